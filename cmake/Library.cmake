@@ -1,0 +1,28 @@
+# The two libraries made of dvs_objects. The exported names stand in one list, dvs.symbols: the version script is
+# written from it, and a test compares it with what the shared library really exports.
+
+set(DVS_SYMBOLS ${CMAKE_SOURCE_DIR}/dvs.symbols)
+set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${DVS_SYMBOLS})
+file(STRINGS ${DVS_SYMBOLS} dvs_names REGEX "^[A-Za-z_]")
+list(JOIN dvs_names ";\n    " dvs_globals)
+set(DVS_VERSION_SCRIPT ${CMAKE_BINARY_DIR}/dvs.map)
+file(WRITE ${DVS_VERSION_SCRIPT} "DVS_1 {\n  global:\n    ${dvs_globals};\n  local:\n    *;\n};\n")
+
+add_library(dvs SHARED $<TARGET_OBJECTS:dvs_objects>)
+add_library(dvs::dvs ALIAS dvs)
+set_target_properties(dvs PROPERTIES VERSION 1.0.0 SOVERSION 1 LINK_DEPENDS ${DVS_VERSION_SCRIPT})
+target_include_directories(dvs INTERFACE
+  $<BUILD_INTERFACE:${CMAKE_SOURCE_DIR}/include> $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
+target_link_options(dvs PRIVATE LINKER:--version-script=${DVS_VERSION_SCRIPT})
+target_link_libraries(dvs PRIVATE dvs_platform_shared Threads::Threads)
+
+add_library(dvs_static STATIC $<TARGET_OBJECTS:dvs_objects>)
+add_library(dvs::dvs_static ALIAS dvs_static)
+set_target_properties(dvs_static PROPERTIES OUTPUT_NAME dvs)
+target_include_directories(dvs_static INTERFACE
+  ${CMAKE_SOURCE_DIR}/include ${CMAKE_SOURCE_DIR}/platform/include ${CMAKE_SOURCE_DIR})
+target_link_libraries(dvs_static INTERFACE dvs_platform Threads::Threads)
+
+install(TARGETS dvs dvs_static dvs_platform dvs_platform_shared
+  LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR})
+install(DIRECTORY include/dvs DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})

@@ -1,0 +1,17 @@
+# dvs_add_test(NAME <target> SOURCES <files…> [LIBS <targets…>] [LABEL unit|integration] [ARGS <arguments…>])
+#
+# One GoogleTest program; each of its tests is a ctest of its own, so that the process-wide switch table starts
+# empty every time. The label "unit" is for tests that take milliseconds, "integration" for the rest.
+function(dvs_add_test)
+  cmake_parse_arguments(T "" "NAME;LABEL" "SOURCES;LIBS;ENVIRONMENT" ${ARGN})
+  if(NOT T_LABEL)
+    set(T_LABEL unit)
+  endif()
+  add_executable(${T_NAME} ${T_SOURCES})
+  target_link_libraries(${T_NAME} PRIVATE dvs_flags ${T_LIBS} dvs::dvs_static dvs::platform GTest::gtest_main)
+  target_include_directories(${T_NAME} PRIVATE ${CMAKE_SOURCE_DIR}/tests)
+  target_compile_definitions(${T_NAME} PRIVATE
+    DVS_SOURCE_DIR="${CMAKE_SOURCE_DIR}" DVS_BINARY_DIR="${CMAKE_BINARY_DIR}")
+  gtest_discover_tests(${T_NAME} DISCOVERY_MODE PRE_TEST DISCOVERY_TIMEOUT 60
+    PROPERTIES LABELS ${T_LABEL} TIMEOUT 300 ENVIRONMENT "${T_ENVIRONMENT}")
+endfunction()

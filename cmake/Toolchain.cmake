@@ -1,0 +1,23 @@
+# Compiler settings every target of this tree shares, carried by the interface target dvs_flags.
+
+find_program(CCACHE_PROGRAM ccache)
+if(CCACHE_PROGRAM)
+  set(CMAKE_C_COMPILER_LAUNCHER ${CCACHE_PROGRAM})
+  set(CMAKE_CXX_COMPILER_LAUNCHER ${CCACHE_PROGRAM})
+endif()
+
+add_library(dvs_flags INTERFACE)
+target_compile_options(dvs_flags INTERFACE -Wall -Wextra -Wpedantic -Wconversion -Wshadow)
+if(DVS_WERROR)
+  target_compile_options(dvs_flags INTERFACE -Werror)
+endif()
+
+# Sanitizers and coverage must cover every object of a program, so they are set for the whole tree.
+if(DVS_SANITIZE)
+  add_compile_options(-fsanitize=${DVS_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer -O1)
+  add_link_options(-fsanitize=${DVS_SANITIZE})
+endif()
+if(DVS_COVERAGE)
+  add_compile_options(--coverage -fprofile-update=atomic)
+  add_link_options(--coverage)
+endif()
