@@ -21,3 +21,8 @@ if(DVS_COVERAGE)
   add_compile_options(--coverage -fprofile-update=atomic)
   add_link_options(--coverage)
 endif()
+
+# Bounds checks of the standard library where speed does not count, the C library's where it does.
+add_compile_definitions($<$<CONFIG:Debug>:_GLIBCXX_ASSERTIONS> $<$<CONFIG:Release>:_FORTIFY_SOURCE=2>)
+add_compile_options($<$<CONFIG:Release>:-fstack-protector-strong>)
+add_link_options(LINKER:-z,relro,-z,now)

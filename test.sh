@@ -1,0 +1,64 @@
+#!/bin/bash
+# Builds everything and runs every test, in the release build and under AddressSanitizer and
+# UndefinedBehaviorSanitizer. The last line says how many tests passed and failed.
+set -euo pipefail
+cd "$(dirname "$0")"
+
+usage() {
+    cat <<'EOF'
+Usage: ./test.sh [OPTIONS]
+
+  --fast         only the unit tests, only the debug build: the loop while editing
+  --no-install   do not install missing packages
+  --jobs N       parallel compilations and tests (default: one per processor)
+  --help         this text
+
+Exit status: 0 when every test passed, 1 otherwise, 2 for wrong usage.
+EOF
+}
+
+presets=(release asan)
+label=()
+install=yes
+jobs=$(nproc)
+while [ $# -gt 0 ]; do
+    case $1 in
+    --fast) presets=(debug) label=(-L unit) ;;
+    --no-install) install=no ;;
+    --jobs) jobs=${2:?--jobs wants a number} && shift ;;
+    --help | -h) usage && exit 0 ;;
+    *) usage >&2 && exit 2 ;;
+    esac
+    shift
+done
+
+[ "$install" = no ] || cmake/install-packages.sh
+
+passed=0
+failed=0
+skipped=0
+summary=
+for preset in "${presets[@]}"; do
+    echo "== $preset: build"
+    cmake --preset "$preset" -DDVS_WERROR=ON >/dev/null
+    cmake --build --preset "$preset" --parallel "$jobs" -- --quiet
+    echo "== $preset: test"
+    report=build/$preset/test-results.xml
+    rm -f "$report"
+    # Only what failed is worth reading; the report has the rest.
+    ctest --preset "$preset" --parallel "$jobs" --output-junit "$PWD/$report" "${label[@]}" |
+        grep -vE '^ *(Start +[0-9]+:|[0-9]+/[0-9]+ Test .* Passed |$)' || true
+    count() { tr '\n\t' '  ' <"$report" | grep -o '<testsuite [^>]*>' | grep -oE " $1=\"[0-9]+\"" | grep -oE '[0-9]+'; }
+    [ -s "$report" ] && total=$(count tests) && [ "$total" -gt 0 ] || { echo "No test ran in $preset" >&2; exit 1; }
+    bad=$(($(count failures) + $(count disabled)))
+    skipped=$((skipped + $(count skipped)))
+    total=$((total - $(count skipped)))
+    passed=$((passed + total - bad))
+    failed=$((failed + bad))
+    summary="$summary, $preset $((total - bad)) of $total"
+done
+
+echo
+[ "$skipped" -eq 0 ] || echo "$skipped tests could not run on this machine; each says why in its output."
+echo "Tests: $passed passed, $failed failed (${summary#, })"
+[ "$failed" -eq 0 ]
