@@ -2,9 +2,10 @@
 #ifndef CONFIGSTORE_CONVERTERS_CONVERTER_H
 #define CONFIGSTORE_CONVERTERS_CONVERTER_H
 
-// What a converter is: the pair of functions that carries one kind of setting between its binary value in a property
-// list and typed fields of the config store. The frame (configstore/maps/prop_frame.h) walks the row's path, then
-// calls the pair that the converter table holds under the row's type; it never looks at a key.
+// What a converter is: the pair of functions that carries one kind of setting between its binary value in a
+// property list and typed fields of the config store. The frame (configstore/maps/prop_frame.h) walks the
+// row's path, then calls the pair that the converter table holds under the row's type; it never looks at a
+// key.
 
 #include <cstdint>
 #include <span>
@@ -15,13 +16,14 @@
 namespace dvs::convert {
 
 struct SaveArgs {
-    configstore::Object *root;      // the object the frame was given: the switch's, or the port's for class 2
-    configstore::Object *parent;    // where the path walk ended: the object that holds the leaf
-    const char *leaf;               // last name of the row's path
-    std::span<const uint8_t> value; // the property's bytes; shorter than the fields read means -1, nothing read
-    const char *key;                // the property's key
-    uint32_t propClass;             // DVS_PROP_CLASS_*
-    uint32_t propType;              // the property's own type word
+    configstore::Object *root;   // the object the frame was given: the switch's, or the port's for class 2
+    configstore::Object *parent; // where the path walk ended: the object that holds the leaf
+    const char *leaf;            // last name of the row's path
+    std::span<const uint8_t>
+        value;          // the property's bytes; shorter than the fields read means -1, nothing read
+    const char *key;    // the property's key
+    uint32_t propClass; // DVS_PROP_CLASS_*
+    uint32_t propType;  // the property's own type word
 };
 
 struct LoadArgs {
@@ -29,16 +31,17 @@ struct LoadArgs {
     configstore::Object *parent; // as above, reached without creating anything
     DVSData *list;               // the property list under construction
     const char *leaf;
-    const char *key;   // the row's key
-    uint32_t propType; // the row's load property type
+    const char *key;    // the row's key
+    uint32_t propType;  // the row's load property type
+    uint32_t propClass; // DVS_PROP_CLASS_*: whose list is being built
 };
 
-// 0, a store status (at the first store call that fails; what was written stays), or -1 for a value that the store
-// cannot express.
+// 0, a store status (at the first store call that fails; what was written stays), or -1 for a value that the
+// store cannot express.
 using SaveFn = int32_t (*)(const SaveArgs &args);
 
-// 0 with at most one DVSData_Update of args.key, 0 with none when the leaf is absent or the row is not for this
-// class of switch, or a status that ends the load. A status from DVSData_Update is passed on as it is.
+// 0 with at most one DVSData_Update of args.key, 0 with none when the leaf is absent or the row is not for
+// this class of switch, or a status that ends the load. A status from DVSData_Update is passed on as it is.
 using LoadFn = int32_t (*)(const LoadArgs &args);
 
 struct Converter {

@@ -4,6 +4,7 @@
 
 /* The whole exported interface. */
 
+#include "dvs/configstore.h"
 #include "dvs/data.h"
 #include "dvs/file.h"
 #include "dvs/log.h"

@@ -1,0 +1,60 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The parts of the converters' shared helpers that are more than a line (configstore/converters/common.h).
+
+#include "configstore/converters/common.h"
+
+#include <algorithm>
+
+namespace dvs::convert {
+
+Text::Text(std::span<const uint8_t> bytes) {
+    if (bytes.empty()) {
+        text_ = "";
+        return;
+    }
+    if (std::memchr(bytes.data(), 0, bytes.size())) {
+        text_ = reinterpret_cast<const char *>(bytes.data());
+        return;
+    }
+    char *copy = small_;
+    if (bytes.size() >= sizeof small_) {
+        large_.reset(static_cast<char *>(std::malloc(bytes.size() + 1)));
+        if (!large_) return;
+        copy = large_.get();
+    }
+    std::memcpy(copy, bytes.data(), bytes.size());
+    copy[bytes.size()] = '\0';
+    text_ = copy;
+}
+
+void CopyUnbounded(std::span<uint8_t> value, std::size_t offset, const char *text) {
+    if (offset >= value.size()) return;
+    CopyBounded(value.subspan(offset), text);
+}
+
+void CopyBounded(std::span<uint8_t> slot, const char *text) {
+    if (slot.empty()) return;
+    const std::size_t length = strnlen(text, slot.size() - 1);
+    std::memcpy(slot.data(), text, length);
+    slot[length] = 0;
+}
+
+int32_t Store(const LoadArgs &args, std::span<const uint8_t> value) {
+    return static_cast<int32_t>(DVSData_Update(args.list, args.key, value.data(),
+                                               static_cast<uint32_t>(value.size()), args.propType));
+}
+
+const char *EnumText(std::span<const char *const> table, uint32_t index) {
+    return index < table.size() ? table[index] : nullptr;
+}
+
+std::optional<uint32_t> EnumIndex(std::span<const char *const> table, const char *text) {
+    const auto first =
+        std::find_if(table.begin(), table.end(), [](const char *slot) { return slot != nullptr; });
+    for (auto slot = first; slot != table.end() && *slot; ++slot) {
+        if (std::strcmp(*slot, text) == 0) return static_cast<uint32_t>(slot - table.begin());
+    }
+    return std::nullopt;
+}
+
+} // namespace dvs::convert

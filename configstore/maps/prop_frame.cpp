@@ -1,0 +1,187 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The frame around every converter (prop_frame.h). It knows rows, paths and types; what a value looks like is
+// the converters' business, so nothing here looks at a key.
+
+#include "configstore/maps/prop_frame.h"
+
+#include <algorithm>
+#include <cstdlib>
+#include <iterator>
+#include <memory>
+
+#include <time.h>
+
+#include "configstore/converters/converter.h"
+#include "configstore/converters/table.h"
+#include "configstore/log.h"
+#include "configstore/maps/prop_lookup.h"
+
+uint32_t dvsSwitchClass = 0;
+bool dvsWidePortRecords = false;
+configstore::Object *dvsLoadedSwitch = nullptr;
+int64_t dvsConfigStoreTimeMs = 0;
+
+namespace {
+
+using dvs::config::LogError;
+using dvs::config::LogTrace;
+using dvs::convert::ConverterFor;
+
+constexpr int32_t kFailed = -1;
+constexpr uint32_t kMaxDepth = std::extent_v<decltype(DVSProp2ConfigEntry::path)>;
+constexpr uint32_t kPropTypeState = 0x10;
+constexpr const char *kPortResourcePoolsKey = "com.orbeno.common.port.respools.cfg";
+constexpr const char *kTrafficResourcesLeaf = "traffic_resources";
+
+struct ListDeleter {
+    void operator()(DVSData *list) const { DVSData_Free(list); }
+};
+using ListOwner = std::unique_ptr<DVSData, ListDeleter>;
+
+void *HeapAlloc(uint64_t size) {
+    return std::malloc(size);
+}
+
+// The tables are writable: a row's depth may have been set to anything.
+uint32_t Depth(const DVSProp2ConfigEntry &row) {
+    return std::min(row.depth, kMaxDepth);
+}
+const char *Leaf(const DVSProp2ConfigEntry &row) {
+    return row.path[std::max(Depth(row), 1U) - 1];
+}
+
+int32_t RunSave(const DVSProp2ConfigEntry &row, const dvs::convert::SaveArgs &args) {
+    const auto *converter = ConverterFor(row.converterType);
+    if (!converter) {
+        LogError("Unknow prop type: %d\n", static_cast<int>(row.converterType));
+        return kFailed;
+    }
+    return converter->save(args);
+}
+
+int32_t FailedToSet(const char *key, int32_t status) {
+    LogError("Set prop: %s failed\n", key);
+    return status;
+}
+
+// The list under construction and where it comes from, as every row's converter is given them.
+struct LoadRun {
+    configstore::Object *object;
+    DVSData *list;
+    uint32_t propClass;
+};
+
+int32_t FailedToLoad(const char *key, const char *leaf, uint32_t type, int32_t status) {
+    LogError("Faild to load prop: %s, key: %s, type:%d from configstore, rc: %d\n", key, leaf,
+             static_cast<int>(type), status);
+    return status;
+}
+
+int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row) {
+    configstore::Object *parent = nullptr;
+    int32_t status = GetSubObjectByPath(row.path, Depth(row), run.object, &parent, false);
+    if (status == configstore::NOT_FOUND) return 0;
+    if (status) return status;
+    const auto *converter = ConverterFor(row.converterType);
+    status = converter ? converter->load({run.object, parent, run.list, Leaf(row), row.key, row.loadPropType,
+                                          run.propClass})
+                       : kFailed;
+    return status ? FailedToLoad(row.key, Leaf(row), row.converterType, status) : 0;
+}
+
+int32_t LoadRows(const LoadRun &run, configstore::Object *trafficResources) {
+    for (const auto *row = GetConfigMap(static_cast<int>(run.propClass)); row->key; ++row) {
+        if (const int32_t status = LoadRow(run, *row)) return status;
+    }
+    if (run.propClass != DVS_PROP_CLASS_PORT || !trafficResources) return 0;
+    return ConverterFor(dvs::convert::kTypeTrafficResources)
+        ->load({run.object, trafficResources, run.list, kTrafficResourcesLeaf, kPortResourcePoolsKey,
+                kPropTypeState, run.propClass});
+}
+
+int32_t BuildProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
+                   uint32_t serializeFlags, configstore::Object *trafficResources) {
+    DVSData *handle = nullptr;
+    if (DVSData_Alloc(&handle, HeapAlloc, std::free) != HYP_OK) return kFailed;
+    const ListOwner list(handle);
+    if (const int32_t status = LoadRows({object, handle, propClass}, trafficResources)) return status;
+    void *buf = nullptr;
+    uint32_t len = 0;
+    HYP_ReturnStatus status = DVSData_Serialize(handle, &buf, &len, serializeFlags);
+    if (status == HYP_OK) status = DVSData_Update(outList, propsName, buf, len, kPropTypeState);
+    std::free(buf);
+    return static_cast<int32_t>(status);
+}
+
+} // namespace
+
+int64_t dvsConfigStoreNowMs() {
+    timespec now;
+    clock_gettime(CLOCK_MONOTONIC, &now);
+    return int64_t{now.tv_sec} * 1000 + now.tv_nsec / 1'000'000;
+}
+
+int32_t GetOrCreateSubObject(bool create, configstore::Object *parent, const char *name,
+                             const char *instanceId, configstore::Object **out) {
+    *out = nullptr;
+    int32_t status = configstore::GetSubObject(parent, name, instanceId, out);
+    if (status == configstore::OK) return status;
+    if (status != configstore::NOT_FOUND) {
+        LogError("GetOrCreateSubObject for prop: %s failed, failure code: %d\n", name, status);
+        return status;
+    }
+    if (!create) return status;
+    status = configstore::CreateSubObject(parent, name, instanceId, out);
+    if (status) LogError("Create sub object for key: %s failed\n", name);
+    return status;
+}
+
+int32_t GetSubObjectByPath(const char (*path)[128], uint32_t depth, configstore::Object *object,
+                           configstore::Object **out, bool create) {
+    configstore::Object *current = object;
+    for (uint32_t level = 0; level + 1 < depth; ++level) {
+        configstore::Object *next = nullptr;
+        if (const int32_t status = GetOrCreateSubObject(create, current, path[level], nullptr, &next))
+            return status;
+        current = next;
+    }
+    *out = current;
+    return 0;
+}
+
+int32_t SaveProp(configstore::Object *object, const char *key, const void *value, uint32_t len,
+                 uint32_t propClass, uint32_t propType) {
+    const uint32_t known = propClass == DVS_PROP_CLASS_HOST || propClass == DVS_PROP_CLASS_PORT
+                               ? propClass
+                               : uint32_t{DVS_PROP_CLASS_GLOBAL};
+    const uint32_t defaultType =
+        known == DVS_PROP_CLASS_PORT ? dvs::convert::kTypePortDefault : dvs::convert::kTypeSwitchDefault;
+    const auto *row = dvs::config::FindRow(GetConfigMap(static_cast<int>(known)), key, defaultType);
+    if (!row) {
+        LogError("Unknow prop: %s\n", key);
+        return FailedToSet(key, kFailed);
+    }
+    LogTrace("Compare %s : %s success\n", key, row->key);
+
+    configstore::Object *parent = object;
+    int32_t status = GetSubObjectByPath(row->path, Depth(*row), object, &parent, true);
+    if (status) {
+        LogError("Failed to get/create sub object for dvs prop:%s stop and return\n", key);
+        return FailedToSet(key, status);
+    }
+    const int64_t start = dvsConfigStoreNowMs();
+    status = RunSave(
+        *row,
+        {object, parent, Leaf(*row), {static_cast<const uint8_t *>(value), len}, key, propClass, propType});
+    dvsConfigStoreTimeMs += dvsConfigStoreNowMs() - start;
+    return status ? FailedToSet(key, status) : 0;
+}
+
+int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
+                  uint32_t serializeFlags, configstore::Object *trafficResources) {
+    LogTrace("LoadProps: %s\n", propsName);
+    const int32_t status =
+        BuildProps(propsName, object, outList, propClass, serializeFlags, trafficResources);
+    if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
+    return status;
+}
