@@ -5,9 +5,9 @@
 #include "platform/runtime.h"
 
 #include <cerrno>
+#include <chrono>
 #include <cstdio>
 #include <cstdlib>
-#include <ctime>
 #include <memory>
 #include <unistd.h>
 
@@ -16,14 +16,18 @@ namespace {
 constexpr std::size_t kStampSize = 80;
 
 std::size_t FormatStamp(char (&stamp)[kStampSize], uint32_t level) {
-    timespec now{};
-    clock_gettime(CLOCK_REALTIME, &now);
-    tm parts{};
-    gmtime_r(&now.tv_sec, &parts);
-    char time[32];
-    std::strftime(time, sizeof time, "%Y-%m-%dT%H:%M:%S", &parts);
-    const int length = std::snprintf(stamp, sizeof stamp, "%s.%03ldZ dvs[%ld] level %u: ", time,
-                                     now.tv_nsec / 1000000, static_cast<long>(getpid()), level);
+    // Not gmtime_r and strftime: those read the time zone's file, which a log line may well be about.
+    using namespace std::chrono;
+    const auto now = floor<milliseconds>(system_clock::now());
+    const auto today = floor<days>(now);
+    const year_month_day date(today);
+    const hh_mm_ss time(now - today);
+    const int length =
+        std::snprintf(stamp, sizeof stamp, "%04d-%02u-%02uT%02ld:%02ld:%02ld.%03ldZ dvs[%ld] level %u: ",
+                      static_cast<int>(date.year()), static_cast<unsigned>(date.month()),
+                      static_cast<unsigned>(date.day()), static_cast<long>(time.hours().count()),
+                      static_cast<long>(time.minutes().count()), static_cast<long>(time.seconds().count()),
+                      static_cast<long>(time.subseconds().count()), static_cast<long>(getpid()), level);
     return length > 0 ? static_cast<std::size_t>(length) : 0;
 }
 

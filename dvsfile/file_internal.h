@@ -1,0 +1,69 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSFILE_FILE_INTERNAL_H
+#define DVSFILE_FILE_INTERNAL_H
+
+// What the files of this folder share: sizes, the owner of a descriptor and the way out for messages.
+
+#include <cerrno>
+#include <chrono>
+#include <cstdint>
+
+#include <unistd.h>
+
+#include "dvs/status.h"
+
+namespace dvs::file {
+
+/// Transfers are aligned to this in memory, in offset and in length, as direct I/O wants it.
+inline constexpr uint64_t kBlockSize = 512;
+
+/// First size that a state file must not have.
+inline constexpr uint64_t kSizeLimit = uint64_t{1} << 32;
+
+constexpr uint64_t PaddedSize(uint64_t len) {
+    return (len + kBlockSize - 1) & ~(kBlockSize - 1);
+}
+
+/// Owner of a file descriptor.
+class Descriptor {
+public:
+    Descriptor() = default;
+    explicit Descriptor(int fd) : fd_(fd) {}
+    Descriptor(Descriptor &&other) noexcept : fd_(other.Release()) {}
+    Descriptor &operator=(Descriptor &&other) noexcept {
+        Reset(other.Release());
+        return *this;
+    }
+    ~Descriptor() { Reset(-1); }
+
+    [[nodiscard]] int Get() const { return fd_; }
+    explicit operator bool() const { return fd_ >= 0; }
+
+private:
+    int Release() {
+        const int fd = fd_;
+        fd_ = -1;
+        return fd;
+    }
+    void Reset(int fd) {
+        // A close that fails has released the descriptor all the same; errno stays that of the failure
+        // before.
+        const int savedErrno = errno;
+        if (fd_ >= 0) (void)close(fd_);
+        errno = savedErrno;
+        fd_ = fd;
+    }
+
+    int fd_ = -1;
+};
+
+/// Gives one message to the sink or to the host's log. State-file messages are not guarded by a debug level.
+void Report(const char *format, ...) __attribute__((format(printf, 1, 2)));
+
+/// DVSFile_WriteDurable with the time it waits for the directory's lock.
+[[nodiscard]] HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len,
+                                            std::chrono::milliseconds lockWait);
+
+} // namespace dvs::file
+
+#endif
