@@ -26,3 +26,5 @@ target_link_libraries(dvs_static INTERFACE dvs_platform Threads::Threads)
 install(TARGETS dvs dvs_static dvs_platform dvs_platform_shared
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR})
 install(DIRECTORY include/dvs DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+configure_file(cmake/libdvs.pc.in ${CMAKE_BINARY_DIR}/libdvs.pc @ONLY)
+install(FILES ${CMAKE_BINARY_DIR}/libdvs.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
