@@ -1,0 +1,241 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The property list: an ordered chain of entries, each carrying the image of its serialized form. Bottom of
+// the dvsdata layer; leans on format.h for sizes and emit.h for messages. Everything above uses it through
+// dvs/data.h.
+
+#include "dvsdata/list_internal.h"
+
+#include <algorithm>
+#include <cstring>
+#include <functional>
+
+#include "dvsdata/emit.h"
+
+namespace dvs::data {
+namespace {
+
+int PrintLen(std::string_view name) {
+    return static_cast<int>(std::min<std::size_t>(name.size(), INT32_MAX));
+}
+
+/// The link that holds `entry`, and the entry before it.
+struct Place {
+    DVSDataEntry *previous = nullptr;
+    DVSDataEntry *entry = nullptr;
+};
+
+Place Find(const DVSData *list, std::string_view name) {
+    Place place{nullptr, list->head};
+    while (place.entry && !NameMatches(place.entry->name, name))
+        place = {place.entry, place.entry->next};
+    return place;
+}
+
+/// Takes the entry out of the chain and out of the list's size, and says so. The caller frees it.
+void Unlink(DVSData *list, Place place) {
+    DVSDataEntry *const entry = place.entry;
+    (place.previous ? place.previous->next : list->head) = entry->next;
+    if (list->tail == entry) list->tail = place.previous;
+    list->serialSize -= entry->serialSize;
+    Emit(kDetail, "Remove entry %s, datalen = %u, flag = 0x%x serialSize = %u\n", entry->name, entry->dataLen,
+         entry->propType, list->serialSize);
+}
+
+/// Writes all but the value. Bytes the format leaves open are zero: images are reproducible and carry no heap
+/// contents.
+void FillEntry(DVSDataEntry *entry, std::uint32_t serialSize, std::string_view name, std::uint32_t dataLen,
+               std::uint32_t propType) {
+    // The padding lies in the last 5 bytes of the block; for an empty value this runs into the fields set
+    // next.
+    std::memset(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset + serialSize - 8, 0, 8);
+    entry->next = nullptr;
+    entry->serialSize = serialSize;
+    std::memset(entry->name, 0, kNameSize);
+    std::memcpy(entry->name, name.data(), std::min<std::size_t>(name.size(), kMaxNameLen));
+    entry->propType = propType;
+    entry->dataLen = dataLen;
+}
+
+bool Overlaps(const void *bytes, std::size_t size, const DVSDataEntry *entry) {
+    const auto *const begin = static_cast<const std::uint8_t *>(bytes);
+    const auto *const block = reinterpret_cast<const std::uint8_t *>(entry);
+    const std::less<const std::uint8_t *> before;
+    return before(begin, block + kImageOffset + entry->serialSize) && before(block, begin + size);
+}
+
+HYP_ReturnStatus Replace(DVSData *list, Place place, std::string_view name, const void *data,
+                         std::uint32_t dataLen, std::uint32_t propType) {
+    DVSDataEntry *const old = place.entry;
+    const std::uint32_t newType = propType ? propType : old->propType;
+    // Name and value may be the old entry's own: then it has to outlive the append.
+    const bool ownBytes = Overlaps(data, dataLen, old) || Overlaps(name.data(), name.size() + 1, old);
+    Unlink(list, place);
+    if (!ownBytes) list->freeFn(old);
+    const HYP_ReturnStatus status = Append(list, name, data, dataLen, newType);
+    if (ownBytes) list->freeFn(old);
+    return status;
+}
+
+HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
+                        std::uint32_t propType) {
+    const std::uint32_t effectiveType = propType ? propType : kDefaultPropType;
+    const Place place = Find(list, name);
+    if (!place.entry) return Append(list, name, data, dataLen, effectiveType);
+    if (place.entry->dataLen != dataLen) return Replace(list, place, name, data, dataLen, propType);
+
+    // Type 0 resets the type here and keeps it in Replace: callers rely on both.
+    if (dataLen) std::memmove(place.entry->data, data, dataLen);
+    place.entry->propType = effectiveType;
+    Emit(kDetail, "updated data %.*s, datalen = %d, serialSize = %d\n", PrintLen(name), name.data(), dataLen,
+         list->serialSize);
+    return HYP_OK;
+}
+
+} // namespace
+
+bool NameMatches(const char *field, std::string_view name) {
+    if (name.size() >= kNameSize) return std::memcmp(field, name.data(), kNameSize) == 0;
+    // Most names differ only behind a long common beginning, so the end is compared first.
+    return field[name.size()] == '\0' && (name.empty() || field[name.size() - 1] == name.back()) &&
+           std::memcmp(field, name.data(), name.size()) == 0;
+}
+
+void EmitAdding(std::string_view name, std::uint32_t dataLen, std::uint32_t startSize) {
+    if (Emits(kDetail)) [[unlikely]]
+        Emit(kDetail, "added data %.*s, len %d, start serialSize = %d\n", PrintLen(name), name.data(),
+             dataLen, startSize);
+}
+
+void EmitAdded(std::string_view name, std::uint32_t serialSize) {
+    if (Emits(kDetail)) [[unlikely]]
+        Emit(kDetail, "added data %.*s, serialSize = %d\n", PrintLen(name), name.data(), serialSize);
+}
+
+HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
+                        std::uint32_t propType) {
+    const std::uint32_t serialSize = EntrySize(dataLen);
+    if (dataLen > serialSize) [[unlikely]] {
+        Emit(kDetail, "Datalen %u, serial size %u for prop %.*s will cause unsigned operation warp\n",
+             dataLen, serialSize, PrintLen(name), name.data());
+        return HYP_BAD_PARAM;
+    }
+    if (serialSize > UINT32_MAX - kImageOffset) [[unlikely]] {
+        Emit(kDetail, "Serial size %u for prop %.*s will cause unsigned operation warp\n", serialSize,
+             PrintLen(name), name.data());
+        return HYP_BAD_PARAM;
+    }
+    EmitAdding(name, dataLen, list->serialSize);
+
+    auto *const entry = static_cast<DVSDataEntry *>(list->allocFn(kImageOffset + std::uint64_t{serialSize}));
+    if (!entry) return HYP_NO_MEMORY;
+    FillEntry(entry, serialSize, name, dataLen, propType);
+    if (dataLen) std::memcpy(entry->data, data, dataLen);
+    (list->tail ? list->tail->next : list->head) = entry;
+    list->tail = entry;
+    list->serialSize += serialSize;
+
+    EmitAdded(name, list->serialSize);
+    return HYP_OK;
+}
+
+void RemoveAfter(DVSData *list, DVSDataEntry *previous) {
+    DVSDataEntry *const entry = previous ? previous->next : list->head;
+    Unlink(list, {previous, entry});
+    list->freeFn(entry);
+}
+
+} // namespace dvs::data
+
+using namespace dvs::data;
+
+HYP_ReturnStatus DVSData_Alloc(DVSData **list, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn) {
+    Emit(kTrace, "Allocing new handle\n");
+    auto *const handle = static_cast<DVSData *>(allocFn(sizeof(DVSData)));
+    if (!handle) return HYP_NO_MEMORY;
+    *handle = DVSData{kMinBufferSize, nullptr, nullptr, allocFn, freeFn};
+    *list = handle;
+    Emit(kTrace, "DVSData handle allocated, serialSize = %d\n", handle->serialSize);
+    return HYP_OK;
+}
+
+void DVSData_Free(DVSData *list) {
+    if (!list) return;
+    while (DVSDataEntry *const entry = list->head) {
+        list->head = entry->next;
+        list->freeFn(entry);
+    }
+    list->freeFn(list);
+}
+
+HYP_ReturnStatus DVSData_Append(DVSData *list, const char *name, const void *data, uint32_t dataLen,
+                                uint32_t propType) {
+    return Append(list, name, data, dataLen, propType);
+}
+
+HYP_ReturnStatus DVSData_Update(DVSData *list, const char *name, const void *data, uint32_t dataLen,
+                                uint32_t propType) {
+    return Update(list, name, data, dataLen, propType);
+}
+
+HYP_ReturnStatus DVSData_UpdateProp(DVSData *list, const char *name, const void *data, uint32_t dataLen) {
+    return Update(list, name, data, dataLen, 0);
+}
+
+HYP_ReturnStatus DVSDataRemove(DVSData *list, const char *name, uint32_t *propType) {
+    const Place place = Find(list, name);
+    if (propType) *propType = place.entry ? place.entry->propType : kDefaultPropType;
+    if (!place.entry) return HYP_NOT_FOUND;
+    RemoveAfter(list, place.previous);
+    return HYP_OK;
+}
+
+HYP_ReturnStatus DVSData_Remove(DVSData *list, const char *name) {
+    return DVSDataRemove(list, name, nullptr);
+}
+
+HYP_ReturnStatus DVSData_Lookup(DVSData *list, const char *name, DVSDataEntry **entry) {
+    DVSDataEntry *const found = Find(list, name).entry;
+    if (!found) return HYP_NOT_FOUND;
+    *entry = found;
+    return HYP_OK;
+}
+
+HYP_ReturnStatus DVSData_Next(DVSData *list, DVSDataEntry *current, DVSDataEntry **next) {
+    DVSDataEntry *const entry = current ? current->next : list->head;
+    if (!entry) return HYP_NOT_FOUND;
+    *next = entry;
+    return HYP_OK;
+}
+
+void DVSData_ForEach(DVSData *list, DVSDataForEachFn callback, void *arg) {
+    // The callback may remove the entry it is given, so its successor is fetched first.
+    for (DVSDataEntry *entry = list->head, *next; entry; entry = next) {
+        next = entry->next;
+        if (callback(entry->name, entry->data, entry->dataLen, entry->propType, arg)) return;
+    }
+}
+
+const char *DVSData_Name(const DVSDataEntry *entry) {
+    return entry->name;
+}
+
+uint32_t DVSData_PropType(const DVSDataEntry *entry) {
+    return entry->propType;
+}
+
+uint32_t DVSData_Data(DVSDataEntry *entry, void **data) {
+    *data = entry->data;
+    return entry->dataLen;
+}
+
+bool DVSData_IsSamePropType(const DVSDataEntry *entry, uint32_t kind) {
+    return (entry->propType & kPropKindMask) == kind;
+}
+
+void DVSData_FreeAssocData(DVSData *list, void *block) {
+    list->freeFn(block);
+}
+
+void DVSData_GetMemFreeFn(DVSData *list, DVSDataFreeFn *freeFn) {
+    *freeFn = list->freeFn;
+}
