@@ -1,0 +1,40 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The switch state's one way out for messages, on top of dvsdata/log.h; every file of this folder calls it.
+
+#include "dvsstate/message.h"
+
+#include <cstdarg>
+#include <cstdio>
+
+#include "dvs/state.h"
+#include "dvsdata/log.h"
+#include "platform/status_text.h"
+
+int32_t dvs_debug = -1;
+
+namespace dvs::state {
+
+bool Prints(int level) {
+    return dvs_debug >= level;
+}
+
+void Message(int level, const char *format, ...) {
+    if (!Prints(level)) return;
+    va_list args;
+    va_start(args, format);
+    log::ToStream(stdout, level, format, args);
+    va_end(args);
+}
+
+void MessageUnguarded(const char *format, ...) {
+    va_list args;
+    va_start(args, format);
+    log::ToStream(stderr, log::kUnguarded, format, args);
+    va_end(args);
+}
+
+const char *Text(HYP_ReturnStatus status) {
+    return HYP_ReturnStatusToString(status);
+}
+
+} // namespace dvs::state

@@ -1,0 +1,90 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Allocation of switch and port records (switch_record.h): the lowest piece of the switch table.
+
+#include "dvsstate/switch_record.h"
+
+#include <bit>
+#include <cstdlib>
+#include <cstring>
+#include <new>
+
+#include "platform/runtime.h"
+
+namespace dvs::state {
+
+// Fronts leave the records behind them aligned, as the bucket array does with the front.
+static_assert(sizeof(SwitchFront) % alignof(DVSwitch) == 0);
+static_assert(sizeof(PortFront) % alignof(DVSPort) == 0);
+static_assert(kWalkedSlots * sizeof(uint32_t) % alignof(DVSwitch) == 0);
+
+SwitchFront &FrontOf(DVSwitch *sw) {
+    return *(reinterpret_cast<SwitchFront *>(sw) - 1);
+}
+
+PortFront &FrontOf(DVSPort *port) {
+    return *(reinterpret_cast<PortFront *>(port) - 1);
+}
+
+uint32_t *BucketsOf(DVSwitch *sw) {
+    SwitchFront &front = FrontOf(sw);
+    return reinterpret_cast<uint32_t *>(&front) - front.bucketCapacity;
+}
+
+namespace {
+
+/// As many buckets as slots, to the next power of two; none where the slots are walked anyway.
+std::size_t BucketCapacity(uint32_t slotNum) {
+    return slotNum > kWalkedSlots ? std::bit_ceil(std::size_t{slotNum}) : 0;
+}
+
+/// The buckets stay unwritten until the index is built, so a switch of few ports never touches their pages.
+DVSwitch *NewRecord(uint32_t slotNum) {
+    const std::size_t capacity = BucketCapacity(slotNum);
+    if (capacity > UINT32_MAX) return nullptr;
+    const std::size_t bucketSize = capacity * sizeof(uint32_t);
+    const std::size_t recordSize = sizeof(DVSwitch) + std::size_t{slotNum} * sizeof(DVSPort *);
+    auto *block = static_cast<unsigned char *>(std::malloc(bucketSize + sizeof(SwitchFront) + recordSize));
+    if (!block) return nullptr;
+    auto *front = new (block + bucketSize) SwitchFront{};
+    front->slotNum = slotNum;
+    front->bucketCapacity = static_cast<uint32_t>(capacity);
+    return static_cast<DVSwitch *>(std::memset(static_cast<void *>(front + 1), 0, recordSize));
+}
+
+} // namespace
+
+HYP_ReturnStatus NewSwitch(uint32_t slotNum, DVSwitch **out) {
+    DVSwitch *sw = NewRecord(slotNum);
+    if (!sw) return HYP_NO_MEMORY;
+    HYP_ReturnStatus status = HYP_NO_MEMORY;
+    sw->portBitmap = BitVector_Alloc(slotNum);
+    if (sw->portBitmap) status = DVSData_Alloc(&sw->globalPropList, std::malloc, std::free);
+    if (status == HYP_OK) status = DVSData_Alloc(&sw->hostPropList, std::malloc, std::free);
+    if (status != HYP_OK) {
+        FreeSwitch(sw);
+        return status;
+    }
+    *out = sw;
+    return HYP_OK;
+}
+
+void FreeSwitch(DVSwitch *sw) {
+    if (!sw) return;
+    DVSData_Free(sw->globalPropList);
+    DVSData_Free(sw->hostPropList);
+    if (sw->portBitmap) BitVector_Free(sw->portBitmap);
+    std::free(BucketsOf(sw));
+}
+
+DVSPort *NewPort() {
+    void *block = std::calloc(1, sizeof(PortFront) + sizeof(DVSPort));
+    return block ? reinterpret_cast<DVSPort *>(static_cast<PortFront *>(block) + 1) : nullptr;
+}
+
+void FreePort(DVSPort *port) {
+    if (!port) return;
+    DVSData_Free(port->portData);
+    std::free(&FrontOf(port));
+}
+
+} // namespace dvs::state

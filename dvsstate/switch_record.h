@@ -1,0 +1,59 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSSTATE_SWITCH_RECORD_H
+#define DVSSTATE_SWITCH_RECORD_H
+
+// The allocation of switch and port records. Callers see exactly the fields of DVSwitch and DVSPort; what the
+// library keeps for itself stands in front of the record in the same block:
+//
+//     | buckets[bucketCapacity] | SwitchFront | DVSwitch … ports[slotNum] |     | PortFront | DVSPort |
+//                                             ^ the address everyone else knows             ^ likewise
+//
+// Used by the switch table (creation, removal), the port table (slots) and the port index (buckets, links).
+
+#include <cstdint>
+
+#include "dvs/state.h"
+
+namespace dvs::state {
+
+/// Private fields of a switch. They are valid as long as the record.
+struct SwitchFront {
+    uint32_t slotNum;        // slots that ports[] really has: the host-wide limit at creation
+    uint32_t usedSlots;      // one past the highest slot that ever held a port
+    uint32_t firstFree;      // every slot below holds a port
+    uint32_t portNum;        // ports in the index
+    uint32_t bucketNum;      // buckets in use, a power of two; 0 while there is no index
+    uint32_t bucketCapacity; // buckets in front of these fields; 0 for a record with few slots
+};
+
+/// Private fields of a port: its links in the switch's index. Meaningless while the switch has none.
+struct PortFront {
+    uint32_t hash; // of the id
+    uint32_t slot; // where the port stands
+    uint32_t next; // slot + 1 of the next port in the bucket, 0 at its end
+    uint32_t tail; // in a bucket's first port: slot + 1 of its last one
+};
+
+// A switch with few slots in use is walked; an index would cost it more than it saves.
+inline constexpr uint32_t kWalkedSlots = 64;
+
+[[nodiscard]] SwitchFront &FrontOf(DVSwitch *sw);
+[[nodiscard]] PortFront &FrontOf(DVSPort *port);
+[[nodiscard]] uint32_t *BucketsOf(DVSwitch *sw);
+
+/// A record with `slotNum` empty slots, its bit vector and both property lists empty. HYP_NO_MEMORY when any
+/// of its blocks cannot be had; nothing is left behind then.
+[[nodiscard]] HYP_ReturnStatus NewSwitch(uint32_t slotNum, DVSwitch **out);
+
+/// Frees the record, its bit vector and property lists; not its ports. None is fine.
+void FreeSwitch(DVSwitch *sw);
+
+/// A zeroed record; none when there is no memory.
+[[nodiscard]] DVSPort *NewPort();
+
+/// Frees the record and its port data. None is fine.
+void FreePort(DVSPort *port);
+
+} // namespace dvs::state
+
+#endif
