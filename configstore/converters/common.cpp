@@ -27,6 +27,16 @@ Text::Text(std::span<const uint8_t> bytes) {
     text_ = copy;
 }
 
+int32_t SetText(configstore::Object *object, const char *name, std::span<const uint8_t> bytes) {
+    const Text text(bytes);
+    return text.get() ? configstore::SetValueStr(object, name, text.get()) : kFailed;
+}
+
+int32_t AppendText(configstore::Object *object, const char *list, std::span<const uint8_t> bytes) {
+    const Text text(bytes);
+    return text.get() ? configstore::AppendValueString(object, list, text.get()) : kFailed;
+}
+
 void CopyUnbounded(std::span<uint8_t> value, std::size_t offset, const char *text) {
     if (offset >= value.size()) return;
     CopyBounded(value.subspan(offset), text);

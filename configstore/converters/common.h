@@ -76,6 +76,12 @@ private:
     const char *text_ = nullptr;
 };
 
+/// SetValueStr and AppendValueString of the text at the start of `bytes`. kFailed when there was no memory
+/// for it.
+[[nodiscard]] int32_t SetText(configstore::Object *object, const char *name, std::span<const uint8_t> bytes);
+[[nodiscard]] int32_t AppendText(configstore::Object *object, const char *list,
+                                 std::span<const uint8_t> bytes);
+
 /// Copies `text` with its NUL to `offset` the way an unbounded copy into a slot would: it may run into the
 /// slots behind, but it stops at the end of `value`, whose last byte stays NUL.
 void CopyUnbounded(std::span<uint8_t> value, std::size_t offset, const char *text);

@@ -53,9 +53,7 @@ int32_t LoadMtu(const LoadArgs &args) {
 }
 
 int32_t SaveText(const SaveArgs &args) {
-    const Text text(args.value);
-    if (!text.get()) return kFailed;
-    return configstore::SetValueStr(args.parent, args.leaf, text.get());
+    return SetText(args.parent, args.leaf, args.value);
 }
 
 int32_t LoadText(const LoadArgs &args) {

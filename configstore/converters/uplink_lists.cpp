@@ -22,10 +22,8 @@ std::optional<uint32_t> CountOf(std::span<const uint8_t> value, std::size_t slot
 
 int32_t AppendSlots(const SaveArgs &args, uint32_t count, std::size_t slotSize) {
     for (uint32_t slot = 0; slot < count; ++slot) {
-        const Text text(args.value.subspan(kCountSize + slot * slotSize));
-        if (!text.get()) return kFailed;
-        if (const int32_t status = configstore::AppendValueString(args.parent, args.leaf, text.get()))
-            return status;
+        const auto text = args.value.subspan(kCountSize + slot * slotSize);
+        if (const int32_t status = AppendText(args.parent, args.leaf, text)) return status;
     }
     return 0;
 }

@@ -1,0 +1,164 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Link aggregation groups: a count and entries of 93 bytes <-> the instances of "lacp_groups". Called through
+// the converter table; port_lacp.cpp shares the table of modes.
+
+#include "configstore/converters/lacp_groups.h"
+
+#include "configstore/converters/common.h"
+#include "configstore/layouts/records.h"
+
+const char *LACP_MODE_2_CAHRS[] = {"NONE", "ACTIVE", "PASSIVE", nullptr};
+const char *LACP_LB_POLICY_SCHEMA[] = {
+    "NONE",
+    "DSTMAC",
+    "SRCMAC",
+    "SRCMAC_DSTMAC",
+    "DSTIP",
+    "SRCIP",
+    "SRCIP_DSTIP",
+    "VLAN",
+    "DSTIP_VLAN",
+    "SRCIP_VLAN",
+    "SRCIP_DSTIP_VLAN",
+    "DSTPORT",
+    "SRCPORT",
+    "SRCPORT_DSTPORT",
+    "DSTIP_DSTPORT",
+    "SRCIP_SRCPORT",
+    "SRCIP_DSTIP_SRCPORT_DSTPORT",
+    "DSTIP_DSTPORT_VLAN",
+    "SRCIP_SRCPORT_VLAN",
+    "SRCIP_DSTIP_SRCPORT_DSTPORT_VLAN",
+    "SRCID",
+    nullptr,
+};
+
+namespace dvs::layout {
+
+constexpr Domain kLacpModes = {"LACP_MODE_2_CAHRS", LACP_MODE_2_CAHRS, std::size(LACP_MODE_2_CAHRS), {}};
+
+namespace {
+
+constexpr Domain kAlgorithms = {
+    "LACP_LB_POLICY_SCHEMA", LACP_LB_POLICY_SCHEMA, std::size(LACP_LB_POLICY_SCHEMA), {}};
+
+// clang-format off
+constexpr Field kGroupFields[] = {
+    // name                   offset width kind             domain        meaning
+    {"name",                       0,   65, Kind::kText,     nullptr,      "name of the group"},
+    {"key",                       65,   16, Kind::kText,     nullptr,      "key of the group"},
+    {"mode",                      81,    4, Kind::kEnum,     &kLacpModes,  "whether the group speaks first, answers only, or neither"},
+    {"load_balance_algorithm",    85,    4, Kind::kEnum,     &kAlgorithms, "what decides over which uplink a frame goes"},
+    {"uplink_num",                89,    4, Kind::kUnsigned, nullptr,      "number of uplinks"},
+};
+constexpr Record kGroup = {"LACP group", 93, kGroupFields, {}};
+static_assert(IsSound(kGroup));
+
+constexpr Field kTableFields[] = {
+    // name  offset width kind          domain   meaning
+    {"count",     0,    4, Kind::kCount, nullptr, "number of groups"},
+};
+constexpr Part kTableParts[] = {
+    {"groups", &kGroup, CountBy::kField, 0, "count", nullptr, 0, "the groups"},
+};
+// clang-format on
+
+} // namespace
+
+constexpr Record kLacpTable = {"LACP group table", 4, kTableFields, kTableParts};
+static_assert(IsSound(kLacpTable));
+
+} // namespace dvs::layout
+
+namespace dvs::convert {
+namespace {
+
+using layout::AreaOf;
+using layout::At;
+using layout::kGroup;
+
+constexpr auto kCount = At<uint32_t>(layout::kLacpTable, "count");
+constexpr auto kName = AreaOf(kGroup, "name");
+constexpr auto kKey = AreaOf(kGroup, "key");
+constexpr auto kMode = At<uint32_t>(kGroup, "mode");
+constexpr auto kAlgorithm = At<uint32_t>(kGroup, "load_balance_algorithm");
+constexpr auto kUplinkNum = At<uint32_t>(kGroup, "uplink_num");
+
+constexpr std::size_t kHeadSize = layout::kLacpTable.size;
+constexpr uint32_t kUnknown = 0xFFFFFFFF;
+
+// `bytes` starts at the group and runs to the value's end: a text that lacks its NUL ends there.
+int32_t SaveGroup(const SaveArgs &args, std::span<const uint8_t> bytes) {
+    const Text key(bytes.subspan(kKey.offset));
+    if (!key.get()) return kFailed;
+    configstore::Object *group = nullptr;
+    int32_t status = GetOrCreateSubObject(true, args.parent, args.leaf, key.get(), &group);
+    if (status) return status;
+    status = SetText(group, "name", bytes.subspan(kName.offset));
+    if (status) return status;
+    status = configstore::SetValueStr(group, "mode", EnumText(LACP_MODE_2_CAHRS, Get(bytes, kMode)));
+    if (status) return status;
+    status = configstore::SetValueStr(group, "load_balance_algorithm",
+                                      EnumText(LACP_LB_POLICY_SCHEMA, Get(bytes, kAlgorithm)));
+    if (status) return status;
+    return configstore::SetValueUint32(group, "uplink_num", Get(bytes, kUplinkNum));
+}
+
+uint32_t AlgorithmOf(const char *text) {
+    const auto index = EnumIndex(LACP_LB_POLICY_SCHEMA, text);
+    if (!index) config::LogError("Unknown lacp lb policy %s\n", text);
+    return index.value_or(kUnknown);
+}
+
+int32_t LoadGroup(configstore::Object *group, std::span<uint8_t> entry) {
+    StoreText text;
+    if (text.Read(group, "name") == 0) CopyBounded(entry.subspan(kName.offset, kName.size), text.get());
+    if (text.Read(group, "key") == 0) CopyBounded(entry.subspan(kKey.offset, kKey.size), text.get());
+    if (text.Read(group, "mode") == 0) Put(entry, kMode, LacpModeOf(text.get()));
+    if (text.Read(group, "load_balance_algorithm") == 0) Put(entry, kAlgorithm, AlgorithmOf(text.get()));
+    uint32_t uplinks = 0;
+    const int32_t status = configstore::GetValueUint32(group, "uplink_num", &uplinks);
+    if (status == 0) Put(entry, kUplinkNum, uplinks);
+    return status;
+}
+
+} // namespace
+
+uint32_t LacpModeOf(const char *text) {
+    const auto index = EnumIndex(LACP_MODE_2_CAHRS, text);
+    if (!index) config::LogError("Unknown lacp mode %s\n", text);
+    return index.value_or(kUnknown);
+}
+
+int32_t SaveLacpGroups(const SaveArgs &args) {
+    if (args.value.size() < kHeadSize) return kFailed;
+    const uint32_t count = Get(args.value, kCount);
+    if (!HoldsRecords(args.value, kHeadSize, count, kGroup.size)) return kFailed;
+    int32_t status = 0;
+    for (std::size_t i = 0; i < count && !status; ++i) {
+        status = SaveGroup(args, args.value.subspan(kHeadSize + i * kGroup.size));
+    }
+    return status;
+}
+
+int32_t LoadLacpGroups(const LoadArgs &args) {
+    Instances groups;
+    int32_t status = groups.Read(args.parent, args.leaf);
+    if (status) return status == configstore::NOT_FOUND ? 0 : status;
+    if (groups.items().empty()) return 0;
+    Block block;
+    if (!block.Allocate(kHeadSize + groups.items().size() * kGroup.size)) {
+        config::LogError("Failed to alloc memory for LACPTable\n");
+        return kFailed;
+    }
+    Put(block.bytes(), kCount, static_cast<uint32_t>(groups.items().size()));
+    std::size_t at = kHeadSize;
+    for (configstore::Object *group : groups.items()) {
+        status = LoadGroup(group, block.bytes().subspan(at, kGroup.size));
+        if (status) return status;
+        at += kGroup.size;
+    }
+    return Store(args, block.bytes());
+}
+
+} // namespace dvs::convert

@@ -1,0 +1,105 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef CONFIGSTORE_CONVERTERS_MIRROR_RECORD_H
+#define CONFIGSTORE_CONVERTERS_MIRROR_RECORD_H
+
+// The binary record of mirror sessions: a head, the sessions, and the port records of all sessions one behind
+// the other. For each session in order come its destinations, its receive sources and its transmit sources.
+// Switches of a version above 99 have wide port records. Only mirror.cpp includes this.
+
+#include <iterator>
+
+#include "configstore/layouts/records.h"
+#include "dvs/configstore.h"
+
+namespace dvs::layout::mirror {
+
+inline constexpr Domain kSessionTypes = {
+    "SESSION_TYPE_LOCAL_ENUM_2_SCHEMA", SESSION_TYPE_LOCAL_ENUM_2_SCHEMA, VSPAN_SESSION_TYPE_NUM, {}};
+inline constexpr Domain kEncapTypes = {
+    "ENCAP_TYPE_LOCAL_ENUM_2SCHEMA", ENCAP_TYPE_LOCAL_ENUM_2SCHEMA, VSPAN_ENCAP_TYPE_NUM, {}};
+
+// clang-format off
+inline constexpr Flag kSessionBits[] = {
+    {0x01, "normal_traffic_not_allowed", "the destination carries mirrored traffic only"},
+    {0x02, "from_store",                 "set by a load together with 0x01"},
+    {0x04, "keep_original_vlan",         "the original VLAN tag is not stripped"},
+    {0x08, "encapsulation_vlan",         "an encapsulation VLAN id is set"},
+    {0x10, "legacy_mode",                "legacy mode; a save also names the switch's promiscuous-mode session by it"},
+    {0x20, "disabled",                   "the session is switched off"},
+};
+inline constexpr Flag kConnecteeBits[] = {
+    {0x1, "VM_VNIC",       "adapters of virtual machines"},
+    {0x2, "PNIC",          "physical adapters"},
+    {0x4, "from_store",    "set by a load for a list that has any text"},
+    {0x8, "HOST_HYP_VNIC", "adapters of the host itself"},
+};
+inline constexpr const char *kPortKindTexts[] = {"port key", "uplink port name"};
+
+inline constexpr Domain kSessionFlags = {"session flags", nullptr, 0, kSessionBits};
+inline constexpr Domain kConnecteeTypes = {"connectee types", nullptr, 0, kConnecteeBits};
+inline constexpr Domain kPortKinds = {"port record kinds", kPortKindTexts, 2, {}};
+
+inline constexpr Field kSessionFields[] = {
+    // name                    offset width kind             domain            meaning
+    {"key",                         0,   32, Kind::kText,     nullptr,          "session key"},
+    {"name",                       32,   81, Kind::kText,     nullptr,          "session name"},
+    {"unused_1",                  113,    3, Kind::kReserved, nullptr,          "0"},
+    {"session_type",              116,    4, Kind::kEnum,     &kSessionTypes,   "what is mirrored, and where to"},
+    {"mirrored_packet_length",    120,    4, Kind::kUnsigned, nullptr,          "bytes mirrored of a frame; 0xFFFFFFFF: not set"},
+    {"flags",                     124,    4, Kind::kFlags,    &kSessionFlags,   "how the session works"},
+    {"encapsulation_vlan_id",     128,    2, Kind::kUnsigned, nullptr,          "VLAN of the mirrored frames"},
+    {"receive_connectee_types",   130,    2, Kind::kFlags,    &kConnecteeTypes, "ports that are receive sources by their kind"},
+    {"transmit_connectee_types",  132,    2, Kind::kFlags,    &kConnecteeTypes, "ports that are transmit sources by their kind"},
+    {"unused_2",                  134,    2, Kind::kReserved, nullptr,          "0"},
+    {"sampling_rate",             136,    4, Kind::kUnsigned, nullptr,          "one frame in so many is mirrored"},
+    {"encap_type",                140,    4, Kind::kEnum,     &kEncapTypes,     "how mirrored frames are wrapped"},
+    {"erspan_id",                 144,    2, Kind::kUnsigned, nullptr,          "ERSPAN session id"},
+    {"erspan_COS",                146,    1, Kind::kUnsigned, nullptr,          "ERSPAN class of service"},
+    {"erspan_gra_nanosec",        147,    1, Kind::kBool,     nullptr,          "ERSPAN time stamps in nanoseconds"},
+    {"unused_3",                  148,   68, Kind::kReserved, nullptr,          "0"},
+    {"destination_count",         216,    4, Kind::kShare,    nullptr,          "number of destination records"},
+    {"receive_count",             220,    4, Kind::kShare,    nullptr,          "number of receive-source records"},
+    {"transmit_count",            224,    4, Kind::kShare,    nullptr,          "number of transmit-source records"},
+    {"first_record",              228,    4, Kind::kUnsigned, nullptr,          "index of the session's first port record; set by a load"},
+};
+inline constexpr Record kSession = {"mirror session", 232, kSessionFields, {}};
+static_assert(IsSound(kSession));
+
+inline constexpr Field kNarrowPortFields[] = {
+    // name  offset width kind         domain       meaning
+    {"kind",      0,    4, Kind::kEnum, &kPortKinds, "what the name is"},
+    {"name",      4,   32, Kind::kText, nullptr,     "port key or uplink name; by session type a VLAN id (2 bytes) or an "
+                                                     "address (1 byte not 0 for IPv6, 3 unused, 4 or 16 bytes)"},
+};
+inline constexpr Field kWidePortFields[] = {
+    // name  offset width kind         domain       meaning
+    {"kind",      0,    4, Kind::kEnum, &kPortKinds, "as in the narrow record"},
+    {"name",      4,   48, Kind::kText, nullptr,     "as in the narrow record"},
+};
+inline constexpr Record kNarrowPort = {"narrow port record", 36, kNarrowPortFields, {}};
+inline constexpr Record kWidePort = {"wide port record", 52, kWidePortFields, {}};
+static_assert(IsSound(kNarrowPort) && IsSound(kWidePort));
+
+inline constexpr Field kHeadFields[] = {
+    // name         offset width kind             domain   meaning
+    {"magic",            0,    4, Kind::kMagic,    nullptr, "0xFACEBEEF"},
+    {"version",          4,    4, Kind::kUnsigned, nullptr, "version of the format, 1"},
+    {"session_count",    8,    4, Kind::kCount,    nullptr, "number of sessions"},
+    {"port_count",      12,    4, Kind::kUnsigned, nullptr, "number of port records; set by a load, not read by a save"},
+    {"reserved",        16,    4, Kind::kReserved, nullptr, "0"},
+};
+inline constexpr Part kNarrowParts[] = {
+    {"sessions", &kSession,    CountBy::kField, 0, "session_count", nullptr, 0, "the sessions"},
+    {"ports",    &kNarrowPort, CountBy::kShare, 0, nullptr,         nullptr, 0, "the sessions' ports"},
+};
+inline constexpr Part kWideParts[] = {
+    {"sessions", &kSession,  CountBy::kField, 0, "session_count", nullptr, 0, "the sessions"},
+    {"ports",    &kWidePort, CountBy::kShare, 0, nullptr,         nullptr, 0, "the sessions' ports"},
+};
+// clang-format on
+
+inline constexpr uint32_t kHeadSize = 20;
+
+} // namespace dvs::layout::mirror
+
+#endif

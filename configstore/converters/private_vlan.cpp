@@ -1,0 +1,156 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Private VLAN map of a switch: entries of 8 bytes <-> the instances of "pvlans". Called through the
+// converter table.
+
+#include "configstore/converters/private_vlan.h"
+
+#include "configstore/converters/common.h"
+#include "configstore/converters/switch_version.h"
+#include "configstore/layouts/records.h"
+
+const char *PVLAN_2_CHARS[] = {nullptr, "PROMISCUOUS", "ISOLATED", "COMMUNITY", nullptr};
+int32_t CHARS_2_PVLAN[] = {-1, 1, 2, 3, -1};
+
+namespace dvs::layout {
+namespace {
+
+constexpr Domain kPvlanTypes = {"PVLAN_2_CHARS", PVLAN_2_CHARS, std::size(PVLAN_2_CHARS), {}};
+
+// clang-format off
+constexpr Field kEntryFields[] = {
+    // name         offset width kind             domain        meaning
+    {"primary_id",       0,    2, Kind::kUnsigned, nullptr,      "primary VLAN id"},
+    {"secondary_id",     2,    2, Kind::kUnsigned, nullptr,      "secondary VLAN id"},
+    {"type",             4,    1, Kind::kEnum,     &kPvlanTypes, "whom ports of the secondary VLAN can reach"},
+    {"padding",          5,    3, Kind::kReserved, nullptr,      "0"},
+};
+constexpr Record kEntry = {"private VLAN", 8, kEntryFields, {}};
+static_assert(IsSound(kEntry));
+
+constexpr Part kMapParts[] = {
+    {"entries", &kEntry, CountBy::kRest, 0, nullptr, nullptr, 0, "the pairs; bytes behind the last whole one are ignored"},
+};
+// clang-format on
+
+} // namespace
+
+constexpr Record kPrivateVlanMap = {"private VLAN map", 0, {}, kMapParts};
+static_assert(IsSound(kPrivateVlanMap));
+
+} // namespace dvs::layout
+
+namespace dvs::convert {
+namespace {
+
+using layout::At;
+using layout::kEntry;
+
+constexpr auto kPrimaryId = At<uint16_t>(kEntry, "primary_id");
+constexpr auto kSecondaryId = At<uint16_t>(kEntry, "secondary_id");
+constexpr auto kType = At<uint8_t>(kEntry, "type");
+
+constexpr const char *kVswitchKey = "com.orbeno.vswitch.pvlanMap";
+constexpr const char *kEtherswitchKey = "com.orbeno.etherswitch.pvlanMap";
+// Above this version number a switch keeps its map under the vswitch key, whatever its class.
+constexpr uint32_t kLastEtherswitchVersion = 106;
+
+int32_t SaveEntry(const SaveArgs &args, std::span<const uint8_t> entry) {
+    StoreText id;
+    int32_t status = id.Generate();
+    if (status) return status;
+    configstore::Object *instance = nullptr;
+    status = GetOrCreateSubObject(true, args.parent, args.leaf, id.get(), &instance);
+    if (status) return status;
+    status = configstore::SetValueUint16(instance, "primary_id", Get(entry, kPrimaryId));
+    if (status) return status;
+    status = configstore::SetValueUint16(instance, "secondary_id", Get(entry, kSecondaryId));
+    if (status) return status;
+    return configstore::SetValueStr(instance, "type", EnumText(PVLAN_2_CHARS, Get(entry, kType)));
+}
+
+// The type byte of a store text; nothing, after a message, for a text that is none.
+std::optional<uint8_t> ParseType(const char *text) {
+    const auto index = EnumIndex(PVLAN_2_CHARS, text);
+    if (!index) {
+        config::LogError("Unknown PvlanType %s\n", text);
+        return std::nullopt;
+    }
+    return static_cast<uint8_t>(CHARS_2_PVLAN[*index]);
+}
+
+int32_t LoadEntry(configstore::Object *instance, std::span<uint8_t> entry) {
+    uint16_t id = 0;
+    int32_t status = configstore::GetValueUint16(instance, "primary_id", &id);
+    if (status) return status;
+    Put(entry, kPrimaryId, id);
+    status = configstore::GetValueUint16(instance, "secondary_id", &id);
+    if (status) return status;
+    Put(entry, kSecondaryId, id);
+    StoreText text;
+    status = text.Read(instance, "type");
+    if (status) return status;
+    const auto type = ParseType(text.get());
+    if (!type) return kFailed;
+    Put(entry, kType, *type);
+    return 0;
+}
+
+// The one key that this switch keeps its map under.
+int32_t ChooseKey(configstore::Object *switchObject, const char **key) {
+    configstore::Object *product = nullptr;
+    int32_t status = configstore::GetSubObject(switchObject, "product", nullptr, &product);
+    if (status) {
+        config::LogError("Failed to get product obj, rc: %d\n", status);
+        return status;
+    }
+    StoreText forwardingClass;
+    status = forwardingClass.Read(product, "forwarding_class");
+    if (status) {
+        config::LogError("Failed to get forwarding_class, rc: %d\n", status);
+        return status;
+    }
+    uint32_t version = 0;
+    if (ReadSwitchVersion(switchObject, &version)) return kFailed;
+    const bool isVswitch =
+        std::strcmp(forwardingClass.get(), "cswitch") == 0 || version > kLastEtherswitchVersion;
+    *key = isVswitch ? kVswitchKey : kEtherswitchKey;
+    return 0;
+}
+
+} // namespace
+
+int32_t SavePrivateVlans(const SaveArgs &args) {
+    int32_t status = configstore::SetValueEmptyList(args.parent, args.leaf);
+    const std::size_t count = args.value.size() / kEntry.size;
+    for (std::size_t i = 0; i < count && !status; ++i) {
+        status = SaveEntry(args, args.value.subspan(i * kEntry.size, kEntry.size));
+    }
+    return status;
+}
+
+int32_t LoadPrivateVlans(const LoadArgs &args) {
+    const char *key = nullptr;
+    int32_t status = ChooseKey(args.root, &key);
+    if (status) return status;
+    if (std::strcmp(args.key, key) != 0) return 0;
+
+    Instances entries;
+    status = entries.Read(args.parent, args.leaf);
+    if (status) return status == configstore::NOT_FOUND ? 0 : status;
+    if (entries.items().empty()) return 0;
+    Block block;
+    if (!block.Allocate(entries.items().size() * kEntry.size)) {
+        config::LogError(key == kVswitchKey ? "Failed to alloc memory for VSPvlanMapEntry\n"
+                                            : "Failed to alloc memory for ESPvlanMapEntry\n");
+        return kFailed;
+    }
+    std::size_t at = 0;
+    for (configstore::Object *instance : entries.items()) {
+        status = LoadEntry(instance, block.bytes().subspan(at, kEntry.size));
+        if (status) return status;
+        at += kEntry.size;
+    }
+    return Store(args, block.bytes());
+}
+
+} // namespace dvs::convert

@@ -1,0 +1,44 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Transmit-uplink mode of a port: one of two texts <-> the bool "tx_uplink". Called through the converter
+// table.
+
+#include "configstore/converters/tx_uplink.h"
+
+#include "configstore/converters/common.h"
+#include "configstore/layouts/records.h"
+
+namespace dvs::layout {
+namespace {
+
+// clang-format off
+constexpr Field kTxUplinkFields[] = {
+    // name offset width kind            domain   meaning
+    {"mode",     0,    7, Kind::kLiteral, nullptr, "\"always\" or \"normal\", with its NUL"},
+};
+// clang-format on
+
+} // namespace
+
+constexpr Record kTxUplink = {"transmit-uplink mode", 7, kTxUplinkFields, {}};
+static_assert(IsSound(kTxUplink));
+
+} // namespace dvs::layout
+
+namespace dvs::convert {
+
+int32_t SaveTxUplink(const SaveArgs &args) {
+    return configstore::SetValueBool(args.parent, args.leaf, BeginsWithText(args.value, "always"));
+}
+
+int32_t LoadTxUplink(const LoadArgs &args) {
+    const char *wanted =
+        dvsSwitchClass == 0 ? "com.orbeno.etherswitch.port.txUplink" : "com.orbeno.vswitch.port.txUplink";
+    if (std::strcmp(args.key, wanted) != 0) return 0;
+    bool always = false;
+    const int32_t status = configstore::GetValueBool(args.parent, args.leaf, &always);
+    if (status) return status == configstore::NOT_FOUND ? 0 : status;
+    const char *mode = always ? "always" : "normal";
+    return Store(args, {reinterpret_cast<const uint8_t *>(mode), layout::kTxUplink.size});
+}
+
+} // namespace dvs::convert
