@@ -1,0 +1,43 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef CONFIGSTORE_LAYOUTS_STORE_FORM_H
+#define CONFIGSTORE_LAYOUTS_STORE_FORM_H
+
+// The other side of every converter, as data: the typed fields that a property has in the config store, below
+// the leaf of its row. From it come the typed display and input of values and the tables of
+// docs/properties.md.
+
+#include <cstdint>
+#include <span>
+
+#include "configstore/layouts/layout.h"
+
+namespace dvs::layout {
+
+enum class Form : uint8_t {
+    kNone, // nothing a tree can show: the rows that take every unmapped key
+    kBool,
+    kUint16,
+    kUint32,
+    kInt,
+    kLong,
+    kText,
+    kTexts,     // list of texts
+    kInts,      // list of numbers
+    kObject,    // singleton sub-object with members
+    kInstances, // list of instances with members
+};
+
+struct StoreField {
+    const char *name; // of a member; of a leaf the row's last path name stands in its place, and this is null
+    Form form;
+    const char *unit;     // of a number; may be empty
+    uint32_t maxText;     // longest text in bytes that survives a load whole; 0: no limit
+    const Domain *domain; // texts that are known; null: any
+    const char *id;       // of instances: the member that is the instance id; null: ids mean nothing
+    std::span<const StoreField> members; // of objects and of instances
+    const char *meaning;
+};
+
+} // namespace dvs::layout
+
+#endif
