@@ -7,6 +7,7 @@
 #include "dvs/configstore.h"
 #include "dvs/data.h"
 #include "dvs/file.h"
+#include "dvs/hyp.h"
 #include "dvs/log.h"
 #include "dvs/state.h"
 #include "dvs/status.h"

@@ -1,0 +1,166 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The device channel: plain calls over the cached descriptor, fetches and command executions over one of
+// their own. Leans on platform/device.h only; every command of the kernel interface goes through here.
+
+#include <atomic>
+#include <cerrno>
+#include <cstdlib>
+#include <memory>
+#include <utility>
+
+#include "kernel/log.h"
+#include "kernel/request.h"
+#include "platform/device.h"
+#include "platform/runtime.h"
+
+namespace {
+
+using dvs::hyp::Address;
+using dvs::hyp::Command;
+
+constexpr const char *kDevicePath = "/pelo/devices/char/hypdriver/dvsdev";
+constexpr int kNoDescriptor = -1;
+
+/// The plain calls' descriptor. Opened by the first call, never closed; a failed open leaves it unset.
+constinit std::atomic<int> g_cachedFd{kNoDescriptor};
+
+int OpenDevice() {
+    const int fd = HostDevice_Open(kDevicePath);
+    if (fd == kNoDescriptor) dvs::hyp::Print("failed to open dvsdev device %s\n", kDevicePath);
+    return fd;
+}
+
+int CachedDescriptor() {
+    int cached = g_cachedFd.load(std::memory_order_acquire);
+    if (cached != kNoDescriptor) return cached;
+    const int opened = OpenDevice();
+    if (opened == kNoDescriptor) return kNoDescriptor;
+    if (g_cachedFd.compare_exchange_strong(cached, opened, std::memory_order_acq_rel)) return opened;
+    // Another thread's first call was quicker: one descriptor is enough.
+    (void)HostDevice_Close(opened);
+    return cached;
+}
+
+/// One call's own descriptor.
+class Device {
+public:
+    Device() : fd_(OpenDevice()) {}
+    ~Device() {
+        if (IsOpen()) (void)HostDevice_Close(fd_);
+    }
+    Device(const Device &) = delete;
+    Device &operator=(const Device &) = delete;
+
+    bool IsOpen() const { return fd_ != kNoDescriptor; }
+
+    /// Presets the record's status and sends it. False when the call failed.
+    bool Send(Command command, DVSHYPRequest *req) const {
+        req->status = HYP_FAILURE;
+        return HostDevice_Ioctl(fd_, static_cast<int>(command), req) != -1;
+    }
+
+private:
+    int fd_;
+};
+
+struct FreeBlock {
+    void operator()(void *block) const { std::free(block); }
+};
+using Block = std::unique_ptr<void, FreeBlock>;
+
+/// A module may name a size of 0, for which malloc may answer null.
+Block AllocateBuffer(uint32_t size) {
+    return Block(std::malloc(size ? size : 1));
+}
+
+/// Hands the buffer over, unless the module claims more bytes than it holds.
+HYP_ReturnStatus HandOut(Block buffer, uint32_t capacity, uint32_t claimed, void **out, uint32_t *outLen) {
+    if (claimed > capacity) {
+        *outLen = 0;
+        return HYP_FAILURE;
+    }
+    *outLen = claimed;
+    *out = buffer.release();
+    return HYP_OK;
+}
+
+/// The result of a receiving call that failed. A failed call with the status of success holds no reply: it is
+/// a claim of bytes that no buffer holds.
+HYP_ReturnStatus Refused(HYP_ReturnStatus status, uint32_t named, uint32_t *outLen) {
+    *outLen = status == HYP_OK ? 0 : named;
+    return status == HYP_OK ? static_cast<HYP_ReturnStatus>(HYP_FAILURE) : status;
+}
+
+void FillExecution(DVSHYPRequest *req, const char *switchName, const char *cmd, const void *in,
+                   uint32_t inLen) {
+    dvs::hyp::SetText(req->switchName, switchName);
+    dvs::hyp::SetText(req->cmd, cmd);
+    req->cmdInLen = inLen;
+    req->cmdIn = Address(in);
+    req->cmdOutLen = dvs::hyp::kFirstBufferSize;
+}
+
+} // namespace
+
+extern "C" HYP_ReturnStatus DVSHYP_Ioctl(int request, DVSHYPRequest *req) {
+    const int fd = CachedDescriptor();
+    if (fd == kNoDescriptor) return HYP_FAILURE;
+    req->status = HYP_FAILURE;
+    if (HostDevice_Ioctl(fd, request, req) != -1) return HYP_OK;
+    const int error = errno;
+    // A missing object is an expected answer of the lookups.
+    if (error != ENOENT) dvs::hyp::Print("ioctl failed: %s\n", Err_Errno2String(error));
+    return req->status;
+}
+
+extern "C" HYP_ReturnStatus DVSHYP_CmdExec(const char *switchName, const char *cmd, const void *in,
+                                           uint32_t inLen, void **out, uint32_t *outLen) {
+    *out = nullptr;
+    DVSHYPRequest req{};
+    FillExecution(&req, switchName, cmd, in, inLen);
+    const Device device;
+    if (!device.IsOpen()) return HYP_FAILURE;
+    for (;;) {
+        const uint32_t capacity = req.cmdOutLen;
+        Block buffer = AllocateBuffer(capacity);
+        if (!buffer) {
+            dvs::hyp::Print("failed to alloc buffer memory");
+            *outLen = capacity;
+            return HYP_NO_MEMORY;
+        }
+        req.cmdOut = Address(buffer.get());
+        if (device.Send(Command::CmdExec, &req))
+            return HandOut(std::move(buffer), capacity, req.cmdOutLen, out, outLen);
+        // Whether the module asked for more is not looked at: it is asked again for as long as it refuses the
+        // buffer.
+        if (req.status != HYP_LIMIT_EXCEEDED) return Refused(req.status, req.cmdOutLen, outLen);
+    }
+}
+
+extern "C" void DVSHYP_DataFree(void *buf) {
+    std::free(buf);
+}
+
+namespace dvs::hyp {
+
+HYP_ReturnStatus Fetch(Command command, DVSHYPRequest *req, void **out, uint32_t *outLen) {
+    *out = nullptr;
+    const Device device;
+    if (!device.IsOpen()) return HYP_FAILURE;
+    req->dataLen = kFirstBufferSize;
+    for (;;) {
+        const uint32_t capacity = req->dataLen;
+        Block buffer = AllocateBuffer(capacity);
+        if (!buffer) {
+            *outLen = capacity;
+            return HYP_NO_MEMORY;
+        }
+        req->data = Address(buffer.get());
+        if (device.Send(command, req)) return HandOut(std::move(buffer), capacity, req->dataLen, out, outLen);
+        // A module that refuses the buffer without asking for a larger one would be asked for ever.
+        const bool again = req->status == HYP_LIMIT_EXCEEDED && req->dataLen > capacity;
+        if (!again) return Refused(req->status, req->dataLen, outLen);
+    }
+}
+
+} // namespace dvs::hyp

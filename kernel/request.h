@@ -1,0 +1,89 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef KERNEL_REQUEST_H
+#define KERNEL_REQUEST_H
+
+// The request record as the commands fill it, and the growing fetch. The record's layout is the module's
+// interface: every offset that another program could get wrong is pinned here.
+
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+
+#include "dvs/hyp.h"
+
+namespace dvs::hyp {
+
+static_assert(sizeof(DVSHYPRequest) == 424);
+static_assert(offsetof(DVSHYPRequest, switchName) == 0);
+static_assert(offsetof(DVSHYPRequest, portId) == 64);
+static_assert(offsetof(DVSHYPRequest, propName) == 112);
+static_assert(offsetof(DVSHYPRequest, maxPorts) == 240);
+static_assert(offsetof(DVSHYPRequest, version) == 244);
+static_assert(offsetof(DVSHYPRequest, propType) == 248);
+static_assert(offsetof(DVSHYPRequest, reserved) == 252);
+static_assert(offsetof(DVSHYPRequest, status) == 256);
+static_assert(offsetof(DVSHYPRequest, dataLen) == 260);
+static_assert(offsetof(DVSHYPRequest, data) == 264);
+static_assert(offsetof(DVSHYPRequest, cmd) == 272);
+static_assert(offsetof(DVSHYPRequest, cmdInLen) == 400);
+static_assert(offsetof(DVSHYPRequest, cmdIn) == 404);
+static_assert(offsetof(DVSHYPRequest, cmdOutLen) == 412);
+static_assert(offsetof(DVSHYPRequest, cmdOut) == 416);
+static_assert(sizeof(DVSHYPExternalIdResult) == 176);
+static_assert(sizeof(DVSHYPPortListEntry) == 52);
+static_assert(sizeof(DVSHYPPortList) == 8);
+
+/// The module's command numbers; 23 to 25 are not this library's to send.
+enum class Command : int {
+    StateInit = 0,
+    StateCleanup = 1,
+    StateSanitize = 2,
+    StateGet = 3,
+    SwitchAdd = 4,
+    SwitchRemove = 5,
+    SwitchAssociate = 6,
+    SwitchDissociate = 7,
+    GlobalPropGet = 8,
+    GlobalPropSet = 9,
+    GlobalPropClear = 10,
+    HostPropGet = 11,
+    HostPropSet = 12,
+    HostPropClear = 13,
+    PortAdd = 14,
+    PortRemove = 15,
+    PortDataGet = 16,
+    PortDataSet = 17,
+    PortDataClear = 18,
+    PortStateGet = 19,
+    PortFind = 20,
+    SwitchSetMaxPorts = 21,
+    SwitchSetVersion = 22,
+    UplinkDataSet = 26,
+    UplinkDataGet = 27,
+    CmdExec = 28,
+    SmartNICGlobalPropGet = 29,
+    SmartNICHostPropGet = 30,
+    SmartNICPortDataGet = 31,
+};
+
+/// What a fetch and a command execution offer the module first.
+inline constexpr uint32_t kFirstBufferSize = 32768;
+
+/// Copies what fits of `text` with its NUL into a zeroed field.
+template <std::size_t N> void SetText(char (&field)[N], const char *text) {
+    std::memcpy(field, text, strnlen(text, N - 1));
+}
+
+/// An address as the record carries it.
+inline uint64_t Address(const void *pointer) {
+    return reinterpret_cast<std::uintptr_t>(pointer);
+}
+
+/// Sends `req` with a receive buffer that grows for as long as the module names a larger size. On success
+/// `*out` is the caller's, of `*outLen` bytes; otherwise it is null. Opens a descriptor of its own: safe in
+/// any thread.
+[[nodiscard]] HYP_ReturnStatus Fetch(Command command, DVSHYPRequest *req, void **out, uint32_t *outLen);
+
+} // namespace dvs::hyp
+
+#endif
