@@ -221,6 +221,11 @@ void *mmap64(void *address, size_t length, int protection, int flags, int fd, of
     return real(address, length, protection, flags, fd, offset);
 }
 
+ssize_t readlink(const char *path, char *link, size_t size) {
+    static constinit Real<ssize_t(const char *, char *, size_t)> real("readlink");
+    return Fails(Kind::kReadlink, Path(path)) ? -1 : real(path, link, size);
+}
+
 ssize_t getrandom(void *buffer, size_t length, unsigned flags) {
     static constinit Real<ssize_t(void *, size_t, unsigned)> real("getrandom");
     const fault::Decision decision = fault::Decide(Kind::kRandom, {});

@@ -26,8 +26,9 @@ constexpr std::size_t kKindNum = static_cast<std::size_t>(Kind::kNum);
 
 // In the order of Kind.
 constexpr std::array<std::string_view, kKindNum> kKindNames = {
-    "alloc", "open",  "read",  "write", "fsync", "truncate", "rename",  "unlink", "stat", "close", "flock",
-    "lock",  "chmod", "mkdir", "mmap",  "ioctl", "socket",   "connect", "send",   "recv", "random"};
+    "alloc",  "open",    "read",  "write", "fsync",  "truncate", "rename", "unlink",
+    "stat",   "close",   "flock", "lock",  "chmod",  "mkdir",    "mmap",   "ioctl",
+    "socket", "connect", "send",  "recv",  "random", "readlink"};
 
 struct ErrorName {
     std::string_view name;

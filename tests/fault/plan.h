@@ -32,6 +32,7 @@ enum class Kind : unsigned {
     kSend,
     kRecv,
     kRandom,
+    kReadlink,
     kNum
 };
 
