@@ -16,6 +16,11 @@ endif()
 if(DVS_SANITIZE)
   add_compile_options(-fsanitize=${DVS_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer -O1)
   add_link_options(-fsanitize=${DVS_SANITIZE})
+  if(DVS_SANITIZE MATCHES "undefined" AND CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
+    # With any of these three gcc no longer takes the address of a constant for one, and the tables that are checked
+    # at compile time do not compile. What they would find at a null pointer, AddressSanitizer stops at too.
+    add_compile_options(-fno-sanitize=null,nonnull-attribute,returns-nonnull-attribute)
+  endif()
 endif()
 if(DVS_COVERAGE)
   add_compile_options(--coverage -fprofile-update=atomic)
