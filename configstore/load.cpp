@@ -1,0 +1,229 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Loading switches from the config store into one state buffer. Exported (dvs/configstore.h); stands on the
+// property frame, which rebuilds the properties of one store object, and on switch_object.h.
+
+#include "dvs/configstore.h"
+
+#include <cstdlib>
+#include <cstring>
+#include <memory>
+
+#include "configstore/converters/common.h"
+#include "configstore/converters/switch_version.h"
+#include "configstore/log.h"
+#include "configstore/maps/prop_frame.h"
+#include "configstore/switch_object.h"
+#include "platform/status_text.h"
+
+namespace {
+
+using namespace dvs::config;
+using dvs::convert::Instances;
+using dvs::convert::StoreText;
+using dvs::convert::StoreTexts;
+
+constexpr uint32_t kStateType = 0x10; // of every entry of a state and of a switch
+constexpr uint32_t kStateVersion = 9; // what a whole state is serialized with
+
+struct ListDeleter {
+    void operator()(DVSData *list) const { DVSData_Free(list); }
+};
+using ListOwner = std::unique_ptr<DVSData, ListDeleter>;
+
+void *HeapAlloc(uint64_t size) {
+    return std::malloc(size);
+}
+
+HYP_ReturnStatus NewList(ListOwner *list) {
+    DVSData *handle = nullptr;
+    const HYP_ReturnStatus status = DVSData_Alloc(&handle, HeapAlloc, std::free);
+    if (status == HYP_OK) list->reset(handle);
+    return status;
+}
+
+// What is read of a switch object before its properties.
+struct SwitchFields {
+    StoreText uuid;
+    StoreText forwardingClass;
+    int32_t maxPorts = 0;
+    uint32_t version = 0;
+};
+
+int32_t Reported(const char *format, int32_t status) {
+    if (status) LogError(format, status);
+    return status;
+}
+
+int32_t ReadFields(configstore::Object *object, SwitchFields *fields) {
+    if (const int32_t status = Reported("Failed to get uuid, rc: %d\n", fields->uuid.Read(object, "uuid")))
+        return status;
+    LogTrace("Loading switch:%s\n", fields->uuid.get());
+    configstore::Object *product = nullptr;
+    if (const int32_t status = Reported("Failed to get product obj, rc: %d\n",
+                                        configstore::GetSubObject(object, "product", "", &product)))
+        return status;
+    if (const int32_t status = Reported("Failed to get forwarding_class, rc: %d\n",
+                                        fields->forwardingClass.Read(product, "forwarding_class")))
+        return status;
+    return Reported("Failed to get max_ports, rc: %d\n",
+                    configstore::GetValueInt(object, "max_ports", &fields->maxPorts));
+}
+
+int32_t FailedSwitch(const SwitchFields &fields, uint32_t cause) {
+    LogTrace("Load dvs: %s from configstore failed, error: %s\n", fields.uuid.get(),
+             HYP_ReturnStatusToString(cause));
+    return kFailed;
+}
+
+// The three entries that every switch list begins with.
+HYP_ReturnStatus AppendFields(DVSData *list, const SwitchFields &fields) {
+    const char *className = fields.forwardingClass.get();
+    HYP_ReturnStatus status =
+        DVSData_Append(list, "switchVersion", &fields.version, sizeof fields.version, kStateType);
+    if (status == HYP_OK)
+        status = DVSData_Append(list, "className", className,
+                                static_cast<uint32_t>(std::strlen(className) + 1), kStateType);
+    if (status == HYP_OK)
+        status = DVSData_Append(list, "maxPorts", &fields.maxPorts, sizeof fields.maxPorts, kStateType);
+    return status;
+}
+
+int32_t LoadPort(configstore::Object *port, DVSData *list, uint32_t version, const StoreTexts &uplinkKeys,
+                 configstore::Object *resources) {
+    StoreText key;
+    if (const int32_t status = key.Read(port, "key")) return status;
+    const auto uplinks = uplinkKeys.items();
+    // The function only reads; C's const does not reach through two pointers.
+    const bool isUplink = StringExistInArray(key.get(), const_cast<const char **>(uplinks.data()),
+                                             static_cast<uint32_t>(uplinks.size()));
+    return LoadProps(key.get(), port, list, DVS_PROP_CLASS_PORT, version, isUplink ? resources : nullptr);
+}
+
+// The store's "not found" ends the walk over the ports without failing the switch, wherever it comes from:
+// that of an absent list cannot be told from that of a port that lacks something.
+int32_t LoadPorts(configstore::Object *object, DVSData *list, uint32_t version) {
+    Instances ports;
+    int32_t status = ports.Read(object, "ports");
+    if (status && status != configstore::NOT_FOUND) return status;
+    configstore::Object *resources = nullptr;
+    status = configstore::GetSubObject(object, "resource_management", "", &resources);
+    if (status && status != configstore::NOT_FOUND) return status;
+    if (status) resources = nullptr;
+    StoreTexts uplinkKeys;
+    status = uplinkKeys.Read(object, "uplink_port_keys");
+    for (auto *port : ports.items()) {
+        status = LoadPort(port, list, version, uplinkKeys, resources);
+        if (status) break;
+    }
+    return status == configstore::NOT_FOUND ? 0 : status;
+}
+
+int32_t LoadProperties(configstore::Object *object, DVSData *list, uint32_t version) {
+    if (const int32_t status =
+            LoadProps("globalPropList", object, list, DVS_PROP_CLASS_GLOBAL, version, nullptr))
+        return status;
+    if (const int32_t status = LoadProps("hostPropList", object, list, DVS_PROP_CLASS_HOST, version, nullptr))
+        return status;
+    return LoadPorts(object, list, version);
+}
+
+// Names the switch being loaded to the converters for as long as it is.
+class LoadedSwitch {
+public:
+    explicit LoadedSwitch(configstore::Object *object) { dvsLoadedSwitch = object; }
+    ~LoadedSwitch() { dvsLoadedSwitch = nullptr; }
+    LoadedSwitch(const LoadedSwitch &) = delete;
+    LoadedSwitch &operator=(const LoadedSwitch &) = delete;
+};
+
+int32_t LoadSwitch(configstore::Object *object, DVSData *state) {
+    SwitchFields fields;
+    if (const int32_t status = ReadFields(object, &fields)) return status;
+    ListOwner list;
+    if (const HYP_ReturnStatus status = NewList(&list)) return FailedSwitch(fields, status);
+    const LoadedSwitch loaded(object);
+    dvsSwitchClass = SwitchClassOf(fields.forwardingClass.get());
+    if (const int32_t status = dvs::convert::ReadSwitchVersion(object, &fields.version))
+        return FailedSwitch(fields, static_cast<uint32_t>(status));
+    dvsWidePortRecords = fields.version > dvs::convert::kLastNarrowPortVersion;
+    if (const HYP_ReturnStatus status = AppendFields(list.get(), fields)) return FailedSwitch(fields, status);
+    if (const int32_t status = LoadProperties(object, list.get(), fields.version)) return status;
+
+    void *buf = nullptr;
+    uint32_t len = 0;
+    HYP_ReturnStatus status = DVSData_Serialize(list.get(), &buf, &len, fields.version);
+    if (status == HYP_OK) status = DVSData_Append(state, fields.uuid.get(), buf, len, kStateType);
+    std::free(buf);
+    return status == HYP_OK ? 0 : FailedSwitch(fields, status);
+}
+
+// The result of a load that a switch has ended: that of reading its "uuid" once more, which is 0 as a rule.
+// Callers test the buffer as well as the result, and rely on this.
+int32_t EndedBy(configstore::Object *object) {
+    StoreText uuid;
+    const int32_t status = uuid.Read(object, "uuid");
+    if (status == 0) LogError("Failed to load buf of switch: %s from configstore\n", uuid.get());
+    return status;
+}
+
+int32_t LoadAll(const RootObjects &objects, void **out, uint32_t *outLen) {
+    ListOwner state;
+    if (NewList(&state)) return kFailed;
+    for (auto *object : objects.items()) {
+        if (LoadSwitch(object, state.get())) return EndedBy(object);
+    }
+    void *buf = nullptr;
+    uint32_t len = 0;
+    const HYP_ReturnStatus status = DVSData_Serialize(state.get(), &buf, &len, kStateVersion);
+    if (status == HYP_OK) {
+        *out = buf;
+        *outLen = len;
+    }
+    return static_cast<int32_t>(status);
+}
+
+int32_t CopyPortsetName(configstore::Object *from, configstore::Object *to) {
+    StoreText name;
+    return name.Read(from, "portset_name") ? 0 : configstore::SetValueStr(to, "portset_name", name.get());
+}
+
+// The port set's name is this host's, so only the current layer has it. The two lists are matched by
+// position.
+int32_t CompleteDesired(const RootObjects &desired, const RootObjects &current) {
+    if (desired.items().size() != current.items().size()) return kFailed;
+    for (std::size_t i = 0; i < desired.items().size(); ++i) {
+        if (const int32_t status = CopyPortsetName(current.items()[i], desired.items()[i])) return status;
+    }
+    return 0;
+}
+
+} // namespace
+
+int32_t DVSState_LoadFromConfigStoreAsBuf(void **out, uint32_t *outLen, bool desired) {
+    StoreHandle store;
+    if (const int32_t status = store.Open()) return status;
+    SwitchFilter filter;
+    if (const int32_t status = filter.Create()) return status;
+    RootObjects desiredObjects;
+    RootObjects currentObjects;
+    if (desired) {
+        const int32_t status = desiredObjects.ListDesired(store.get());
+        if (status) LogError("Failed to get dvs desired user config instances\n");
+        if (status) return status;
+    }
+    if (const int32_t status = currentObjects.ListCurrent(store.get(), filter.get())) {
+        LogError("Failed to get dvs instances\n");
+        return status;
+    }
+    if (!desired) return LoadAll(currentObjects, out, outLen);
+    const int32_t status = CompleteDesired(desiredObjects, currentObjects);
+    return status ? status : LoadAll(desiredObjects, out, outLen);
+}
+
+bool StringExistInArray(const char *s, const char **array, uint32_t n) {
+    if (!s || !array) return false;
+    for (uint32_t i = 0; i < n; ++i) {
+        if (std::strcmp(s, array[i]) == 0) return true;
+    }
+    return false;
+}

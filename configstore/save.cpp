@@ -1,0 +1,223 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Saving switches to the config store: a state buffer goes into the switch table, every switch of it becomes
+// one store object, all of them in one transaction. Exported (dvs/configstore.h); stands on the property
+// frame for the single property and on switch_object.h for the object around it.
+
+#include "dvs/configstore.h"
+
+#include <cstdlib>
+#include <memory>
+
+#include <syslog.h>
+
+#include "configstore/converters/common.h"
+#include "configstore/log.h"
+#include "configstore/maps/prop_frame.h"
+#include "configstore/switch_object.h"
+#include "dvs/state.h"
+
+namespace {
+
+using namespace dvs::config;
+
+constexpr uint32_t kLastNarrowVersion = 99;
+
+// What the walk over the switches carries along. On the heap, and checked, because running out of memory here
+// has a message and a result of its own.
+struct SaveContext {
+    int32_t status;
+    configstore::Store *store;
+};
+struct ContextDeleter {
+    void operator()(SaveContext *context) const { std::free(context); }
+};
+using ContextOwner = std::unique_ptr<SaveContext, ContextDeleter>;
+
+ContextOwner NewContext(configstore::Store *store) {
+    ContextOwner context(static_cast<SaveContext *>(std::calloc(1, sizeof(SaveContext))));
+    if (context) context->store = store;
+    return context;
+}
+
+// One list of properties of one class into one object, and the first status that is not 0.
+struct PropRun {
+    configstore::Object *object;
+    uint32_t propClass;
+    const char *trace; // null for none
+    int32_t status;
+};
+
+bool SaveEntry(DVSDataEntry *entry, void *arg) {
+    auto *run = static_cast<PropRun *>(arg);
+    void *value = nullptr;
+    const uint32_t len = DVSData_Data(entry, &value);
+    const char *key = DVSData_Name(entry);
+    if (run->trace && Tracing()) LogTrace("%s: %s\n", run->trace, key);
+    run->status = SaveProp(run->object, key, value, len, run->propClass, DVSData_PropType(entry));
+    return run->status != 0;
+}
+
+int32_t SaveList(DVSData *list, PropRun run) {
+    DVSDataEntry *entry = nullptr;
+    while (list && DVSData_Next(list, entry, &entry) == HYP_OK) {
+        if (SaveEntry(entry, &run)) break;
+    }
+    return run.status;
+}
+
+struct PortRun {
+    configstore::Object *switchObject;
+    int32_t status;
+};
+
+bool SavePort(DVSPort *port, void *arg) {
+    auto *run = static_cast<PortRun *>(arg);
+    configstore::Object *object = nullptr;
+    run->status = GetOrCreateSubObject(true, run->switchObject, "ports", DVS_PortId(port), &object);
+    if (run->status == 0) run->status = SaveList(port->portData, {object, DVS_PROP_CLASS_PORT, nullptr, 0});
+    return run->status != 0;
+}
+
+int32_t SaveForwardingClass(configstore::Object *object, DVSwitch *sw) {
+    configstore::Object *product = nullptr;
+    if (const int32_t status = GetOrCreateSubObject(true, object, "product", "", &product)) return status;
+    return configstore::SetValueStr(product, "forwarding_class", DVS_ClassName(sw));
+}
+
+int32_t FillObject(configstore::Object *object, DVSwitch *sw) {
+    if (const int32_t status = SaveForwardingClass(object, sw)) return status;
+    if (const int32_t status = SaveMaxPorts(object, sw)) return status;
+    LogTrace("SaveDVS: %s\n", DVS_SwitchName(sw));
+    if (const int32_t status = SaveIdentity(object, sw)) return status;
+    const PropRun global = {object, DVS_PROP_CLASS_GLOBAL, "SaveGlobalProp", 0};
+    if (const int32_t status = SaveList(sw->globalPropList, global)) return status;
+    const PropRun host = {object, DVS_PROP_CLASS_HOST, "SaveHostProp", 0};
+    if (const int32_t status = SaveList(sw->hostPropList, host)) return status;
+    PortRun ports = {object, 0};
+    DVSState_PortForEach(sw, SavePort, &ports);
+    return ports.status;
+}
+
+int32_t WriteObject(configstore::Store *store, configstore::Object *object) {
+    const int64_t start = dvsConfigStoreNowMs();
+    const int32_t status = configstore::Set(store, object, kSource);
+    dvsConfigStoreTimeMs += dvsConfigStoreNowMs() - start;
+    return status;
+}
+
+// The walk's callback: true ends it.
+bool SaveSwitch(DVSwitch *sw, void *arg) {
+    auto *context = static_cast<SaveContext *>(arg);
+    dvsWidePortRecords = DVS_Version(sw) > kLastNarrowVersion;
+    dvsSwitchClass = SwitchClassOf(DVS_ClassName(sw));
+    RootObject object;
+    context->status = FetchForRewrite(context->store, DVS_SwitchId(sw), &object);
+    if (!object.get()) return true;
+    if (context->status == 0) context->status = FillObject(object.get(), sw);
+    if (context->status == 0) context->status = WriteObject(context->store, object.get());
+    if (context->status) LogError("Failed to save dvs: %s to configstore\n", DVS_SwitchId(sw));
+    return context->status != 0;
+}
+
+// The objects that the store holds before the save: all of them, or the one of `switchId`.
+class Existing {
+public:
+    [[nodiscard]] int32_t Collect(configstore::Store *store, const char *switchId) {
+        return switchId ? CollectOne(store, switchId) : CollectAll(store);
+    }
+    // Deletes those whose switch the table lacks.
+    [[nodiscard]] int32_t DeleteStale(configstore::Store *store) const {
+        if (one_.get()) return DeleteIfStale(store, one_.get());
+        for (auto *object : all_.items()) {
+            if (const int32_t status = DeleteIfStale(store, object)) return status;
+        }
+        return 0;
+    }
+
+private:
+    int32_t CollectOne(configstore::Store *store, const char *switchId) {
+        const int32_t status = configstore::Get(store, kKey, kGroup, kComponent, switchId, one_.out());
+        return status == configstore::NOT_FOUND ? 0 : status;
+    }
+    int32_t CollectAll(configstore::Store *store) {
+        if (const int32_t status = filter_.Create()) return status;
+        const int64_t start = dvsConfigStoreNowMs();
+        const int32_t status = all_.ListCurrent(store, filter_.get());
+        LogSystem(LOG_DEBUG, "DVSState_SaveBufToConfigStore_ByInstance GetInstances time: %lldms",
+                  static_cast<long long>(dvsConfigStoreNowMs() - start));
+        return status;
+    }
+    static int32_t DeleteIfStale(configstore::Store *store, configstore::Object *object) {
+        dvs::convert::StoreText uuid;
+        if (const int32_t status = uuid.Read(object, "uuid")) return status;
+        if (DVSState_SwitchFind(uuid.get())) return 0;
+        return configstore::Delete(store, kKey, kGroup, kComponent, uuid.get());
+    }
+
+    RootObjects all_;
+    RootObject one_;
+    SwitchFilter filter_;
+};
+
+int32_t SaveSwitches(configstore::Store *store, const char *switchId) {
+    const ContextOwner context = NewContext(store);
+    if (!context) {
+        LogError("Failed to alloc memory for DVSUplinkPorts\n");
+        return kFailed;
+    }
+    if (!switchId)
+        DVSState_SwitchForEach(SaveSwitch, context.get());
+    else if (DVSwitch *sw = DVSState_SwitchFind(switchId))
+        (void)SaveSwitch(sw, context.get());
+    if (context->status) LogError("Failed to save dvs to configstore\n");
+    return context->status;
+}
+
+void ReportTime(const char *format) {
+    LogSystem(LOG_DEBUG, format, static_cast<long long>(dvsConfigStoreTimeMs));
+    dvsConfigStoreTimeMs = 0;
+}
+
+// Everything between a begun transaction and its end, which it brings about.
+int32_t RunTransaction(configstore::Store *store, const char *switchId, Existing *existing) {
+    LogTrace("Ready to save dvs list\n");
+    int32_t status = existing->Collect(store, switchId);
+    if (status == 0) status = SaveSwitches(store, switchId);
+    if (status == 0) status = existing->DeleteStale(store);
+    if (status == 0) {
+        status = configstore::CommitTransaction(store);
+        ReportTime("End DVSState_SaveBufToConfigStore_ByInstance, configStore time: %lldms");
+    }
+    if (status) {
+        (void)configstore::CancelTransaction(store); // the failure being reported is the one before it
+        ReportTime("End DVSState_SaveBufToConfigStore_ByInstance with error, configStore time: %lldms");
+    }
+    return status;
+}
+
+} // namespace
+
+int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId) {
+    MXUserRecLock *lock = DVSwitchHandleLock();
+    (void)DVSState_ConfigReset();
+    (void)DVSState_ConfigDeserialize(buf, len); // a buffer that does not load counts as one without switches
+    LogSystem(LOG_DEBUG, "Start DVSState_SaveBufToConfigStore_ByInstance, swId:[%s]",
+              switchId ? switchId : "");
+    dvsConfigStoreTimeMs = 0;
+
+    // These two keep the lock and the loaded table: callers have always had to release it on them.
+    StoreHandle store;
+    if (store.Open()) return kFailed;
+    if (const int32_t status = configstore::BeginTransaction(store.get())) return status;
+
+    // Declared before the lock is released: objects and store go last.
+    Existing existing;
+    const int32_t status = RunTransaction(store.get(), switchId, &existing);
+    (void)DVSState_ConfigReset();
+    DVSwitchHandleUnlock(lock);
+    return status;
+}
+
+int32_t DVSState_SaveBufToConfigStore(const void *buf, uint32_t len) {
+    return DVSState_SaveBufToConfigStore_ByInstance(buf, len, nullptr);
+}

@@ -1,0 +1,35 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The save of the kernel's persistent state: fetched through the kernel interface, then saved like any
+// buffer.
+
+#include "dvs/configstore.h"
+
+#include "configstore/log.h"
+#include "dvs/status.h"
+#include "platform/status_text.h"
+
+// The kernel interface is not part of every build yet; without it there is nothing to fetch.
+extern "C" {
+HYP_ReturnStatus DVSHYP_PersistentStateGet(void **out, uint32_t *outLen) __attribute__((weak));
+void DVSHYP_DataFree(void *buf) __attribute__((weak));
+}
+
+int32_t DVSState_SaveToConfigStore_ByInstance(const char *switchId) {
+    void *buf = nullptr;
+    uint32_t len = 0;
+    const HYP_ReturnStatus status =
+        DVSHYP_PersistentStateGet ? DVSHYP_PersistentStateGet(&buf, &len) : HYP_ReturnStatus{HYP_FAILURE};
+    if (status != HYP_OK) {
+        dvs::config::LogError(
+            "Failed to save DVS config to configstore when get DVS buffrom hyp. Error: %s\n",
+            HYP_ReturnStatusToString(status));
+        return -1;
+    }
+    const int32_t saved = DVSState_SaveBufToConfigStore_ByInstance(buf, len, switchId);
+    DVSHYP_DataFree(buf);
+    return saved;
+}
+
+int32_t DVSState_SaveToConfigStore(void) {
+    return DVSState_SaveToConfigStore_ByInstance(nullptr);
+}

@@ -1,0 +1,158 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Carrying an older host's state file over: the identity of its switches into the store, or into a plain
+// list. Stands on dvs/file.h for the file, on the switch table for its switches and on switch_object.h.
+
+#include "configstore/upgrade.h"
+
+#include <cstdlib>
+#include <memory>
+
+#include <syslog.h>
+
+#include "configstore/converters/common.h"
+#include "configstore/log.h"
+#include "configstore/switch_object.h"
+#include "dvs/file.h"
+#include "dvs/state.h"
+
+namespace {
+
+using namespace dvs::config;
+
+constexpr const char *kStateFile = "/etc/orbeno/dvsdata.db";
+
+// A state file's contents. The block begins before them, where their alignment asks for it.
+class FileBuffer {
+public:
+    FileBuffer() = default;
+    ~FileBuffer() {
+        if (contents_) std::free(static_cast<uint8_t *>(contents_) - offset_);
+    }
+    FileBuffer(const FileBuffer &) = delete;
+    FileBuffer &operator=(const FileBuffer &) = delete;
+    [[nodiscard]] HYP_ReturnStatus Read(const char *path) {
+        void *contents = nullptr;
+        const HYP_ReturnStatus status = DVSFile_ReadClassical(path, &contents, &size_, &offset_);
+        if (status == HYP_OK) contents_ = contents;
+        return status;
+    }
+    void LoadIntoTable() const { (void)DVSState_ConfigDeserialize(contents_, size_); }
+    void LeaveAllocated() { contents_ = nullptr; }
+
+private:
+    void *contents_ = nullptr;
+    uint32_t size_ = 0;
+    uint32_t offset_ = 0;
+};
+
+struct UpgradeContext {
+    int32_t status;
+    configstore::Store *store;
+};
+struct ContextDeleter {
+    void operator()(UpgradeContext *context) const { std::free(context); }
+};
+using ContextOwner = std::unique_ptr<UpgradeContext, ContextDeleter>;
+
+// Writes the object only where there is a port set's name to write.
+int32_t SaveBasics(configstore::Store *store, DVSwitch *sw, configstore::Object *object) {
+    if (const int32_t status = SaveMaxPorts(object, sw)) return status;
+    LogError("SaveDVS: %s\n", DVS_SwitchName(sw)); // prints from level 0 on, unlike the save's
+    if (const int32_t status = SaveIdentity(object, sw)) return status;
+    void *value = nullptr;
+    uint32_t len = 0;
+    if (DVSState_HostPropRead(sw, kPortsetKey, &value, &len) != HYP_OK) return 0;
+    const dvs::convert::Text name({static_cast<const uint8_t *>(value), len});
+    if (!name.get()) return kFailed;
+    if (const int32_t status = configstore::SetValueStr(object, "portset_name", name.get())) return status;
+    return configstore::Set(store, object, kSource);
+}
+
+// The walk's callback: true ends it.
+bool SaveBasicSwitch(DVSwitch *sw, void *arg) {
+    auto *context = static_cast<UpgradeContext *>(arg);
+    RootObject object;
+    context->status = FetchForRewrite(context->store, DVS_SwitchId(sw), &object);
+    if (!object.get()) return true;
+    if (context->status == 0) context->status = SaveBasics(context->store, sw, object.get());
+    if (context->status) LogError("Failed to save dvs: %s to configstore\n", DVS_SwitchId(sw));
+    return context->status != 0;
+}
+
+int32_t RunTransaction(configstore::Store *store) {
+    const ContextOwner context(static_cast<UpgradeContext *>(std::calloc(1, sizeof(UpgradeContext))));
+    int32_t status = kFailed;
+    if (!context) {
+        LogError("Failed to alloc memory for DVS\n");
+    } else {
+        context->store = store;
+        DVSState_SwitchForEach(SaveBasicSwitch, context.get());
+        status = context->status;
+        if (status) LogError("Failed to save dvs to configstore\n");
+    }
+    if (status == 0) status = configstore::CommitTransaction(store);
+    if (status)
+        (void)configstore::CancelTransaction(store); // the failure being reported is the one before it
+    return status;
+}
+
+// The state file's switches into the store; the caller has the lock and cleans up unless *keepLock is set.
+int32_t SaveToStore(bool *keepLock) {
+    StoreHandle store;
+    *keepLock = true; // as in the save, callers have always had to release it on these two
+    if (store.Open()) return kFailed;
+    if (const int32_t status = configstore::BeginTransaction(store.get())) return status;
+    *keepLock = false;
+    return RunTransaction(store.get());
+}
+
+bool ListSwitch(DVSwitch *sw, void *arg) {
+    auto *info = static_cast<DvsBasicInfo *>(arg);
+    void *portset = nullptr;
+    uint32_t len = 0;
+    if (DVSState_HostPropRead(sw, kPortsetKey, &portset, &len) != HYP_OK) portset = nullptr;
+    info->entries[info->count++] = {DVS_SwitchId(sw), DVS_SwitchName(sw), static_cast<const char *>(portset)};
+    return false;
+}
+
+} // namespace
+
+int32_t RetrieveUpgradeInfoFrom(const char *stateFile) {
+    MXUserRecLock *lock = DVSwitchHandleLock();
+    FileBuffer file;
+    const HYP_ReturnStatus read = file.Read(stateFile);
+    (void)DVSState_ConfigReset();
+    bool keepLock = false;
+    int32_t status = 0;
+    if (read == HYP_FILE_EMPTY) {
+        LogSystem(LOG_DEBUG, "File is empty, skip load");
+    } else if (read != HYP_OK) {
+        LogSystem(LOG_INFO, "Failed to read DVS config from sticky-bit file.");
+    } else {
+        file.LoadIntoTable();
+        status = SaveToStore(&keepLock);
+    }
+    if (keepLock) return status;
+    (void)DVSState_ConfigReset();
+    DVSwitchHandleUnlock(lock);
+    return status;
+}
+
+DvsBasicInfo BasicInfoFrom(const char *stateFile) {
+    DvsBasicInfo info = {};
+    FileBuffer file;
+    if (file.Read(stateFile) != HYP_OK) return info;
+    (void)DVSState_ConfigReset();
+    file.LoadIntoTable();
+    DVSState_SwitchForEach(ListSwitch, &info);
+    file.LeaveAllocated(); // so it has always been; nothing points into it
+    return info;
+}
+
+int32_t DVSState_RetrieveDVSUpgradeInfo(void) {
+    return RetrieveUpgradeInfoFrom(kStateFile);
+}
+
+DvsBasicInfo GetDvsBasicInfoFromFileHyp(void) {
+    return BasicInfoFrom(kStateFile);
+}
