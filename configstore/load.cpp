@@ -6,13 +6,13 @@
 
 #include <cstdlib>
 #include <cstring>
-#include <memory>
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/switch_version.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
 #include "configstore/switch_object.h"
+#include "dvsstate/owned_list.h"
 #include "platform/status_text.h"
 
 namespace {
@@ -21,25 +21,11 @@ using namespace dvs::config;
 using dvs::convert::Instances;
 using dvs::convert::StoreText;
 using dvs::convert::StoreTexts;
+using dvs::state::NewList;
+using dvs::state::OwnedList;
 
 constexpr uint32_t kStateType = 0x10; // of every entry of a state and of a switch
 constexpr uint32_t kStateVersion = 9; // what a whole state is serialized with
-
-struct ListDeleter {
-    void operator()(DVSData *list) const { DVSData_Free(list); }
-};
-using ListOwner = std::unique_ptr<DVSData, ListDeleter>;
-
-void *HeapAlloc(uint64_t size) {
-    return std::malloc(size);
-}
-
-HYP_ReturnStatus NewList(ListOwner *list) {
-    DVSData *handle = nullptr;
-    const HYP_ReturnStatus status = DVSData_Alloc(&handle, HeapAlloc, std::free);
-    if (status == HYP_OK) list->reset(handle);
-    return status;
-}
 
 // What is read of a switch object before its properties.
 struct SwitchFields {
@@ -139,8 +125,8 @@ public:
 int32_t LoadSwitch(configstore::Object *object, DVSData *state) {
     SwitchFields fields;
     if (const int32_t status = ReadFields(object, &fields)) return status;
-    ListOwner list;
-    if (const HYP_ReturnStatus status = NewList(&list)) return FailedSwitch(fields, status);
+    OwnedList list;
+    if (const HYP_ReturnStatus status = NewList(list)) return FailedSwitch(fields, status);
     const LoadedSwitch loaded(object);
     dvsSwitchClass = SwitchClassOf(fields.forwardingClass.get());
     if (const int32_t status = dvs::convert::ReadSwitchVersion(object, &fields.version))
@@ -167,8 +153,8 @@ int32_t EndedBy(configstore::Object *object) {
 }
 
 int32_t LoadAll(const RootObjects &objects, void **out, uint32_t *outLen) {
-    ListOwner state;
-    if (NewList(&state)) return kFailed;
+    OwnedList state;
+    if (NewList(state) != HYP_OK) return kFailed;
     for (auto *object : objects.items()) {
         if (LoadSwitch(object, state.get())) return EndedBy(object);
     }

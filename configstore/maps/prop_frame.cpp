@@ -7,7 +7,6 @@
 #include <algorithm>
 #include <cstdlib>
 #include <iterator>
-#include <memory>
 
 #include <time.h>
 
@@ -15,6 +14,7 @@
 #include "configstore/converters/table.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_lookup.h"
+#include "dvsstate/owned_list.h"
 
 uint32_t dvsSwitchClass = 0;
 bool dvsWidePortRecords = false;
@@ -32,15 +32,6 @@ constexpr uint32_t kMaxDepth = std::extent_v<decltype(DVSProp2ConfigEntry::path)
 constexpr uint32_t kPropTypeState = 0x10;
 constexpr const char *kPortResourcePoolsKey = "com.orbeno.common.port.respools.cfg";
 constexpr const char *kTrafficResourcesLeaf = "traffic_resources";
-
-struct ListDeleter {
-    void operator()(DVSData *list) const { DVSData_Free(list); }
-};
-using ListOwner = std::unique_ptr<DVSData, ListDeleter>;
-
-void *HeapAlloc(uint64_t size) {
-    return std::malloc(size);
-}
 
 // The tables are writable: a row's depth may have been set to anything.
 uint32_t Depth(const DVSProp2ConfigEntry &row) {
@@ -101,13 +92,12 @@ int32_t LoadRows(const LoadRun &run, configstore::Object *trafficResources) {
 
 int32_t BuildProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
                    uint32_t serializeFlags, configstore::Object *trafficResources) {
-    DVSData *handle = nullptr;
-    if (DVSData_Alloc(&handle, HeapAlloc, std::free) != HYP_OK) return kFailed;
-    const ListOwner list(handle);
-    if (const int32_t status = LoadRows({object, handle, propClass}, trafficResources)) return status;
+    dvs::state::OwnedList list;
+    if (dvs::state::NewList(list) != HYP_OK) return kFailed;
+    if (const int32_t status = LoadRows({object, list.get(), propClass}, trafficResources)) return status;
     void *buf = nullptr;
     uint32_t len = 0;
-    HYP_ReturnStatus status = DVSData_Serialize(handle, &buf, &len, serializeFlags);
+    HYP_ReturnStatus status = DVSData_Serialize(list.get(), &buf, &len, serializeFlags);
     if (status == HYP_OK) status = DVSData_Update(outList, propsName, buf, len, kPropTypeState);
     std::free(buf);
     return static_cast<int32_t>(status);
