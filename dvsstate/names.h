@@ -6,6 +6,7 @@
 // untouched. Written and read in this folder only.
 
 #include <cstdint>
+#include <string_view>
 
 namespace dvs::state {
 
@@ -24,6 +25,8 @@ inline constexpr char kClassName[] = "className";
 inline constexpr char kMaxPorts[] = "maxPorts";
 inline constexpr char kGlobalPropList[] = "globalPropList";
 inline constexpr char kHostPropList[] = "hostPropList";
+inline constexpr std::string_view kFixedEntries[] = {kSwitchVersion, kClassName, kMaxPorts, kGlobalPropList,
+                                                     kHostPropList};
 
 // The type word of everything the switch state writes itself: its fields, nested lists and port kinds.
 inline constexpr uint32_t kStatePropType = 0x10;

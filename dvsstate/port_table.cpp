@@ -21,12 +21,8 @@ uint32_t numPortsInUseHostWide = 0;
 
 namespace {
 
-constexpr uint32_t kShortIdVersion = 6; // up to here a port id has less than kShortIdSize characters
-constexpr std::size_t kShortIdSize = 16;
-
 HYP_ReturnStatus CheckLimits(const DVSwitch *sw, const char *portId) {
-    const std::size_t idSize = sw->version > kShortIdVersion ? kPortIdSize : kShortIdSize;
-    if (std::strlen(portId) >= idSize) {
+    if (std::strlen(portId) >= PortIdSize(sw->version)) {
         Message(kError, "DVSStatePortAdd %s, id length too long\n", portId);
         return HYP_BAD_PARAM;
     }

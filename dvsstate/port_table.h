@@ -15,6 +15,11 @@ namespace dvs::state {
 
 inline constexpr std::size_t kPortIdSize = 48; // with the terminator
 
+/// Room for a port id, terminator included, on a switch of this version.
+[[nodiscard]] constexpr std::size_t PortIdSize(uint32_t switchVersion) {
+    return switchVersion > 6 ? kPortIdSize : 16;
+}
+
 /// Ports of all kinds on all switches.
 extern uint32_t numPortsInUseHostWide;
 

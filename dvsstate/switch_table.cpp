@@ -48,11 +48,6 @@ constexpr SwitchClass kClasses[] = {
     {"vswitch", kUnlimitedClass},
 };
 
-uint32_t ClassFlags(std::string_view className) {
-    const auto *row = std::ranges::find(kClasses, className, &SwitchClass::name);
-    return row == std::end(kClasses) ? 0 : row->flags;
-}
-
 struct VersionRange {
     uint32_t first, last;
 };
@@ -108,6 +103,11 @@ HYP_ReturnStatus InsertSwitch(const char *switchId, std::string_view className, 
 }
 
 } // namespace
+
+uint32_t ClassFlags(std::string_view className) {
+    const auto *row = std::ranges::find(kClasses, className, &SwitchClass::name);
+    return row == std::end(kClasses) ? 0 : row->flags;
+}
 
 HYP_ReturnStatus DVSStateSwitchAdd(const char *switchId, std::string_view className, uint32_t maxPorts,
                                    uint32_t version) {

@@ -21,6 +21,9 @@ inline constexpr std::size_t kClassNameSize = 128; // with the terminator
 inline constexpr uint32_t kUnlimitedClass = 1; // not held to maxPorts
 inline constexpr uint32_t kOverlayClass = 2;
 
+/// The flags of a class, by its whole name; 0 for one that is held to its limit.
+[[nodiscard]] uint32_t ClassFlags(std::string_view className);
+
 /// Slot order is insertion order into the first free slot. Guarded by the lock "dvsstate".
 extern std::array<DVSwitch *, kSwitchNum> dvsSwitchTable;
 
