@@ -1,0 +1,61 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// A program with a system-information interface of its own: all of platform/kit.h is defined here, and the
+// static archives bring the rest.
+
+#include "platform/kit.h"
+
+#include <gtest/gtest.h>
+
+#include <cstring>
+
+#include "dvs/state.h"
+
+namespace {
+
+HYP_ReturnStatus g_signatureStatus;
+HYP_ReturnStatus g_getStatus;
+uint32_t g_version;
+
+} // namespace
+
+extern "C" HYP_ReturnStatus KIT_CheckSig(const char *, uint32_t version) {
+    g_version = version;
+    return g_signatureStatus;
+}
+
+extern "C" HYP_ReturnStatus KIT_Get(uint32_t node, const void *instanceArgs, void *value, uint32_t size) {
+    const uint32_t ports = 77;
+    if (node != KIT_NODE_net_maxPortsSystemWide || instanceArgs || size != sizeof ports) return HYP_BAD_PARAM;
+    if (g_getStatus == HYP_OK) std::memcpy(value, &ports, size);
+    return g_getStatus;
+}
+
+namespace {
+
+class OwnKit : public testing::Test {
+protected:
+    void SetUp() override { g_signatureStatus = g_getStatus = HYP_OK; }
+    void TearDown() override { (void)DVSState_ConfigReset(); }
+};
+
+// The limit is read once in a process, and each of these is a process of its own under ctest; run together,
+// the failures come first.
+
+TEST_F(OwnKit, AFailedSignatureCheckFailsTheFirstAdd) {
+    g_signatureStatus = HYP_NOT_SUPPORTED;
+    EXPECT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_NOT_SUPPORTED);
+    EXPECT_EQ(g_version, 21u);
+}
+
+TEST_F(OwnKit, AFailedReadFailsTheFirstAdd) {
+    g_getStatus = HYP_FAILURE;
+    EXPECT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_FAILURE);
+}
+
+TEST_F(OwnKit, GivesThePortLimit) {
+    ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_OK);
+    EXPECT_EQ(uwMaxNumActivePortsSystemWide, 77u);
+    EXPECT_EQ(DVS_GetMaxPorts(DVSState_SwitchFind("s")), 77u);
+}
+
+} // namespace
