@@ -8,8 +8,10 @@
 #include <algorithm>
 #include <cstring>
 #include <functional>
+#include <new>
 
 #include "dvsdata/emit.h"
+#include "dvsdata/name_index.h"
 
 namespace dvs::data {
 namespace {
@@ -18,24 +20,33 @@ int PrintLen(std::string_view name) {
     return static_cast<int>(std::min<std::size_t>(name.size(), INT32_MAX));
 }
 
-/// The link that holds `entry`, and the entry before it.
-struct Place {
-    DVSDataEntry *previous = nullptr;
-    DVSDataEntry *entry = nullptr;
+/// A list with what the library keeps for itself behind it, in the same block.
+struct ListRecord {
+    DVSData face;
+    NameIndex names;
 };
+static_assert(offsetof(ListRecord, face) == 0);
 
-Place Find(const DVSData *list, std::string_view name) {
-    Place place{nullptr, list->head};
-    while (place.entry && !NameMatches(place.entry->name, name))
-        place = {place.entry, place.entry->next};
-    return place;
+NameIndex &Names(DVSData *list) {
+    return reinterpret_cast<ListRecord *>(list)->names;
+}
+
+DVSDataEntry *Find(const DVSData *list, std::string_view name) {
+    return reinterpret_cast<const ListRecord *>(list)->names.Find(list, name);
+}
+
+DVSDataEntry *Previous(const DVSData *list, const DVSDataEntry *entry) {
+    DVSDataEntry *previous = nullptr;
+    for (DVSDataEntry *at = list->head; at != entry; at = at->next)
+        previous = at;
+    return previous;
 }
 
 /// Takes the entry out of the chain and out of the list's size, and says so. The caller frees it.
-void Unlink(DVSData *list, Place place) {
-    DVSDataEntry *const entry = place.entry;
-    (place.previous ? place.previous->next : list->head) = entry->next;
-    if (list->tail == entry) list->tail = place.previous;
+void Unlink(DVSData *list, DVSDataEntry *previous, DVSDataEntry *entry) {
+    Names(list).Removing(list, entry);
+    (previous ? previous->next : list->head) = entry->next;
+    if (list->tail == entry) list->tail = previous;
     list->serialSize -= entry->serialSize;
     Emit(kDetail, "Remove entry %s, datalen = %u, flag = 0x%x serialSize = %u\n", entry->name, entry->dataLen,
          entry->propType, list->serialSize);
@@ -63,13 +74,12 @@ bool Overlaps(const void *bytes, std::size_t size, const DVSDataEntry *entry) {
     return before(begin, block + kImageOffset + entry->serialSize) && before(block, begin + size);
 }
 
-HYP_ReturnStatus Replace(DVSData *list, Place place, std::string_view name, const void *data,
+HYP_ReturnStatus Replace(DVSData *list, DVSDataEntry *old, std::string_view name, const void *data,
                          std::uint32_t dataLen, std::uint32_t propType) {
-    DVSDataEntry *const old = place.entry;
     const std::uint32_t newType = propType ? propType : old->propType;
     // Name and value may be the old entry's own: then it has to outlive the append.
     const bool ownBytes = Overlaps(data, dataLen, old) || Overlaps(name.data(), name.size() + 1, old);
-    Unlink(list, place);
+    Unlink(list, Previous(list, old), old);
     if (!ownBytes) list->freeFn(old);
     const HYP_ReturnStatus status = Append(list, name, data, dataLen, newType);
     if (ownBytes) list->freeFn(old);
@@ -79,13 +89,13 @@ HYP_ReturnStatus Replace(DVSData *list, Place place, std::string_view name, cons
 HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
                         std::uint32_t propType) {
     const std::uint32_t effectiveType = propType ? propType : kDefaultPropType;
-    const Place place = Find(list, name);
-    if (!place.entry) return Append(list, name, data, dataLen, effectiveType);
-    if (place.entry->dataLen != dataLen) return Replace(list, place, name, data, dataLen, propType);
+    DVSDataEntry *const entry = Find(list, name);
+    if (!entry) return Append(list, name, data, dataLen, effectiveType);
+    if (entry->dataLen != dataLen) return Replace(list, entry, name, data, dataLen, propType);
 
     // Type 0 resets the type here and keeps it in Replace: callers rely on both.
-    if (dataLen) std::memmove(place.entry->data, data, dataLen);
-    place.entry->propType = effectiveType;
+    if (dataLen) std::memmove(entry->data, data, dataLen);
+    entry->propType = effectiveType;
     Emit(kDetail, "updated data %.*s, datalen = %d, serialSize = %d\n", PrintLen(name), name.data(), dataLen,
          list->serialSize);
     return HYP_OK;
@@ -133,6 +143,7 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
     (list->tail ? list->tail->next : list->head) = entry;
     list->tail = entry;
     list->serialSize += serialSize;
+    Names(list).Added(list, entry, name);
 
     EmitAdded(name, list->serialSize);
     return HYP_OK;
@@ -140,7 +151,7 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
 
 void RemoveAfter(DVSData *list, DVSDataEntry *previous) {
     DVSDataEntry *const entry = previous ? previous->next : list->head;
-    Unlink(list, {previous, entry});
+    Unlink(list, previous, entry);
     list->freeFn(entry);
 }
 
@@ -150,9 +161,10 @@ using namespace dvs::data;
 
 HYP_ReturnStatus DVSData_Alloc(DVSData **list, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn) {
     Emit(kTrace, "Allocing new handle\n");
-    auto *const handle = static_cast<DVSData *>(allocFn(sizeof(DVSData)));
-    if (!handle) return HYP_NO_MEMORY;
-    *handle = DVSData{kMinBufferSize, nullptr, nullptr, allocFn, freeFn};
+    void *const block = allocFn(sizeof(ListRecord));
+    if (!block) return HYP_NO_MEMORY;
+    auto *const record = new (block) ListRecord{{kMinBufferSize, nullptr, nullptr, allocFn, freeFn}, {}};
+    DVSData *const handle = &record->face;
     *list = handle;
     Emit(kTrace, "DVSData handle allocated, serialSize = %d\n", handle->serialSize);
     return HYP_OK;
@@ -164,6 +176,7 @@ void DVSData_Free(DVSData *list) {
         list->head = entry->next;
         list->freeFn(entry);
     }
+    Names(list).Drop(list);
     list->freeFn(list);
 }
 
@@ -182,10 +195,10 @@ HYP_ReturnStatus DVSData_UpdateProp(DVSData *list, const char *name, const void 
 }
 
 HYP_ReturnStatus DVSDataRemove(DVSData *list, const char *name, uint32_t *propType) {
-    const Place place = Find(list, name);
-    if (propType) *propType = place.entry ? place.entry->propType : kDefaultPropType;
-    if (!place.entry) return HYP_NOT_FOUND;
-    RemoveAfter(list, place.previous);
+    const DVSDataEntry *const entry = Find(list, name);
+    if (propType) *propType = entry ? entry->propType : kDefaultPropType;
+    if (!entry) return HYP_NOT_FOUND;
+    RemoveAfter(list, Previous(list, entry));
     return HYP_OK;
 }
 
@@ -194,7 +207,7 @@ HYP_ReturnStatus DVSData_Remove(DVSData *list, const char *name) {
 }
 
 HYP_ReturnStatus DVSData_Lookup(DVSData *list, const char *name, DVSDataEntry **entry) {
-    DVSDataEntry *const found = Find(list, name).entry;
+    DVSDataEntry *const found = Find(list, name);
     if (!found) return HYP_NOT_FOUND;
     *entry = found;
     return HYP_OK;

@@ -1,0 +1,246 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The name index of property lists; see name_index.h. Leans on list_internal.h for the comparison of names.
+
+#include "dvsdata/name_index.h"
+
+#include <algorithm>
+#include <bit>
+#include <cstring>
+
+#if defined(__SSE2__)
+#include <emmintrin.h>
+#endif
+
+#include "dvsdata/list_internal.h"
+
+namespace dvs::data {
+namespace {
+
+constexpr std::uint32_t kNone = UINT32_MAX;
+
+/// What the list stores of it.
+std::string_view Stored(std::string_view name) {
+    return name.substr(0, kMaxNameLen);
+}
+
+std::string_view NameOf(const DVSDataEntry *entry) {
+    return {entry->name, ::strnlen(entry->name, kMaxNameLen)};
+}
+
+/// One byte of a name, drawn from its end, where names differ.
+std::uint8_t Print(std::string_view name) {
+    std::uint32_t word = 0;
+    if (name.size() >= 4)
+        word = Load32(name.data() + name.size() - 4);
+    else
+        std::memcpy(&word, name.data(), name.size());
+    return static_cast<std::uint8_t>(((word + static_cast<std::uint32_t>(name.size())) * 0x9e3779b1u) >> 24);
+}
+
+/// Eight bytes a step; spread by a multiplication, so that every bit of a name reaches the bits that are
+/// used.
+std::uint32_t Hash(std::string_view name) {
+    constexpr std::uint64_t kSpread = 0x9e3779b97f4a7c15u;
+    std::uint64_t hash = name.size() * kSpread;
+    while (!name.empty()) {
+        std::uint64_t word = 0;
+        const std::size_t size = std::min<std::size_t>(name.size(), sizeof word);
+        if (size == sizeof word)
+            std::memcpy(&word, name.data(), sizeof word);
+        else
+            std::memcpy(&word, name.data(), size);
+        hash = (hash ^ word) * kSpread;
+        hash ^= hash >> 29;
+        name.remove_prefix(size);
+    }
+    return static_cast<std::uint32_t>(hash >> 32);
+}
+
+} // namespace
+
+/// Chains of nodes, all in one block: the table, `size` buckets, `size` nodes.
+struct alignas(8) NameIndex::Table {
+    struct Bucket {
+        std::uint32_t first, last;
+    };
+    struct Node {
+        DVSDataEntry *entry;
+        std::uint32_t hash;
+        std::uint32_t next; // in the chain, or among the free ones
+    };
+
+    std::uint32_t size; // a power of two
+    std::uint32_t used; // nodes ever handed out
+    std::uint32_t free; // first of those given back
+
+    static std::uint64_t BlockSize(std::uint32_t size) {
+        return sizeof(Table) + std::uint64_t{size} * (sizeof(Bucket) + sizeof(Node));
+    }
+    Bucket &BucketOf(std::uint32_t hash) { return Buckets()[hash & (size - 1)]; }
+    Node *Nodes() { return reinterpret_cast<Node *>(Buckets() + size); }
+    [[nodiscard]] bool IsFull() const { return used == size && free == kNone; }
+
+    void Clear(std::uint32_t newSize) {
+        size = newSize;
+        used = 0;
+        free = kNone;
+        std::memset(static_cast<void *>(Buckets()), 0xff, size * sizeof(Bucket)); // kNone everywhere
+    }
+
+    void Add(DVSDataEntry *entry, std::uint32_t hash) {
+        std::uint32_t index = free;
+        if (index != kNone)
+            free = Nodes()[index].next;
+        else
+            index = used++;
+        Nodes()[index] = {entry, hash, kNone};
+        Bucket &bucket = BucketOf(hash);
+        if (bucket.first == kNone)
+            bucket.first = index;
+        else
+            Nodes()[bucket.last].next = index;
+        bucket.last = index;
+    }
+
+    void Remove(const DVSDataEntry *entry, std::uint32_t hash) {
+        Bucket &bucket = BucketOf(hash);
+        std::uint32_t previous = kNone, index = bucket.first;
+        while (index != kNone && Nodes()[index].entry != entry) {
+            previous = index;
+            index = Nodes()[index].next;
+        }
+        if (index == kNone) return;
+        Node &node = Nodes()[index];
+        (previous == kNone ? bucket.first : Nodes()[previous].next) = node.next;
+        if (bucket.last == index) bucket.last = previous;
+        node.next = free;
+        free = index;
+    }
+
+    DVSDataEntry *Find(std::string_view name) {
+        const std::uint32_t hash = Hash(name);
+        for (std::uint32_t index = BucketOf(hash).first; index != kNone;) {
+            const Node &node = Nodes()[index];
+            if (node.hash == hash && NameMatches(node.entry->name, name)) return node.entry;
+            index = node.next;
+        }
+        return nullptr;
+    }
+
+private:
+    Bucket *Buckets() { return reinterpret_cast<Bucket *>(this + 1); }
+};
+
+DVSDataEntry *NameIndex::Find(const DVSData *list, std::string_view name) const {
+    if (name.size() > kMaxNameLen) return nullptr; // Stored names are shorter.
+    if (mode_ == Mode::Hashed) return table_->Find(name);
+    if (mode_ == Mode::Walk) {
+        DVSDataEntry *entry = list->head;
+        while (entry && !NameMatches(entry->name, name))
+            entry = entry->next;
+        return entry;
+    }
+    for (std::uint32_t left = Candidates(Print(name)); left; left &= left - 1) {
+        DVSDataEntry *const entry = At(static_cast<std::uint32_t>(std::countr_zero(left)));
+        if (NameMatches(entry->name, name)) return entry;
+    }
+    return nullptr;
+}
+
+DVSDataEntry *NameIndex::At(std::uint32_t position) const {
+    DVSDataEntry *entry = anchors_[position / kStride];
+    for (std::uint32_t steps = position % kStride; steps; --steps)
+        entry = entry->next;
+    return entry;
+}
+
+/// A bit for each entry whose name has that print.
+std::uint32_t NameIndex::Candidates(std::uint8_t print) const {
+    std::uint32_t bits = 0;
+#if defined(__SSE2__)
+    const __m128i wanted = _mm_set1_epi8(static_cast<char>(print));
+    const auto *const prints = reinterpret_cast<const __m128i *>(prints_.data());
+    const int low = _mm_movemask_epi8(_mm_cmpeq_epi8(_mm_loadu_si128(prints), wanted));
+    const int high = _mm_movemask_epi8(_mm_cmpeq_epi8(_mm_loadu_si128(prints + 1), wanted));
+    bits = static_cast<std::uint32_t>(low) | static_cast<std::uint32_t>(high) << 16;
+#else
+    for (std::uint32_t i = 0; i < kShortMax; ++i)
+        bits |= std::uint32_t{prints_[i] == print} << i;
+#endif
+    return count_ == kShortMax ? bits : bits & ((1u << count_) - 1);
+}
+
+void NameIndex::AddShort(DVSDataEntry *entry, std::string_view name) {
+    prints_[count_] = Print(name);
+    if (count_ % kStride == 0) anchors_[count_ / kStride] = entry;
+    ++count_;
+}
+
+void NameIndex::RemoveShort(const DVSDataEntry *entry) {
+    std::uint32_t left = Candidates(Print(NameOf(entry)));
+    while (left && At(static_cast<std::uint32_t>(std::countr_zero(left))) != entry)
+        left &= left - 1;
+    if (!left) return;
+    const auto position = static_cast<std::uint32_t>(std::countr_zero(left));
+    --count_;
+    std::memmove(&prints_[position], &prints_[position] + 1, count_ - position);
+    // Every anchor from there on now stands for the entry behind the one it held.
+    for (std::uint32_t i = (position + kStride - 1) / kStride; i <= count_ / kStride; ++i)
+        anchors_[i] = anchors_[i]->next;
+}
+
+void NameIndex::Added(DVSData *list, DVSDataEntry *entry, std::string_view name) {
+    name = Stored(name);
+    if (mode_ == Mode::Short && count_ < kShortMax) {
+        AddShort(entry, name);
+        return;
+    }
+    ++count_;
+    if (mode_ == Mode::Hashed && !table_->IsFull())
+        table_->Add(entry, Hash(name));
+    else if (mode_ != Mode::Walk || std::has_single_bit(count_)) // Memory may be back after a while.
+        BuildTable(list);
+}
+
+void NameIndex::Removing(DVSData *list, DVSDataEntry *entry) {
+    if (mode_ == Mode::Short) {
+        RemoveShort(entry);
+        return;
+    }
+    --count_;
+    if (mode_ == Mode::Hashed) table_->Remove(entry, Hash(NameOf(entry)));
+    if (count_ <= kShrinkTo) {
+        BuildShort(list);
+        RemoveShort(entry); // It is still in the list.
+    }
+}
+
+void NameIndex::BuildTable(DVSData *list) {
+    Drop(list);
+    mode_ = Mode::Walk;
+    const std::uint64_t size = std::bit_ceil(std::uint64_t{count_} + 1);
+    if (size > UINT32_MAX) return;
+    auto *const table =
+        static_cast<Table *>(list->allocFn(Table::BlockSize(static_cast<std::uint32_t>(size))));
+    if (!table) return;
+    table->Clear(static_cast<std::uint32_t>(size));
+    for (DVSDataEntry *entry = list->head; entry; entry = entry->next)
+        table->Add(entry, Hash(NameOf(entry)));
+    table_ = table;
+    mode_ = Mode::Hashed;
+}
+
+void NameIndex::BuildShort(DVSData *list) {
+    Drop(list);
+    mode_ = Mode::Short;
+    count_ = 0;
+    for (DVSDataEntry *entry = list->head; entry; entry = entry->next)
+        AddShort(entry, NameOf(entry));
+}
+
+void NameIndex::Drop(DVSData *list) {
+    if (table_) list->freeFn(table_);
+    table_ = nullptr;
+}
+
+} // namespace dvs::data
