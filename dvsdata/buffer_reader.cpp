@@ -138,9 +138,9 @@ HYP_ReturnStatus InPlaceList::Open(Bytes buf, std::uint32_t typeMask, KnownSum k
     start_.Quiet();
 
     // The messages are those of a list being built, which whoever reads them expects to see.
-    Emit(kTrace, "Allocing new handle\n");
+    EmitAllocating();
     std::uint32_t serialSize = kMinBufferSize;
-    Emit(kTrace, "DVSData handle allocated, serialSize = %d\n", serialSize);
+    EmitAllocated(serialSize);
     EntryRef entry;
     HYP_ReturnStatus status;
     while ((status = reader_.Next(&entry)) == HYP_OK) {

@@ -132,7 +132,8 @@ void ImageWriter::Entry(std::string_view name, std::uint32_t propType, Bytes val
     EndEntry();
 }
 
-HYP_ReturnStatus ImageWriter::List(const DVSData *list, const Filter &filter, std::uint32_t bufSize) {
+HYP_ReturnStatus ImageWriter::List(const DVSData *list, const Filter &filter, std::uint32_t bufSize,
+                                   const Extra *extra) {
     BeginBuffer();
     std::uint32_t remaining = EntriesSize(list);
     for (const DVSDataEntry *entry = list->head; entry; entry = entry->next) {
@@ -142,10 +143,15 @@ HYP_ReturnStatus ImageWriter::List(const DVSData *list, const Filter &filter, st
         remaining -= size;
         if (!filter.IsNone() && !filter.Keeps(entry)) continue;
         if (Emits(kDetail)) [[unlikely]]
-            Emit(kDetail, "serializing %s: %u/%u data/serial bytes\n", entry->name, entry->dataLen, size);
+            EmitWriting(entry->name, entry->dataLen, size);
         Image(entry);
     }
     if (remaining != kMarkerSize) return LengthChanged(bufSize, remaining, "NULL", 0);
+    if (extra) {
+        const auto dataLen = static_cast<std::uint32_t>(extra->value.size());
+        EmitWriting(extra->name, dataLen, EntrySize(dataLen));
+        Entry(extra->name, extra->propType, extra->value);
+    }
     EndBuffer();
     return HYP_OK;
 }

@@ -48,8 +48,8 @@ void Unlink(DVSData *list, DVSDataEntry *previous, DVSDataEntry *entry) {
     (previous ? previous->next : list->head) = entry->next;
     if (list->tail == entry) list->tail = previous;
     list->serialSize -= entry->serialSize;
-    Emit(kDetail, "Remove entry %s, datalen = %u, flag = 0x%x serialSize = %u\n", entry->name, entry->dataLen,
-         entry->propType, list->serialSize);
+    if (Emits(kDetail)) [[unlikely]]
+        EmitRemoved(entry->name, entry->dataLen, entry->propType, list->serialSize);
 }
 
 /// Writes all but the value. Bytes the format leaves open are zero: images are reproducible and carry no heap
@@ -96,8 +96,7 @@ HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, 
     // Type 0 resets the type here and keeps it in Replace: callers rely on both.
     if (dataLen) std::memmove(entry->data, data, dataLen);
     entry->propType = effectiveType;
-    Emit(kDetail, "updated data %.*s, datalen = %d, serialSize = %d\n", PrintLen(name), name.data(), dataLen,
-         list->serialSize);
+    EmitUpdated(name, dataLen, list->serialSize);
     return HYP_OK;
 }
 
@@ -108,17 +107,6 @@ bool NameMatches(const char *field, std::string_view name) {
     // Most names differ only behind a long common beginning, so the end is compared first.
     return field[name.size()] == '\0' && (name.empty() || field[name.size() - 1] == name.back()) &&
            std::memcmp(field, name.data(), name.size()) == 0;
-}
-
-void EmitAdding(std::string_view name, std::uint32_t dataLen, std::uint32_t startSize) {
-    if (Emits(kDetail)) [[unlikely]]
-        Emit(kDetail, "added data %.*s, len %d, start serialSize = %d\n", PrintLen(name), name.data(),
-             dataLen, startSize);
-}
-
-void EmitAdded(std::string_view name, std::uint32_t serialSize) {
-    if (Emits(kDetail)) [[unlikely]]
-        Emit(kDetail, "added data %.*s, serialSize = %d\n", PrintLen(name), name.data(), serialSize);
 }
 
 HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
@@ -134,7 +122,8 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
              PrintLen(name), name.data());
         return HYP_BAD_PARAM;
     }
-    EmitAdding(name, dataLen, list->serialSize);
+    if (Emits(kDetail)) [[unlikely]]
+        EmitAdding(name, dataLen, list->serialSize);
 
     auto *const entry = static_cast<DVSDataEntry *>(list->allocFn(kImageOffset + std::uint64_t{serialSize}));
     if (!entry) return HYP_NO_MEMORY;
@@ -145,7 +134,8 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
     list->serialSize += serialSize;
     Names(list).Added(list, entry, name);
 
-    EmitAdded(name, list->serialSize);
+    if (Emits(kDetail)) [[unlikely]]
+        EmitAdded(name, list->serialSize);
     return HYP_OK;
 }
 
@@ -160,13 +150,13 @@ void RemoveAfter(DVSData *list, DVSDataEntry *previous) {
 using namespace dvs::data;
 
 HYP_ReturnStatus DVSData_Alloc(DVSData **list, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn) {
-    Emit(kTrace, "Allocing new handle\n");
+    EmitAllocating();
     void *const block = allocFn(sizeof(ListRecord));
     if (!block) return HYP_NO_MEMORY;
     auto *const record = new (block) ListRecord{{kMinBufferSize, nullptr, nullptr, allocFn, freeFn}, {}};
     DVSData *const handle = &record->face;
     *list = handle;
-    Emit(kTrace, "DVSData handle allocated, serialSize = %d\n", handle->serialSize);
+    EmitAllocated(handle->serialSize);
     return HYP_OK;
 }
 

@@ -29,9 +29,21 @@ namespace dvs::data {
 /// also among namesakes. Prints the message of DVSDataRemove.
 void RemoveAfter(DVSData *list, DVSDataEntry *previous);
 
+// The lines that lists print, also for those who do a list's work in place. `serialSize` is the list's,
+// except where an entry is written: there it is the entry's.
+
+void EmitAllocating();
+void EmitAllocated(std::uint32_t serialSize);
 /// The two lines that frame each addition to a list.
 void EmitAdding(std::string_view name, std::uint32_t dataLen, std::uint32_t startSize);
 void EmitAdded(std::string_view name, std::uint32_t serialSize);
+void EmitUpdated(std::string_view name, std::uint32_t dataLen, std::uint32_t serialSize);
+void EmitRemoved(std::string_view name, std::uint32_t dataLen, std::uint32_t propType,
+                 std::uint32_t serialSize);
+/// Serialization for a switch of a version that is older than the format.
+void EmitOldVersion(std::uint32_t version);
+void EmitBufferSize(std::uint32_t bufSize);
+void EmitWriting(std::string_view name, std::uint32_t dataLen, std::uint32_t entrySize);
 
 /// Name comparison of lookups: equal, or equal in the first 128 characters. `field` is any 128-byte name
 /// field.
@@ -99,10 +111,18 @@ public:
     /// A copy of the entry's image.
     void Image(const DVSDataEntry *entry) { Put(&entry->serialSize, entry->serialSize); }
 
-    /// The whole list as one buffer, with the checks and messages of DVSData_Serialize from its header on.
-    /// HYP_LIMIT_EXCEEDED: the list's size and its entries do not agree; what was written is to be thrown
-    /// away.
-    [[nodiscard]] HYP_ReturnStatus List(const DVSData *list, const Filter &filter, std::uint32_t bufSize);
+    /// An entry that a list's buffer carries behind those of the list.
+    struct Extra {
+        std::string_view name;
+        std::uint32_t propType;
+        Bytes value;
+    };
+
+    /// The whole list as one buffer, with the checks and messages of DVSData_Serialize from its header on. A
+    /// list of `bufSize` bytes, `extra` (may be null) included. HYP_LIMIT_EXCEEDED: the list's size and its
+    /// entries do not agree; what was written is to be thrown away.
+    [[nodiscard]] HYP_ReturnStatus List(const DVSData *list, const Filter &filter, std::uint32_t bufSize,
+                                        const Extra *extra = nullptr);
 
     [[nodiscard]] std::size_t Position() const { return at_; }
     [[nodiscard]] bool Complete() const { return !overflow_ && depth_ == 0 && at_ == size_; }

@@ -11,9 +11,6 @@ using namespace dvs::data;
 
 namespace {
 
-/// Switches below this version predate the format.
-constexpr std::uint32_t kMinSwitchVersion = 4;
-
 /// A buffer of `size` bytes by the convention of dvs/data.h: the caller's, or one of the list's own, which
 /// goes back to the list unless it is kept.
 class OutputBuffer {
@@ -51,7 +48,7 @@ private:
 
 HYP_ReturnStatus Serialize(DVSData *list, void **buf, std::uint32_t *bufLen, const Filter &filter) {
     const std::uint32_t size = SerializedSize(list, filter);
-    Emit(kDetail, "allocating buffer size %d\n", size);
+    EmitBufferSize(size);
     OutputBuffer output(list, buf, bufLen);
     if (const HYP_ReturnStatus status = output.Reserve(size); status != HYP_OK) return status;
     ImageWriter writer(output.Block());
@@ -83,7 +80,7 @@ HYP_ReturnStatus DVSData_Serialize(DVSData *list, void **buf, uint32_t *bufLen, 
 
 HYP_ReturnStatus DVSData_SerializeExNamedProp(DVSData *list, void **buf, uint32_t *bufLen, uint32_t version,
                                               const char *exName) {
-    if (version < kMinSwitchVersion) Emit(kError, "DVS version %d is smaller than 6.0.\n", version);
+    EmitOldVersion(version);
     return Serialize(list, buf, bufLen, Filter::WithoutName(exName));
 }
 
@@ -99,8 +96,7 @@ HYP_ReturnStatus DVSData_SerializeEntry(DVSData *list, const char *name, void **
     OutputBuffer output(list, buf, bufLen);
     if (const HYP_ReturnStatus status = output.Reserve(entry->serialSize + kMinBufferSize); status != HYP_OK)
         return status;
-    Emit(kDetail, "serializing %s: %u/%u data/serial bytes\n", entry->name, entry->dataLen,
-         entry->serialSize);
+    EmitWriting(entry->name, entry->dataLen, entry->serialSize);
     ImageWriter writer(output.Block());
     writer.BeginBuffer();
     writer.Image(entry);
