@@ -1,0 +1,282 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The object tree (node.h): finding, adding and removing nodes. What the content may be is judge.cpp's business, how
+// it is written as a document that of document_*.cpp.
+
+#include "platform/embedded/configstore/node.h"
+
+#include <bit>
+#include <cstring>
+
+namespace configstore {
+
+namespace {
+
+constexpr std::size_t kIndexFrom = 12; // shorter lists are walked
+
+const Name *NewName(Arena &arena, std::string_view text) {
+    auto *const name = static_cast<Name *>(arena.Allocate(offsetof(Name, text) + text.size() + 1));
+    name->size = text.size();
+    if (!text.empty()) std::memcpy(name->text, text.data(), text.size());
+    name->text[text.size()] = '\0';
+    return name;
+}
+
+Object *NewNode(Arena &arena, Object *parent) {
+    auto *const node = static_cast<Object *>(arena.Allocate(sizeof(Object)));
+    node->parent = parent;
+    node->next = nullptr;
+    node->integer = 0;
+    node->kind = Kind::Null;
+    node->described = false;
+    node->bad = false;
+    node->isRoot = false;
+    return node;
+}
+
+uint64_t HashId(std::string_view id) {
+    // Ids come from documents too. The seed keeps their writers from choosing ids that all fall together.
+    static const uint64_t seed =
+        (reinterpret_cast<uintptr_t>(&id) ^ reinterpret_cast<uintptr_t>(&HashId)) * 0x9e3779b97f4a7c15U;
+    uint64_t hash = seed ^ id.size();
+    const char *at = id.data();
+    std::size_t left = id.size();
+    while (left > 0) {
+        uint64_t word = 0;
+        const std::size_t step = left < 8 ? left : 8;
+        std::memcpy(&word, at, step);
+        hash = (hash ^ word) * 0xff51afd7ed558ccdU;
+        hash ^= hash >> 32;
+        at += step;
+        left -= step;
+    }
+    return hash;
+}
+
+void Insert(InstanceTable *table, Object *instance) {
+    const std::size_t mask = table->slotCount - 1;
+    std::size_t at = static_cast<std::size_t>(HashId(NameOf(instance))) & mask;
+    while (table->slots[at])
+        at = (at + 1) & mask;
+    table->slots[at] = instance;
+}
+
+void DropIndex(InstanceTable *table) {
+    std::free(table->slots);
+    table->slots = nullptr;
+    table->slotCount = 0;
+}
+
+/// An index is a convenience: without the memory for it, lists are walked.
+void BuildIndex(InstanceTable *table) {
+    const std::size_t slotCount = std::bit_ceil(table->count * 2);
+    auto **const slots = static_cast<Object **>(std::calloc(slotCount, sizeof(Object *)));
+    if (!slots) return;
+    DropIndex(table);
+    table->slots = slots;
+    table->slotCount = slotCount;
+    for (Object *instance = table->first; instance; instance = instance->next)
+        Insert(table, instance);
+}
+
+} // namespace
+
+Tree::Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent, std::string_view newInstance)
+    : shape(FindSchema(newKey, newGroup)), key(newKey), group(newGroup), component(newComponent), instance(newInstance) {
+    root.parent = nullptr;
+    root.next = nullptr;
+    root.name = NewName(arena, newInstance);
+    root.described = false;
+    root.bad = false;
+    root.isRoot = true;
+    MakeObject(&root);
+}
+
+Tree::~Tree() {
+    for (InstanceTable *table = tables; table; table = table->nextInTree)
+        DropIndex(table);
+}
+
+Tree *TreeOf(Object *node) {
+    while (!node->isRoot) {
+        if (node->kind == Kind::Dead || !node->parent) return nullptr;
+        node = node->parent;
+    }
+    return node->kind == Kind::Dead ? nullptr : reinterpret_cast<Tree *>(node);
+}
+
+const Shape *ShapeOf(const Object *object) {
+    if (object->isRoot) return reinterpret_cast<const Tree *>(object)->shape;
+    if (object->described) return object->field->shape;
+    const Object *const list = object->parent;
+    if (list->kind == Kind::Instances && list->described) return list->field->shape;
+    return nullptr;
+}
+
+Object *FindMember(Object *object, std::string_view name) {
+    const Shape *const shape = ShapeOf(object);
+    if (const Field *const field = shape ? shape->Find(name) : nullptr) {
+        for (Object *member = object->members.first; member; member = member->next) {
+            if (member->field == field) return member;
+        }
+        return nullptr;
+    }
+    for (Object *member = object->members.first; member; member = member->next) {
+        if (!member->described && NameOf(member) == name) return member;
+    }
+    return nullptr;
+}
+
+Object *FindInstance(Object *list, std::string_view id) {
+    InstanceTable *const table = list->table;
+    if (!table->slots && table->count > kIndexFrom) BuildIndex(table);
+    if (!table->slots) {
+        for (Object *instance = table->first; instance; instance = instance->next) {
+            if (NameOf(instance) == id) return instance;
+        }
+        return nullptr;
+    }
+    const std::size_t mask = table->slotCount - 1;
+    for (std::size_t at = static_cast<std::size_t>(HashId(id)) & mask; table->slots[at]; at = (at + 1) & mask) {
+        if (NameOf(table->slots[at]) == id) return table->slots[at];
+    }
+    return nullptr;
+}
+
+Object *FirstChild(const Object *container) {
+    return container->kind == Kind::Instances ? container->table->first : container->members.first;
+}
+
+std::string PathOf(const Object *node) {
+    if (node->isRoot) return {};
+    const std::string above = PathOf(node->parent);
+    const std::string own(NameOf(node));
+    if (node->parent->kind == Kind::Instances) return above + '[' + own + ']';
+    return above.empty() ? own : above + '/' + own;
+}
+
+Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name) {
+    const Name *const ownName = field ? nullptr : NewName(tree->arena, name);
+    Object *const member = NewNode(tree->arena, object);
+    member->described = field != nullptr;
+    if (field)
+        member->field = field;
+    else
+        member->name = ownName;
+    if (object->members.last)
+        object->members.last->next = member;
+    else
+        object->members.first = member;
+    object->members.last = member;
+    return member;
+}
+
+Object *AddMember(Tree *tree, Object *object, std::string_view name) {
+    const Shape *const shape = ShapeOf(object);
+    return AddMember(tree, object, shape ? shape->Find(name) : nullptr, name);
+}
+
+Object *AddInstance(Tree *tree, Object *list, std::string_view id) {
+    const Name *const name = NewName(tree->arena, id);
+    Object *const instance = NewNode(tree->arena, list);
+    instance->name = name;
+    MakeObject(instance);
+    InstanceTable *const table = list->table;
+    if (table->last)
+        table->last->next = instance;
+    else
+        table->first = instance;
+    table->last = instance;
+    table->count++;
+    if (!table->slots) return instance;
+    if (table->count * 4 <= table->slotCount * 3) {
+        Insert(table, instance);
+    } else {
+        DropIndex(table); // the old one must not outlive a failure to build the larger one
+        BuildIndex(table);
+    }
+    return instance;
+}
+
+void MakeObject(Object *node) {
+    node->kind = Kind::Object;
+    node->members = {nullptr, nullptr};
+}
+
+void MakeInstances(Tree *tree, Object *node) {
+    auto *const table = static_cast<InstanceTable *>(tree->arena.Allocate(sizeof(InstanceTable)));
+    *table = {nullptr, nullptr, 0, nullptr, 0, tree->tables};
+    tree->tables = table;
+    node->kind = Kind::Instances;
+    node->table = table;
+}
+
+void RemoveChild(Object *container, Object *child) {
+    const bool instances = container->kind == Kind::Instances;
+    Object *before = nullptr;
+    for (Object *at = FirstChild(container); at != child; at = at->next)
+        before = at;
+    Object *&first = instances ? container->table->first : container->members.first;
+    Object *&last = instances ? container->table->last : container->members.last;
+    (before ? before->next : first) = child->next;
+    if (last == child) last = before;
+    child->kind = Kind::Dead;
+    if (instances) {
+        container->table->count--;
+        DropIndex(container->table);
+    }
+}
+
+void RemoveAllChildren(Object *container) {
+    for (Object *child = FirstChild(container); child; child = child->next)
+        child->kind = Kind::Dead;
+    if (container->kind == Kind::Instances) {
+        InstanceTable *const table = container->table;
+        DropIndex(table);
+        table->first = table->last = nullptr;
+        table->count = 0;
+    } else {
+        container->members = {nullptr, nullptr};
+    }
+}
+
+PackedList *NewList(Tree *tree) {
+    auto *const list = static_cast<PackedList *>(tree->arena.Allocate(sizeof(PackedList)));
+    *list = {nullptr, 0, 0, 0};
+    return list;
+}
+
+namespace {
+
+char *Grow(Tree *tree, PackedList *list, std::size_t more) {
+    if (list->capacity - list->size < more) {
+        const std::size_t capacity = list->size * 2 + (more < 40 ? 56 : more);
+        auto *const data = static_cast<char *>(tree->arena.Allocate(capacity));
+        if (list->size > 0) std::memcpy(data, list->data, list->size);
+        list->data = data;
+        list->capacity = capacity;
+    }
+    char *const at = list->data + list->size;
+    list->size += more;
+    list->count++;
+    return at;
+}
+
+} // namespace
+
+void AppendText(Tree *tree, PackedList *list, std::string_view text) {
+    char *const at = Grow(tree, list, text.size() + 1);
+    if (!text.empty()) std::memcpy(at, text.data(), text.size());
+    at[text.size()] = '\0';
+}
+
+void AppendInteger(Tree *tree, PackedList *list, int64_t value) {
+    std::memcpy(Grow(tree, list, sizeof value), &value, sizeof value);
+}
+
+int64_t IntegerAt(const PackedList *list, std::size_t index) {
+    int64_t value = 0;
+    std::memcpy(&value, list->data + index * sizeof value, sizeof value);
+    return value;
+}
+
+} // namespace configstore

@@ -1,0 +1,169 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef PLATFORM_EMBEDDED_CONFIGSTORE_NODE_H
+#define PLATFORM_EMBEDDED_CONFIGSTORE_NODE_H
+
+// The object tree behind the client interface (platform/configstore.h). A node is an object, a list of instances or a
+// value; a handle is a node's address. Nodes live in their tree's arena: they never move, children keep their order,
+// and instances are found by id through an index. Each node of a known field points to the field's descriptor
+// (schema.h), by which its content is judged the moment it is set.
+//
+// Lists of texts and numbers are packed bytes and not nodes, and content of unknown names stays JSON text until
+// somebody asks for it, so that no document costs many times its own size in memory.
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/configstore.h"
+#include "platform/embedded/configstore/arena.h"
+#include "platform/embedded/configstore/schema.h"
+
+namespace configstore {
+
+enum class Kind : uint8_t {
+    Dead, // deleted; kept so that a stale handle meets a refusal and not somebody else's node
+    Null, Bool, Integer, Unsigned /* above INT64_MAX */, Real, Text, Binary,
+    EmptyList, TextList, IntegerList,
+    Raw,       // JSON text of an array or object without a usable description
+    Object,    // a singleton, an instance, or the root
+    Instances, // a list of instances
+};
+
+struct Span {
+    char *data; // a NUL follows
+    std::size_t size;
+};
+
+/// A packed list: texts with a NUL behind each, or 64-bit numbers.
+struct PackedList {
+    char *data;
+    std::size_t size;
+    std::size_t capacity;
+    std::size_t count;
+};
+
+struct Name {
+    std::size_t size;
+    char text[1]; // a NUL follows
+};
+
+struct InstanceTable {
+    Object *first;
+    Object *last;
+    std::size_t count;
+    Object **slots;       // null until the list is long, and after a removal
+    std::size_t slotCount; // a power of two, at most three quarters full
+    InstanceTable *nextInTree;
+};
+
+struct Object {
+    Object *parent;
+    Object *next;
+    union {
+        const Field *field; // when `described`
+        const Name *name;   // otherwise: unknown members, instances, the root (its instance id)
+    };
+    union {
+        bool boolean;
+        int64_t integer;
+        uint64_t unsignedInteger;
+        double real;
+        Span span; // Text, Binary, Raw
+        PackedList *list;
+        InstanceTable *table;
+        struct {
+            Object *first;
+            Object *last;
+        } members; // Object
+    };
+    Kind kind;
+    bool described;
+    bool bad;    // not what the schema allows here
+    bool isRoot; // the node is the first member of a Tree
+};
+
+struct Tree {
+    Object root; // first: a root handle is its tree's address
+    Arena arena;
+    const Shape *shape = nullptr;
+    InstanceTable *tables = nullptr;
+    bool suspect = false; // some node was bad once
+    std::string key, group, component, instance;
+
+    Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent, std::string_view newInstance);
+    ~Tree();
+    Tree(const Tree &) = delete;
+    Tree &operator=(const Tree &) = delete;
+};
+
+/// What a filter spec selects by; also the address of a store object.
+struct FilterSpec {
+    std::string key, group, component, instance;
+};
+
+// Walking.
+
+[[nodiscard]] inline std::string_view NameOf(const Object *node) {
+    return node->described ? std::string_view(node->field->name) : std::string_view(node->name->text, node->name->size);
+}
+[[nodiscard]] Tree *TreeOf(Object *node); // null below a deleted node
+[[nodiscard]] const Shape *ShapeOf(const Object *object); // of an Object; null where nothing is known
+[[nodiscard]] Object *FindMember(Object *object, std::string_view name);
+[[nodiscard]] Object *FindInstance(Object *list, std::string_view id);
+[[nodiscard]] Object *FirstChild(const Object *container); // of an Object or Instances
+/// "settings/vlan/vlan_id", with the ids of instances in brackets.
+[[nodiscard]] std::string PathOf(const Object *node);
+
+// Changing. All may throw std::bad_alloc, with the tree as it was.
+
+/// A new last member; `field` is the shape's field of that name, if any. Its kind is Null until it is given another.
+Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name);
+Object *AddMember(Tree *tree, Object *object, std::string_view name);
+/// A new last instance, an empty Object. The id is not there yet.
+Object *AddInstance(Tree *tree, Object *list, std::string_view id);
+void MakeObject(Object *node);
+void MakeInstances(Tree *tree, Object *node);
+void RemoveChild(Object *container, Object *child);
+void RemoveAllChildren(Object *container);
+
+/// Turns Raw content that somebody asks for into nodes. False when it is not what it would have to be.
+bool Expand(Tree *tree, Object *node);
+/// Makes the content of an undescribed Object a list of instances. False when some of it is not an object.
+bool TreatAsInstances(Tree *tree, Object *node);
+
+// Packed lists.
+
+PackedList *NewList(Tree *tree);
+void AppendText(Tree *tree, PackedList *list, std::string_view text);
+void AppendInteger(Tree *tree, PackedList *list, int64_t value);
+[[nodiscard]] int64_t IntegerAt(const PackedList *list, std::size_t index);
+
+// Judging.
+
+/// Sets the node's mark by its field and content.
+void Judge(Tree *tree, Object *node);
+[[nodiscard]] inline bool TextFits(const Field *field, std::size_t size) { return size <= field->maxBytes; }
+[[nodiscard]] inline bool IntegerFits(const Field *field, int64_t value) {
+    return value >= field->minimum && value <= field->maximum;
+}
+/// The first node that the schema does not allow, in document order; null when all is well.
+[[nodiscard]] const Object *FindViolation(Tree *tree);
+/// Why it is not allowed, for a message.
+[[nodiscard]] std::string Describe(const Object *bad);
+
+/// Runs `work` and turns what it throws into a status: no exception leaves an exported function.
+template <typename Work> int32_t Guarded(Work &&work) noexcept {
+    try {
+        return work();
+    } catch (const std::bad_alloc &) {
+        return NO_MEMORY;
+    } catch (...) {
+        return FAILED;
+    }
+}
+
+} // namespace configstore
+
+#endif

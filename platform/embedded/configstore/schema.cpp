@@ -1,0 +1,194 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Compiles the JSON Schema text into descriptors (schema.h). Boost.JSON reads the text; only the keywords that the
+// schema file uses are known, and anything else is refused, so that no constraint is silently left out.
+
+#include "platform/embedded/configstore/schema.h"
+
+#include <boost/json.hpp>
+#include <cassert>
+#include <cstring>
+#include <map>
+#include <new>
+#include <stdexcept>
+
+#include "platform/embedded/configstore/log.h"
+#include "platform/embedded/configstore/schema_text.h"
+
+namespace configstore {
+
+namespace json = boost::json;
+
+std::size_t Shape::Hash(std::string_view name) {
+    // The names of one shape differ in length, first or last bytes nearly always; what collides is compared.
+    uint64_t first = 0;
+    uint64_t last = 0;
+    if (name.size() >= 8) {
+        std::memcpy(&first, name.data(), 8);
+        std::memcpy(&last, name.data() + name.size() - 8, 8);
+    } else if (!name.empty()) {
+        std::memcpy(&first, name.data(), name.size());
+    }
+    const uint64_t mixed = (first ^ (last * 0x9e3779b97f4a7c15U) ^ name.size()) * 0xff51afd7ed558ccdU;
+    return static_cast<std::size_t>(mixed >> 32);
+}
+
+const Field *Shape::Find(std::string_view name) const {
+    if (slots_.empty()) return nullptr;
+    const std::size_t mask = slots_.size() - 1;
+    for (std::size_t at = Hash(name) & mask; slots_[at]; at = (at + 1) & mask) {
+        if (slots_[at]->name == name) return slots_[at];
+    }
+    return nullptr;
+}
+
+std::size_t Shape::IndexOf(const Field *field) const {
+    for (std::size_t i = 0; i < fields_.size(); i++) {
+        if (fields_[i] == field) return i;
+    }
+    assert(!"the field is another shape's");
+    return 0;
+}
+
+void Shape::Add(Field field) {
+    field.prefix = '"' + field.name + "\":";
+    owned_.push_back(std::move(field));
+    fields_.push_back(&owned_.back());
+    Rehash();
+}
+
+void Shape::Rehash() {
+    std::size_t size = 8;
+    while (size < fields_.size() * 2)
+        size *= 2;
+    slots_.assign(size, nullptr);
+    for (const Field *field : fields_) {
+        std::size_t at = Hash(field->name) & (size - 1);
+        while (slots_[at])
+            at = (at + 1) & (size - 1);
+        slots_[at] = field;
+    }
+}
+
+class CompiledSchema {
+  public:
+    explicit CompiledSchema(std::string_view text)
+        : document_(json::parse(json::string_view(text.data(), text.size()))) {
+        root_ = ShapeOf(document_);
+        document_ = nullptr;
+    }
+    [[nodiscard]] const Shape *Root() const { return root_; }
+
+  private:
+    const json::value &Resolve(const json::value &node) {
+        const json::value *at = &node;
+        while (const json::value *ref = at->as_object().if_contains("$ref")) {
+            const json::string &target = ref->as_string();
+            if (!target.starts_with("#/definitions/"))
+                throw std::runtime_error("a reference to elsewhere: " + std::string(target));
+            at = &document_.at("definitions").at(target.subview(14));
+        }
+        return *at;
+    }
+
+    const Shape *ShapeOf(const json::value &unresolved) {
+        const json::value &node = Resolve(unresolved);
+        if (const auto known = known_.find(&node); known != known_.end()) return known->second;
+        shapes_.emplace_back();
+        Shape *const shape = &shapes_.back();
+        known_.emplace(&node, shape);
+        const json::object &properties = node.at("properties").as_object();
+        if (properties.size() > Shape::kMaxFields) throw std::runtime_error("an object with too many properties");
+        for (const auto &[name, value] : properties) {
+            Field field = FieldOf(value);
+            field.name.assign(name.data(), name.size());
+            shape->Add(std::move(field));
+        }
+        return shape;
+    }
+
+    Field FieldOf(const json::value &unresolved) {
+        const json::value &node = Resolve(unresolved);
+        const json::object &keywords = node.as_object();
+        Field field;
+        const json::value *const type = keywords.if_contains("type");
+        if (!type) return field;
+        const json::string &name = type->as_string();
+        if (name == "boolean") {
+            field.type = FieldType::Bool;
+        } else if (name == "integer") {
+            field.type = FieldType::Integer;
+            field.minimum = keywords.at("minimum").to_number<int64_t>();
+            field.maximum = keywords.at("maximum").to_number<int64_t>();
+        } else if (name == "string") {
+            field.type = keywords.contains("contentEncoding") ? FieldType::Binary : FieldType::Text;
+            if (const json::value *most = keywords.if_contains("maxLength"))
+                field.maxBytes = most->to_number<uint64_t>();
+        } else if (name == "array") {
+            field = ListOf(keywords);
+        } else if (name == "object") {
+            const json::value *const additional = keywords.if_contains("additionalProperties");
+            const bool instances = additional && additional->is_object();
+            field.type = instances ? FieldType::Instances : FieldType::Object;
+            field.shape = ShapeOf(instances ? *additional : node);
+        } else {
+            throw std::runtime_error("an unknown type: " + std::string(name));
+        }
+        return field;
+    }
+
+    Field ListOf(const json::object &keywords) {
+        Field field = FieldOf(keywords.at("items"));
+        switch (field.type) {
+        case FieldType::Text:
+            field.type = FieldType::TextList;
+            break;
+        case FieldType::Integer:
+            field.type = FieldType::IntegerList;
+            break;
+        default:
+            throw std::runtime_error("a list of neither texts nor numbers");
+        }
+        if (const json::value *most = keywords.if_contains("maxItems")) field.maxItems = most->to_number<uint64_t>();
+        return field;
+    }
+
+    json::value document_;
+    std::deque<Shape> shapes_;
+    std::map<const json::value *, const Shape *> known_;
+    const Shape *root_ = nullptr;
+};
+
+void CompiledSchemaDeleter::operator()(CompiledSchema *schema) const { delete schema; }
+
+CompiledSchemaPtr CompileSchema(std::string_view text, std::string *why) {
+    try {
+        return CompiledSchemaPtr(new CompiledSchema(text));
+    } catch (const std::bad_alloc &) {
+        throw;
+    } catch (const std::exception &error) {
+        if (why) *why = error.what();
+        return nullptr;
+    }
+}
+
+const Shape *RootShape(const CompiledSchema *schema) { return schema->Root(); }
+
+std::string_view SchemaText(std::string_view key, std::string_view group) {
+    if (key != "switches" || group != "network_vds") return {};
+    return {reinterpret_cast<const char *>(kSwitchesSchema), kSwitchesSchemaSize};
+}
+
+const Shape *FindSchema(std::string_view key, std::string_view group) {
+    const std::string_view text = SchemaText(key, group);
+    if (text.empty()) return nullptr;
+    static const CompiledSchemaPtr switches = [&] {
+        std::string why;
+        CompiledSchemaPtr compiled = CompileSchema(text, &why);
+        if (!compiled) Log("config store: the built-in schema of switches cannot be used: %s", why.c_str());
+        assert(compiled);
+        return compiled;
+    }();
+    return switches ? RootShape(switches.get()) : nullptr;
+}
+
+} // namespace configstore
