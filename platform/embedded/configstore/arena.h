@@ -2,8 +2,8 @@
 #ifndef PLATFORM_EMBEDDED_CONFIGSTORE_ARENA_H
 #define PLATFORM_EMBEDDED_CONFIGSTORE_ARENA_H
 
-// The memory of one object tree: handed out piece by piece, given back all at once. Nothing moves and nothing is
-// released before the tree is, which is what keeps handles valid while their siblings come and go.
+// The memory of one object tree: handed out piece by piece, given back all at once. Nothing moves and nothing
+// is released before the tree is, which is what keeps handles valid while their siblings come and go.
 
 #include <cstddef>
 #include <cstdint>
@@ -15,7 +15,7 @@
 namespace configstore {
 
 class Arena {
-  public:
+public:
     Arena() = default;
     Arena(const Arena &) = delete;
     Arena &operator=(const Arena &) = delete;
@@ -47,7 +47,7 @@ class Arena {
         return copy;
     }
 
-  private:
+private:
     struct Chunk {
         Chunk *next;
         std::size_t size;
@@ -56,7 +56,8 @@ class Arena {
     static constexpr std::size_t kLargestChunk = std::size_t{1} << 20;
 
     void *AllocateSlow(std::size_t size) {
-        // A large piece gets a chunk of its own behind the current one, so that the current one's rest stays in use.
+        // A large piece gets a chunk of its own behind the current one, so that the current one's rest stays
+        // in use.
         const bool alone = size > nextChunk_ / 4;
         const std::size_t room = alone ? size : nextChunk_ - sizeof(Chunk);
         if (room > SIZE_MAX - sizeof(Chunk)) throw std::bad_alloc();

@@ -1,5 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// SQLite behind the store (database.h): statements, errors, and the opening of a file that nobody vouches for.
+// SQLite behind the store (database.h): statements, errors, and the opening of a file that nobody vouches
+// for.
 
 #include "platform/embedded/configstore/database.h"
 
@@ -37,16 +38,19 @@ int32_t CreateFile(const std::string &path) {
             return Fail(path, "the directory cannot be made", errno);
     }
     const int fd = open(path.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, kFileMode);
-    if (fd < 0) return errno == EEXIST ? static_cast<int32_t>(OK) : Fail(path, "the file cannot be made", errno);
+    if (fd < 0)
+        return errno == EEXIST ? static_cast<int32_t>(OK) : Fail(path, "the file cannot be made", errno);
     close(fd);
     return OK;
 }
 
-/// What the path leads to has to be a file of its own: through a link or a device the store might write elsewhere.
+/// What the path leads to has to be a file of its own: through a link or a device the store might write
+/// elsewhere.
 int32_t CheckFile(const std::string &path, Access access) {
     struct stat info {};
     if (lstat(path.c_str(), &info) != 0) {
-        if (errno != ENOENT || access == Access::ReadOnly) return Fail(path, "the file cannot be opened", errno);
+        if (errno != ENOENT || access == Access::ReadOnly)
+            return Fail(path, "the file cannot be opened", errno);
         const int32_t status = CreateFile(path);
         if (status != OK) return status;
         if (lstat(path.c_str(), &info) != 0) return Fail(path, "the file cannot be opened", errno);
@@ -71,7 +75,8 @@ int32_t KeepMemoryDatabase() {
     const std::lock_guard guard(mutex);
     if (keeper) return OK;
     sqlite3 *db = nullptr;
-    const int rc = sqlite3_open_v2(kMemoryUri, &db, SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_URI, nullptr);
+    const int rc = sqlite3_open_v2(kMemoryUri, &db,
+                                   SQLITE_OPEN_READWRITE | SQLITE_OPEN_CREATE | SQLITE_OPEN_URI, nullptr);
     Database opened(db);
     if (rc != SQLITE_OK) return StatusOf(rc);
     // The database is made with the first access to it, not by opening it.
@@ -88,17 +93,19 @@ int32_t Harden(Store *store) {
     constexpr struct {
         int option, value;
     } kOptions[] = {
-        {SQLITE_DBCONFIG_DEFENSIVE, 1},       //
-        {SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0},  //
-        {SQLITE_DBCONFIG_ENABLE_TRIGGER, 0},  //
-        {SQLITE_DBCONFIG_ENABLE_VIEW, 0},     // ours are for people
-        {SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, 1}, // until the file is known to be ours, closing must not change it
+        {SQLITE_DBCONFIG_DEFENSIVE, 1},      //
+        {SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0}, //
+        {SQLITE_DBCONFIG_ENABLE_TRIGGER, 0}, //
+        {SQLITE_DBCONFIG_ENABLE_VIEW, 0},    // ours are for people
+        {SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE,
+         1}, // until the file is known to be ours, closing must not change it
     };
     for (const auto &option : kOptions) {
         if (sqlite3_db_config(db, option.option, option.value, nullptr) != SQLITE_OK) return FAILED;
     }
     int32_t status = Execute(store, "PRAGMA cell_size_check=ON");
-    if (status == OK) status = Execute(store, "PRAGMA mmap_size=0"); // a file cut short would be a signal, not an error
+    if (status == OK)
+        status = Execute(store, "PRAGMA mmap_size=0"); // a file cut short would be a signal, not an error
     return status;
 }
 
@@ -119,7 +126,8 @@ int32_t OpenFile(Store *store, Access access) {
     const int rc = sqlite3_open_v2(name.c_str(), &db, flags, nullptr);
     store->db.reset(db);
     if (rc == SQLITE_OK) return OK;
-    Log("config store %s: the file cannot be opened: %s", store->path.c_str(), db ? sqlite3_errmsg(db) : "no memory");
+    Log("config store %s: the file cannot be opened: %s", store->path.c_str(),
+        db ? sqlite3_errmsg(db) : "no memory");
     return StatusOf(rc);
 }
 
@@ -155,7 +163,8 @@ int32_t StatusOf(int rc) {
 void NoteLostTransaction(Store *store, int32_t status) {
     // SQLite rolls back by itself on some failures. What came after would be saved on its own, outside any
     // transaction: it is refused with the same status until the caller cancels.
-    if (store->inTransaction && store->refusal == OK && sqlite3_get_autocommit(store->db.get())) store->refusal = status;
+    if (store->inTransaction && store->refusal == OK && sqlite3_get_autocommit(store->db.get()))
+        store->refusal = status;
 }
 
 Statement::Statement(Store *store, const char *sql) : store_(store) {
@@ -167,7 +176,8 @@ void Statement::Note(int rc) {
     status_ = StatusOf(rc);
     if (rc == SQLITE_OK || rc == SQLITE_ROW || rc == SQLITE_DONE) return;
     const char *const text = sqlite3_errmsg(store_->db.get());
-    const char *const hint = (rc & 0xff) == SQLITE_FULL ? " (make room; nothing of this transaction has been saved)" : "";
+    const char *const hint =
+        (rc & 0xff) == SQLITE_FULL ? " (make room; nothing of this transaction has been saved)" : "";
     Log("config store %s: %s (result %d)%s", store_->path.c_str(), text, rc, hint);
     NoteLostTransaction(store_, status_);
 }
@@ -176,7 +186,8 @@ Statement &Statement::Bind(std::string_view text) {
     parameter_++;
     if (status_ == OK) {
         const char *const data = text.data() ? text.data() : "";
-        const int rc = sqlite3_bind_text64(statement_, parameter_, data, text.size(), SQLITE_STATIC, SQLITE_UTF8);
+        const int rc =
+            sqlite3_bind_text64(statement_, parameter_, data, text.size(), SQLITE_STATIC, SQLITE_UTF8);
         if (rc != SQLITE_OK) Note(rc);
     }
     return *this;
@@ -218,7 +229,8 @@ int32_t Execute(Store *store, const char *sql) {
 }
 
 std::string StorePath() {
-    // Not for programs that run with more rights than their caller: the caller's environment decides nothing there.
+    // Not for programs that run with more rights than their caller: the caller's environment decides nothing
+    // there.
     const char *const path = secure_getenv("DVS_CONFIGSTORE");
     return path && *path ? path : kDefaultPath;
 }
@@ -232,7 +244,8 @@ int32_t OpenStore(const std::string &path, Access access, std::unique_ptr<Store>
     store->readOnly = sqlite3_db_readonly(store->db.get(), "main") != 0;
     status = Migrate(store.get());
     if (status != OK) return status;
-    if (sqlite3_db_config(store->db.get(), SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, 0, nullptr) != SQLITE_OK) return FAILED;
+    if (sqlite3_db_config(store->db.get(), SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, 0, nullptr) != SQLITE_OK)
+        return FAILED;
     *out = std::move(store);
     return OK;
 }

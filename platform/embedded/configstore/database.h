@@ -2,12 +2,13 @@
 #ifndef PLATFORM_EMBEDDED_CONFIGSTORE_DATABASE_H
 #define PLATFORM_EMBEDDED_CONFIGSTORE_DATABASE_H
 
-// The SQLite database below the store: opening it with the precautions a hostile file calls for, its tables, its
-// errors as store statuses. store.cpp and the operators' functions (admin.h) stand on this.
+// The SQLite database below the store: opening it with the precautions a hostile file calls for, its tables,
+// its errors as store statuses. store.cpp and the operators' functions (admin.h) stand on this.
 //
 //   object_row   one row per object and layer: address, revision, the document it holds
-//   history_row  one row for every document that was replaced or deleted: the same, and the revision that ended it
-//   document     the documents' texts; a row is written once and never changed, so that ending an object's document
+//   history_row  one row for every document that was replaced or deleted: the same, and the revision that
+//   ended it document     the documents' texts; a row is written once and never changed, so that ending an
+//   object's document
 //                moves a number and not megabytes, and bringing one back copies nothing
 //   revision     one row per transaction that changed something
 //   object, history   views for people: one row per object and layer, with the document
@@ -24,8 +25,8 @@
 
 namespace configstore {
 
-inline constexpr int kSchemaVersion = 1;            // user_version of the databases this code writes
-inline constexpr int kApplicationId = 0x44565343;   // "DVSC"
+inline constexpr int kSchemaVersion = 1;          // user_version of the databases this code writes
+inline constexpr int kApplicationId = 0x44565343; // "DVSC"
 inline constexpr int kBusyTimeoutMs = 5000;
 inline constexpr const char *kDefaultPath = "/var/lib/dvs/configstore.db";
 inline constexpr const char *kMemoryPath = ":memory:";
@@ -40,15 +41,15 @@ using Database = std::unique_ptr<sqlite3, DatabaseCloser>;
 struct Store {
     std::string path;
     Database db;
-    int64_t revision = 0;    // of the open transaction, once it has changed something
-    int32_t refusal = 0;     // what every call of this transaction answers: it could not begin, or is lost
+    int64_t revision = 0; // of the open transaction, once it has changed something
+    int32_t refusal = 0;  // what every call of this transaction answers: it could not begin, or is lost
     bool inTransaction = false;
     bool readOnly = false;
 };
 
 /// A prepared statement; errors surface at Step.
 class Statement {
-  public:
+public:
     Statement(Store *store, const char *sql);
     ~Statement() { sqlite3_finalize(statement_); }
     Statement(const Statement &) = delete;
@@ -65,7 +66,7 @@ class Statement {
     [[nodiscard]] int64_t Integer(int column) { return sqlite3_column_int64(statement_, column); }
     [[nodiscard]] std::string_view Text(int column);
 
-  private:
+private:
     void Note(int rc);
 
     Store *store_;
@@ -85,7 +86,8 @@ enum class Access { ReadWrite, ReadOnly };
 [[nodiscard]] int32_t Execute(Store *store, const char *sql);
 /// A status for SQLite's result code.
 [[nodiscard]] int32_t StatusOf(int rc);
-/// Whether a statement gave up because memory ran out, the disk is full or the like, and took the transaction along.
+/// Whether a statement gave up because memory ran out, the disk is full or the like, and took the transaction
+/// along.
 void NoteLostTransaction(Store *store, int32_t status);
 
 } // namespace configstore

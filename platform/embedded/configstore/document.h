@@ -2,8 +2,8 @@
 #ifndef PLATFORM_EMBEDDED_CONFIGSTORE_DOCUMENT_H
 #define PLATFORM_EMBEDDED_CONFIGSTORE_DOCUMENT_H
 
-// A tree as a JSON document and back. Singletons and lists of instances are both JSON objects, the latter keyed by
-// instance id; members keep their order. How bytes are written is told in text_code.h.
+// A tree as a JSON document and back. Singletons and lists of instances are both JSON objects, the latter
+// keyed by instance id; members keep their order. How bytes are written is told in text_code.h.
 
 #include <cstdlib>
 #include <memory>
@@ -16,7 +16,7 @@ namespace configstore {
 
 /// Text under construction, in a block of its own that is not cleared first.
 class Buffer {
-  public:
+public:
     /// At least `size` more bytes to write to; throws std::bad_alloc.
     char *Room(std::size_t size) {
         if (capacity_ - size_ < size) Grow(size);
@@ -36,7 +36,7 @@ class Buffer {
     [[nodiscard]] bool Empty() const { return size_ == 0; }
     [[nodiscard]] std::string_view View() const { return {data_.get(), size_}; }
 
-  private:
+private:
     struct Free {
         void operator()(char *block) const { std::free(block); }
     };
@@ -61,9 +61,9 @@ enum class Reading {
 /// The deepest nesting that a document may have.
 inline constexpr std::size_t kMaxDepth = 32;
 
-/// Fills an empty tree. What the schema does not allow is marked in the tree and is no failure. False, with the
-/// reason and the place, for what is not JSON, not an object, too deep, has a name twice or a NUL in a name or text;
-/// the tree then holds what had been read.
+/// Fills an empty tree. What the schema does not allow is marked in the tree and is no failure. False, with
+/// the reason and the place, for what is not JSON, not an object, too deep, has a name twice or a NUL in a
+/// name or text; the tree then holds what had been read.
 [[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why);
 
 } // namespace configstore

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Reads a document into a tree (document.h). Boost.JSON's event parser does the syntax, UTF-8 and depth; the events
-// become nodes at once, without a document model in between, guided by the schema's shapes. Content that the shapes
-// do not describe is kept as compact JSON text.
+// Reads a document into a tree (document.h). Boost.JSON's event parser does the syntax, UTF-8 and depth; the
+// events become nodes at once, without a document model in between, guided by the schema's shapes. Content
+// that the shapes do not describe is kept as compact JSON text.
 
 #include <algorithm>
 #include <boost/json/basic_parser_impl.hpp>
@@ -33,7 +33,7 @@ uint64_t HashName(std::string_view name) {
 
 /// Takes the parser's events.
 class Builder {
-  public:
+public:
     static constexpr std::size_t max_object_size = SIZE_MAX;
     static constexpr std::size_t max_array_size = SIZE_MAX;
     static constexpr std::size_t max_key_size = SIZE_MAX;
@@ -146,7 +146,8 @@ class Builder {
         if (field_) {
             const uint64_t bit = uint64_t{1} << frame.next++;
             if (frame.next == frame.shape->Fields().size()) frame.next = 0;
-            if (frame.seen & bit) return Refuse(ec, "the name \"" + Shown(key) + "\" occurs twice in an object");
+            if (frame.seen & bit)
+                return Refuse(ec, "the name \"" + Shown(key) + "\" occurs twice in an object");
             frame.seen |= bit;
         } else {
             if (strict_ && frame.kind == Kind::Object && frame.shape)
@@ -175,38 +176,46 @@ class Builder {
     bool on_int64(int64_t value, json::string_view, error_code &ec) {
         if (rawDepth_ == 0 && depth_ > 0 && frames_[depth_ - 1].kind == Kind::EmptyList) {
             Object *const list = frames_[depth_ - 1].node;
-            if (list->kind == Kind::EmptyList && TypeOf(list) != FieldType::TextList) list->kind = Kind::IntegerList;
+            if (list->kind == Kind::EmptyList && TypeOf(list) != FieldType::TextList)
+                list->kind = Kind::IntegerList;
             if (list->kind == Kind::IntegerList) {
                 AppendInteger(tree_, list_, value);
                 return true;
             }
         }
-        return Scalar(ec, Kind::Integer, value, [&] { PutNumber(value); }, [&](Object *node) { node->integer = value; });
+        return Scalar(
+            ec, Kind::Integer, value, [&] { PutNumber(value); },
+            [&](Object *node) { node->integer = value; });
     }
 
     bool on_uint64(uint64_t value, json::string_view, error_code &ec) {
-        return Scalar(ec, Kind::Unsigned, value, [&] { PutNumber(value); },
-                      [&](Object *node) { node->unsignedInteger = value; });
+        return Scalar(
+            ec, Kind::Unsigned, value, [&] { PutNumber(value); },
+            [&](Object *node) { node->unsignedInteger = value; });
     }
 
     bool on_double(double value, json::string_view, error_code &ec) {
-        return Scalar(ec, Kind::Real, value, [&] { PutReal(value); }, [&](Object *node) { node->real = value; });
+        return Scalar(
+            ec, Kind::Real, value, [&] { PutReal(value); }, [&](Object *node) { node->real = value; });
     }
 
     bool on_bool(bool value, error_code &ec) {
-        return Scalar(ec, Kind::Bool, value, [&] { raw_.Put(value ? std::string_view("true") : std::string_view("false")); },
-                      [&](Object *node) { node->boolean = value; });
+        return Scalar(
+            ec, Kind::Bool, value,
+            [&] { raw_.Put(value ? std::string_view("true") : std::string_view("false")); },
+            [&](Object *node) { node->boolean = value; });
     }
 
     bool on_null(error_code &ec) {
-        return Scalar(ec, Kind::Null, 0, [&] { raw_.Put(std::string_view("null")); }, [](Object *) {});
+        return Scalar(
+            ec, Kind::Null, 0, [&] { raw_.Put(std::string_view("null")); }, [](Object *) {});
     }
 
-  private:
+private:
     struct Frame {
         Object *node;
         const Shape *shape;
-        Kind kind; // Object, Instances, or EmptyList for any list
+        Kind kind;        // Object, Instances, or EmptyList for any list
         std::size_t next; // the field expected next: documents are mostly written in one order
         uint64_t seen;
         std::size_t hashes;
@@ -285,11 +294,13 @@ class Builder {
         if (depth_ == 0) return Refuse(ec, "a document must be an object");
         if (rawDepth_ == 0 && frames_[depth_ - 1].kind == Kind::EmptyList) {
             Object *const list = frames_[depth_ - 1].node;
-            if (list->kind == Kind::EmptyList && TypeOf(list) != FieldType::IntegerList) list->kind = Kind::TextList;
+            if (list->kind == Kind::EmptyList && TypeOf(list) != FieldType::IntegerList)
+                list->kind = Kind::TextList;
             if (list->kind == Kind::TextList) {
                 if (HasEncodedBytes(text)) {
                     decoded_.resize(text.size());
-                    text = {decoded_.data(), static_cast<std::size_t>(DecodeText(decoded_.data(), text) - decoded_.data())};
+                    text = {decoded_.data(),
+                            static_cast<std::size_t>(DecodeText(decoded_.data(), text) - decoded_.data())};
                 }
                 AppendText(tree_, list_, text);
                 return true;
@@ -336,7 +347,8 @@ class Builder {
     void PutReal(double value) {
         const std::size_t before = raw_.View().size();
         PutNumber(value);
-        if (raw_.View().substr(before).find_first_of(".eE") == std::string_view::npos) raw_.Put(std::string_view(".0"));
+        if (raw_.View().substr(before).find_first_of(".eE") == std::string_view::npos)
+            raw_.Put(std::string_view(".0"));
     }
 
     /// Puts the comma before the next element or name of raw content.
@@ -399,7 +411,7 @@ class Builder {
     std::size_t depth_ = 0;
     std::size_t rawDepth_ = 0;
     Buffer raw_;
-    Object *target_ = nullptr; // the node that the raw content goes to
+    Object *target_ = nullptr;     // the node that the raw content goes to
     const Field *field_ = nullptr; // of the last name read
     PackedList *list_ = nullptr;
     std::string key_;
@@ -443,7 +455,8 @@ bool TreatAsInstances(Tree *tree, Object *node) {
     std::size_t count = 0;
     Object *last = nullptr;
     for (Object *child = node->members.first; child; child = child->next) {
-        const bool object = child->kind == Kind::Object || (child->kind == Kind::Raw && child->span.data[0] == '{');
+        const bool object =
+            child->kind == Kind::Object || (child->kind == Kind::Raw && child->span.data[0] == '{');
         if (!object || child->described) return false;
         last = child;
         count++;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Writes a tree as its document (document.h), straight from the nodes: a save of thousands of ports spends its time
-// here and in SQLite.
+// Writes a tree as its document (document.h), straight from the nodes: a save of thousands of ports spends
+// its time here and in SQLite.
 
 #include <bit>
 #include <charconv>
@@ -90,7 +90,8 @@ void WriteReal(double value, Buffer *out) {
     const std::size_t before = out->View().size();
     WriteNumber(value, out);
     // "1" would come back as a whole number.
-    if (out->View().substr(before).find_first_of(".eE") == std::string_view::npos) out->Put(std::string_view(".0"));
+    if (out->View().substr(before).find_first_of(".eE") == std::string_view::npos)
+        out->Put(std::string_view(".0"));
 }
 
 void WriteList(const Object &node, Buffer *out) {
@@ -197,7 +198,8 @@ void WriteText(std::string_view text, bool asIs, Buffer *out) {
         to = out->Room(left * kEscapeSize + 1);
         to = PutRest(to, at, end, asIs);
     } else {
-        // Up to seven bytes, nearly always plain: the room above is enough for them then, and is asked for else.
+        // Up to seven bytes, nearly always plain: the room above is enough for them then, and is asked for
+        // else.
         for (; at != end; at++, to++) {
             const auto c = static_cast<unsigned char>(*at);
             if (c < 0x20 || c == '"' || c == '\\' || c >= 0x80) break;
@@ -213,6 +215,8 @@ void WriteText(std::string_view text, bool asIs, Buffer *out) {
     out->Used(to);
 }
 
-void WriteDocument(const Tree &tree, Buffer *out) { WriteChildren(tree.root, out); }
+void WriteDocument(const Tree &tree, Buffer *out) {
+    WriteChildren(tree.root, out);
+}
 
 } // namespace configstore

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Judges the content of nodes by the schema's descriptors (node.h). The judgement is made when a value is set and
-// kept as a mark on its node; the store asks for the marks when an object is written.
+// Judges the content of nodes by the schema's descriptors (node.h). The judgement is made when a value is set
+// and kept as a mark on its node; the store asks for the marks when an object is written.
 
 #include <cstring>
 
@@ -106,8 +106,8 @@ std::string Describe(const Object *bad) {
         return std::to_string(bad->integer) + " is not between " + std::to_string(field.minimum) + " and " +
                std::to_string(field.maximum);
     if (field.type == FieldType::Text && bad->kind == Kind::Text)
-        return "a text of " + std::to_string(bad->span.size) + " bytes, at most " + std::to_string(field.maxBytes) +
-               " are allowed";
+        return "a text of " + std::to_string(bad->span.size) + " bytes, at most " +
+               std::to_string(field.maxBytes) + " are allowed";
     if (field.type == FieldType::TextList && bad->kind == Kind::TextList)
         return "a text in the list has more than " + std::to_string(field.maxBytes) + " bytes";
     if (field.type == FieldType::IntegerList && bad->kind == Kind::IntegerList)

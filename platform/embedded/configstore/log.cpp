@@ -20,9 +20,13 @@ thread_local MessageCollector *t_collector = nullptr;
 
 } // namespace
 
-MessageCollector::MessageCollector() : outer_(t_collector) { t_collector = this; }
+MessageCollector::MessageCollector() : outer_(t_collector) {
+    t_collector = this;
+}
 
-MessageCollector::~MessageCollector() { t_collector = outer_; }
+MessageCollector::~MessageCollector() {
+    t_collector = outer_;
+}
 
 void MessageCollector::Append(const char *format, va_list args) {
     char line[1024];

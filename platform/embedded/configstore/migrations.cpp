@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The database's tables and versions (migrations.h). Each step brings a database from one user_version to the next
-// and is never changed once released; a new version is a new step.
+// The database's tables and versions (migrations.h). Each step brings a database from one user_version to the
+// next and is never changed once released; a new version is a new step.
 
 #include "platform/embedded/configstore/migrations.h"
 
@@ -15,29 +15,28 @@ struct Definition {
     const char *sql; // exactly as the database keeps it
 };
 
-
 // What a database of the present version holds, in the order in which it is made.
 constexpr Definition kDefinitions[] = {
     {"revision", "CREATE TABLE revision (revision INTEGER PRIMARY KEY, saved_ms INTEGER NOT NULL)"},
     {"document", "CREATE TABLE document (id INTEGER PRIMARY KEY, text TEXT NOT NULL)"},
-    {"object_row",
-     "CREATE TABLE object_row (layer TEXT NOT NULL, key TEXT NOT NULL, grp TEXT NOT NULL, component TEXT NOT NULL, "
-     "instance TEXT NOT NULL, revision INTEGER NOT NULL, document INTEGER NOT NULL, "
-     "PRIMARY KEY (layer, key, grp, component, instance)) WITHOUT ROWID"},
+    {"object_row", "CREATE TABLE object_row (layer TEXT NOT NULL, key TEXT NOT NULL, grp TEXT NOT NULL, "
+                   "component TEXT NOT NULL, "
+                   "instance TEXT NOT NULL, revision INTEGER NOT NULL, document INTEGER NOT NULL, "
+                   "PRIMARY KEY (layer, key, grp, component, instance)) WITHOUT ROWID"},
     {"history_row",
-     "CREATE TABLE history_row (id INTEGER PRIMARY KEY, layer TEXT NOT NULL, key TEXT NOT NULL, grp TEXT NOT NULL, "
+     "CREATE TABLE history_row (id INTEGER PRIMARY KEY, layer TEXT NOT NULL, key TEXT NOT NULL, grp TEXT NOT "
+     "NULL, "
      "component TEXT NOT NULL, instance TEXT NOT NULL, revision INTEGER NOT NULL, ended INTEGER NOT NULL, "
      "deleted INTEGER NOT NULL, document INTEGER NOT NULL)"},
     {"history_by_address",
      "CREATE INDEX history_by_address ON history_row (layer, key, grp, component, instance, ended)"},
-    {"object",
-     "CREATE VIEW object AS SELECT layer, key, grp, component, instance, o.revision AS revision, "
-     "datetime(saved_ms / 1000, 'unixepoch') AS saved, d.text AS document FROM object_row o "
-     "JOIN document d ON d.id = o.document JOIN revision r ON r.revision = o.revision"},
-    {"history",
-     "CREATE VIEW history AS SELECT layer, key, grp, component, instance, h.revision AS revision, ended, deleted, "
-     "datetime(saved_ms / 1000, 'unixepoch') AS ended_at, d.text AS document FROM history_row h "
-     "JOIN document d ON d.id = h.document JOIN revision r ON r.revision = h.ended"},
+    {"object", "CREATE VIEW object AS SELECT layer, key, grp, component, instance, o.revision AS revision, "
+               "datetime(saved_ms / 1000, 'unixepoch') AS saved, d.text AS document FROM object_row o "
+               "JOIN document d ON d.id = o.document JOIN revision r ON r.revision = o.revision"},
+    {"history", "CREATE VIEW history AS SELECT layer, key, grp, component, instance, h.revision AS revision, "
+                "ended, deleted, "
+                "datetime(saved_ms / 1000, 'unixepoch') AS ended_at, d.text AS document FROM history_row h "
+                "JOIN document d ON d.id = h.document JOIN revision r ON r.revision = h.ended"},
 };
 
 int32_t ReadNumber(Store *store, const char *sql, int64_t *value) {
@@ -55,7 +54,8 @@ struct Identity {
 int32_t ReadIdentity(Store *store, Identity *identity) {
     int32_t status = ReadNumber(store, "PRAGMA user_version", &identity->version);
     if (status == OK) status = ReadNumber(store, "PRAGMA application_id", &identity->application);
-    if (status == OK) status = ReadNumber(store, "SELECT count(*) FROM sqlite_schema", &identity->definitions);
+    if (status == OK)
+        status = ReadNumber(store, "SELECT count(*) FROM sqlite_schema", &identity->definitions);
     return status;
 }
 
@@ -82,7 +82,8 @@ int32_t MakeStore(Store *store) {
     return status;
 }
 
-/// Whether the tables are the ones that this code made. Others could turn a plain statement into something else.
+/// Whether the tables are the ones that this code made. Others could turn a plain statement into something
+/// else.
 int32_t CheckDefinitions(Store *store) {
     Statement statement(store, "SELECT name, sql FROM sqlite_schema WHERE sql IS NOT NULL");
     std::size_t known = 0;
@@ -122,7 +123,8 @@ int32_t Migrate(Store *store) {
         return CORRUPT;
     }
     if (identity.version > kSchemaVersion) {
-        Log("config store %s: written by a newer release (version %lld, this one knows up to %d); it has been left as "
+        Log("config store %s: written by a newer release (version %lld, this one knows up to %d); it has "
+            "been left as "
             "it is",
             store->path.c_str(), static_cast<long long>(identity.version), kSchemaVersion);
         return FAILED;

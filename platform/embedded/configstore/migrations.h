@@ -8,8 +8,8 @@
 
 namespace configstore {
 
-/// Brings a freshly opened database to kSchemaVersion: makes the tables of an empty one, refuses a newer one (FAILED)
-/// and one that is not a store's (CORRUPT) without touching it.
+/// Brings a freshly opened database to kSchemaVersion: makes the tables of an empty one, refuses a newer one
+/// (FAILED) and one that is not a store's (CORRUPT) without touching it.
 [[nodiscard]] int32_t Migrate(Store *store);
 
 } // namespace configstore

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The object tree (node.h): finding, adding and removing nodes. What the content may be is judge.cpp's business, how
-// it is written as a document that of document_*.cpp.
+// The object tree (node.h): finding, adding and removing nodes. What the content may be is judge.cpp's
+// business, how it is written as a document that of document_*.cpp.
 
 #include "platform/embedded/configstore/node.h"
 
@@ -80,8 +80,10 @@ void BuildIndex(InstanceTable *table) {
 
 } // namespace
 
-Tree::Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent, std::string_view newInstance)
-    : shape(FindSchema(newKey, newGroup)), key(newKey), group(newGroup), component(newComponent), instance(newInstance) {
+Tree::Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent,
+           std::string_view newInstance)
+    : shape(FindSchema(newKey, newGroup)), key(newKey), group(newGroup), component(newComponent),
+      instance(newInstance) {
     root.parent = nullptr;
     root.next = nullptr;
     root.name = NewName(arena, newInstance);
@@ -136,7 +138,8 @@ Object *FindInstance(Object *list, std::string_view id) {
         return nullptr;
     }
     const std::size_t mask = table->slotCount - 1;
-    for (std::size_t at = static_cast<std::size_t>(HashId(id)) & mask; table->slots[at]; at = (at + 1) & mask) {
+    for (std::size_t at = static_cast<std::size_t>(HashId(id)) & mask; table->slots[at];
+         at = (at + 1) & mask) {
         if (NameOf(table->slots[at]) == id) return table->slots[at];
     }
     return nullptr;

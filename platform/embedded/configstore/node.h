@@ -2,13 +2,13 @@
 #ifndef PLATFORM_EMBEDDED_CONFIGSTORE_NODE_H
 #define PLATFORM_EMBEDDED_CONFIGSTORE_NODE_H
 
-// The object tree behind the client interface (platform/configstore.h). A node is an object, a list of instances or a
-// value; a handle is a node's address. Nodes live in their tree's arena: they never move, children keep their order,
-// and instances are found by id through an index. Each node of a known field points to the field's descriptor
-// (schema.h), by which its content is judged the moment it is set.
+// The object tree behind the client interface (platform/configstore.h). A node is an object, a list of
+// instances or a value; a handle is a node's address. Nodes live in their tree's arena: they never move,
+// children keep their order, and instances are found by id through an index. Each node of a known field
+// points to the field's descriptor (schema.h), by which its content is judged the moment it is set.
 //
-// Lists of texts and numbers are packed bytes and not nodes, and content of unknown names stays JSON text until
-// somebody asks for it, so that no document costs many times its own size in memory.
+// Lists of texts and numbers are packed bytes and not nodes, and content of unknown names stays JSON text
+// until somebody asks for it, so that no document costs many times its own size in memory.
 
 #include <cstddef>
 #include <cstdint>
@@ -24,8 +24,16 @@ namespace configstore {
 
 enum class Kind : uint8_t {
     Dead, // deleted; kept so that a stale handle meets a refusal and not somebody else's node
-    Null, Bool, Integer, Unsigned /* above INT64_MAX */, Real, Text, Binary,
-    EmptyList, TextList, IntegerList,
+    Null,
+    Bool,
+    Integer,
+    Unsigned /* above INT64_MAX */,
+    Real,
+    Text,
+    Binary,
+    EmptyList,
+    TextList,
+    IntegerList,
     Raw,       // JSON text of an array or object without a usable description
     Object,    // a singleton, an instance, or the root
     Instances, // a list of instances
@@ -53,7 +61,7 @@ struct InstanceTable {
     Object *first;
     Object *last;
     std::size_t count;
-    Object **slots;       // null until the list is long, and after a removal
+    Object **slots;        // null until the list is long, and after a removal
     std::size_t slotCount; // a power of two, at most three quarters full
     InstanceTable *nextInTree;
 };
@@ -92,7 +100,8 @@ struct Tree {
     bool suspect = false; // some node was bad once
     std::string key, group, component, instance;
 
-    Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent, std::string_view newInstance);
+    Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent,
+         std::string_view newInstance);
     ~Tree();
     Tree(const Tree &) = delete;
     Tree &operator=(const Tree &) = delete;
@@ -106,9 +115,10 @@ struct FilterSpec {
 // Walking.
 
 [[nodiscard]] inline std::string_view NameOf(const Object *node) {
-    return node->described ? std::string_view(node->field->name) : std::string_view(node->name->text, node->name->size);
+    return node->described ? std::string_view(node->field->name)
+                           : std::string_view(node->name->text, node->name->size);
 }
-[[nodiscard]] Tree *TreeOf(Object *node); // null below a deleted node
+[[nodiscard]] Tree *TreeOf(Object *node);                 // null below a deleted node
 [[nodiscard]] const Shape *ShapeOf(const Object *object); // of an Object; null where nothing is known
 [[nodiscard]] Object *FindMember(Object *object, std::string_view name);
 [[nodiscard]] Object *FindInstance(Object *list, std::string_view id);
@@ -118,7 +128,8 @@ struct FilterSpec {
 
 // Changing. All may throw std::bad_alloc, with the tree as it was.
 
-/// A new last member; `field` is the shape's field of that name, if any. Its kind is Null until it is given another.
+/// A new last member; `field` is the shape's field of that name, if any. Its kind is Null until it is given
+/// another.
 Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name);
 Object *AddMember(Tree *tree, Object *object, std::string_view name);
 /// A new last instance, an empty Object. The id is not there yet.
@@ -144,7 +155,9 @@ void AppendInteger(Tree *tree, PackedList *list, int64_t value);
 
 /// Sets the node's mark by its field and content.
 void Judge(Tree *tree, Object *node);
-[[nodiscard]] inline bool TextFits(const Field *field, std::size_t size) { return size <= field->maxBytes; }
+[[nodiscard]] inline bool TextFits(const Field *field, std::size_t size) {
+    return size <= field->maxBytes;
+}
 [[nodiscard]] inline bool IntegerFits(const Field *field, int64_t value) {
     return value >= field->minimum && value <= field->maximum;
 }

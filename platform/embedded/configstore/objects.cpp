@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Objects, sub-objects and filter specs of the client interface (platform/configstore.h): a thin face over the tree
-// of node.h.
+// Objects, sub-objects and filter specs of the client interface (platform/configstore.h): a thin face over
+// the tree of node.h.
 
 #include <cstdlib>
 #include <memory>
@@ -14,9 +14,13 @@ namespace configstore {
 
 namespace {
 
-std::string_view IdOf(const char *instanceId) { return instanceId ? std::string_view(instanceId) : std::string_view(); }
+std::string_view IdOf(const char *instanceId) {
+    return instanceId ? std::string_view(instanceId) : std::string_view();
+}
 
-bool IsObject(const Object *object) { return object && object->kind == Kind::Object; }
+bool IsObject(const Object *object) {
+    return object && object->kind == Kind::Object;
+}
 
 /// A member as a list of instances: null when it is something else.
 Object *AsInstances(Tree *tree, Object *member) {
@@ -64,7 +68,8 @@ int32_t CreateSingleton(Tree *tree, Object *parent, const char *name, Object *me
     return OK;
 }
 
-int32_t CreateInstance(Tree *tree, Object *parent, const char *name, Object *member, std::string_view id, Object **out) {
+int32_t CreateInstance(Tree *tree, Object *parent, const char *name, Object *member, std::string_view id,
+                       Object **out) {
     if (!member) {
         member = AddMember(tree, parent, name);
         member->kind = Kind::EmptyList;
@@ -147,8 +152,8 @@ bool DeleteSelected(Tree *tree, Object *object, const FilterSpec &spec) {
 
 } // namespace
 
-int32_t CreateFilterSpecObject(const char *key, const char *group, const char *component, const char *instanceId,
-                               FilterSpec **spec) {
+int32_t CreateFilterSpecObject(const char *key, const char *group, const char *component,
+                               const char *instanceId, FilterSpec **spec) {
     if (!key || !group || !component || !spec) return BAD_PARAMETER;
     return Guarded([&] {
         *spec = new FilterSpec{key, group, component, std::string(IdOf(instanceId))};
@@ -156,7 +161,9 @@ int32_t CreateFilterSpecObject(const char *key, const char *group, const char *c
     });
 }
 
-void DestroyFilterSpecObject(FilterSpec *spec) { delete spec; }
+void DestroyFilterSpecObject(FilterSpec *spec) {
+    delete spec;
+}
 
 int32_t CreateObject(const char *key, const char *group, const char *component, const char *instanceId,
                      const char *json, Object **object) {
@@ -165,8 +172,8 @@ int32_t CreateObject(const char *key, const char *group, const char *component, 
         auto tree = std::make_unique<Tree>(key, group, component, IdOf(instanceId));
         std::string why;
         if (!ReadDocument(json, Reading::Tolerant, tree.get(), &why)) {
-            Log("config store: document given for %s/%s/%s[%s]: %s", key, group, component, tree->instance.c_str(),
-                why.c_str());
+            Log("config store: document given for %s/%s/%s[%s]: %s", key, group, component,
+                tree->instance.c_str(), why.c_str());
             return BAD_PARAMETER;
         }
         *object = &tree.release()->root;
@@ -242,7 +249,9 @@ int32_t DeleteSubObjectInstances(Object *parent, const FilterSpec *spec) {
     });
 }
 
-void FreeSubObjectArray(Object **objects) { std::free(static_cast<void *>(objects)); }
+void FreeSubObjectArray(Object **objects) {
+    std::free(static_cast<void *>(objects));
+}
 
 int32_t GenerateInstanceId(char **id) {
     if (!id) return BAD_PARAMETER;
@@ -264,6 +273,8 @@ int32_t GenerateInstanceId(char **id) {
     return OK;
 }
 
-void FreeString(char *text) { std::free(text); }
+void FreeString(char *text) {
+    std::free(text);
+}
 
 } // namespace configstore

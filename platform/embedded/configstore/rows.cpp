@@ -13,7 +13,11 @@ namespace configstore {
 namespace {
 
 Statement &BindAddress(Statement &statement, const char *layer, const FilterSpec &address) {
-    return statement.Bind(layer).Bind(address.key).Bind(address.group).Bind(address.component).Bind(address.instance);
+    return statement.Bind(layer)
+        .Bind(address.key)
+        .Bind(address.group)
+        .Bind(address.component)
+        .Bind(address.instance);
 }
 
 /// The transaction's revision, taken at its first change.
@@ -28,11 +32,13 @@ int32_t TakeRevision(Store *store) {
     return status;
 }
 
-/// Puts the row's document into history, unless it has come and gone within one transaction and was never to be seen.
+/// Puts the row's document into history, unless it has come and gone within one transaction and was never to
+/// be seen.
 int32_t EndRow(Store *store, const char *layer, const FilterSpec &address, const Row &row, bool deleted) {
     if (row.revision == store->revision) return OK;
-    Statement statement(store, "INSERT INTO history_row (layer, key, grp, component, instance, revision, ended, deleted, "
-                               "document) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)");
+    Statement statement(
+        store, "INSERT INTO history_row (layer, key, grp, component, instance, revision, ended, deleted, "
+               "document) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)");
     BindAddress(statement, layer, address)
         .Bind(row.revision)
         .Bind(store->revision)
@@ -56,7 +62,9 @@ OwnTransaction::~OwnTransaction() {
     if (own_) store_->revision = 0;
 }
 
-int32_t OwnTransaction::Commit() { return own_ ? Execute(store_, "COMMIT") : static_cast<int32_t>(OK); }
+int32_t OwnTransaction::Commit() {
+    return own_ ? Execute(store_, "COMMIT") : static_cast<int32_t>(OK);
+}
 
 int32_t FindRow(Store *store, const char *layer, const FilterSpec &address, std::optional<Row> *row) {
     Statement statement(store, "SELECT revision, document FROM object_row "
@@ -80,8 +88,9 @@ int32_t PutRow(Store *store, const char *layer, const FilterSpec &address, int64
     if (status == OK) status = FindRow(store, layer, address, &row);
     if (status == OK && row) status = EndRow(store, layer, address, *row, false);
     if (status != OK) return status;
-    Statement statement(store, "REPLACE INTO object_row (layer, key, grp, component, instance, revision, document) "
-                               "VALUES (?, ?, ?, ?, ?, ?, ?)");
+    Statement statement(store,
+                        "REPLACE INTO object_row (layer, key, grp, component, instance, revision, document) "
+                        "VALUES (?, ?, ?, ?, ?, ?, ?)");
     return BindAddress(statement, layer, address).Bind(store->revision).Bind(document).Run();
 }
 
@@ -98,12 +107,14 @@ int32_t DeleteRow(Store *store, const char *layer, const FilterSpec &address) {
     return BindAddress(statement, layer, address).Run();
 }
 
-int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view text, std::unique_ptr<Tree> *tree) {
+int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view text,
+                 std::unique_ptr<Tree> *tree) {
     auto loaded = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
     std::string why;
     if (!ReadDocument(text, Reading::Tolerant, loaded.get(), &why)) {
-        Log("config store %s: the document of %s/%s/%s[%s] is damaged: %s", store->path.c_str(), address.key.c_str(),
-            address.group.c_str(), address.component.c_str(), address.instance.c_str(), why.c_str());
+        Log("config store %s: the document of %s/%s/%s[%s] is damaged: %s", store->path.c_str(),
+            address.key.c_str(), address.group.c_str(), address.component.c_str(), address.instance.c_str(),
+            why.c_str());
         return CORRUPT;
     }
     *tree = std::move(loaded);
@@ -112,8 +123,9 @@ int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view
 
 int32_t SaveTree(Store *store, const char *layer, Tree *tree) {
     if (const Object *const bad = FindViolation(tree)) {
-        Log("config store %s: %s/%s/%s[%s]: %s: %s", store->path.c_str(), tree->key.c_str(), tree->group.c_str(),
-            tree->component.c_str(), tree->instance.c_str(), PathOf(bad).c_str(), Describe(bad).c_str());
+        Log("config store %s: %s/%s/%s[%s]: %s: %s", store->path.c_str(), tree->key.c_str(),
+            tree->group.c_str(), tree->component.c_str(), tree->instance.c_str(), PathOf(bad).c_str(),
+            Describe(bad).c_str());
         return SCHEMA_VIOLATION;
     }
     Buffer text;
@@ -122,7 +134,8 @@ int32_t SaveTree(Store *store, const char *layer, Tree *tree) {
     int32_t status = transaction.Status();
     int64_t document = 0;
     if (status == OK) status = AddDocument(store, text.View(), &document);
-    if (status == OK) status = PutRow(store, layer, {tree->key, tree->group, tree->component, tree->instance}, document);
+    if (status == OK)
+        status = PutRow(store, layer, {tree->key, tree->group, tree->component, tree->instance}, document);
     return status == OK ? transaction.Commit() : status;
 }
 

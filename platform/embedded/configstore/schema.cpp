@@ -1,6 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Compiles the JSON Schema text into descriptors (schema.h). Boost.JSON reads the text; only the keywords that the
-// schema file uses are known, and anything else is refused, so that no constraint is silently left out.
+// Compiles the JSON Schema text into descriptors (schema.h). Boost.JSON reads the text; only the keywords
+// that the schema file uses are known, and anything else is refused, so that no constraint is silently left
+// out.
 
 #include "platform/embedded/configstore/schema.h"
 
@@ -70,7 +71,7 @@ void Shape::Rehash() {
 }
 
 class CompiledSchema {
-  public:
+public:
     explicit CompiledSchema(std::string_view text)
         : document_(json::parse(json::string_view(text.data(), text.size()))) {
         root_ = ShapeOf(document_);
@@ -78,7 +79,7 @@ class CompiledSchema {
     }
     [[nodiscard]] const Shape *Root() const { return root_; }
 
-  private:
+private:
     const json::value &Resolve(const json::value &node) {
         const json::value *at = &node;
         while (const json::value *ref = at->as_object().if_contains("$ref")) {
@@ -97,7 +98,8 @@ class CompiledSchema {
         Shape *const shape = &shapes_.back();
         known_.emplace(&node, shape);
         const json::object &properties = node.at("properties").as_object();
-        if (properties.size() > Shape::kMaxFields) throw std::runtime_error("an object with too many properties");
+        if (properties.size() > Shape::kMaxFields)
+            throw std::runtime_error("an object with too many properties");
         for (const auto &[name, value] : properties) {
             Field field = FieldOf(value);
             field.name.assign(name.data(), name.size());
@@ -148,7 +150,8 @@ class CompiledSchema {
         default:
             throw std::runtime_error("a list of neither texts nor numbers");
         }
-        if (const json::value *most = keywords.if_contains("maxItems")) field.maxItems = most->to_number<uint64_t>();
+        if (const json::value *most = keywords.if_contains("maxItems"))
+            field.maxItems = most->to_number<uint64_t>();
         return field;
     }
 
@@ -158,7 +161,9 @@ class CompiledSchema {
     const Shape *root_ = nullptr;
 };
 
-void CompiledSchemaDeleter::operator()(CompiledSchema *schema) const { delete schema; }
+void CompiledSchemaDeleter::operator()(CompiledSchema *schema) const {
+    delete schema;
+}
 
 CompiledSchemaPtr CompileSchema(std::string_view text, std::string *why) {
     try {
@@ -171,7 +176,9 @@ CompiledSchemaPtr CompileSchema(std::string_view text, std::string *why) {
     }
 }
 
-const Shape *RootShape(const CompiledSchema *schema) { return schema->Root(); }
+const Shape *RootShape(const CompiledSchema *schema) {
+    return schema->Root();
+}
 
 std::string_view SchemaText(std::string_view key, std::string_view group) {
     if (key != "switches" || group != "network_vds") return {};

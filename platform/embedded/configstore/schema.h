@@ -3,8 +3,9 @@
 #define PLATFORM_EMBEDDED_CONFIGSTORE_SCHEMA_H
 
 // The store's schema, compiled: what each field of an object may hold. The source is the JSON Schema file of
-// platform/embedded/schemas, which the build puts into the library; it is compiled on first use, once per process.
-// The nodes of a tree (node.h) point to these descriptors, so that checking a value needs no walk and no lookup.
+// platform/embedded/schemas, which the build puts into the library; it is compiled on first use, once per
+// process. The nodes of a tree (node.h) point to these descriptors, so that checking a value needs no walk
+// and no lookup.
 
 #include <cstdint>
 #include <deque>
@@ -42,7 +43,7 @@ struct Field {
 
 /// The fields of one kind of object, found by name.
 class Shape {
-  public:
+public:
     static constexpr std::size_t kMaxFields = 64; // a reader marks what it has seen in one 64-bit word
 
     [[nodiscard]] const Field *Find(std::string_view name) const;
@@ -50,7 +51,7 @@ class Shape {
     [[nodiscard]] std::size_t IndexOf(const Field *field) const;
     void Add(Field field);
 
-  private:
+private:
     static std::size_t Hash(std::string_view name);
     void Rehash();
 

@@ -32,9 +32,10 @@ int32_t HandOut(Trees *trees, Object ***objects, int32_t *count) {
 
 int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***objects, int32_t *count) {
     // The primary key has this order already.
-    Statement statement(store, "SELECT instance, text FROM object_row o JOIN document d ON d.id = o.document "
-                               "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND (?5 = '' OR instance = ?5) "
-                               "ORDER BY instance");
+    Statement statement(
+        store, "SELECT instance, text FROM object_row o JOIN document d ON d.id = o.document "
+               "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND (?5 = '' OR instance = ?5) "
+               "ORDER BY instance");
     statement.Bind(layer).Bind(spec.key).Bind(spec.group).Bind(spec.component).Bind(spec.instance);
     Trees trees;
     while (statement.Step()) {
@@ -67,13 +68,16 @@ int32_t GetStore(Store **store) {
     });
 }
 
-void DestroyStore(Store *store) { delete store; }
+void DestroyStore(Store *store) {
+    delete store;
+}
 
 int32_t BeginTransaction(Store *store) {
     if (!store || store->inTransaction) return BAD_PARAMETER;
     return Guarded([&]() -> int32_t {
-        // A caller whose begin fails leaves its lock held. So a begin always succeeds, and what kept it from doing so
-        // is the answer of every call until the caller cancels, which it then does in its ordinary way.
+        // A caller whose begin fails leaves its lock held. So a begin always succeeds, and what kept it from
+        // doing so is the answer of every call until the caller cancels, which it then does in its ordinary
+        // way.
         store->refusal = Execute(store, "BEGIN IMMEDIATE");
         store->inTransaction = true;
         store->revision = 0;
@@ -117,10 +121,16 @@ int32_t Get(Store *store, const char *key, const char *group, const char *compon
     if (const int32_t status = Ready(store); status != OK) return status;
     return Guarded([&]() -> int32_t {
         const FilterSpec address{key, group, component, instanceId ? instanceId : ""};
-        Statement statement(store, "SELECT text FROM object_row o JOIN document d ON d.id = o.document "
-                                   "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND instance = ?");
-        statement.Bind(kCurrentLayer).Bind(address.key).Bind(address.group).Bind(address.component).Bind(address.instance);
-        if (!statement.Step()) return statement.Status() == OK ? static_cast<int32_t>(NOT_FOUND) : statement.Status();
+        Statement statement(store,
+                            "SELECT text FROM object_row o JOIN document d ON d.id = o.document "
+                            "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND instance = ?");
+        statement.Bind(kCurrentLayer)
+            .Bind(address.key)
+            .Bind(address.group)
+            .Bind(address.component)
+            .Bind(address.instance);
+        if (!statement.Step())
+            return statement.Status() == OK ? static_cast<int32_t>(NOT_FOUND) : statement.Status();
         std::unique_ptr<Tree> tree;
         const int32_t status = LoadTree(store, address, statement.Text(0), &tree);
         if (status == OK) *object = &tree.release()->root;
@@ -138,7 +148,8 @@ int32_t Set(Store *store, Object *object, const char *source) {
     return Guarded([&] { return SaveTree(store, layer, TreeOf(object)); });
 }
 
-int32_t Delete(Store *store, const char *key, const char *group, const char *component, const char *instanceId) {
+int32_t Delete(Store *store, const char *key, const char *group, const char *component,
+               const char *instanceId) {
     if (!key || !group || !component) return BAD_PARAMETER;
     if (const int32_t status = Ready(store); status != OK) return status;
     return Guarded([&] {

@@ -24,10 +24,14 @@ constexpr std::array<uint8_t, 256> kDigitValues = [] {
     return values;
 }();
 
-bool Follows(Byte byte) { return (byte & 0xc0) == 0x80; }
+bool Follows(Byte byte) {
+    return (byte & 0xc0) == 0x80;
+}
 
 /// U+10FE80 to U+10FEFF: f4 8f ba 80 to f4 8f bb bf.
-bool IsEncodedByte(const Byte *at) { return at[0] == 0xf4 && at[1] == 0x8f && (at[2] & 0xfe) == 0xba; }
+bool IsEncodedByte(const Byte *at) {
+    return at[0] == 0xf4 && at[1] == 0x8f && (at[2] & 0xfe) == 0xba;
+}
 
 } // namespace
 
@@ -60,7 +64,8 @@ char *PutEncodedByte(char *out, unsigned char byte) {
 bool HasEncodedBytes(std::string_view text) {
     const char *at = text.data();
     const char *const end = at + text.size();
-    while (at != end && (at = static_cast<const char *>(std::memchr(at, 0xf4, static_cast<std::size_t>(end - at))))) {
+    while (at != end &&
+           (at = static_cast<const char *>(std::memchr(at, 0xf4, static_cast<std::size_t>(end - at))))) {
         if (end - at >= 4 && IsEncodedByte(reinterpret_cast<const Byte *>(at))) return true;
         at++;
     }
@@ -92,7 +97,8 @@ char *PutBase64(char *out, const char *data, std::size_t size) {
         *out++ = kDigits[word & 63];
     }
     if (size > 0) {
-        const uint32_t word = static_cast<uint32_t>(at[0]) << 16 | (size > 1 ? static_cast<uint32_t>(at[1]) << 8 : 0);
+        const uint32_t word =
+            static_cast<uint32_t>(at[0]) << 16 | (size > 1 ? static_cast<uint32_t>(at[1]) << 8 : 0);
         *out++ = kDigits[word >> 18];
         *out++ = kDigits[word >> 12 & 63];
         *out++ = size > 1 ? kDigits[word >> 6 & 63] : '=';
@@ -107,10 +113,13 @@ bool DecodeBase64(std::string_view text, char *out, std::size_t *size) {
     std::size_t padding = 0;
     while (padding < 2 && padding < text.size() && text[text.size() - 1 - padding] == '=')
         padding++;
-    const auto value = [](char digit) { return static_cast<uint32_t>(kDigitValues[static_cast<Byte>(digit)]); };
+    const auto value = [](char digit) {
+        return static_cast<uint32_t>(kDigitValues[static_cast<Byte>(digit)]);
+    };
     const std::size_t whole = padding > 0 ? text.size() - 4 : text.size();
     for (std::size_t at = 0; at < whole; at += 4) {
-        const uint32_t a = value(text[at]), b = value(text[at + 1]), c = value(text[at + 2]), d = value(text[at + 3]);
+        const uint32_t a = value(text[at]), b = value(text[at + 1]), c = value(text[at + 2]),
+                       d = value(text[at + 3]);
         if ((a | b | c | d) > 63) return false;
         const uint32_t word = a << 18 | b << 12 | c << 6 | d;
         *out++ = static_cast<char>(word >> 16);

@@ -4,10 +4,11 @@
 
 // How bytes that are not UTF-8, and binary values, are written in a document.
 //
-// A text is kept as it is while it is UTF-8. A byte that is not part of a well-formed sequence becomes the private
-// character U+10FE00 + byte (U+10FE80 to U+10FEFF). Should a text hold one of those very characters, its four bytes
-// are written like four such bytes: whatever a document holds in that range stands for a byte, so that each text has
-// one form and each form one text. Binary values are base64 (RFC 4648, padded, no unused bits set).
+// A text is kept as it is while it is UTF-8. A byte that is not part of a well-formed sequence becomes the
+// private character U+10FE00 + byte (U+10FE80 to U+10FEFF). Should a text hold one of those very characters,
+// its four bytes are written like four such bytes: whatever a document holds in that range stands for a byte,
+// so that each text has one form and each form one text. Binary values are base64 (RFC 4648, padded, no
+// unused bits set).
 
 #include <cstddef>
 #include <cstdint>
@@ -28,7 +29,9 @@ char *PutEncodedByte(char *out, unsigned char byte);
 /// Writes the bytes that a document's text stands for; no more than it has. Returns the end.
 char *DecodeText(char *out, std::string_view text);
 
-[[nodiscard]] inline std::size_t Base64Size(std::size_t size) { return (size + 2) / 3 * 4; }
+[[nodiscard]] inline std::size_t Base64Size(std::size_t size) {
+    return (size + 2) / 3 * 4;
+}
 char *PutBase64(char *out, const char *data, std::size_t size);
 /// Decodes into `out` (three quarters of the text's size). False when the text is not base64.
 [[nodiscard]] bool DecodeBase64(std::string_view text, char *out, std::size_t *size);

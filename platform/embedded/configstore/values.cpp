@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Typed values of the client interface (platform/configstore.h). A setter takes any value, marks what the schema does
-// not allow and leaves the verdict to Set; a getter refuses what is not of its type.
+// Typed values of the client interface (platform/configstore.h). A setter takes any value, marks what the
+// schema does not allow and leaves the verdict to Set; a getter refuses what is not of its type.
 
 #include <cstdlib>
 #include <cstring>
@@ -19,13 +19,15 @@ Tree *CheckTarget(Object *object, const char *name) {
     return TreeOf(object);
 }
 
-/// Sets a member to what `fill` makes of its node. Sub-objects are not overwritten: handles into them may be about.
+/// Sets a member to what `fill` makes of its node. Sub-objects are not overwritten: handles into them may be
+/// about.
 template <typename Fill> int32_t Put(Object *object, const char *name, Fill &&fill) {
     return Guarded([&]() -> int32_t {
         Tree *const tree = CheckTarget(object, name);
         if (!tree) return BAD_PARAMETER;
         Object *member = FindMember(object, name);
-        if (member && (member->kind == Kind::Object || member->kind == Kind::Instances)) return SCHEMA_VIOLATION;
+        if (member && (member->kind == Kind::Object || member->kind == Kind::Instances))
+            return SCHEMA_VIOLATION;
         // What needs memory comes first: without it nothing is changed.
         Object content{};
         fill(tree, &content);
@@ -95,7 +97,8 @@ const std::string_view *ImpliedKey(Object *object, const char *name, std::string
 }
 
 /// The member as a list for a getter: its text form is read first if it has to be.
-int32_t LookupList(Object *object, const char *name, const void *out, const void *count, Kind kind, Object **list) {
+int32_t LookupList(Object *object, const char *name, const void *out, const void *count, Kind kind,
+                   Object **list) {
     if (!count) return BAD_PARAMETER;
     const int32_t status = Lookup(object, name, out, list);
     if (status != OK) return status;
@@ -111,8 +114,8 @@ std::size_t CountOf(const Object *list) {
 
 /// The list that an element is appended to: an absent one is made, an empty one takes the element's kind.
 template <typename AppendTo>
-int32_t Append(Object *object, const char *name, Kind kind, bool (*fits)(const Field *, const void *), const void *element,
-               AppendTo &&append) {
+int32_t Append(Object *object, const char *name, Kind kind, bool (*fits)(const Field *, const void *),
+               const void *element, AppendTo &&append) {
     return Guarded([&]() -> int32_t {
         Tree *const tree = CheckTarget(object, name);
         if (!tree) return BAD_PARAMETER;
@@ -144,10 +147,18 @@ int32_t SetValueBool(Object *object, const char *name, bool value) {
     });
 }
 
-int32_t SetValueUint16(Object *object, const char *name, uint16_t value) { return PutInteger(object, name, value); }
-int32_t SetValueUint32(Object *object, const char *name, uint32_t value) { return PutInteger(object, name, value); }
-int32_t SetValueInt(Object *object, const char *name, int32_t value) { return PutInteger(object, name, value); }
-int32_t SetValueLong(Object *object, const char *name, int64_t value) { return PutInteger(object, name, value); }
+int32_t SetValueUint16(Object *object, const char *name, uint16_t value) {
+    return PutInteger(object, name, value);
+}
+int32_t SetValueUint32(Object *object, const char *name, uint32_t value) {
+    return PutInteger(object, name, value);
+}
+int32_t SetValueInt(Object *object, const char *name, int32_t value) {
+    return PutInteger(object, name, value);
+}
+int32_t SetValueLong(Object *object, const char *name, int64_t value) {
+    return PutInteger(object, name, value);
+}
 
 int32_t SetValueStr(Object *object, const char *name, const char *value) {
     if (!value) return BAD_PARAMETER;
@@ -212,10 +223,18 @@ int32_t GetValueBool(Object *object, const char *name, bool *out) {
     return OK;
 }
 
-int32_t GetValueUint16(Object *object, const char *name, uint16_t *value) { return TakeInteger(object, name, value); }
-int32_t GetValueUint32(Object *object, const char *name, uint32_t *value) { return TakeInteger(object, name, value); }
-int32_t GetValueInt(Object *object, const char *name, int32_t *value) { return TakeInteger(object, name, value); }
-int32_t GetValueLong(Object *object, const char *name, int64_t *value) { return TakeInteger(object, name, value); }
+int32_t GetValueUint16(Object *object, const char *name, uint16_t *value) {
+    return TakeInteger(object, name, value);
+}
+int32_t GetValueUint32(Object *object, const char *name, uint32_t *value) {
+    return TakeInteger(object, name, value);
+}
+int32_t GetValueInt(Object *object, const char *name, int32_t *value) {
+    return TakeInteger(object, name, value);
+}
+int32_t GetValueLong(Object *object, const char *name, int64_t *value) {
+    return TakeInteger(object, name, value);
+}
 
 int32_t GetValueStr(Object *object, const char *name, char **out) {
     return Guarded([&] {
@@ -247,7 +266,9 @@ int32_t GetValueBinary(Object *object, const char *name, void **data, uint32_t *
     });
 }
 
-void FreeBinary(void *data) { std::free(data); }
+void FreeBinary(void *data) {
+    std::free(data);
+}
 
 int32_t GetValueStringArray(Object *object, const char *name, char ***strings, int32_t *count) {
     return Guarded([&] {
@@ -273,7 +294,9 @@ int32_t GetValueStringArray(Object *object, const char *name, char ***strings, i
     });
 }
 
-void FreeStringArray(char **strings, int32_t) { std::free(static_cast<void *>(strings)); }
+void FreeStringArray(char **strings, int32_t) {
+    std::free(static_cast<void *>(strings));
+}
 
 int32_t GetValueIntArray(Object *object, const char *name, int32_t **values, int32_t *count) {
     return Guarded([&] {
@@ -298,14 +321,17 @@ int32_t GetValueIntArray(Object *object, const char *name, int32_t **values, int
     });
 }
 
-void FreeIntArray(int32_t *values) { std::free(values); }
+void FreeIntArray(int32_t *values) {
+    std::free(values);
+}
 
 int32_t RemoveValue(Object *object, const char *name) {
     if (!CheckTarget(object, name)) return BAD_PARAMETER;
     Object *const member = FindMember(object, name);
     if (!member) return NOT_FOUND;
     const bool anything = !member->described || member->field->type == FieldType::Any;
-    if ((member->kind == Kind::Object || member->kind == Kind::Instances) && !anything) return SCHEMA_VIOLATION;
+    if ((member->kind == Kind::Object || member->kind == Kind::Instances) && !anything)
+        return SCHEMA_VIOLATION;
     if (member->kind == Kind::Instances) RemoveAllChildren(member);
     RemoveChild(object, member);
     return OK;

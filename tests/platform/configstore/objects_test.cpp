@@ -1,0 +1,216 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Sub-objects, instances and filter specs on an object.
+
+#include "platform/configstore/support.h"
+
+using namespace configstore;
+using namespace store_test;
+
+TEST(StoreObjects, NullOrEmptyIdMeansASingleton) {
+    const ObjectPtr object = NewSwitch();
+    Object *made = nullptr;
+    Object *found = nullptr;
+    ASSERT_EQ(CreateSubObject(object.get(), "settings", nullptr, &made), OK);
+    ASSERT_EQ(GetSubObject(object.get(), "settings", "", &found), OK);
+    EXPECT_EQ(made, found);
+}
+
+TEST(StoreObjects, AbsentSubObjectIsNotFoundAndLeavesTheOutput) {
+    const ObjectPtr object = NewSwitch();
+    Object *out = object.get();
+    EXPECT_EQ(GetSubObject(object.get(), "settings", "", &out), NOT_FOUND);
+    EXPECT_EQ(GetSubObject(object.get(), "ports", "p1", &out), NOT_FOUND);
+    EXPECT_EQ(DeleteSubObject(object.get(), "settings", ""), NOT_FOUND);
+    EXPECT_EQ(DeleteSubObject(object.get(), "ports", "p1"), NOT_FOUND);
+    EXPECT_EQ(out, object.get());
+}
+
+TEST(StoreObjects, PlainValueIsNoSubObject) {
+    const ObjectPtr object = NewSwitch(R"({"name":"x"})");
+    Object *out = nullptr;
+    EXPECT_EQ(GetSubObject(object.get(), "name", "", &out), SCHEMA_VIOLATION);
+    EXPECT_EQ(GetSubObject(object.get(), "name", "id", &out), SCHEMA_VIOLATION);
+    EXPECT_EQ(CreateSubObject(object.get(), "name", "", &out), SCHEMA_VIOLATION);
+    EXPECT_EQ(CreateSubObject(object.get(), "name", "id", &out), SCHEMA_VIOLATION);
+    EXPECT_EQ(Text(object.get(), "name"), "x");
+}
+
+TEST(StoreObjects, EmptyListBecomesAListOfInstances) {
+    const ObjectPtr object = NewSwitch();
+    for (const char *name : {"ports", "unheard_of"}) {
+        ASSERT_EQ(SetValueEmptyList(object.get(), name), OK);
+        Object *out = nullptr;
+        EXPECT_EQ(GetSubObject(object.get(), name, "p1", &out), NOT_FOUND);
+        EXPECT_EQ(CreateSubObject(object.get(), name, "p1", &out), OK);
+        EXPECT_EQ(GetSubObject(object.get(), name, "p1", &out), OK);
+    }
+}
+
+TEST(StoreObjects, SetValueEmptyListEmptiesInstances) {
+    const ObjectPtr object = NewSwitch();
+    Sub(object.get(), "ports", "p1");
+    ASSERT_EQ(SetValueEmptyList(object.get(), "ports"), OK);
+    Object *out = nullptr;
+    EXPECT_EQ(GetSubObject(object.get(), "ports", "p1", &out), NOT_FOUND);
+    EXPECT_EQ(Json(object.get()), R"({"ports":{}})");
+}
+
+TEST(StoreObjects, CreateOfAnExistingInstanceEmptiesIt) {
+    const ObjectPtr object = NewSwitch();
+    Object *const port = Sub(object.get(), "ports", "p1");
+    ASSERT_EQ(SetValueStr(port, "name", "x"), OK);
+    Object *again = nullptr;
+    ASSERT_EQ(CreateSubObject(object.get(), "ports", "p1", &again), OK);
+    EXPECT_EQ(again, port);
+    EXPECT_EQ(Text(again, "name"), "<6>");
+    EXPECT_EQ(Json(object.get()), R"({"ports":{"p1":{}}})");
+}
+
+TEST(StoreObjects, InstanceIdReadsBackAsKeyUnlessItHasItsOwn) {
+    const ObjectPtr object = NewSwitch();
+    Object *const port = Sub(object.get(), "ports", "p1");
+    EXPECT_EQ(Text(port, "key"), "p1");
+    EXPECT_EQ(RemoveValue(port, "key"), NOT_FOUND);
+    ASSERT_EQ(SetValueStr(port, "key", "own"), OK);
+    EXPECT_EQ(Text(port, "key"), "own");
+    EXPECT_EQ(Text(Sub(object.get(), "settings"), "key"), "<6>");
+}
+
+TEST(StoreObjects, HandlesSurviveTheirSiblingsComingAndGoing) {
+    const ObjectPtr object = NewSwitch();
+    Object *const kept = Sub(object.get(), "ports", "kept");
+    for (int round = 0; round < 3; round++) {
+        for (int i = 0; i < 500; i++)
+            ASSERT_EQ(
+                SetValueUint32(Sub(object.get(), "ports", std::to_string(i).c_str()), "connection_cookie", 1),
+                OK);
+        for (int i = 0; i < 500; i++)
+            ASSERT_EQ(DeleteSubObject(object.get(), "ports", std::to_string(i).c_str()), OK);
+    }
+    ASSERT_EQ(SetValueStr(kept, "name", "still"), OK);
+    EXPECT_EQ(Json(object.get()), R"({"ports":{"kept":{"name":"still"}}})");
+}
+
+TEST(StoreObjects, DeletedHandleIsRefused) {
+    const ObjectPtr object = NewSwitch();
+    Object *const settings = Sub(object.get(), "settings");
+    Object *const beacon = Sub(settings, "ipfix");
+    ASSERT_EQ(DeleteSubObject(object.get(), "settings", ""), OK);
+    EXPECT_EQ(SetValueBool(settings, "x", true), BAD_PARAMETER);
+    EXPECT_EQ(SetValueBool(beacon, "x", true), BAD_PARAMETER);
+}
+
+TEST(StoreObjects, InstancesComeInInsertionOrder) {
+    const ObjectPtr object = NewSwitch();
+    for (const char *id : {"c", "a", "b"})
+        Sub(object.get(), "ports", id);
+    int32_t status = 0;
+    EXPECT_EQ(Ids(object.get(), "ports", &status), (std::vector<std::string>{"c", "a", "b"}));
+    ASSERT_EQ(DeleteSubObject(object.get(), "ports", "a"), OK);
+    Sub(object.get(), "ports", "a");
+    EXPECT_EQ(Ids(object.get(), "ports", &status), (std::vector<std::string>{"c", "b", "a"}));
+}
+
+TEST(StoreFilter, SelectsTheInstancesOfItsKey) {
+    const ObjectPtr object = NewSwitch(R"({"ports":{"a":{},"b":{}},"health_checks":{"VLAN_MTU":{}}})");
+    int32_t status = 0;
+    EXPECT_EQ(Ids(object.get(), "ports", &status), (std::vector<std::string>{"a", "b"}));
+    EXPECT_EQ(status, OK);
+}
+
+TEST(StoreFilter, SelectsOneInstanceByItsId) {
+    const ObjectPtr object = NewSwitch(R"({"ports":{"a":{},"b":{}}})");
+    int32_t status = 0;
+    EXPECT_EQ(Ids(object.get(), "ports", &status, "b"), std::vector<std::string>{"b"});
+    EXPECT_EQ(Ids(object.get(), "ports", &status, "c"), std::vector<std::string>{});
+    EXPECT_EQ(status, NOT_FOUND);
+}
+
+TEST(StoreFilter, GivesOneHandlePerElementOfATextList) {
+    const ObjectPtr object = NewSwitch(R"({"uplink_port_names":["a","b","c"]})");
+    int32_t status = 0;
+    EXPECT_EQ(Ids(object.get(), "uplink_port_names", &status).size(), 3U);
+    EXPECT_EQ(status, OK);
+}
+
+TEST(StoreFilter, DescendsIntoSingletonsWhereTheMemberIsAbsentDepthFirst) {
+    const ObjectPtr object = NewSwitch();
+    Object *const settings = Sub(object.get(), "settings");
+    Sub(Sub(settings, "ipfix"), "things", "deep");
+    Sub(settings, "more");
+    Sub(Sub(settings, "more"), "things", "later");
+    Sub(Sub(object.get(), "product"), "things", "last");
+    int32_t status = 0;
+    EXPECT_EQ(Ids(object.get(), "things", &status), (std::vector<std::string>{"deep", "later", "last"}));
+}
+
+TEST(StoreFilter, CountsTheTextsOfAllSingletons) {
+    const ObjectPtr object = NewSwitch(
+        R"({"settings":{"vspans":{"s":{"source_recv_port":{"port_keys":["a"]},"destination_port":{"port_keys":["b","c"]}}}}})");
+    int32_t status = 0;
+    EXPECT_EQ(Ids(Sub(Sub(object.get(), "settings"), "vspans", "s"), "port_keys", &status).size(), 3U);
+}
+
+TEST(StoreFilter, DoesNotDescendWhereTheMemberIsThereButEmpty) {
+    const ObjectPtr object = NewSwitch();
+    Sub(Sub(object.get(), "settings"), "things", "hidden");
+    ASSERT_EQ(SetValueEmptyList(object.get(), "things"), OK);
+    int32_t status = 0;
+    EXPECT_TRUE(Ids(object.get(), "things", &status).empty());
+    EXPECT_EQ(status, NOT_FOUND);
+}
+
+TEST(StoreFilter, DoesNotDescendIntoInstances) {
+    const ObjectPtr object = NewSwitch();
+    Sub(Sub(object.get(), "ports", "p"), "things", "x");
+    int32_t status = 0;
+    EXPECT_TRUE(Ids(object.get(), "things", &status).empty());
+    EXPECT_EQ(status, NOT_FOUND);
+}
+
+TEST(StoreFilter, NoMatchAtAllIsNotFoundAndLeavesTheOutputs) {
+    const ObjectPtr object = NewSwitch();
+    const SpecPtr spec = NewSpec("ports");
+    Object *some = object.get();
+    Object **found = &some;
+    int32_t count = 7;
+    EXPECT_EQ(GetSubObjectInstances(object.get(), spec.get(), &found, &count), NOT_FOUND);
+    EXPECT_EQ(found, &some);
+    EXPECT_EQ(count, 7);
+    EXPECT_EQ(DeleteSubObjectInstances(object.get(), spec.get()), NOT_FOUND);
+}
+
+TEST(StoreFilter, DeletesWhatItSelects) {
+    const ObjectPtr object =
+        NewSwitch(R"({"ports":{"a":{},"b":{}},"vtep_ports":{"x":{"a":1},"y":{}},"name":"n"})");
+    EXPECT_EQ(DeleteSubObjectInstances(object.get(), NewSpec("ports", "a").get()), OK);
+    EXPECT_EQ(Json(object.get()), R"({"ports":{"b":{}},"vtep_ports":{"x":{"a":1},"y":{}},"name":"n"})");
+    EXPECT_EQ(DeleteSubObjectInstances(object.get(), NewSpec("ports").get()), OK);
+    EXPECT_EQ(DeleteSubObjectInstances(object.get(), NewSpec("vtep_ports").get()), OK);
+    EXPECT_EQ(Json(object.get()), R"({"name":"n"})");
+}
+
+TEST(StoreFilter, RefusesNulls) {
+    FilterSpec *spec = nullptr;
+    EXPECT_EQ(CreateFilterSpecObject(nullptr, "", "", "", &spec), BAD_PARAMETER);
+    EXPECT_EQ(CreateFilterSpecObject("k", nullptr, "", "", &spec), BAD_PARAMETER);
+    EXPECT_EQ(CreateFilterSpecObject("k", "", nullptr, "", &spec), BAD_PARAMETER);
+    EXPECT_EQ(CreateFilterSpecObject("k", "", "", "", nullptr), BAD_PARAMETER);
+    EXPECT_EQ(spec, nullptr);
+    ASSERT_EQ(CreateFilterSpecObject("k", "", "", nullptr, &spec), OK);
+    DestroyFilterSpecObject(spec);
+    DestroyFilterSpecObject(nullptr);
+}
+
+TEST(StoreObjects, GeneratedIdsAreDistinctUuids) {
+    char *one = nullptr;
+    char *two = nullptr;
+    ASSERT_EQ(GenerateInstanceId(&one), OK);
+    ASSERT_EQ(GenerateInstanceId(&two), OK);
+    EXPECT_STRNE(one, two);
+    EXPECT_EQ(std::string(one).size(), 36U);
+    EXPECT_EQ(one[14], '4');
+    FreeString(one);
+    FreeString(two);
+    EXPECT_EQ(GenerateInstanceId(nullptr), BAD_PARAMETER);
+}
