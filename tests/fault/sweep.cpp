@@ -116,17 +116,20 @@ namespace {
     notes.reserve(kNotesSize);
     Child child;
     ChildAccess::SetNotes(&child, &notes);
-    if (options.prepare) options.prepare(child);
-    if (options.warmUp) (void)scenario(child);
-    notes.clear();
     Wire wire{};
+    const auto round = [&](const char *armed) {
+        if (options.prepare) options.prepare(child);
+        if (fault_arm(armed) != 0) _exit(2);
+        wire.status = scenario(child);
+        wire.hits = fault_hits();
+        fault_disarm();
+        if (options.conclude) options.conclude(child);
+    };
+    if (options.warmUp) round("");
+    notes.clear();
     const int fds = CountFds();
     const int64_t blocks = fault_live_blocks();
-    if (fault_arm(plan.c_str()) != 0) _exit(2);
-    wire.status = scenario(child);
-    wire.hits = fault_hits();
-    fault_disarm();
-    if (options.conclude) options.conclude(child);
+    round(plan.c_str());
     wire.leakedBlocks = fault_live_blocks() - blocks;
     wire.leakedFds = CountFds() - fds;
     wire.lockHeld = ChildAccess::LockHeld(child);

@@ -52,14 +52,17 @@ private:
 };
 
 struct Options {
-    uint64_t step = 1; // distance between rounds' faults; see StepFromEnvironment
+    // Distance between the faults of two rounds.
+    uint64_t step = 1;
     uint64_t maxRounds = 20000;
-    unsigned timeoutSeconds = 60;         // of one round
-    std::function<void(Child &)> prepare; // in the child, before the fault is armed and blocks are counted
-    std::function<void(Child &)>
-        conclude; // in the child, after the scenario and without faults, before blocks are counted
-    bool warmUp =
-        false; // run the scenario once without faults first, so that caches of the first use are no leak
+    // Of one round.
+    unsigned timeoutSeconds = 60;
+    // Run in the child before the scenario and after it, without faults. Heap blocks and descriptors are
+    // counted around all three, so what the first makes the last has to release.
+    std::function<void(Child &)> prepare;
+    std::function<void(Child &)> conclude;
+    // Go through the three once beforehand, so that what the process keeps from a first use is no leak.
+    bool warmUp = false;
 };
 
 using Scenario = std::function<uint32_t(Child &)>;
