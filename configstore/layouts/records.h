@@ -11,7 +11,7 @@
 namespace dvs::layout {
 
 // Single values and plain lists (layouts/scalars.cpp).
-extern const Record kNumber, kSignedNumber, kText, kBoolByte, kBoolText, kPassthrough, kEnabledText,
+extern const Record kNumber, kSignedNumber, kTextValue, kBoolByte, kBoolText, kPassthrough, kEnabledText,
     kIpv4Value, kUplinkKeys, kUplinkNames, kOpaqueValue, kSwitchVersion;
 
 // Families, each in configstore/converters/<family>.cpp.

@@ -62,7 +62,7 @@ constexpr Part kNameParts[] = {{"names", &kName, CountBy::kField, 0, "count", nu
 
 constexpr Record kNumber = {"number", 4, kNumberFields, {}};
 constexpr Record kSignedNumber = {"signed number", 4, kSignedFields, {}};
-constexpr Record kText = {"text", 0, kTextFields, {}};
+constexpr Record kTextValue = {"text", 0, kTextFields, {}};
 constexpr Record kBoolByte = {"one-byte boolean", 1, kBoolFields, {}};
 constexpr Record kBoolText = {"boolean as text", 0, kBoolTextFields, {}};
 constexpr Record kEnabledText = {"enabled as text", 0, kEnabledFields, {}};
@@ -72,7 +72,7 @@ constexpr Record kSwitchVersion = {"switch version", 4, kVersionFields, {}};
 constexpr Record kOpaqueValue = {"opaque value", 0, kOpaqueFields, {}};
 constexpr Record kUplinkKeys = {"uplink port keys", 4, kCountFields, kKeyParts};
 constexpr Record kUplinkNames = {"uplink port names", 4, kCountFields, kNameParts};
-static_assert(IsSound(kNumber) && IsSound(kSignedNumber) && IsSound(kText) && IsSound(kBoolByte));
+static_assert(IsSound(kNumber) && IsSound(kSignedNumber) && IsSound(kTextValue) && IsSound(kBoolByte));
 static_assert(IsSound(kBoolText) && IsSound(kEnabledText) && IsSound(kPassthrough) && IsSound(kIpv4Value));
 static_assert(IsSound(kSwitchVersion) && IsSound(kOpaqueValue) && IsSound(kUplinkKeys) &&
               IsSound(kUplinkNames));

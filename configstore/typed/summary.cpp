@@ -1,0 +1,145 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Trees as one line for people (tree.h). Types that read better in words of their own have a function in the
+// table at the end; all others list their fields.
+
+#include <array>
+#include <iterator>
+
+#include "configstore/typed/tree.h"
+
+namespace dvs::typed {
+namespace {
+
+std::string Join(const std::vector<std::string> &parts) {
+    std::string line;
+    for (const std::string &part : parts)
+        line += (line.empty() ? "" : ", ") + part;
+    return line;
+}
+
+std::string NumberText(const Node &node) {
+    const std::string number = std::to_string(node.number);
+    return *node.unit ? number + " " + node.unit : number;
+}
+
+int64_t NumberOf(const Node &object, std::string_view name) {
+    const Node *member = object.Find(name);
+    return member ? member->number : 0;
+}
+
+std::string NamesOf(const Node *list) {
+    std::vector<std::string> names;
+    if (list) {
+        for (const Node &item : list->items)
+            names.push_back(item.text);
+    }
+    return Join(names);
+}
+
+std::string SummarizeVlan(const Node &tree) {
+    const Node *ranges = tree.Find("trunk_vlan_ids");
+    if (!ranges || ranges->items.empty()) {
+        if (const Node *id = tree.Find("pvlan_id")) return "private VLAN " + std::to_string(id->number);
+        const Node *id = tree.Find("vlan_id");
+        return id ? "VLAN " + std::to_string(id->number) : "trunk without ranges";
+    }
+    std::string line;
+    for (const Node &range : ranges->items) {
+        const int64_t start = NumberOf(range, "start");
+        const int64_t end = NumberOf(range, "end");
+        line += (line.empty() ? "trunk " : ",") + std::to_string(start);
+        if (end != start) line += "-" + std::to_string(end);
+    }
+    return line;
+}
+
+std::string SummarizeTeaming(const Node &tree) {
+    const Node *policy = tree.Find("policy");
+    std::vector<std::string> parts = {policy ? policy->text : "no policy"};
+    const Node *order = tree.Find("uplink_port_order");
+    const std::string active = order ? NamesOf(order->Find("active_uplink_ports")) : "";
+    const std::string standby = order ? NamesOf(order->Find("standby_uplink_ports")) : "";
+    if (!active.empty()) parts.push_back("active " + active);
+    if (!standby.empty()) parts.push_back("standby " + standby);
+    return Join(parts);
+}
+
+std::string SummarizeShaping(const Node &tree) {
+    std::vector<std::string> parts;
+    for (const auto &[name, words] :
+         {std::pair("average_bandwidth", "average "), std::pair("peak_bandwidth", "peak "),
+          std::pair("burst_size", "burst ")}) {
+        if (const Node *limit = tree.Find(name)) parts.push_back(words + NumberText(*limit));
+    }
+    return Join(parts);
+}
+
+std::string SummarizeSecurity(const Node &tree) {
+    std::vector<std::string> rejected;
+    for (const auto &[name, words] :
+         {std::pair("allow_promiscuous", "promiscuous mode"), std::pair("allow_mac_change", "MAC changes"),
+          std::pair("allow_forged_transmit", "forged transmits")}) {
+        const Node *allowed = tree.Find(name);
+        if (allowed && !allowed->flag) rejected.emplace_back(words);
+    }
+    return rejected.empty() ? "rejects nothing" : "rejects " + Join(rejected);
+}
+
+std::string SummarizePrivateVlans(const Node &tree) {
+    std::vector<std::string> pairs;
+    for (const Node &entry : tree.items) {
+        const Node *type = entry.Find("type");
+        pairs.push_back(std::to_string(NumberOf(entry, "primary_id")) + "/" +
+                        std::to_string(NumberOf(entry, "secondary_id")) + (type ? " " + type->text : ""));
+    }
+    return pairs.empty() ? "none" : Join(pairs);
+}
+
+struct Row {
+    uint32_t type;
+    std::string (*summarize)(const Node &tree);
+};
+constexpr Row kRows[] = {
+    {6, SummarizePrivateVlans}, {7, SummarizePrivateVlans}, {17, SummarizeTeaming},
+    {18, SummarizeTeaming},     {24, SummarizeVlan},        {25, SummarizeVlan},
+    {26, SummarizeShaping},     {27, SummarizeSecurity},    {28, SummarizeSecurity},
+};
+
+} // namespace
+
+std::string ToLine(const Node &node) {
+    std::vector<std::string> parts;
+    switch (node.kind) {
+    case Node::Kind::kNull:
+        return "nothing";
+    case Node::Kind::kBool:
+        return node.flag ? "true" : "false";
+    case Node::Kind::kNumber:
+        return NumberText(node);
+    case Node::Kind::kText:
+        return node.text;
+    case Node::Kind::kList:
+        if (node.items.empty()) return "none";
+        for (const Node &item : node.items) {
+            const bool isObject = item.kind == Node::Kind::kObject;
+            parts.push_back(isObject ? "(" + ToLine(item) + ")" : ToLine(item));
+        }
+        return Join(parts);
+    case Node::Kind::kObject:
+        break;
+    }
+    for (const Node &item : node.items) {
+        const bool isObject = item.kind == Node::Kind::kObject;
+        parts.push_back(item.name + " " + (isObject ? "(" + ToLine(item) + ")" : ToLine(item)));
+    }
+    return Join(parts);
+}
+
+std::string Summarize(uint32_t type, const Node &tree) {
+    for (const Row &row : kRows) {
+        if (row.type == type) return row.summarize(tree);
+    }
+    return ToLine(tree);
+}
+
+} // namespace dvs::typed

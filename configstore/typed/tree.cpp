@@ -1,0 +1,353 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Trees in and out of store objects (tree.h).
+
+#include "configstore/typed/tree.h"
+
+#include <algorithm>
+#include <limits>
+
+#include "configstore/converters/common.h"
+
+namespace dvs::typed {
+namespace {
+
+using convert::Instances;
+using convert::StoreText;
+using convert::StoreTexts;
+using layout::Form;
+using layout::StoreField;
+
+Node Make(const StoreField &form, Node::Kind kind) {
+    Node node;
+    node.kind = kind;
+    node.unit = form.unit;
+    node.note = form.meaning;
+    return node;
+}
+
+Node TextNode(const char *text) {
+    Node node;
+    node.kind = Node::Kind::kText;
+    node.text = text;
+    return node;
+}
+
+// --- Reading ---
+
+// Absent or unreadable is kNull throughout.
+Node ReadBool(const StoreField &form, const Place &place) {
+    bool flag = false;
+    if (configstore::GetValueBool(place.parent, place.name, &flag)) return {};
+    Node node = Make(form, Node::Kind::kBool);
+    node.flag = flag;
+    return node;
+}
+
+Node ReadNumber(const StoreField &form, const Place &place) {
+    int64_t number = 0;
+    if (configstore::GetValueLong(place.parent, place.name, &number)) return {};
+    Node node = Make(form, Node::Kind::kNumber);
+    node.number = number;
+    return node;
+}
+
+Node ReadText(const StoreField &form, const Place &place) {
+    StoreText text;
+    if (text.Read(place.parent, place.name)) return {};
+    Node node = Make(form, Node::Kind::kText);
+    node.text = text.get();
+    return node;
+}
+
+Node ReadTexts(const StoreField &form, const Place &place) {
+    StoreTexts texts;
+    if (texts.Read(place.parent, place.name)) return {};
+    Node node = Make(form, Node::Kind::kList);
+    for (const char *text : texts.items())
+        node.items.push_back(TextNode(text));
+    return node;
+}
+
+Node ReadNumbers(const StoreField &form, const Place &place) {
+    int32_t *numbers = nullptr;
+    int32_t count = 0;
+    if (configstore::GetValueIntArray(place.parent, place.name, &numbers, &count)) return {};
+    Node node = Make(form, Node::Kind::kList);
+    for (int32_t i = 0; i < count; ++i) {
+        node.items.emplace_back().kind = Node::Kind::kNumber;
+        node.items.back().number = numbers[i];
+    }
+    configstore::FreeIntArray(numbers);
+    return node;
+}
+
+Node ReadMember(const StoreField &form, const Place &place);
+
+Node ReadObject(const StoreField &form, configstore::Object *object) {
+    Node node = Make(form, Node::Kind::kObject);
+    for (const StoreField &member : form.members) {
+        Node value = ReadMember(member, {object, member.name, nullptr});
+        if (value.kind == Node::Kind::kNull) continue;
+        value.name = member.name;
+        node.items.push_back(std::move(value));
+    }
+    return node;
+}
+
+Node ReadMember(const StoreField &form, const Place &place) {
+    switch (form.form) {
+    case Form::kBool:
+        return ReadBool(form, place);
+    case Form::kUint16:
+    case Form::kUint32:
+    case Form::kInt:
+    case Form::kLong:
+        return ReadNumber(form, place);
+    case Form::kText:
+        return ReadText(form, place);
+    case Form::kTexts:
+        return ReadTexts(form, place);
+    case Form::kInts:
+        return ReadNumbers(form, place);
+    case Form::kObject: {
+        configstore::Object *object = nullptr;
+        if (configstore::GetSubObject(place.parent, place.name, place.id, &object)) return {};
+        return ReadObject(form, object);
+    }
+    case Form::kInstances: {
+        Instances instances;
+        if (instances.Read(place.parent, place.name)) return {};
+        Node node = Make(form, Node::Kind::kList);
+        for (configstore::Object *object : instances.items())
+            node.items.push_back(ReadObject(form, object));
+        return node;
+    }
+    case Form::kNone:
+        break;
+    }
+    return {};
+}
+
+// --- Writing ---
+
+const char *NameOf(Node::Kind kind) {
+    constexpr const char *kNames[] = {"null", "a truth value", "a number", "a text", "a list", "an object"};
+    return kNames[static_cast<std::size_t>(kind)];
+}
+
+Flaw Refused(const std::string &field, int32_t status) {
+    return {field, "the store refuses it with status " + std::to_string(status)};
+}
+
+Flaw Expect(const Node &node, Node::Kind kind, const std::string &path) {
+    if (node.kind == kind) return {};
+    return {path, std::string("is ") + NameOf(node.kind) + ", expected " + NameOf(kind)};
+}
+
+Flaw CheckText(const StoreField &form, const Node &node, const std::string &path) {
+    if (Flaw flaw = Expect(node, Node::Kind::kText, path)) return flaw;
+    if (node.text.find('\0') != std::string::npos) return {path, "contains a NUL"};
+    if (form.maxText && node.text.size() > form.maxText) {
+        return {path, "is " + std::to_string(node.text.size()) + " bytes long, at most " +
+                          std::to_string(form.maxText) + " fit"};
+    }
+    if (!form.domain) return {};
+    std::string known;
+    for (uint32_t i = 0; i < form.domain->textCount; ++i) {
+        const char *text = form.domain->texts[i];
+        if (!text) continue;
+        if (node.text == text) return {};
+        known += std::string(known.empty() ? "" : ", ") + text;
+    }
+    return {path, "\"" + node.text + "\" is not known; expected one of " + known};
+}
+
+Flaw CheckNumber(const Node &node, int64_t least, int64_t most, const std::string &path) {
+    if (Flaw flaw = Expect(node, Node::Kind::kNumber, path)) return flaw;
+    if (node.number >= least && node.number <= most) return {};
+    return {path, std::to_string(node.number) + " is out of range, expected " + std::to_string(least) +
+                      " to " + std::to_string(most)};
+}
+
+template <typename T, typename Set>
+Flaw WriteNumber(const Place &place, const Node &node, const std::string &path, Set set) {
+    if (Flaw flaw = CheckNumber(node, std::numeric_limits<T>::min(), std::numeric_limits<T>::max(), path))
+        return flaw;
+    const int32_t status = set(place.parent, place.name, static_cast<T>(node.number));
+    return status ? Refused(path, status) : Flaw{};
+}
+
+Flaw WriteList(const StoreField &form, const Place &place, const Node &node, const std::string &path) {
+    if (Flaw flaw = Expect(node, Node::Kind::kList, path)) return flaw;
+    int32_t status = configstore::SetValueEmptyList(place.parent, place.name);
+    if (status) return Refused(path, status);
+    for (std::size_t i = 0; i < node.items.size(); ++i) {
+        const Node &item = node.items[i];
+        const std::string itemPath = path + "[" + std::to_string(i) + "]";
+        const bool isText = form.form == Form::kTexts;
+        if (Flaw flaw = isText ? CheckText(form, item, itemPath) : CheckNumber(item, 0, UINT16_MAX, itemPath))
+            return flaw;
+        status =
+            isText ? configstore::AppendValueString(place.parent, place.name, item.text.c_str())
+                   : configstore::AppendValueInt(place.parent, place.name, static_cast<int32_t>(item.number));
+        if (status) return Refused(itemPath, status);
+    }
+    return {};
+}
+
+Flaw WriteMember(const StoreField &form, const Place &place, const Node &node, const std::string &path);
+
+Flaw WriteMembers(const StoreField &form, configstore::Object *object, const Node &node,
+                  const std::string &path) {
+    const std::string prefix = path.empty() ? "" : path + ".";
+    for (const Node &item : node.items) {
+        const auto member = std::find_if(form.members.begin(), form.members.end(),
+                                         [&](const StoreField &field) { return item.name == field.name; });
+        if (member == form.members.end()) {
+            std::string known;
+            for (const StoreField &field : form.members)
+                known += (known.empty() ? "" : ", ") + std::string(field.name);
+            return {prefix + item.name, "is no field of this value; there are " + known};
+        }
+        if (Flaw flaw = WriteMember(*member, {object, member->name, nullptr}, item, prefix + item.name))
+            return flaw;
+    }
+    return {};
+}
+
+Flaw WriteInstances(const StoreField &form, const Place &place, const Node &node, const std::string &path) {
+    if (Flaw flaw = Expect(node, Node::Kind::kList, path)) return flaw;
+    const int32_t status = configstore::SetValueEmptyList(place.parent, place.name);
+    if (status) return Refused(path, status);
+    for (std::size_t i = 0; i < node.items.size(); ++i) {
+        const Node &item = node.items[i];
+        const std::string itemPath = path + "[" + std::to_string(i) + "]";
+        if (Flaw flaw = Expect(item, Node::Kind::kObject, itemPath)) return flaw;
+        std::string id = std::to_string(i);
+        if (form.id) {
+            const Node *member = item.Find(form.id);
+            if (!member || member->text.empty())
+                return {itemPath + "." + form.id, "is missing; it tells the entries apart"};
+            id = member->text;
+        }
+        configstore::Object *object = nullptr;
+        if (configstore::GetSubObject(place.parent, place.name, id.c_str(), &object) == 0) {
+            return {itemPath + "." + form.id, "\"" + id + "\" is there twice"};
+        }
+        const int32_t created = configstore::CreateSubObject(place.parent, place.name, id.c_str(), &object);
+        if (created) return Refused(itemPath, created);
+        if (Flaw flaw = WriteMembers(form, object, item, itemPath)) return flaw;
+    }
+    return {};
+}
+
+Flaw WriteMember(const StoreField &form, const Place &place, const Node &node, const std::string &path) {
+    switch (form.form) {
+    case Form::kBool: {
+        if (Flaw flaw = Expect(node, Node::Kind::kBool, path)) return flaw;
+        const int32_t status = configstore::SetValueBool(place.parent, place.name, node.flag);
+        return status ? Refused(path, status) : Flaw{};
+    }
+    case Form::kUint16:
+        return WriteNumber<uint16_t>(place, node, path, configstore::SetValueUint16);
+    case Form::kUint32:
+        return WriteNumber<uint32_t>(place, node, path, configstore::SetValueUint32);
+    case Form::kInt:
+        return WriteNumber<int32_t>(place, node, path, configstore::SetValueInt);
+    case Form::kLong:
+        return WriteNumber<int64_t>(place, node, path, configstore::SetValueLong);
+    case Form::kText: {
+        if (Flaw flaw = CheckText(form, node, path)) return flaw;
+        const int32_t status = configstore::SetValueStr(place.parent, place.name, node.text.c_str());
+        return status ? Refused(path, status) : Flaw{};
+    }
+    case Form::kTexts:
+    case Form::kInts:
+        return WriteList(form, place, node, path);
+    case Form::kObject: {
+        if (Flaw flaw = Expect(node, Node::Kind::kObject, path)) return flaw;
+        configstore::Object *object = nullptr;
+        const int32_t status = configstore::CreateSubObject(place.parent, place.name, place.id, &object);
+        return status ? Refused(path, status) : WriteMembers(form, object, node, path);
+    }
+    case Form::kInstances:
+        return WriteInstances(form, place, node, path);
+    case Form::kNone:
+        break;
+    }
+    return {path, "has no typed form"};
+}
+
+void CompareAt(const Node &given, const Node *found, const std::string &path, std::vector<std::string> *out) {
+    if (given.kind == Node::Kind::kObject && found) {
+        for (const Node &item : given.items) {
+            CompareAt(item, found->Find(item.name), path.empty() ? item.name : path + "." + item.name, out);
+        }
+        return;
+    }
+    if (given.kind == Node::Kind::kList && found && given.items.size() == found->items.size()) {
+        for (std::size_t i = 0; i < given.items.size(); ++i) {
+            CompareAt(given.items[i], &found->items[i], path + "[" + std::to_string(i) + "]", out);
+        }
+        return;
+    }
+    const std::string before = ToLine(given);
+    const std::string after = found ? ToLine(*found) : "absent";
+    if (before == after) return;
+    out->push_back((path.empty() ? "the value" : path) + ": " + before + " reads back as " + after);
+}
+
+} // namespace
+
+const Node *Node::Find(std::string_view member) const {
+    const auto item =
+        std::find_if(items.begin(), items.end(), [&](const Node &node) { return node.name == member; });
+    return item == items.end() ? nullptr : &*item;
+}
+
+Node ReadTree(const layout::StoreField &form, const Place &place) {
+    Node node = ReadMember(form, place);
+    const bool isList = form.form == Form::kInstances || form.form == Form::kTexts;
+    return node.kind == Node::Kind::kNull && isList ? Make(form, Node::Kind::kList) : node;
+}
+
+Node Normalized(const layout::StoreField &form, const Node &node) {
+    Node result = node;
+    if (form.form == Form::kInstances && node.kind == Node::Kind::kObject) {
+        result.kind = Node::Kind::kList;
+        for (Node &item : result.items) {
+            if (form.id && !item.Find(form.id)) {
+                Node id = TextNode(item.name.c_str());
+                id.name = form.id;
+                item.items.insert(item.items.begin(), std::move(id));
+            }
+            item.name.clear();
+        }
+    }
+    for (Node &item : result.items) {
+        if (result.kind == Node::Kind::kList && form.form == Form::kInstances) {
+            for (Node &member : item.items) {
+                for (const StoreField &field : form.members) {
+                    if (member.name == field.name) member = Normalized(field, member);
+                }
+            }
+            continue;
+        }
+        for (const StoreField &field : form.members) {
+            if (item.name == field.name) item = Normalized(field, item);
+        }
+    }
+    return result;
+}
+
+Flaw WriteTree(const layout::StoreField &form, const Place &place, const Node &node) {
+    return WriteMember(form, place, node, "");
+}
+
+std::vector<std::string> Compare(const Node &given, const Node &found) {
+    std::vector<std::string> differences;
+    CompareAt(given, &found, "", &differences);
+    return differences;
+}
+
+} // namespace dvs::typed

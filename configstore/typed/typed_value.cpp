@@ -1,0 +1,270 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Values as trees (typed_value.h): a property's converter is run over an object that no store has, and the
+// tree is read from or written to that object.
+
+#include "configstore/typed/typed_value.h"
+
+#include <map>
+#include <memory>
+
+#include "configstore/converters/common.h"
+#include "configstore/converters/health_check.h"
+#include "configstore/converters/switch_version.h"
+#include "configstore/converters/table.h"
+#include "configstore/layouts/registry.h"
+#include "configstore/layouts/walk.h"
+#include "configstore/typed/tree.h"
+
+namespace dvs::typed {
+namespace {
+
+constexpr uint32_t kTypeVersion = 15;
+constexpr uint32_t kTypeHealthCheck = 11;
+constexpr uint32_t kTypePortPools = 36;
+constexpr uint32_t kFirstOverlayVersion = 107;
+
+// The converters' process-wide values as the property's own key calls for, and silence. Restored at the end.
+class Surroundings {
+public:
+    Surroundings(std::string_view key, const Context &context) {
+        dvsSwitchClass = key.find(".vswitch.") != std::string_view::npos ? 1 : 0;
+        dvsWidePortRecords = context.version > convert::kLastNarrowPortVersion;
+        dvsLoadedSwitch = nullptr;
+        dvsconfigstore_debug = -1;
+    }
+    ~Surroundings() {
+        dvsSwitchClass = switchClass_;
+        dvsWidePortRecords = wide_;
+        dvsLoadedSwitch = loaded_;
+        dvsconfigstore_debug = debug_;
+    }
+    Surroundings(const Surroundings &) = delete;
+    Surroundings &operator=(const Surroundings &) = delete;
+
+private:
+    uint32_t switchClass_ = dvsSwitchClass;
+    bool wide_ = dvsWidePortRecords;
+    configstore::Object *loaded_ = dvsLoadedSwitch;
+    int32_t debug_ = dvsconfigstore_debug;
+};
+
+struct ObjectDeleter {
+    void operator()(configstore::Object *object) const { configstore::DestroyObject(object); }
+};
+struct ListDeleter {
+    void operator()(DVSData *list) const { DVSData_Free(list); }
+};
+
+// One property, the object it is converted through, and where in it the property's leaf is.
+class Bench {
+public:
+    Bench(uint32_t propClass, std::string_view key, const Context &context)
+        : surroundings_(key, context), propClass_(propClass), context_(context),
+          row_(layout::FindProperty(propClass, key)) {
+        if (!row_) return;
+        const bool isPortPools = row_->converterType == kTypePortPools;
+        // A port's pools have no form of their own: they are the switch's.
+        type_ = layout::FindType(isPortPools ? convert::kTypeTrafficResources : row_->converterType);
+        converter_ = type_ ? convert::ConverterFor(type_->type) : nullptr;
+        configstore::Object *object = nullptr;
+        if (!converter_ ||
+            configstore::CreateObject("switches", "network_vds", "qel", "typed", "{}", &object))
+            return;
+        root_.reset(object);
+        leaf_ = isPortPools ? "traffic_resources" : row_->path[row_->depth - 1];
+        if (GetSubObjectByPath(row_->path, row_->depth, object, &parent_, true)) parent_ = nullptr;
+    }
+
+    [[nodiscard]] bool IsMapped() const { return row_ && type_; }
+    [[nodiscard]] bool IsReady() const { return parent_ != nullptr; }
+    [[nodiscard]] const layout::TypeInfo &type() const { return *type_; }
+    [[nodiscard]] const layout::Record &record() const {
+        return dvsWidePortRecords ? *type_->wide : *type_->record;
+    }
+    [[nodiscard]] Place place() const {
+        return {parent_, leaf_,
+                type_->type == kTypeHealthCheck ? convert::HealthCheckInstance(row_->key) : nullptr};
+    }
+
+    int32_t Save(std::span<const uint8_t> value) {
+        const int32_t status =
+            converter_->save({root_.get(), parent_, leaf_, value, row_->key, propClass_, row_->loadPropType});
+        if (status == 0) CorrectNames(value);
+        return status;
+    }
+
+    // The loaded bytes; `found` tells an absent property from an empty one.
+    int32_t Load(std::vector<uint8_t> *bytes, bool *found) {
+        if (const int32_t status = DescribeSwitch()) return status;
+        DVSData *handle = nullptr;
+        if (DVSData_Alloc(
+                &handle, [](uint64_t size) { return std::malloc(size); }, std::free))
+            return convert::kFailed;
+        const std::unique_ptr<DVSData, ListDeleter> list(handle);
+        const int32_t status = converter_->load(
+            {root_.get(), parent_, handle, leaf_, row_->key, row_->loadPropType, propClass_});
+        DVSDataEntry *entry = nullptr;
+        *found = status == 0 && DVSData_Lookup(handle, row_->key, &entry) == HYP_OK;
+        if (*found) bytes->assign(entry->data, entry->data + entry->dataLen);
+        return status;
+    }
+
+private:
+    // Two saves write names that the load would not understand as they were meant. A tree has what a load
+    // reads.
+    void CorrectNames(std::span<const uint8_t> value) {
+        configstore::Object *object = nullptr;
+        if (type_->form->form != layout::Form::kObject) return;
+        if (configstore::GetSubObject(parent_, leaf_, place().id, &object)) return;
+        if (type_->record == &layout::kTeamingPolicy) {
+            const layout::Domain &names = *layout::Find(layout::kTeamingPolicy, "policy")->domain;
+            const char *name = convert::EnumText(layout::Texts(names), convert::GetU32(value, 0));
+            if (name)
+                (void)configstore::SetValueStr(object, "policy",
+                                               name); // the name for another value stays at worst
+        }
+        if (type_->type == kTypeHealthCheck) {
+            (void)configstore::RemoveValue(object, "enable"); // a name that a tree does not show
+            (void)configstore::SetValueBool(object, "enabled", value[0] != 0);
+        }
+    }
+
+    // What the loads of some global properties ask the switch's object for.
+    int32_t DescribeSwitch() {
+        if (propClass_ != DVS_PROP_CLASS_GLOBAL) return 0;
+        int32_t status =
+            configstore::SetValueBool(root_.get(), "ovl_enabled", context_.version >= kFirstOverlayVersion);
+        if (status || type_->type == kTypeVersion) return status;
+        configstore::Object *product = nullptr;
+        status = GetOrCreateSubObject(true, root_.get(), "product", nullptr, &product);
+        if (status) return status;
+        // Class and version under which the property's key is the one that is loaded.
+        status =
+            configstore::SetValueStr(product, "forwarding_class", dvsSwitchClass ? "cswitch" : "etherswitch");
+        if (status) return status;
+        status = configstore::SetValueBool(root_.get(), "ovl_enabled", false);
+        return status
+                   ? status
+                   : configstore::SetValueStr(product, "version", dvsWidePortRecords ? "OVL 1.0" : "6.0.0");
+    }
+
+    Surroundings surroundings_;
+    uint32_t propClass_;
+    Context context_;
+    const DVSProp2ConfigEntry *row_;
+    const layout::TypeInfo *type_ = nullptr;
+    const convert::Converter *converter_ = nullptr;
+    std::unique_ptr<configstore::Object, ObjectDeleter> root_;
+    configstore::Object *parent_ = nullptr;
+    const char *leaf_ = nullptr;
+};
+
+std::string ReasonOf(const layout::Record &record, std::span<const uint8_t> value, int32_t status) {
+    const layout::Fault fault = layout::Check(record, value);
+    if (fault.found) return "at byte " + std::to_string(fault.offset) + ": " + fault.what;
+    return "its converter refuses it with status " + std::to_string(status);
+}
+
+// The fields of two values that differ, by the record.
+std::vector<std::string> DifferencesOf(const layout::Record &record, std::span<const uint8_t> before,
+                                       std::span<const uint8_t> after) {
+    std::map<std::string, std::string> read;
+    (void)layout::Walk(record, after,
+                       [&](const layout::Item &item) { read[item.path] = layout::TextOf(item); });
+    std::vector<std::string> differences;
+    (void)layout::Walk(record, before, [&](const layout::Item &item) {
+        const auto found = read.find(item.path);
+        const std::string text = layout::TextOf(item);
+        const std::string now = found == read.end() ? "absent" : found->second;
+        if (text != now) differences.push_back(item.path + ": " + text + " becomes " + now);
+    });
+    if (differences.empty() && before.size() != after.size()) {
+        differences.push_back("length: " + std::to_string(before.size()) + " becomes " +
+                              std::to_string(after.size()));
+    }
+    if (differences.empty()) differences.emplace_back("bytes behind the end of a text");
+    return differences;
+}
+
+void JudgeExactness(Bench *bench, std::span<const uint8_t> value, View *view) {
+    std::vector<uint8_t> again;
+    bool found = false;
+    const int32_t status = bench->Load(&again, &found);
+    if (status) {
+        view->differences.push_back("does not load again (status " + std::to_string(status) + ")");
+    } else if (!found) {
+        view->differences.emplace_back("loads as no property");
+    } else if (std::equal(value.begin(), value.end(), again.begin(), again.end())) {
+        view->exact = true;
+    } else {
+        view->differences = DifferencesOf(bench->record(), value, again);
+    }
+}
+
+} // namespace
+
+View Describe(uint32_t propClass, std::string_view key, std::span<const uint8_t> value,
+              const Context &context) {
+    View view;
+    Context known = context;
+    // A version's own number tells whether it is an overlay switch's.
+    if (propClass == DVS_PROP_CLASS_GLOBAL && key == "com.orbeno.common.version" &&
+        value.size() >= sizeof known.version) {
+        known.version = convert::GetU32(value, 0);
+    }
+    Bench bench(propClass, key, known);
+    if (!bench.IsMapped()) return view;
+    view.state = State::kDamaged;
+    if (!bench.IsReady()) {
+        view.reason = "no memory to look into it";
+        return view;
+    }
+    if (const int32_t status = bench.Save(value)) {
+        view.reason = ReasonOf(bench.record(), value, status);
+        return view;
+    }
+    view.state = State::kTyped;
+    view.tree = ReadTree(*bench.type().form, bench.place());
+    view.summary = Summarize(bench.type().type, view.tree);
+    JudgeExactness(&bench, value, &view);
+    return view;
+}
+
+Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Context &context) {
+    Built built;
+    {
+        Bench bench(propClass, key, context);
+        if (!bench.IsReady()) {
+            built.reason = bench.IsMapped() ? "no memory to build it" : "this property has no typed form";
+            return built;
+        }
+        const layout::StoreField &form = *bench.type().form;
+        const Flaw flaw = WriteTree(form, bench.place(), Normalized(form, tree));
+        if (flaw) {
+            built.field = flaw.field;
+            built.reason = flaw.reason;
+            return built;
+        }
+        bool found = false;
+        if (const int32_t status = bench.Load(&built.bytes, &found)) {
+            built.reason =
+                "does not convert (status " + std::to_string(status) + "); expected: " + form.meaning;
+            return built;
+        }
+        if (!found) {
+            built.reason = "loads as no property";
+            return built;
+        }
+        built.ok = true;
+    }
+    const View view = Describe(propClass, key, built.bytes, context);
+    if (view.state != State::kTyped) {
+        built.differences.push_back("the value reads back as damaged: " + view.reason);
+    } else {
+        const auto *type = layout::FindType(layout::FindProperty(propClass, key)->converterType);
+        built.differences = Compare(Normalized(*type->form, tree), view.tree);
+    }
+    return built;
+}
+
+} // namespace dvs::typed
