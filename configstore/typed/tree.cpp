@@ -291,6 +291,9 @@ void CompareAt(const Node &given, const Node *found, const std::string &path, st
         }
         return;
     }
+    if (given.kind == Node::Kind::kNumber && found && found->kind == given.kind &&
+        found->number == given.number)
+        return;
     const std::string before = ToLine(given);
     const std::string after = found ? ToLine(*found) : "absent";
     if (before == after) return;

@@ -14,6 +14,7 @@
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/walk.h"
 #include "configstore/typed/tree.h"
+#include "dvsstate/owned_list.h"
 
 namespace dvs::typed {
 namespace {
@@ -51,10 +52,6 @@ private:
 struct ObjectDeleter {
     void operator()(configstore::Object *object) const { configstore::DestroyObject(object); }
 };
-struct ListDeleter {
-    void operator()(DVSData *list) const { DVSData_Free(list); }
-};
-
 // One property, the object it is converted through, and where in it the property's leaf is.
 class Bench {
 public:
@@ -96,15 +93,12 @@ public:
     // The loaded bytes; `found` tells an absent property from an empty one.
     int32_t Load(std::vector<uint8_t> *bytes, bool *found) {
         if (const int32_t status = DescribeSwitch()) return status;
-        DVSData *handle = nullptr;
-        if (DVSData_Alloc(
-                &handle, [](uint64_t size) { return std::malloc(size); }, std::free))
-            return convert::kFailed;
-        const std::unique_ptr<DVSData, ListDeleter> list(handle);
+        state::OwnedList list;
+        if (state::NewList(list) != HYP_OK) return convert::kFailed;
         const int32_t status = converter_->load(
-            {root_.get(), parent_, handle, leaf_, row_->key, row_->loadPropType, propClass_});
+            {root_.get(), parent_, list.get(), leaf_, row_->key, row_->loadPropType, propClass_});
         DVSDataEntry *entry = nullptr;
-        *found = status == 0 && DVSData_Lookup(handle, row_->key, &entry) == HYP_OK;
+        *found = status == 0 && DVSData_Lookup(list.get(), row_->key, &entry) == HYP_OK;
         if (*found) bytes->assign(entry->data, entry->data + entry->dataLen);
         return status;
     }
