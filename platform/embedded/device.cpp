@@ -5,6 +5,7 @@
 
 #include <cerrno>
 #include <cstdint>
+#include <new>
 
 #include <fcntl.h>
 #include <sys/ioctl.h>
@@ -24,8 +25,14 @@ extern "C" int HostDevice_Open(const char *path) {
 }
 
 extern "C" int HostDevice_Ioctl(int fd, int request, void *record) {
-    if (const auto channel = dvs::embedded::FindChannel(fd))
-        return channel->Call(request, static_cast<DVSHYPRequest *>(record));
+    if (const auto channel = dvs::embedded::FindChannel(fd)) {
+        try {
+            return channel->Call(request, static_cast<DVSHYPRequest *>(record));
+        } catch (const std::bad_alloc &) {
+            errno = ENOMEM;
+            return -1;
+        }
+    }
     return ioctl(fd, static_cast<unsigned long>(static_cast<unsigned int>(request)), record);
 }
 

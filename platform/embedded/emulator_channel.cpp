@@ -94,6 +94,15 @@ bool Channel::IsStillOurs() const {
     return fstat(fd_, &status) == 0 && status.st_dev == device_ && status.st_ino == inode_;
 }
 
+/// Descriptors opened from now on go to the emulator that is configured now; one that stays open must not
+/// talk to another one than they do.
+void Channel::FollowEnvironment() {
+    const char *path = EmulatorPath();
+    if (!path || path_ == path) return;
+    path_ = path;
+    stale_ = true;
+}
+
 bool Channel::Reconnect() {
     const int fresh = ConnectEmulator(path_.c_str());
     if (fresh == -1) return false;
@@ -115,6 +124,7 @@ int Channel::Call(int request, DVSHYPRequest *record) {
         record->status = HYP_LIMIT_EXCEEDED;
         return Fail(ENOSPC);
     }
+    FollowEnvironment();
     wire::ReplyHeader reply{};
     // Twice: a restarted emulator shows in the first attempt, which it did not get whole and so did not carry
     // out.

@@ -33,13 +33,14 @@ private:
     enum class Outcome { Answered, NotSent, Lost };
 
     bool IsStillOurs() const;
+    void FollowEnvironment();
     bool Reconnect();
     Outcome Exchange(int request, DVSHYPRequest *record, wire::ReplyHeader *reply) const;
     int Finish(int request, const wire::ReplyHeader &reply, DVSHYPRequest *record);
 
     const int fd_;
-    const std::string path_;
     std::mutex mutex_; // held for the whole of a call, guards what follows
+    std::string path_;
     dev_t device_ = 0; // what the descriptor refers to: the program may have closed it behind our back
     ino_t inode_ = 0;
     bool stale_ = false;    // the connection is broken or another process's

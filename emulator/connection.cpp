@@ -1,0 +1,161 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Non-blocking reassembly of requests and sending of answers for one client.
+
+#include "emulator/connection.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+
+#include <sys/socket.h>
+#include <sys/uio.h>
+#include <unistd.h>
+
+namespace dvs::emulator {
+
+namespace {
+
+/// A request without a large value fits, so that it takes one receive.
+constexpr std::size_t kFirstCapacity = 4096;
+
+/// What may wait for less is not counted: every client may have that.
+constexpr std::size_t kFree = 64 << 10;
+
+constexpr uint64_t Counted(std::size_t size) {
+    return size > kFree ? size : 0;
+}
+
+} // namespace
+
+Connection::Connection(int fd, pid_t peer, MemoryBudget *budget)
+    : fd_(fd), peer_(peer), budget_(budget), lastProgress_(Clock::now()) {}
+
+Connection::~Connection() {
+    budget_->Return(Counted(capacity_) + outTaken_);
+    close(fd_);
+}
+
+wire::RequestHeader Connection::Header() const {
+    wire::RequestHeader header;
+    std::memcpy(&header, in_.get(), sizeof header);
+    return header;
+}
+
+bool Connection::Reserve(std::size_t size) {
+    if (size <= capacity_) return true;
+    if (!budget_->Take(Counted(size))) return false;
+    auto larger = std::make_unique_for_overwrite<char[]>(size);
+    if (received_ > 0) std::memcpy(larger.get(), in_.get(), received_);
+    in_ = std::move(larger);
+    budget_->Return(Counted(capacity_));
+    capacity_ = size;
+    return true;
+}
+
+/// Learns from the header how much is to come.
+bool Connection::JudgeHeader() {
+    const wire::RequestHeader header = Header();
+    if (header.magic != wire::kMagic || header.version != wire::kVersion) return false;
+    if (header.kind != static_cast<uint16_t>(wire::Kind::Ioctl) &&
+        header.kind != static_cast<uint16_t>(wire::Kind::Limits))
+        return false;
+    if (header.dataSize > wire::kMaxTransfer || header.cmdInSize > wire::kMaxTransfer) return false;
+    judged_ = true;
+    if (header.kind == static_cast<uint16_t>(wire::Kind::Ioctl))
+        needed_ += wire::kRecordSize + std::size_t{header.dataSize} + header.cmdInSize;
+    return true;
+}
+
+bool Connection::Receive() {
+    for (;;) {
+        // Announced sizes cost what has arrived of them, twice over at most.
+        const std::size_t room = std::min(needed_, std::max(received_ * 2, kFirstCapacity));
+        if (!Reserve(std::max(room, kFirstCapacity))) return false;
+        const ssize_t got = recv(fd_, in_.get() + received_, capacity_ - received_, MSG_DONTWAIT);
+        if (got == 0) return false;
+        if (got < 0 && errno == EINTR) continue;
+        if (got < 0) return errno == EAGAIN || errno == EWOULDBLOCK;
+        received_ += static_cast<std::size_t>(got);
+        lastProgress_ = Clock::now();
+        if (!judged_ && HasHeader() && !JudgeHeader()) return false;
+        // The common request is complete by now; otherwise there may be more to take in.
+        if (HasRequest() || received_ < capacity_) return true;
+    }
+}
+
+wire::Kind Connection::RequestKind() const {
+    return static_cast<wire::Kind>(Header().kind);
+}
+
+Call Connection::Request() const {
+    const wire::RequestHeader header = Header();
+    Call call{};
+    call.request = header.request;
+    call.flags = header.flags;
+    const char *at = in_.get() + sizeof header;
+    std::memcpy(&call.record, at, sizeof call.record);
+    at += sizeof call.record;
+    call.value = {at, header.dataSize};
+    call.cmdIn = {at + header.dataSize, header.cmdInSize};
+    return call;
+}
+
+void Connection::Finish() {
+    // A client that did not wait for its answer has begun the next request already.
+    const std::size_t surplus = received_ - needed_;
+    if (surplus > 0) std::memmove(in_.get(), in_.get() + needed_, surplus);
+    received_ = surplus;
+    needed_ = sizeof(wire::RequestHeader);
+    judged_ = false;
+    if (Counted(capacity_) > 0 && surplus <= kFirstCapacity) {
+        auto smaller = std::make_unique_for_overwrite<char[]>(kFirstCapacity);
+        std::memcpy(smaller.get(), in_.get(), surplus);
+        in_ = std::move(smaller);
+        budget_->Return(Counted(capacity_));
+        capacity_ = kFirstCapacity;
+    }
+}
+
+bool Connection::Send(const wire::ReplyHeader &header, Payload payload) {
+    outHeader_ = header;
+    out_ = std::move(payload);
+    sent_ = 0;
+    sending_ = true;
+    lastProgress_ = Clock::now();
+    if (!Flush()) return false;
+    if (!sending_) return true;
+    if (!budget_->Take(Counted(out_.size))) return false;
+    outTaken_ = Counted(out_.size);
+    if (!out_.IsLent()) return true;
+    Block copy(std::malloc(out_.size));
+    if (!copy) return false;
+    std::memcpy(copy.get(), out_.data, out_.size);
+    out_.data = static_cast<const char *>(copy.get());
+    out_.owned = std::move(copy);
+    return true;
+}
+
+bool Connection::Flush() {
+    const std::size_t whole = sizeof outHeader_ + out_.size;
+    while (sent_ < whole) {
+        const std::size_t ofHeader = std::min(sent_, sizeof outHeader_);
+        const std::size_t ofPayload = sent_ - ofHeader;
+        iovec parts[] = {{reinterpret_cast<char *>(&outHeader_) + ofHeader, sizeof outHeader_ - ofHeader},
+                         {const_cast<char *>(out_.data) + ofPayload, out_.size - ofPayload}};
+        msghdr message{};
+        message.msg_iov = parts;
+        message.msg_iovlen = 2;
+        const ssize_t sent = sendmsg(fd_, &message, MSG_DONTWAIT | MSG_NOSIGNAL);
+        if (sent < 0 && errno == EINTR) continue;
+        if (sent < 0) return errno == EAGAIN || errno == EWOULDBLOCK;
+        sent_ += static_cast<std::size_t>(sent);
+        lastProgress_ = Clock::now();
+    }
+    sending_ = false;
+    out_ = {};
+    budget_->Return(outTaken_);
+    outTaken_ = 0;
+    return true;
+}
+
+} // namespace dvs::emulator

@@ -1,0 +1,274 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The poll loop. Leans on Connection for bytes and on Module for what they mean.
+
+#include "emulator/server.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstring>
+#include <new>
+#include <string_view>
+
+#include <sys/resource.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include "kernel/request.h"
+
+namespace dvs::emulator {
+
+namespace {
+
+constexpr std::size_t kMaxClients = 1024;
+constexpr std::size_t kMaxClientsOfProcess = 256;
+constexpr std::size_t kReservedDescriptors = 32; // state file, signals, standard streams
+constexpr uint64_t kWaitingBytes = 1ULL << 30;
+constexpr std::chrono::seconds kStall{60};
+constexpr std::chrono::seconds kFarewell{5};
+constexpr int32_t kCmdExec = static_cast<int32_t>(dvs::hyp::Command::CmdExec);
+
+/// As many clients as descriptors allow, raising the soft limit where that helps.
+std::size_t RoomForClients() {
+    rlimit limit{};
+    if (getrlimit(RLIMIT_NOFILE, &limit) != 0) return kMaxClients / 2;
+    const rlim_t wanted = kMaxClients + kReservedDescriptors;
+    if (limit.rlim_cur < wanted) {
+        rlimit raised{std::min(wanted, limit.rlim_max), limit.rlim_max};
+        if (setrlimit(RLIMIT_NOFILE, &raised) == 0) limit = raised;
+    }
+    const rlim_t usable = limit.rlim_cur > kReservedDescriptors ? limit.rlim_cur - kReservedDescriptors : 1;
+    return static_cast<std::size_t>(std::min<rlim_t>(usable, kMaxClients));
+}
+
+bool Failed(const std::string &what, std::string *why) {
+    *why = what + ": " + std::strerror(errno);
+    return false;
+}
+
+/// True when the path is free for a new socket: there is nothing, or a socket that nobody listens at.
+bool FreePath(const sockaddr_un &address, std::string *why) {
+    struct stat status {};
+    if (lstat(address.sun_path, &status) != 0) return errno == ENOENT || Failed(address.sun_path, why);
+    if (!S_ISSOCK(status.st_mode)) {
+        *why = std::string(address.sun_path) + " is there and is no socket";
+        return false;
+    }
+    const int probe = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
+    if (probe == -1) return Failed("socket", why);
+    const bool answered = connect(probe, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
+    const int error = errno;
+    close(probe);
+    if (answered || error != ECONNREFUSED) {
+        *why = std::string(address.sun_path) + " is in use";
+        return false;
+    }
+    return unlink(address.sun_path) == 0 || errno == ENOENT || Failed(address.sun_path, why);
+}
+
+int ListenAt(const sockaddr_un &address, std::string *why) {
+    const int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
+    if (fd == -1) return Failed("socket", why), -1;
+    // The mask makes the mode 0600 from the first moment.
+    const mode_t mask = umask(0177);
+    const bool bound = bind(fd, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
+    const bool listens = bound && listen(fd, SOMAXCONN) == 0;
+    umask(mask);
+    if (listens) return fd;
+    (void)Failed(address.sun_path, why);
+    close(fd);
+    return -1;
+}
+
+wire::ReplyHeader NewReply() {
+    wire::ReplyHeader reply{};
+    reply.magic = wire::kMagic;
+    reply.version = wire::kVersion;
+    return reply;
+}
+
+} // namespace
+
+Server::Server(Module *module) : module_(module), budget_(kWaitingBytes), maxClients_(RoomForClients()) {}
+
+Server::~Server() {
+    if (listenFd_ == -1) return;
+    unlink(path_.c_str());
+    close(listenFd_);
+}
+
+bool Server::Listen(const std::string &path, std::string *why) {
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    if (path.empty() || path.size() >= sizeof address.sun_path) {
+        *why = "a socket's path has 1 to " + std::to_string(sizeof address.sun_path - 1) + " characters";
+        return false;
+    }
+    std::memcpy(address.sun_path, path.c_str(), path.size());
+    if (!FreePath(address, why)) return false;
+    listenFd_ = ListenAt(address, why);
+    path_ = path;
+    return listenFd_ != -1;
+}
+
+bool Server::MayConnect(pid_t peer) const {
+    if (clients_.size() >= maxClients_) return false;
+    const auto ofPeer =
+        std::ranges::count_if(clients_, [&](const auto &client) { return client->Peer() == peer; });
+    return static_cast<std::size_t>(ofPeer) < kMaxClientsOfProcess;
+}
+
+void Server::Accept() {
+    for (;;) {
+        const int fd = accept4(listenFd_, nullptr, nullptr, SOCK_CLOEXEC | SOCK_NONBLOCK);
+        if (fd == -1 && errno == EINTR) continue;
+        if (fd == -1) return;
+        ucred peer{};
+        socklen_t size = sizeof peer;
+        const bool known = getsockopt(fd, SOL_SOCKET, SO_PEERCRED, &peer, &size) == 0;
+        if (!known || (peer.uid != 0 && peer.uid != geteuid()) || !MayConnect(peer.pid)) {
+            close(fd);
+            continue;
+        }
+        clients_.push_back(std::make_unique<Connection>(fd, peer.pid, &budget_));
+    }
+}
+
+void Server::Run(int stopFd) {
+    bool stopped = false;
+    while (!stopped)
+        ServeOnce(stopFd, &stopped);
+    FinishRequests();
+}
+
+int Server::NextTimeout() const {
+    auto wait = std::chrono::milliseconds(-1);
+    const auto now = Clock::now();
+    const auto consider = [&](Clock::time_point when) {
+        // Rounded up: waking a moment early would only mean to poll again.
+        const auto left =
+            std::max(std::chrono::ceil<std::chrono::milliseconds>(when - now), decltype(wait){0});
+        if (wait.count() < 0 || left < wait) wait = left;
+    };
+    if (stopping_) consider(stopAt_);
+    for (const auto &client : clients_) {
+        if (client->delayed)
+            consider(client->delayed->due);
+        else if (client->IsInMessage())
+            consider(client->LastProgress() + kStall);
+    }
+    return static_cast<int>(wait.count());
+}
+
+void Server::ServeOnce(int stopFd, bool *stopped) {
+    polled_.clear();
+    polled_.push_back({stopFd, POLLIN, 0});
+    polled_.push_back({listenFd_, POLLIN, 0});
+    for (const auto &client : clients_) {
+        // A client whose answer is delayed or not yet taken is not listened to.
+        const int events = client->delayed ? 0 : client->IsSending() ? POLLOUT : POLLIN;
+        polled_.push_back({client->Fd(), static_cast<short>(events), 0});
+    }
+    if (poll(polled_.data(), polled_.size(), NextTimeout()) < 0) return;
+    const auto now = Clock::now();
+    for (std::size_t i = 0; i < clients_.size(); i++) {
+        if (!Keeps(clients_[i].get(), polled_[i + 2].revents, now)) clients_[i].reset();
+    }
+    std::erase(clients_, nullptr);
+    if (polled_[1].revents) Accept();
+    *stopped = polled_[0].revents != 0;
+}
+
+/// Nobody new is heard; who is in mid-request may end it; who has been answered is done.
+void Server::FinishRequests() {
+    stopping_ = true;
+    unlink(path_.c_str());
+    close(listenFd_);
+    listenFd_ = -1;
+    stopAt_ = Clock::now(); // the first round only looks for what has arrived
+    for (const auto &client : clients_) {
+        if (client->delayed) client->delayed->due = stopAt_;
+    }
+    bool stopped = false;
+    ServeOnce(-1, &stopped);
+    stopAt_ = Clock::now() + kFarewell;
+    for (;;) {
+        std::erase_if(clients_, [](const auto &client) { return client->IsIdle(); });
+        if (clients_.empty() || Clock::now() >= stopAt_) break;
+        ServeOnce(-1, &stopped);
+    }
+    clients_.clear();
+}
+
+/// What a round does for one client; false when it is to be given up.
+bool Server::Keeps(Connection *client, short events, Clock::time_point now) {
+    try {
+        if (client->delayed && client->delayed->due <= now) {
+            Fault fault = std::move(client->delayed->fault);
+            client->delayed.reset();
+            return CarryOut(client, fault) && ServeRequests(client);
+        }
+        if (events & POLLIN) return client->Receive() && ServeRequests(client);
+        if (events & POLLOUT) return client->Flush() && (client->IsSending() || ServeRequests(client));
+        const bool stalled = client->IsInMessage() && now - client->LastProgress() > kStall;
+        return events == 0 && !stalled;
+    } catch (const std::bad_alloc &) {
+        return false;
+    }
+}
+
+/// Carries out what has arrived whole, which is one request of a client that waits for its answers.
+bool Server::ServeRequests(Connection *client) {
+    while (client->HasRequest() && !client->IsSending()) {
+        if (client->RequestKind() == wire::Kind::Limits) {
+            if (!AnswerLimits(client)) return false;
+            continue;
+        }
+        const Call call = client->Request();
+        // Whoever set faults must be able to look at them and take them back.
+        const bool exempt = call.request == kCmdExec && std::string_view(call.record.cmd, 5) == "fault";
+        const auto fault = exempt ? std::nullopt : module_->FaultTable().Next(call.request);
+        if (fault && fault->delay.count() > 0 && !stopping_) {
+            client->delayed = {Clock::now() + fault->delay, *fault};
+            return true;
+        }
+        if (!CarryOut(client, fault.value_or(Fault{}))) return false;
+    }
+    return true;
+}
+
+bool Server::CarryOut(Connection *client, const Fault &fault) {
+    if (fault.drop == Drop::Before) return false;
+    const Call call = client->Request();
+    Answer answer;
+    if (fault.Refuses()) {
+        answer.status = fault.status.value_or(call.record.status);
+        answer.error = fault.error.value_or(ErrnoOf(answer.status));
+        answer.dataLen = call.record.dataLen;
+        answer.cmdOutLen = call.record.cmdOutLen;
+    } else {
+        answer = module_->Execute(call);
+    }
+    if (fault.drop == Drop::After) return false;
+    wire::ReplyHeader reply = NewReply();
+    reply.error = answer.error;
+    reply.status = answer.status;
+    reply.dataLen = answer.dataLen;
+    reply.cmdOutLen = answer.cmdOutLen;
+    reply.payloadSize = answer.payload.size;
+    client->Finish();
+    return client->Send(reply, std::move(answer.payload));
+}
+
+bool Server::AnswerLimits(Connection *client) {
+    wire::ReplyHeader reply = NewReply();
+    Payload payload;
+    payload.data = reinterpret_cast<const char *>(&uwMaxNumActivePortsSystemWide);
+    payload.size = sizeof uwMaxNumActivePortsSystemWide;
+    reply.payloadSize = payload.size;
+    client->Finish();
+    return client->Send(reply, std::move(payload));
+}
+
+} // namespace dvs::emulator

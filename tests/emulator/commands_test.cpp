@@ -1,0 +1,225 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Every command through the library against a real emulator process: what it does to the state, and how it
+// refuses.
+
+#include <cstring>
+#include <string>
+#include <string_view>
+
+#include <gtest/gtest.h>
+
+#include "dvs/dvs.h"
+#include "emulator/emulator_process.h"
+#include "emulator/hyp_support.h"
+
+namespace dvs::test {
+namespace {
+
+class EmulatorCommands : public testing::Test {
+protected:
+    EmulatorCommands() {
+        EXPECT_EQ(DVSHYP_SwitchAdd("s1", "vswitch", 0, 110), HYP_OK);
+        EXPECT_EQ(AddPort("s1", "p1"), HYP_OK);
+    }
+    LiveEmulator emulator_;
+};
+
+TEST_F(EmulatorCommands, StartsWithoutSwitches) {
+    ASSERT_TRUE(emulator_.Restart());
+    const Bytes state = Fetch(DVSHYP_StateGet);
+    EXPECT_EQ(state.status, HYP_OK);
+    EXPECT_EQ(state.text.size(), 16U);
+}
+
+TEST_F(EmulatorCommands, SaysWhereItListensInOneLine) {
+    EXPECT_EQ(emulator_.Process().ReadyLine(), "dvs-emulator ready on " + emulator_.Socket());
+}
+
+TEST_F(EmulatorCommands, StateInitReplacesTheWholeState) {
+    const Bytes before = Fetch(DVSHYP_StateGet);
+    ASSERT_EQ(DVSHYP_SwitchAdd("s2", "etherswitch", 0, 9), HYP_OK);
+    ASSERT_EQ(DVSHYP_StateInit(before.text.data(), before.Size()), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_StateGet).text, before.text);
+}
+
+TEST_F(EmulatorCommands, StateInitRefusesDamageAndKeepsTheState) {
+    const Bytes before = Fetch(DVSHYP_StateGet);
+    std::string damaged = before.text;
+    damaged.back() = 1;
+    damaged[damaged.size() / 2] ^= 1;
+    EXPECT_EQ(DVSHYP_StateInit(damaged.data(), static_cast<uint32_t>(damaged.size())), HYP_BAD_CHECKSUM);
+    EXPECT_EQ(DVSHYP_StateInit(damaged.data(), 10), HYP_BAD_PARAM);
+    EXPECT_EQ(Fetch(DVSHYP_StateGet).text, before.text);
+}
+
+TEST_F(EmulatorCommands, StateCleanupEmptiesIt) {
+    EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_StateGet).text.size(), 16U);
+}
+
+TEST_F(EmulatorCommands, StateSanitizeRemovesZombiesAndCachedPorts) {
+    for (const uint32_t kind : {2U, 3U, 3U, 4U})
+        ASSERT_EQ(AddPort("s1", "k" + std::to_string(kind), {}, kind), HYP_OK);
+    EXPECT_EQ(DVSHYP_StateSanitize(), HYP_OK);
+    const std::string listing = Exec("ports s1").text;
+    EXPECT_NE(listing.find("\"p1\" kind active"), std::string::npos) << listing;
+    EXPECT_NE(listing.find("\"k2\" kind shadow"), std::string::npos) << listing;
+    EXPECT_EQ(listing.find("zombie"), std::string::npos) << listing;
+    EXPECT_EQ(listing.find("local-cache"), std::string::npos) << listing;
+}
+
+TEST_F(EmulatorCommands, SwitchAddAndRemoveRefuseAsTheTableDoes) {
+    EXPECT_EQ(DVSHYP_SwitchAdd("s1", "vswitch", 0, 110), HYP_EXISTS);
+    EXPECT_EQ(DVSHYP_SwitchAdd("big", "custom", 70000, 110), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(DVSHYP_SwitchRemove("s2"), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_SwitchRemove("s1"), HYP_OK);
+    EXPECT_EQ(DVSHYP_PortFind("s1", "p1"), HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, AssociationShowsInStats) {
+    EXPECT_EQ(DVSHYP_SwitchAssociate("none"), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_SwitchDissociate("none"), HYP_NOT_FOUND);
+    EXPECT_NE(Exec("stats").text.find("ports 1 dissociated\n"), std::string::npos);
+    EXPECT_EQ(DVSHYP_SwitchAssociate("s1"), HYP_OK);
+    EXPECT_NE(Exec("stats").text.find("ports 1 associated\n"), std::string::npos);
+    EXPECT_EQ(DVSHYP_SwitchDissociate("s1"), HYP_OK);
+    EXPECT_NE(Exec("stats").text.find("ports 1 dissociated\n"), std::string::npos);
+}
+
+TEST_F(EmulatorCommands, GlobalAndHostPropertiesAreApart) {
+    EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", "global", 6, 16), HYP_OK);
+    EXPECT_EQ(DVSHYP_HostPropSet("s1", "n", "host", 4, 16), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "n").text, "global");
+    EXPECT_EQ(Fetch(DVSHYP_HostPropGet, "s1", "n").text, "host");
+    EXPECT_EQ(Fetch(DVSHYP_SmartNICGlobalPropGet, "s1", "n").text, "global");
+    EXPECT_EQ(Fetch(DVSHYP_SmartNICHostPropGet, "s1", "n").text, "host");
+    EXPECT_EQ(DVSHYP_GlobalPropClear("s1", "n"), HYP_OK);
+    EXPECT_EQ(DVSHYP_GlobalPropClear("s1", "n"), HYP_NOT_FOUND);
+    EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "n").status, HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_HostPropClear("s1", "n"), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_HostPropGet, "s1", "n").status, HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, PropertyCommandsRefuseUnknownSwitchesAndEmptyValues) {
+    EXPECT_EQ(DVSHYP_GlobalPropSet("none", "n", "v", 1, 16), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_HostPropSet("none", "n", "v", 1, 16), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_HostPropClear("none", "n"), HYP_NOT_FOUND);
+    EXPECT_EQ(Fetch(DVSHYP_HostPropGet, "none", "n").status, HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", "v", 0, 16), HYP_FAILURE);
+    EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", nullptr, 0, 16), HYP_FAILURE);
+}
+
+TEST_F(EmulatorCommands, TheVersionReadsAsAGlobalProperty) {
+    EXPECT_EQ(FetchWord(DVSHYP_GlobalPropGet, "s1", "com.orbeno.common.version"), 110U);
+    EXPECT_EQ(DVSHYP_SwitchSetVersion("s1", 7), HYP_OK);
+    EXPECT_EQ(FetchWord(DVSHYP_GlobalPropGet, "s1", "com.orbeno.common.version"), 7U);
+    const uint32_t version = 106;
+    EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "com.orbeno.common.version", &version, 4, 16), HYP_OK);
+    EXPECT_EQ(FetchWord(DVSHYP_GlobalPropGet, "s1", "com.orbeno.common.version"), 106U);
+    EXPECT_EQ(DVSHYP_SwitchSetVersion("s1", 112), HYP_OK);
+    EXPECT_EQ(FetchWord(DVSHYP_GlobalPropGet, "s1", "com.orbeno.common.version"), 112U);
+}
+
+TEST_F(EmulatorCommands, UnsupportedVersionsAreRefused) {
+    EXPECT_EQ(DVSHYP_SwitchSetVersion("s1", 13), HYP_NOT_SUPPORTED);
+    EXPECT_EQ(DVSHYP_SwitchSetVersion("none", 12), HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, MaxPortsAreSetAndHeldTo) {
+    ASSERT_EQ(DVSHYP_SwitchAdd("c1", "custom", 2, 110), HYP_OK);
+    ASSERT_EQ(AddPort("c1", "a"), HYP_OK);
+    ASSERT_EQ(AddPort("c1", "b"), HYP_OK);
+    EXPECT_EQ(AddPort("c1", "c"), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("c1", 3), HYP_OK);
+    EXPECT_EQ(AddPort("c1", "c"), HYP_OK);
+    EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("c1", 2), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("c1", 65537), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("none", 2), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("s1", 20), HYP_OK);
+    EXPECT_NE(Exec("stats").text.find("max-ports 20 "), std::string::npos);
+}
+
+TEST_F(EmulatorCommands, PortsComeAndGo) {
+    EXPECT_EQ(DVSHYP_PortFind("s1", "p1"), HYP_OK);
+    EXPECT_EQ(DVSHYP_PortFind("s1", "p2"), HYP_NOT_FOUND);
+    EXPECT_EQ(AddPort("s1", "p1"), HYP_EXISTS);
+    EXPECT_EQ(AddPort("none", "p1"), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_PortAdd("s1", "p2", "not a property list", 19), HYP_BAD_PARAM);
+    EXPECT_EQ(DVSHYP_PortRemove("s1", "p1"), HYP_OK);
+    EXPECT_EQ(DVSHYP_PortRemove("s1", "p1"), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_PortFind("s1", "p1"), HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, PortStateReadsBackAsItWasAdded) {
+    const std::string data = PortData({{"a", "one"}, {"b", "two"}});
+    ASSERT_EQ(DVSHYP_PortAdd("s1", "p2", data.data(), static_cast<uint32_t>(data.size())), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_PortStateGet, "s1", "p2").text, data);
+    EXPECT_EQ(Fetch(DVSHYP_PortStateGet, "s1", "none").status, HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, PortDataIsSetReadAndCleared) {
+    EXPECT_EQ(DVSHYP_PortDataSet("s1", "p1", "n", "value", 5, 16), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_PortDataGet, "s1", "p1", "n").text, "value");
+    EXPECT_EQ(Fetch(DVSHYP_SmartNICPortDataGet, "s1", "p1", "n").text, "value");
+    EXPECT_EQ(DVSHYP_PortDataClear("s1", "p1", "n"), HYP_OK);
+    EXPECT_EQ(DVSHYP_PortDataClear("s1", "p1", "n"), HYP_NOT_FOUND);
+    EXPECT_EQ(Fetch(DVSHYP_PortDataGet, "s1", "p1", "n").status, HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_PortDataSet("s1", "none", "n", "value", 5, 16), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_PortDataClear("s1", "none", "n"), HYP_NOT_FOUND);
+    EXPECT_EQ(Fetch(DVSHYP_PortDataGet, "s1", "none", "n").status, HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, UplinkDataIsKeptPerPortAndUplink) {
+    ASSERT_EQ(AddPort("s1", "p2"), HYP_OK);
+    EXPECT_EQ(DVSHYP_UplinkDataSet("s1", "p1", 0, "zero", 4, 16), HYP_OK);
+    EXPECT_EQ(DVSHYP_UplinkDataSet("s1", "p1", -1, "minus", 5, 16), HYP_OK);
+    EXPECT_EQ(DVSHYP_UplinkDataSet("s1", "p2", 0, "other", 5, 16), HYP_OK);
+    EXPECT_EQ(FetchUplink("s1", "p1", 0).text, "zero");
+    EXPECT_EQ(FetchUplink("s1", "p1", -1).text, "minus");
+    EXPECT_EQ(FetchUplink("s1", "p2", 0).text, "other");
+    EXPECT_EQ(FetchUplink("s1", "p2", 7).status, HYP_NOT_FOUND);
+    EXPECT_EQ(FetchUplink("s1", "none", 0).status, HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_UplinkDataSet("s1", "none", 0, "v", 1, 16), HYP_NOT_FOUND);
+    EXPECT_EQ(DVSHYP_UplinkDataSet("s1", "p1", 0, "", 0, 16), HYP_FAILURE);
+    EXPECT_EQ(DVSHYP_PortRemove("s1", "p1"), HYP_OK);
+    ASSERT_EQ(AddPort("s1", "p1"), HYP_OK);
+    EXPECT_EQ(FetchUplink("s1", "p1", 0).status, HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, LargeValuesTravelWhole) {
+    std::string value(1 << 20, 'v');
+    value[12345] = '\0';
+    ASSERT_EQ(DVSHYP_GlobalPropSet("s1", "large", value.data(), static_cast<uint32_t>(value.size()), 16),
+              HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "large").text, value);
+}
+
+TEST_F(EmulatorCommands, ValuesOfSixteenMebibytesAreTheLargest) {
+    const std::string value((16 << 20) + 1, 'v');
+    EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", value.data(), 16 << 20, 16), HYP_OK);
+    EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", value.data(), (16 << 20) + 1, 16), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "n").text.size(), 16U << 20);
+}
+
+TEST_F(EmulatorCommands, TheWholeStateIsBounded) {
+    const std::string value(16 << 20, 'v');
+    HYP_ReturnStatus status = HYP_OK;
+    int set = 0;
+    for (; status == HYP_OK && set < 20; set++)
+        status = DVSHYP_HostPropSet("s1", ("n" + std::to_string(set)).c_str(), value.data(), 16 << 20, 16);
+    EXPECT_EQ(status, HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(set, 16); // fifteen fit beside what is there, the sixteenth does not
+    // Setting what is there anew takes no more room.
+    for (int i = 0; i < 3; i++)
+        EXPECT_EQ(DVSHYP_HostPropSet("s1", "n0", "small", 5, 16), HYP_OK);
+}
+
+TEST_F(EmulatorCommands, UnknownCommandsAreNotSupported) {
+    for (const int command : {23, 24, 25, 32, 1000, -1}) {
+        DVSHYPRequest request{};
+        EXPECT_EQ(DVSHYP_Ioctl(command, &request), HYP_NOT_SUPPORTED) << command;
+    }
+}
+
+} // namespace
+} // namespace dvs::test
