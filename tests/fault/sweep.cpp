@@ -20,8 +20,9 @@
 
 #include "fault/fault.h"
 
-extern "C" void __gcov_dump(void)
-    __attribute__((weak)); // a coverage build's counters, which _exit would drop
+#ifdef DVS_COVERAGE
+extern "C" void __gcov_dump(void); // the counters, which _exit would drop
+#endif
 
 namespace fault {
 
@@ -135,7 +136,9 @@ namespace {
     wire.lockHeld = ChildAccess::LockHeld(child);
     WriteAll(out, &wire, sizeof wire);
     WriteAll(out, notes.data(), notes.size());
-    if (__gcov_dump) __gcov_dump();
+#ifdef DVS_COVERAGE
+    __gcov_dump();
+#endif
     _exit(0);
 }
 
