@@ -18,7 +18,8 @@ STRONG = set("TDBRSC")
 
 def declared(path):
     text = re.sub(r"/\*.*?\*/|//[^\n]*", "", open(path, encoding="utf-8").read(), flags=re.S)
-    return set(DECLARATION.findall(text))
+    one_per_line = re.sub(r";\s*", ";\n", text)
+    return set(DECLARATION.findall(one_per_line))
 
 
 def members(nm, archive):
