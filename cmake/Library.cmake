@@ -10,7 +10,8 @@ file(WRITE ${DVS_VERSION_SCRIPT} "DVS_1 {\n  global:\n    ${dvs_globals};\n  loc
 
 add_library(dvs SHARED $<TARGET_OBJECTS:dvs_objects>)
 add_library(dvs::dvs ALIAS dvs)
-set_target_properties(dvs PROPERTIES VERSION 1.0.0 SOVERSION 1 LINK_DEPENDS ${DVS_VERSION_SCRIPT})
+set_target_properties(dvs PROPERTIES VERSION 1.0.0 SOVERSION 1 LINK_DEPENDS ${DVS_VERSION_SCRIPT}
+  INSTALL_RPATH "$ORIGIN") # the platform library lies beside it, wherever that is
 target_include_directories(dvs INTERFACE
   $<BUILD_INTERFACE:${CMAKE_SOURCE_DIR}/include> $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
 target_link_options(dvs PRIVATE LINKER:--version-script=${DVS_VERSION_SCRIPT})
