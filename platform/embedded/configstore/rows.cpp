@@ -32,10 +32,18 @@ int32_t TakeRevision(Store *store) {
     return status;
 }
 
+/// Deletes a document of this transaction's own; one that was brought back from history belongs there too.
+int32_t DropDocument(Store *store, int64_t document) {
+    Statement statement(store, "DELETE FROM document WHERE id = ?1 AND "
+                               "NOT EXISTS (SELECT 1 FROM history_row WHERE document = ?1) AND "
+                               "(SELECT count(*) FROM object_row WHERE document = ?1) = 1");
+    return statement.Bind(document).Run();
+}
+
 /// Puts the row's document into history, unless it has come and gone within one transaction and was never to
 /// be seen.
 int32_t EndRow(Store *store, const char *layer, const FilterSpec &address, const Row &row, bool deleted) {
-    if (row.revision == store->revision) return OK;
+    if (row.revision == store->revision) return DropDocument(store, row.document);
     Statement statement(
         store, "INSERT INTO history_row (layer, key, grp, component, instance, revision, ended, deleted, "
                "document) VALUES (?, ?, ?, ?, ?, ?, ?, ?, ?)");

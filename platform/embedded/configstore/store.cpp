@@ -48,6 +48,11 @@ int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***
     return statement.Status() == OK ? HandOut(&trees, objects, count) : statement.Status();
 }
 
+int32_t RefuseReadOnly(const Store *store) {
+    Log("config store %s: the file cannot be written to", store->path.c_str());
+    return IO_ERROR;
+}
+
 int32_t EndTransaction(Store *store, const char *sql) {
     const int32_t status = Execute(store, sql);
     if (status != OK) return status;
@@ -78,7 +83,7 @@ int32_t BeginTransaction(Store *store) {
         // A caller whose begin fails leaves its lock held. So a begin always succeeds, and what kept it from
         // doing so is the answer of every call until the caller cancels, which it then does in its ordinary
         // way.
-        store->refusal = Execute(store, "BEGIN IMMEDIATE");
+        store->refusal = store->readOnly ? RefuseReadOnly(store) : Execute(store, "BEGIN IMMEDIATE");
         store->inTransaction = true;
         store->revision = 0;
         return OK;
