@@ -1,162 +1,280 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Ports, switches and the whole switch table from serialized state, level by level, and the reset of the
-// table. Leans on the exported list operations, the switch table and the port table.
+// Ports, switches and the whole switch table from serialized state. Nested values are read where they lie: of
+// the levels above the property lists nothing is built. Checks, the order of failures and messages are those
+// of building a list for each level. Leans on the readers of dvsdata, the switch table and the port table.
 
+#include <algorithm>
+#include <array>
+#include <cstdlib>
+#include <cstring>
+#include <utility>
+
+#include "dvsdata/emit.h"
+#include "dvsdata/list_internal.h"
 #include "dvsstate/message.h"
 #include "dvsstate/names.h"
 #include "dvsstate/owned_list.h"
 #include "dvsstate/port_table.h"
 #include "dvsstate/switch_table.h"
 
-#include <cstring>
-
 using namespace dvs::state;
+namespace data = dvs::data;
 
 namespace {
 
-struct SwitchFields {
-    uint32_t version = 0;
-    std::string_view className;
-    uint32_t maxPorts = 0;
+/// A buffer, and its sum when the buffer around it told.
+struct Source {
+    data::Bytes bytes;
+    data::KnownSum sum;
 };
 
-/// The u32 an entry starts with. HYP_BAD_PARAM when it is shorter.
-HYP_ReturnStatus ReadU32(DVSDataEntry *entry, uint32_t *value) {
-    void *data = nullptr;
-    if (DVSData_Data(entry, &data) < sizeof *value) return HYP_BAD_PARAM;
-    std::memcpy(value, data, sizeof *value);
+Source SourceOf(const void *buf, uint32_t len) {
+    return {{static_cast<const uint8_t *>(buf), buf ? len : 0}, {}};
+}
+
+Source SourceOf(const data::EntryRef &entry) {
+    return {entry.value, entry.sum};
+}
+
+/// An entry's name, ended by NUL.
+class NameText {
+public:
+    explicit NameText(std::string_view name) {
+        std::ranges::copy(name.substr(0, data::kMaxNameLen), text_.begin());
+    }
+    operator const char *() const { return text_.data(); }
+
+private:
+    std::array<char, data::kNameSize> text_{};
+};
+
+HYP_ReturnStatus ReadOwned(OwnedList &list, const Source &source) {
+    DVSData *made = nullptr;
+    const HYP_ReturnStatus status =
+        data::ReadList(&made, source.bytes, std::malloc, std::free, data::kDeserializeTypeMask, source.sum);
+    if (status == HYP_OK) list.reset(made);
+    return status;
+}
+
+/// The u32 a value starts with. HYP_BAD_PARAM when it is shorter.
+HYP_ReturnStatus ReadU32(data::Bytes value, uint32_t *number) {
+    if (value.size() < sizeof *number) return HYP_BAD_PARAM;
+    *number = data::Load32(value.data());
     return HYP_OK;
 }
 
-HYP_ReturnStatus DVSStateDeserializeSubList(DVSData *parent, const char *name, OwnedList &list) {
-    DVSDataEntry *entry = FindEntry(parent, name);
-    if (!entry) return HYP_OK;
-    void *data = nullptr;
-    const uint32_t size = DVSData_Data(entry, &data);
-    const HYP_ReturnStatus status = DeserializeOwned(list, data, size);
-    if (status == HYP_OK) (void)DVSData_Remove(parent, name);
-    return status;
-}
+// ---- Ports ----
 
-HYP_ReturnStatus ReadFields(DVSData *list, SwitchFields *fields) {
-    DVSDataEntry *entry = nullptr;
-    HYP_ReturnStatus status = DVSData_Lookup(list, kSwitchVersion, &entry);
-    if (status != HYP_OK) {
-        Message(kError, "Failed to find switchVersion, status:%d\n\n", static_cast<int>(status));
+HYP_ReturnStatus AddAs(DVSwitch *sw, const char *portId, DVSData *list, DVSDataEntry *kindEntry) {
+    if (!kindEntry) {
+        const HYP_ReturnStatus status = DVSStatePortAdd(sw, portId, list, DVS_PORT_ACTIVE, nullptr);
+        Message(kError, "Add active DV port %s, return %s\n", portId, Text(status));
         return status;
     }
-    status = ReadU32(entry, &fields->version);
+    uint32_t kind = 0;
+    HYP_ReturnStatus status = ReadU32({kindEntry->data, kindEntry->dataLen}, &kind);
     if (status != HYP_OK) return status;
-    status = DVSData_Lookup(list, kClassName, &entry);
-    if (status != HYP_OK) return status;
-    fields->className = TextOf(entry);
-    status = DVSData_Lookup(list, kMaxPorts, &entry);
-    if (status != HYP_OK) return status;
-    return ReadU32(entry, &fields->maxPorts);
+    status = DVSStatePortAdd(sw, portId, list, kind, nullptr);
+    Message(kError, "Deserialize DV port(type %d) %s, return %s\n", static_cast<int>(kind), portId,
+            Text(status));
+    (void)DVSData_Remove(list, kPortKind); // it is there
+    return status;
 }
 
-HYP_ReturnStatus CreateSwitch(const char *switchId, const SwitchFields &fields) {
-    Message(kError, "Create DVS %s with portset %s\n", switchId, "");
-    const HYP_ReturnStatus status =
-        DVSStateSwitchAdd(switchId, fields.className, fields.maxPorts, fields.version);
+HYP_ReturnStatus AddPort(DVSwitch *sw, const char *portId, const Source &source) {
+    if (!sw) return HYP_NOT_FOUND;
+    Message(kDetail, "Deserialize %s, %s\n", sw->switchId, portId);
+    OwnedList list;
+    HYP_ReturnStatus status = ReadOwned(list, source);
+    if (status != HYP_OK) return status;
+    status = AddAs(sw, portId, list.get(), FindEntry(list.get(), kPortKind));
+    if (status == HYP_OK) (void)list.release(); // the port's from here on
+    return status;
+}
+
+// ---- Switches ----
+
+/// The fixed entries of a switch: the first one of each name. Every other entry is a port.
+class FixedEntries {
+public:
+    explicit FixedEntries(data::InPlaceList &list);
+
+    /// None when there is no such entry.
+    [[nodiscard]] const data::EntryRef *Find(std::string_view name) const {
+        const Slot &slot = slots_[IndexOf(name)];
+        return slot.present ? &slot.entry : nullptr;
+    }
+    [[nodiscard]] bool Holds(const data::EntryRef &entry) const {
+        const std::size_t index = IndexOf(entry.name);
+        return index < slots_.size() && slots_[index].entry.offset == entry.offset;
+    }
+
+private:
+    struct Slot {
+        bool present = false;
+        data::EntryRef entry{};
+    };
+
+    static std::size_t IndexOf(std::string_view name) {
+        return static_cast<std::size_t>(std::ranges::find(kFixedEntries, name) - std::begin(kFixedEntries));
+    }
+
+    std::array<Slot, std::size(kFixedEntries)> slots_;
+};
+
+FixedEntries::FixedEntries(data::InPlaceList &list) {
+    std::size_t missing = slots_.size();
+    for (data::EntryRef entry; missing > 0 && list.Next(&entry);) {
+        const std::size_t index = IndexOf(entry.name);
+        if (index == slots_.size() || slots_[index].present) continue;
+        slots_[index] = {true, entry};
+        missing--;
+    }
+    list.Rewind();
+}
+
+/// One switch being rebuilt from its buffer.
+class SwitchReader {
+public:
+    SwitchReader(const char *switchId, data::InPlaceList &list)
+        : switchId_(switchId), list_(list), fixed_(list) {}
+    HYP_ReturnStatus Run();
+
+private:
+    HYP_ReturnStatus ReadSubList(const char *name, OwnedList &sub);
+    HYP_ReturnStatus ReadFields();
+    HYP_ReturnStatus Create();
+    HYP_ReturnStatus AddPorts(DVSwitch *sw);
+    void EmitRemoved(std::string_view name);
+
+    const char *switchId_;
+    data::InPlaceList &list_;
+    FixedEntries fixed_;
+    OwnedList hostList_, globalList_;
+    uint32_t version_ = 0, maxPorts_ = 0;
+    std::string_view className_;
+    uint32_t removed_ = 0; // bytes of the entries that are gone from the list by now, for messages
+};
+
+HYP_ReturnStatus SwitchReader::Run() {
+    HYP_ReturnStatus status = ReadSubList(kHostPropList, hostList_);
+    if (status == HYP_OK) status = ReadSubList(kGlobalPropList, globalList_);
+    if (status == HYP_OK) status = ReadFields();
+    if (status != HYP_OK) return status;
+    const bool create = !DVSState_SwitchFind(switchId_);
+    if (create) {
+        status = Create();
+        if (status != HYP_OK) return status;
+    }
+    for (const char *name : {kClassName, kMaxPorts, kSwitchVersion})
+        EmitRemoved(name);
+    DVSwitch *sw = DVSState_SwitchFind(switchId_);
+    if (!sw) {
+        Message(kError, "DVS %s acquire failed\n", switchId_);
+        return HYP_NOT_FOUND;
+    }
+    // The old lists live to the end of this: the buffer may lie in one of them.
+    sw->hostPropList = std::exchange(hostList_, OwnedList(sw->hostPropList)).release();
+    sw->globalPropList = std::exchange(globalList_, OwnedList(sw->globalPropList)).release();
+    status = AddPorts(sw);
+    if (status != HYP_OK && create)
+        (void)DVSStateSwitchRemove(switchId_); // the port's failure is the one to tell
+    Message(status == HYP_OK ? kTrace : kError, "Deserialize dvs %s return %s\n", switchId_, Text(status));
+    return status;
+}
+
+HYP_ReturnStatus SwitchReader::ReadSubList(const char *name, OwnedList &sub) {
+    const data::EntryRef *entry = fixed_.Find(name);
+    if (!entry) return HYP_OK;
+    const HYP_ReturnStatus status = ReadOwned(sub, SourceOf(*entry));
+    if (status == HYP_OK) EmitRemoved(name);
+    return status;
+}
+
+HYP_ReturnStatus SwitchReader::ReadFields() {
+    const data::EntryRef *entry = fixed_.Find(kSwitchVersion);
+    if (!entry) {
+        Message(kError, "Failed to find switchVersion, status:%d\n\n", static_cast<int>(HYP_NOT_FOUND));
+        return HYP_NOT_FOUND;
+    }
+    const HYP_ReturnStatus status = ReadU32(entry->value, &version_);
+    if (status != HYP_OK) return status;
+    entry = fixed_.Find(kClassName);
+    if (!entry) return HYP_NOT_FOUND;
+    const auto *text = reinterpret_cast<const char *>(entry->value.data());
+    className_ = {text, strnlen(text, entry->value.size())};
+    entry = fixed_.Find(kMaxPorts);
+    return entry ? ReadU32(entry->value, &maxPorts_) : static_cast<HYP_ReturnStatus>(HYP_NOT_FOUND);
+}
+
+HYP_ReturnStatus SwitchReader::Create() {
+    Message(kError, "Create DVS %s with portset %s\n", switchId_, "");
+    const HYP_ReturnStatus status = DVSStateSwitchAdd(switchId_, className_, maxPorts_, version_);
     if (status != HYP_OK) {
-        Message(kError, "Failed to add switch %s/%.*s/%s/%d\n", switchId,
-                static_cast<int>(fields.className.size()), fields.className.data(), "",
-                static_cast<int>(fields.maxPorts));
+        Message(kError, "Failed to add switch %s/%.*s/%s/%d\n", switchId_,
+                static_cast<int>(className_.size()), className_.data(), "", static_cast<int>(maxPorts_));
     }
     return status;
 }
 
-HYP_ReturnStatus AddPorts(DVSwitch *sw, DVSData *list) {
-    for (DVSDataEntry *entry = nullptr; DVSData_Next(list, entry, &entry) == HYP_OK;) {
-        void *data = nullptr;
-        const uint32_t size = DVSData_Data(entry, &data);
-        const HYP_ReturnStatus status = DVSState_PortAddDeserialize(sw, DVSData_Name(entry), data, size);
+HYP_ReturnStatus SwitchReader::AddPorts(DVSwitch *sw) {
+    for (data::EntryRef entry; list_.Next(&entry);) {
+        if (fixed_.Holds(entry)) continue;
+        const HYP_ReturnStatus status = AddPort(sw, NameText(entry.name), SourceOf(entry));
         if (status != HYP_OK) return status;
     }
     return HYP_OK;
 }
 
-void Replace(DVSData *&old, OwnedList &list) {
-    DVSData_Free(old);
-    old = list.release();
+/// The line of taking a fixed entry out of the list that would have been built.
+void SwitchReader::EmitRemoved(std::string_view name) {
+    if (!data::Emits(data::kDetail)) return;
+    uint32_t listSize = data::kMinBufferSize;
+    data::InPlaceList list = list_;
+    list.Rewind();
+    for (data::EntryRef entry; list.Next(&entry);)
+        listSize += data::EntrySize(static_cast<uint32_t>(entry.value.size()));
+    const data::EntryRef &entry = *fixed_.Find(name);
+    const auto dataLen = static_cast<uint32_t>(entry.value.size());
+    removed_ += data::EntrySize(dataLen);
+    data::EmitRemoved(name, dataLen, entry.propType, listSize - removed_);
+}
+
+HYP_ReturnStatus ReadSwitch(const char *switchId, const Source &source) {
+    Message(kTrace, "Deserialize DVS %s\n", switchId);
+    data::InPlaceList list;
+    const HYP_ReturnStatus status =
+        list.Open(source.bytes, data::kDeserializeTypeMask, source.sum, data::PartSums::Yes);
+    return status == HYP_OK ? SwitchReader(switchId, list).Run() : status;
 }
 
 } // namespace
 
 HYP_ReturnStatus DVSState_PortAddDeserialize(DVSwitch *sw, const char *portId, const void *buf,
                                              uint32_t len) {
-    if (!sw) return HYP_NOT_FOUND;
-    Message(kDetail, "Deserialize %s, %s\n", sw->switchId, portId);
-    OwnedList data;
-    HYP_ReturnStatus status = DeserializeOwned(data, buf, len);
-    if (status != HYP_OK) return status;
-    if (DVSDataEntry *entry = FindEntry(data.get(), kPortKind)) {
-        uint32_t kind = 0;
-        status = ReadU32(entry, &kind);
-        if (status != HYP_OK) return status;
-        status = DVSStatePortAdd(sw, portId, data.get(), kind, nullptr);
-        Message(kError, "Deserialize DV port(type %d) %s, return %s\n", static_cast<int>(kind), portId,
-                Text(status));
-        (void)DVSData_Remove(data.get(), kPortKind);
-    } else {
-        status = DVSStatePortAdd(sw, portId, data.get(), DVS_PORT_ACTIVE, nullptr);
-        Message(kError, "Add active DV port %s, return %s\n", portId, Text(status));
-    }
-    if (status == HYP_OK) (void)data.release(); // the port's from here on
-    return status;
+    return AddPort(sw, portId, SourceOf(buf, len));
 }
 
 HYP_ReturnStatus DVSState_PortDeserialize(const char *switchId, const char *portId, const void *buf,
                                           uint32_t len) {
-    return DVSState_PortAddDeserialize(DVSState_SwitchFind(switchId), portId, buf, len);
+    return AddPort(DVSState_SwitchFind(switchId), portId, SourceOf(buf, len));
 }
 
 HYP_ReturnStatus DVSState_SwitchDeserialize(const char *switchId, const void *buf, uint32_t len) {
-    Message(kTrace, "Deserialize DVS %s\n", switchId);
-    OwnedList list, hostList, globalList;
-    HYP_ReturnStatus status = DeserializeOwned(list, buf, len);
-    if (status != HYP_OK) return status;
-    status = DVSStateDeserializeSubList(list.get(), kHostPropList, hostList);
-    if (status != HYP_OK) return status;
-    status = DVSStateDeserializeSubList(list.get(), kGlobalPropList, globalList);
-    if (status != HYP_OK) return status;
-    SwitchFields fields;
-    status = ReadFields(list.get(), &fields);
-    if (status != HYP_OK) return status;
-
-    const bool create = !DVSState_SwitchFind(switchId);
-    if (create) {
-        status = CreateSwitch(switchId, fields);
-        if (status != HYP_OK) return status;
-    }
-    for (const char *name : {kClassName, kMaxPorts, kSwitchVersion})
-        (void)DVSData_Remove(list.get(), name);
-    DVSwitch *sw = DVSState_SwitchFind(switchId);
-    if (!sw) {
-        Message(kError, "DVS %s acquire failed\n", switchId);
-        return HYP_NOT_FOUND;
-    }
-    Replace(sw->hostPropList, hostList);
-    Replace(sw->globalPropList, globalList);
-    status = AddPorts(sw, list.get());
-    if (status != HYP_OK && create) (void)DVSStateSwitchRemove(switchId);
-    Message(status == HYP_OK ? kTrace : kError, "Deserialize dvs %s return %s\n", switchId, Text(status));
-    return status;
+    return ReadSwitch(switchId, SourceOf(buf, len));
 }
 
 HYP_ReturnStatus DVSState_ConfigDeserialize(const void *buf, uint32_t len) {
     Message(kTrace, "DVSState_ConfigDeserialize\n");
-    OwnedList state;
-    HYP_ReturnStatus status = DeserializeOwned(state, buf, len);
+    data::InPlaceList state;
+    HYP_ReturnStatus status =
+        state.Open(SourceOf(buf, len).bytes, data::kDeserializeTypeMask, {}, data::PartSums::Yes);
     if (status != HYP_OK) {
         Message(kError, "DVSState_ConfigDeserialize failed %s\n", Text(status));
         return status;
     }
-    for (DVSDataEntry *entry = nullptr; DVSData_Next(state.get(), entry, &entry) == HYP_OK;) {
-        void *data = nullptr;
-        const uint32_t size = DVSData_Data(entry, &data);
-        status = DVSState_SwitchDeserialize(DVSData_Name(entry), data, size);
+    for (data::EntryRef entry; state.Next(&entry);) {
+        status = ReadSwitch(NameText(entry.name), SourceOf(entry));
         if (status == HYP_OK) continue;
         Message(kError, "DVSState_SwitchDeserialize failed %s\n", Text(status));
         (void)DVSState_ConfigReset(); // the failure that led here is the one to tell

@@ -1,0 +1,48 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Blocks for serialized state (output_block.h), on the process heap.
+
+#include "dvsstate/output_block.h"
+
+#include <cstdlib>
+
+#include <sys/mman.h>
+
+namespace dvs::state {
+
+OutputBlock::~OutputBlock() {
+    if (own_) freeFn_(own_);
+}
+
+HYP_ReturnStatus OutputBlock::Reserve(uint64_t size) {
+    if (size > UINT32_MAX) return HYP_OK;
+    void *block = *buf_;
+    if (block) {
+        if (*len_ < size) return HYP_OK;
+    } else {
+        block = own_ = allocFn_(size);
+        if (!block) return HYP_NO_MEMORY;
+    }
+    bytes_ = {static_cast<uint8_t *>(block), static_cast<std::size_t>(size)};
+    return HYP_OK;
+}
+
+void OutputBlock::HandOver() {
+    *buf_ = bytes_.data();
+    *len_ = static_cast<uint32_t>(bytes_.size());
+    own_ = nullptr;
+}
+
+void *StateAlloc(uint64_t size) {
+    constexpr uint64_t kHugePage = 2u << 20;
+    void *block = std::malloc(size);
+    if (block && size >= 2 * kHugePage) {
+        // Only whole huge pages inside the block: what lies around it is the heap's. Merely advice, so a
+        // refusal is no failure.
+        const uint64_t start = (reinterpret_cast<uintptr_t>(block) + kHugePage - 1) & ~(kHugePage - 1);
+        const uint64_t end = (reinterpret_cast<uintptr_t>(block) + size) & ~(kHugePage - 1);
+        (void)madvise(reinterpret_cast<void *>(start), end - start, MADV_HUGEPAGE);
+    }
+    return block;
+}
+
+} // namespace dvs::state
