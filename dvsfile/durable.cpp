@@ -217,14 +217,15 @@ HYP_ReturnStatus WriteFailure(const char *path) {
 }
 
 /// The part under the directory's lock.
-HYP_ReturnStatus ReplaceFile(const char *path, int directory, const char *base, std::string_view bytes) {
+HYP_ReturnStatus ReplaceFile(const char *path, int directory, const char *base, std::string_view bytes,
+                             uint64_t paddedSize) {
     static constexpr std::array<char, kBlockSize> kPadding{};
     if (*base == '\0') errno = EISDIR;
     if (*base == '\0' || IsSpecialFile(directory, base)) return OpenFailure(path);
     RemoveStale(directory, base);
     TempFile temp(directory);
     if (!temp.Create(base)) return OpenFailure(path);
-    const std::string_view padding(kPadding.data(), PaddedSize(bytes.size()) - bytes.size());
+    const std::string_view padding(kPadding.data(), paddedSize - bytes.size());
     if (!temp.WriteAt(0, bytes) || !temp.WriteAt(bytes.size(), padding)) return WriteFailure(path);
     if (!temp.Flush()) return WriteFailure(path);
     if (!temp.RenameTo(base)) {
@@ -237,7 +238,8 @@ HYP_ReturnStatus ReplaceFile(const char *path, int directory, const char *base, 
 
 } // namespace
 
-HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len, milliseconds lockWait) {
+HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len, milliseconds lockWait,
+                              Padding padding) {
     if (len == 0 || !buf || PaddedSize(len) >= kSizeLimit) return HYP_BAD_PARAM;
     if (!path) return HYP_NO_MEMORY;
     TargetPath target;
@@ -249,11 +251,12 @@ HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len, m
         Report("failed to lock the directory of dvsfile %s, error: %s\n", path, Err_Errno2String(errno));
         return HYP_IO_ERROR;
     }
-    return ReplaceFile(path, directory.Get(), target.Base(), {static_cast<const char *>(buf), len});
+    return ReplaceFile(path, directory.Get(), target.Base(), {static_cast<const char *>(buf), len},
+                       padding == Padding::ToBlock ? PaddedSize(len) : len);
 }
 
 } // namespace dvs::file
 
 extern "C" HYP_ReturnStatus DVSFile_WriteDurable(const char *path, const void *buf, uint32_t len) {
-    return dvs::file::WriteDurable(path, buf, len, dvs::file::kLockWait);
+    return dvs::file::WriteDurable(path, buf, len, dvs::file::kLockWait, dvs::file::Padding::ToBlock);
 }

@@ -60,9 +60,16 @@ private:
 /// Gives one message to the sink or to the host's log. State-file messages are not guarded by a debug level.
 void Report(const char *format, ...) __attribute__((format(printf, 1, 2)));
 
-/// DVSFile_WriteDurable with the time it waits for the directory's lock.
+/// What stands behind the bytes of a file.
+enum class Padding {
+    ToBlock, ///< zeros up to the next multiple of kBlockSize: a state file
+    None     ///< nothing: any other file that wants the same durability
+};
+
+/// DVSFile_WriteDurable with the time it waits for the directory's lock, for files of either kind.
 [[nodiscard]] HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len,
-                                            std::chrono::milliseconds lockWait);
+                                            std::chrono::milliseconds lockWait,
+                                            Padding padding = Padding::ToBlock);
 
 } // namespace dvs::file
 
