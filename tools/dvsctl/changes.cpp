@@ -1,0 +1,279 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Differences on their way out: as a list for people, as a table, as JSON.
+
+#include <array>
+
+#include <boost/json/array.hpp>
+#include <boost/json/object.hpp>
+#include <boost/json/value.hpp>
+#include <fmt/format.h>
+
+#include "tools/dvsctl/compare.h"
+#include "tools/dvsctl/filter.h"
+#include "tools/dvsctl/json_codec.h"
+#include "tools/dvsctl/options.h"
+#include "tools/dvsctl/output.h"
+#include "tools/dvsctl/show.h"
+#include "tools/dvsctl/table.h"
+#include "tools/dvsctl/value.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+namespace json = boost::json;
+
+struct KindRow {
+    const char *word;
+    const char *sign;
+    Style style;
+};
+
+// In the order of ChangeKind.
+constexpr KindRow kKinds[] = {
+    {"added", "+", Style::Added},
+    {"removed", "-", Style::Removed},
+    {"changed", "~", Style::Changed},
+    {"reordered", "%", Style::Changed},
+};
+
+// In the order of Subject.
+constexpr const char *kSubjects[] = {"switch", "field", "list", "port", "property", "entry"};
+
+const KindRow &RowOf(const Change &change) {
+    return kKinds[static_cast<std::size_t>(change.kind)];
+}
+
+const char *SubjectWord(const Change &change) {
+    return kSubjects[static_cast<std::size_t>(change.subject)];
+}
+
+const Property &Either(const Change &change) {
+    return change.before ? *change.before : *change.after;
+}
+
+const char *FieldLabel(const Property &field) {
+    const Role role = static_cast<const Entry &>(field).role;
+    return role == Role::Version ? "version" : role == Role::ClassName ? "class" : "max_ports";
+}
+
+std::string Name(const Change &change) {
+    if (!change.before && !change.after) return "";
+    if (change.subject == Subject::Field) return FieldLabel(Either(change));
+    return ShowName(Either(change).name);
+}
+
+// What one side holds, for the column or the arrow.
+std::string Side(const Change &change, const Property *side, const Options &options) {
+    if (!side) return "";
+    switch (change.subject) {
+    case Subject::Switch: {
+        const auto &sw = static_cast<const Switch &>(*side);
+        return fmt::format("{}, {}, {}", ShowName(sw.ClassName()), Count(sw.PortCount(), "port"),
+                           Count(sw.PropertyCount(), "property", "properties"));
+    }
+    case Subject::Field:
+        return ShowField(static_cast<const Entry &>(*side), options.full);
+    case Subject::Port: {
+        const auto &port = static_cast<const Entry &>(*side);
+        return fmt::format("{}, {}", ShowKind(port.kind), Count(port.list.size(), "property", "properties"));
+    }
+    case Subject::List:
+        return Count(static_cast<const Entry &>(*side).list.size(), "property", "properties");
+    case Subject::Property:
+    case Subject::Entry:
+        break;
+    }
+    return ShowValue(side->value, options.full);
+}
+
+// "1500 -> 9000 (type 0x10 -> 0x20)": only what differs.
+std::string Sides(const Change &change, const Options &options) {
+    if (change.kind == ChangeKind::Reordered) return "the order differs";
+    std::string before = Side(change, change.before, options), after = Side(change, change.after, options);
+    if (!change.before || !change.after) return before + after;
+    if (before == after && AsText(change.before->value) != AsText(change.after->value) &&
+        (change.subject == Subject::Property || change.subject == Subject::Entry)) {
+        // Cut at the same place: what differs lies behind it.
+        before = ShowValue(change.before->value, true);
+        after = ShowValue(change.after->value, true);
+    }
+    std::string text = before == after ? before : before + " -> " + after;
+    if (change.before->type != change.after->type)
+        text += fmt::format(" (type 0x{:02x} -> 0x{:02x})", change.before->type, change.after->type);
+    return text;
+}
+
+std::string PortTitle(const Entry &port) {
+    return fmt::format("port {} ({})", ShowName(port.name), ShowKind(port.kind));
+}
+
+/// Prints the headings under which a change stands, each once.
+class Listing {
+public:
+    Listing(const Options &options, Output &out) : options_(options), out_(out) {}
+
+    void Add(const Change &change) {
+        const bool isSwitch = change.subject == Subject::Switch;
+        if (!isSwitch) Enter(0, switch_, change.sw, "switch " + ShowName(change.sw->name));
+        if (isSwitch) switch_ = nullptr;
+        if (isSwitch || !change.sw) container_ = nullptr;
+        if (change.subject == Subject::Property) {
+            if (change.port)
+                Enter(1, container_, change.port, PortTitle(*change.port));
+            else
+                Enter(1, container_, static_cast<const void *>(change.list), change.list);
+        } else {
+            container_ = nullptr;
+        }
+        const std::size_t depth = isSwitch ? 0 : change.subject == Subject::Property ? 2 : 1;
+        const std::string line =
+            RowOf(change).sign + std::string(" ") + Label(change) + Sides(change, options_);
+        out_.Write(std::string(depth * 2, ' ') + out_.Paint(RowOf(change).style, line) + "\n");
+    }
+
+private:
+    static std::string Label(const Change &change) {
+        const std::string name = Name(change);
+        const std::string what =
+            change.subject == Subject::Switch ? "switch " + name
+            : change.subject == Subject::Port ? "port " + name
+            : change.subject == Subject::List ? std::string("list ") + change.list
+            : name.empty() && change.kind == ChangeKind::Reordered && change.subject == Subject::Entry
+                ? "entries"
+                : name;
+        return what.empty() || what == "switch " ? what : what + ": ";
+    }
+
+    void Enter(std::size_t depth, const void *&current, const void *next, const std::string &title) {
+        if (current == next) return;
+        current = next;
+        if (depth == 0) container_ = nullptr;
+        out_.Write(std::string(depth * 2, ' ') +
+                   out_.Paint(depth == 0 ? Style::Heading : Style::Name, title) + "\n");
+    }
+
+    const Options &options_;
+    Output &out_;
+    const void *switch_ = nullptr;
+    const void *container_ = nullptr;
+};
+
+constexpr Column kColumns[] = {
+    // name, right, by default
+    {"change", false, true}, {"what", false, true}, {"switch", false, true}, {"port", false, true},
+    {"list", false, true},   {"name", false, true}, {"before", false, true}, {"after", false, true},
+    {"type-before"},         {"type-after"},
+};
+
+void WriteTable(const std::vector<Change> &changes, const Options &options, Output &out) {
+    Table table(kColumns, options);
+    const auto type = [](const Property *side) {
+        return side ? fmt::format("0x{:02x}", side->type) : std::string();
+    };
+    for (const Change &change : changes)
+        table.Add({{RowOf(change).word, RowOf(change).style},
+                   {SubjectWord(change)},
+                   {change.sw ? ShowName(change.sw->name) : ""},
+                   {change.port ? ShowName(change.port->name) : ""},
+                   {change.list},
+                   {Name(change)},
+                   {Side(change, change.before, options)},
+                   {Side(change, change.after, options)},
+                   {type(change.before)},
+                   {type(change.after)}});
+    table.Write(out);
+}
+
+json::value SideJson(const Change &change, const Property &side) {
+    switch (change.subject) {
+    case Subject::Port: {
+        const auto &port = static_cast<const Entry &>(side);
+        json::object object;
+        object["kind"] = ShowKind(port.kind);
+        object["properties"] = port.list.size();
+        return object;
+    }
+    case Subject::Switch: {
+        const auto &sw = static_cast<const Switch &>(side);
+        json::object object;
+        object["class"] = ValidUtf8(sw.ClassName());
+        object["ports"] = sw.PortCount();
+        object["properties"] = sw.PropertyCount();
+        return object;
+    }
+    case Subject::List: {
+        json::object object;
+        object["properties"] = static_cast<const Entry &>(side).list.size();
+        return object;
+    }
+    case Subject::Field: {
+        const auto &field = static_cast<const Entry &>(side);
+        if (field.role == Role::ClassName)
+            return json::value(ValidUtf8(AsText(field.value).substr(0, AsText(field.value).find('\0'))));
+        if (const auto number = AsNumber(field.value)) return *number;
+        break;
+    }
+    case Subject::Property:
+    case Subject::Entry:
+        break;
+    }
+    return ValueToJson(side.value);
+}
+
+json::object ChangeJson(const Change &change) {
+    json::object object;
+    object["change"] = RowOf(change).word;
+    object["what"] = SubjectWord(change);
+    if (change.sw) object["switch"] = NameToJson(change.sw->name);
+    if (change.port) {
+        object["port"] = NameToJson(change.port->name);
+        object["kind"] = ShowKind(change.port->kind);
+    }
+    if (*change.list) object["list"] = change.list;
+    if (change.kind == ChangeKind::Reordered) return object;
+    if (change.subject == Subject::Field)
+        object["name"] = FieldLabel(Either(change));
+    else if (change.subject != Subject::Switch && change.subject != Subject::Port &&
+             change.subject != Subject::List)
+        object["name"] = NameToJson(Either(change).name);
+    if (change.before) object["before"] = SideJson(change, *change.before);
+    if (change.after) object["after"] = SideJson(change, *change.after);
+    if (change.before && change.after && change.before->type != change.after->type) {
+        object["type_before"] = change.before->type;
+        object["type_after"] = change.after->type;
+    }
+    return object;
+}
+
+} // namespace
+
+std::string ShowChangeCount(const std::vector<Change> &changes) {
+    std::array<std::size_t, std::size(kKinds)> counts{};
+    for (const Change &change : changes)
+        ++counts[static_cast<std::size_t>(change.kind)];
+    std::string text;
+    for (std::size_t i = 0; i < counts.size(); ++i)
+        if (counts[i] > 0)
+            text += fmt::format("{}{} {}", text.empty() ? "" : ", ", counts[i], kKinds[i].word);
+    return text.empty() ? "no differences" : text;
+}
+
+void WriteChanges(const std::vector<Change> &changes, const Options &options, Output &out) {
+    if (options.columns) {
+        WriteTable(changes, options, out);
+        return;
+    }
+    Listing listing(options, out);
+    for (const Change &change : changes)
+        listing.Add(change);
+}
+
+json::array ChangesJson(const std::vector<Change> &changes) {
+    json::array array;
+    for (const Change &change : changes)
+        array.emplace_back(ChangeJson(change));
+    return array;
+}
+
+} // namespace dvs::ctl

@@ -1,0 +1,214 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The command line: the table of verbs handed to the parser, and the one place where an error is shown and
+// becomes an exit status. The only file that includes the parser.
+
+#include "tools/dvsctl/cli.h"
+
+#include <csignal>
+#include <cmath>
+#include <cstring>
+#include <new>
+
+#include <boost/json/object.hpp>
+#include <boost/json/value.hpp>
+#include <CLI/CLI.hpp>
+
+#include "tools/dvsctl/command.h"
+#include "tools/dvsctl/envelope.h"
+#include "tools/dvsctl/help.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+struct Parsed {
+    const Command *command = nullptr;
+    bool help = false, version = false;
+};
+
+void AddRow(CLI::App &app, const OptionRow &row, Options &options) {
+    std::visit(
+        [&](auto member) {
+            using Value = std::remove_reference_t<decltype(options.*member)>;
+            if constexpr (std::is_same_v<Value, bool>)
+                app.add_flag(row.name, options.*member);
+            else if constexpr (std::is_same_v<Value, std::string>)
+                app.add_option(row.name, options.*member)->required();
+            else
+                app.add_option(row.name, options.*member)->take_last();
+        },
+        row.target);
+}
+
+CLI::App *AddWord(CLI::App &at, const std::string &word) {
+    CLI::App *app = at.add_subcommand(word)->fallthrough();
+    app->set_help_flag(); // help is this program's own
+    return app;
+}
+
+// "store list" is the subcommand "list" of the group "store", which is made when its first verb comes.
+CLI::App *AddCommand(CLI::App &root, const Command &command) {
+    CLI::App *at = &root;
+    std::string_view name = command.name;
+    for (std::size_t space; (space = name.find(' ')) != std::string_view::npos;
+         name.remove_prefix(space + 1)) {
+        const std::string word(name.substr(0, space));
+        const auto groups = at->get_subcommands([&](CLI::App *app) { return app->get_name() == word; });
+        at = !groups.empty() ? groups.front() : AddWord(*at, word)->require_subcommand(1);
+    }
+    return AddWord(*at, std::string(name));
+}
+
+void ExplainUnknownVerb(Error &error, int argc, char **argv) {
+    for (int i = 1; i < argc; ++i) {
+        if (argv[i][0] == '-') continue;
+        const std::string nearest = NearestCommand(argv[i]);
+        for (const Command &command : Commands())
+            if (std::string_view(command.name).substr(0, std::string_view(command.name).find(' ')) == argv[i])
+                return;
+        error.title = "there is no verb \"" + std::string(argv[i]) + "\"";
+        error.why = nearest.empty() ? "" : "perhaps \"" + nearest + "\" was meant";
+        return;
+    }
+    error.title = "no verb was given";
+}
+
+void CheckOptions(const Options &options) {
+    if (!std::isfinite(options.timeout) || options.timeout < 0)
+        throw Error(Exit::Usage, "--timeout wants a number of seconds that is not negative");
+    if (options.quiet && options.verbose)
+        throw Error(Exit::Usage, "--quiet and --verbose exclude each other");
+}
+
+// Fills `parsed` as far as it gets, also when it throws: an error names its verb.
+void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
+    CLI::App root;
+    root.set_help_flag();
+    root.add_flag("-h,--help", parsed.help);
+    root.add_flag("--version", parsed.version);
+    for (const OptionRow &row : CommonOptions())
+        AddRow(root, row, options);
+    std::vector<std::pair<CLI::App *, const Command *>> verbs;
+    for (const Command &command : Commands()) {
+        CLI::App *verb = AddCommand(root, command);
+        for (const OptionRow &row : command.options)
+            AddRow(*verb, row, options);
+        verbs.emplace_back(verb, &command);
+    }
+    // Which verb the words name is known even when its operands are missing, as with `dvsctl show --help`.
+    const auto find = [&] {
+        for (const auto &[verb, command] : verbs)
+            if (verb->parsed()) parsed.command = command;
+    };
+    try {
+        root.parse(argc, argv);
+        find();
+    } catch (const CLI::ParseError &failure) {
+        find();
+        if (parsed.help || parsed.version) return;
+        Error error(Exit::Usage, failure.what());
+        if (!parsed.command) ExplainUnknownVerb(error, argc, argv);
+        error.next =
+            parsed.command ? "dvsctl " + std::string(parsed.command->name) + " --help" : "dvsctl --help";
+        error.next += " shows what there is";
+        throw Error(error);
+    }
+    if (parsed.help || parsed.version) return;
+    if (!parsed.command) {
+        Error error(Exit::Usage, "no verb was given");
+        ExplainUnknownVerb(error, argc, argv);
+        error.next = "dvsctl --help shows what there is";
+        throw Error(error);
+    }
+    CheckOptions(options);
+}
+
+Exit ShowAbout(const Parsed &parsed, const Options &options, Output &out) {
+    const std::string text = parsed.version   ? "dvsctl " DVSCTL_VERSION "\n"
+                             : parsed.command ? CommandHelp(*parsed.command)
+                                              : OverviewHelp();
+    if (options.json) {
+        boost::json::object document = Envelope(parsed.command ? parsed.command->name : "");
+        if (parsed.version)
+            document["version"] = DVSCTL_VERSION;
+        else
+            document["help"] = text;
+        out.Json(std::move(document));
+    } else {
+        out.Write(text);
+    }
+    return Exit::Done;
+}
+
+// Errors of a usage that could not be parsed come as JSON too when the words ask for it.
+bool AsksForJson(int argc, char **argv) {
+    for (int i = 1; i < argc && std::strcmp(argv[i], "--") != 0; ++i)
+        if (std::strcmp(argv[i], "--json") == 0) return true;
+    return false;
+}
+
+// `diff` keeps 1 for "different".
+Exit StatusFor(const Parsed &parsed, Exit status) {
+    const bool isDiff = parsed.command && std::strcmp(parsed.command->name, "diff") == 0;
+    return isDiff && status == Exit::Failed ? Exit::DiffTrouble : status;
+}
+
+Exit Report(Error error, const Parsed &parsed, bool asJson, Output &out) {
+    error.status = StatusFor(parsed, error.status);
+    out.Discard();
+    if (error.isSilent) return error.status;
+    if (asJson) {
+        boost::json::object document = Envelope(parsed.command ? parsed.command->name : "");
+        document["error"] = ErrorJson(error);
+        out.Json(std::move(document));
+        try {
+            out.Finish();
+            return error.status;
+        } catch (const Error &) {
+            // Standard output is gone; people get the text instead.
+        }
+    }
+    out.Diagnose(ErrorText(error, out.ErrorColour()));
+    return error.status;
+}
+
+Error OutOfMemory() {
+    return Error(Exit::Failed, "not enough memory").Try("free memory, or look at a part: --switch, --port");
+}
+
+} // namespace
+
+int RunCommandLine(int argc, char **argv) {
+    ReserveStandardDescriptors();
+    std::signal(SIGPIPE, SIG_IGN); // a reader that went away is an error like any other
+    Options options;
+    Output out;
+    LogCapture log;
+    Parsed parsed;
+    const auto run = [&]() -> Exit {
+        Parse(argc, argv, options, parsed);
+        if (parsed.help || parsed.version) return ShowAbout(parsed, options, out);
+        out.Configure(options);
+        log.SetVerbose(options.verbose);
+        Context context{options, out, log, Deadline(options.timeout)};
+        return parsed.command->run(context);
+    };
+    const auto report = [&](Error error) {
+        if (error.messages.empty()) error.messages = log.Take();
+        return static_cast<int>(
+            Report(std::move(error), parsed, options.json || AsksForJson(argc, argv), out));
+    };
+    try {
+        const Exit status = run();
+        out.Finish();
+        return static_cast<int>(status);
+    } catch (const Error &error) {
+        return report(error);
+    } catch (const std::bad_alloc &) {
+        return report(OutOfMemory());
+    } catch (const std::exception &failure) {
+        return report(Error(Exit::Failed, "unexpected trouble").Because(failure.what()));
+    }
+}
+
+} // namespace dvs::ctl

@@ -1,0 +1,152 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// `dvsctl copy`: a verified state from one source to another. Nothing is written before everything has been
+// read and judged; what then goes wrong leaves the target as it was.
+
+#include <boost/json/array.hpp>
+#include <boost/json/object.hpp>
+#include <boost/json/value.hpp>
+#include <fmt/format.h>
+
+#include "tools/dvsctl/commands.h"
+#include "tools/dvsctl/compare.h"
+#include "tools/dvsctl/encode.h"
+#include "tools/dvsctl/envelope.h"
+#include "tools/dvsctl/show.h"
+#include "tools/dvsctl/source.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+/// What the target holds before the copy, as far as it can be told.
+struct Target {
+    bool exists = false;
+    bool isSound = true;
+    std::string damage;
+    LoadedState loaded;
+};
+
+Target LookAtTarget(Context &context, Source &to) {
+    Target target;
+    if (to.IsStandardOutput()) return target;
+    std::optional<StateBytes> read;
+    try {
+        read = to.Read(context, ReadMode::Tolerant);
+        target.exists = read.has_value();
+    } catch (const Error &error) {
+        if (error.status != Exit::Malformed) throw;
+        target.exists = true;
+        target.damage = error.why;
+    }
+    if (read && read->bytes.empty()) target.damage = read->complaint;
+    if (read && !read->bytes.empty()) {
+        const state::StateVerdict verdict = state::VerifyState(read->bytes);
+        if (verdict.first)
+            target.damage = ShowFault(verdict.located);
+        else
+            target.loaded.raw = std::move(*read);
+    }
+    target.isSound = target.damage.empty();
+    target.loaded.state = ParseState(target.loaded.raw.bytes);
+    return target;
+}
+
+void RefuseIfTaken(const Options &options, const Source &to, const Target &target) {
+    if (!options.noReplace || !target.exists) return;
+    throw Error(Exit::Failed, "the target holds something already")
+        .In(to.Name())
+        .Because("--no-replace was given")
+        .Try("name another target, or leave --no-replace out");
+}
+
+struct Outcome {
+    const Source &from, &to;
+    StateCount count;
+    std::size_t bytes;
+    bool isWritten;
+};
+
+void ReportPlan(Context &context, const Outcome &outcome, const Target &target,
+                const std::vector<Change> &changes) {
+    Output &out = context.out;
+    if (!target.exists)
+        out.Write(fmt::format("would create {}\n", ShowName(outcome.to.Name())));
+    else if (!target.isSound)
+        out.Write(fmt::format("would replace {}, which holds no sound state: {}\n",
+                              ShowName(outcome.to.Name()), Escape(target.damage)));
+    else if (changes.empty())
+        out.Write(fmt::format("would change nothing in {}\n", ShowName(outcome.to.Name())));
+    else
+        out.Write(
+            fmt::format("would change {}: {}\n", ShowName(outcome.to.Name()), ShowChangeCount(changes)));
+    WriteChanges(changes, context.options, out);
+    out.Remark("nothing was written (--dry-run)\n");
+}
+
+void Report(Context &context, const Outcome &outcome, const Target &target,
+            const std::vector<Change> &changes) {
+    const Options &options = context.options;
+    if (!options.json) {
+        if (options.dryRun)
+            ReportPlan(context, outcome, target, changes);
+        else if (!outcome.to.IsStandardOutput())
+            context.out.Remark(fmt::format("copied {} from {} to {}\n", ShowCount(outcome.count),
+                                           ShowName(outcome.from.Name()), ShowName(outcome.to.Name())));
+        return;
+    }
+    boost::json::object document = Envelope("copy");
+    document["from"] = ValidUtf8(outcome.from.Name());
+    document["to"] = ValidUtf8(outcome.to.Name());
+    document["is_written"] = outcome.isWritten;
+    document["bytes"] = outcome.bytes;
+    document["summary"] = CountJson(outcome.count);
+    if (options.dryRun) {
+        document["target_exists"] = target.exists;
+        document["target_is_sound"] = target.exists && target.isSound;
+        document["changes"] = ChangesJson(changes);
+    }
+    context.out.Json(std::move(document));
+}
+
+Exit NothingToCopy(Context &context, const Source &from, const Source &to) {
+    if (!context.options.json)
+        context.out.Remark(fmt::format("nothing to copy: {} is not there\n", ShowName(from.Name())));
+    else
+        Report(context, {from, to, {}, 0, false}, {}, {});
+    return Exit::Done;
+}
+
+} // namespace
+
+Exit RunCopy(Context &context) {
+    const Options &options = context.options;
+    const auto from = OpenSource(options.source), to = OpenSource(options.target);
+    if (options.json && to->IsStandardOutput())
+        throw Error(Exit::Usage, "--json and the target json:- both want standard output")
+            .Try("leave --json out, or name a file as the target");
+    if (options.mayExist && options.noReplace)
+        throw Error(Exit::Usage, "--may-exist and --no-replace exclude each other");
+
+    // Here an absent source is not an empty state: copying that would empty the target.
+    std::optional<StateBytes> read = from->Read(context, ReadMode::Strict);
+    if (!read && options.ifExists) return NothingToCopy(context, *from, *to);
+    if (!read) throw Error(AbsentError(*from));
+    const LoadedState loaded = JudgeState(*from, std::move(*read));
+    const Bytes state = Bytes(loaded.raw.bytes).first(loaded.state.size);
+    Outcome outcome{*from, *to, CountState(loaded.state), state.size(), false};
+
+    Target target;
+    std::vector<Change> changes;
+    if (options.dryRun || options.noReplace) target = LookAtTarget(context, *to);
+    RefuseIfTaken(options, *to, target);
+    if (options.dryRun) {
+        changes = Compare(target.loaded.state, loaded.state, {});
+    } else {
+        to->Write(context, state);
+        outcome.isWritten = true;
+    }
+    Report(context, outcome, target, changes);
+    return Exit::Done;
+}
+
+} // namespace dvs::ctl

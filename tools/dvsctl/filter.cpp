@@ -1,0 +1,95 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Narrowing a state down.
+
+#include "tools/dvsctl/filter.h"
+
+#include "dvsstate/names.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+// Prefers ids: an alias counts only where nothing has that id, so that every switch and port can be reached.
+template <typename Item, typename IsCandidate>
+bool KeepNamed(std::vector<Item> &items, std::string_view name, IsCandidate isCandidate) {
+    bool hasId = false, found = false;
+    for (const Item &item : items)
+        hasId = hasId || (isCandidate(item) && item.name == name);
+    std::erase_if(items, [&](const Item &item) {
+        const bool keep = isCandidate(item) && (item.name == name || (!hasId && AliasOf(item) == name));
+        found = found || keep;
+        return !keep;
+    });
+    return found;
+}
+
+[[noreturn]] void ThrowNotThere(const Source &source, std::string what, std::string_view name,
+                                std::string next) {
+    throw Error(Exit::NotThere, "there is no " + what + " \"" + std::string(name) + "\"")
+        .In(source.Name())
+        .Try(std::move(next));
+}
+
+bool KeepPorts(State &state, std::string_view name) {
+    bool found = false;
+    for (Switch &sw : state.switches)
+        found |= KeepNamed(sw.entries, name, [](const Entry &e) { return e.role == Role::Port; });
+    std::erase_if(state.switches, [](const Switch &sw) { return sw.entries.empty(); });
+    return found;
+}
+
+bool KeepProperties(State &state, std::string_view pattern) {
+    bool found = false;
+    for (Switch &sw : state.switches) {
+        for (Entry &entry : sw.entries) {
+            std::erase_if(entry.list, [&](const Property &p) { return !GlobMatch(pattern, p.name); });
+            found = found || !entry.list.empty();
+        }
+        std::erase_if(sw.entries, [](const Entry &e) { return e.list.empty(); });
+    }
+    std::erase_if(state.switches, [](const Switch &sw) { return sw.entries.empty(); });
+    return found;
+}
+
+} // namespace
+
+std::string_view TextOf(const std::vector<Property> &list, std::string_view name) {
+    for (const Property &property : list) {
+        if (property.name != name) continue;
+        const std::string_view text = AsText(property.value);
+        return text.substr(0, text.find('\0'));
+    }
+    return {};
+}
+
+std::string_view AliasOf(const Switch &sw) {
+    const Entry *global = sw.Find(Role::GlobalList);
+    return global ? TextOf(global->list, state::kSwitchAlias) : std::string_view();
+}
+
+std::string_view AliasOf(const Entry &port) {
+    return TextOf(port.list, state::kPortAlias);
+}
+
+bool IsSwitch(const Switch &sw, std::string_view text) {
+    return sw.name == text || AliasOf(sw) == text;
+}
+
+bool IsPort(const Entry &port, std::string_view text) {
+    return port.role == Role::Port && (port.name == text || AliasOf(port) == text);
+}
+
+void ApplyFilter(const Options &options, const Source &source, State &state) {
+    const std::string list = "dvsctl show " + source.Name() + " lists what there is";
+    if (options.switchId &&
+        !KeepNamed(state.switches, *options.switchId, [](const Switch &) { return true; }) &&
+        !options.ifExists)
+        ThrowNotThere(source, "switch", *options.switchId, list);
+    if (options.portId && !KeepPorts(state, *options.portId) && !options.ifExists)
+        ThrowNotThere(source, "port", *options.portId, list);
+    if (options.props && !KeepProperties(state, *options.props) && !options.ifExists)
+        ThrowNotThere(source, "property that matches", *options.props,
+                      list + "; quote the pattern for the shell");
+}
+
+} // namespace dvs::ctl

@@ -1,0 +1,132 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// `dvsctl hexdump`: every byte of a state with what it is, nested buffers inside their entries. Goes on
+// behind a fault as far as the bytes can be told apart, and says where the faults are.
+
+#include <boost/json/array.hpp>
+#include <boost/json/object.hpp>
+#include <boost/json/value.hpp>
+#include <fmt/format.h>
+
+#include "tools/dvsctl/commands.h"
+#include "tools/dvsctl/envelope.h"
+#include "tools/dvsctl/hexdump.h"
+#include "tools/dvsctl/json_codec.h"
+#include "tools/dvsctl/source.h"
+#include "tools/dvsctl/value.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+constexpr std::size_t kLineBytes = 16;
+constexpr std::size_t kHexWidth = kLineBytes * 3 - 1;
+
+class TextWriter : public RangeWriter {
+public:
+    explicit TextWriter(Output &out) : out_(out) {}
+
+    void Range(const ByteRange &range) override {
+        const std::string indent(range.depth * 2, ' ');
+        for (std::size_t at = 0; at < range.bytes.size() || at == 0;) {
+            const Bytes rest = range.bytes.subspan(at);
+            const std::size_t zeros = ZeroLines(rest);
+            const Bytes line = rest.first(std::min(kLineBytes, rest.size()));
+            const std::string what = at == 0 ? indent + range.what : "";
+            if (at > 0 && zeros > kLineBytes) {
+                out_.Write(fmt::format("*         {} zero bytes\n", zeros));
+                at += zeros;
+                continue;
+            }
+            const std::string bytes =
+                fmt::format("{:<{}}  |{:<{}}|", Hex(line), kHexWidth, Characters(line), kLineBytes);
+            std::string text =
+                out_.Paint(Style::Dim, fmt::format("{:08x}", range.offset + at)) + "  " + bytes;
+            if (!what.empty()) text += "  " + out_.Paint(range.isWrong ? Style::Bad : Style::Plain, what);
+            out_.Write(text + "\n");
+            at += std::max<std::size_t>(line.size(), 1);
+        }
+    }
+
+    void Fault(std::size_t depth, const std::string &text) override {
+        out_.Write(std::string(10 + kHexWidth + 4 + kLineBytes + 2 + depth * 2, ' ') +
+                   out_.Paint(Style::Bad, "!! " + text) + "\n");
+    }
+
+private:
+    // Bytes of the whole lines of zeros that follow.
+    static std::size_t ZeroLines(Bytes bytes) {
+        std::size_t zeros = 0;
+        while (zeros < bytes.size() && bytes[zeros] == 0)
+            ++zeros;
+        return zeros == bytes.size() ? zeros : zeros / kLineBytes * kLineBytes;
+    }
+
+    static std::string Characters(Bytes bytes) {
+        std::string text;
+        for (const std::uint8_t byte : bytes)
+            text += byte >= 0x20 && byte < 0x7f ? static_cast<char>(byte) : '.';
+        return text;
+    }
+
+    Output &out_;
+};
+
+class JsonWriter : public RangeWriter {
+public:
+    void Range(const ByteRange &range) override {
+        boost::json::object object;
+        object["offset"] = range.offset;
+        object["size"] = range.bytes.size();
+        object["depth"] = range.depth;
+        object["what"] = range.what;
+        object["bytes"] = ToHexDigits(range.bytes);
+        if (range.isWrong) object["is_wrong"] = true;
+        ranges.emplace_back(std::move(object));
+    }
+    void Fault(std::size_t, const std::string &) override {}
+
+    boost::json::array ranges;
+};
+
+} // namespace
+
+Exit RunHexdump(Context &context) {
+    const Options &options = context.options;
+    const auto source = OpenSource(options.source);
+    const StateBytes read = ReadState(context, *source, ReadMode::Tolerant);
+    const state::StateVerdict verdict = state::VerifyState(read.bytes);
+    const bool damaged = verdict.first || !read.complaint.empty();
+    const DumpFilter filter{options.switchId, options.portId};
+    bool found;
+    if (options.json) {
+        JsonWriter writer;
+        found = DumpState(read.bytes, filter, writer);
+        boost::json::object document = Envelope("hexdump");
+        document["source"] = ValidUtf8(source->Name());
+        document["ranges"] = std::move(writer.ranges);
+        if (verdict.first)
+            document["error"] = ErrorJson(DamageError(*source, verdict));
+        else if (damaged)
+            document["error"] = ErrorJson(Error(Exit::Malformed, read.complaint));
+        if (found) context.out.Json(std::move(document));
+    } else {
+        TextWriter writer(context.out);
+        found = DumpState(read.bytes, filter, writer);
+        if (damaged) {
+            context.out.Write(fmt::format(
+                "damaged: {}\n", Escape(verdict.first ? ShowFault(verdict.located) : read.complaint)));
+            if (verdict.first)
+                context.out.Write(fmt::format(
+                    "  at:    {}byte offset {} (0x{:x})\n",
+                    verdict.located.path.depth > 0 ? Escape(ShowPath(verdict.located.path)) + ", " : "",
+                    verdict.located.offset, verdict.located.offset));
+        }
+    }
+    if (!found && !options.ifExists)
+        throw Error(Exit::NotThere, "there is no such switch or port to dump")
+            .In(source->Name())
+            .Try("dvsctl show " + source->Name() + " lists what there is");
+    return damaged ? Exit::Malformed : Exit::Done;
+}
+
+} // namespace dvs::ctl

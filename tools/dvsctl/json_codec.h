@@ -1,0 +1,45 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSCTL_JSON_CODEC_H
+#define DVSCTL_JSON_CODEC_H
+
+// The JSON form of states (docs/json-form.md): lossless for every sound state, and written so that people can
+// read and edit it. Encoding is in json_encode.cpp, decoding in json_decode.cpp.
+
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <boost/json/fwd.hpp>
+
+#include "tools/dvsctl/model.h"
+
+namespace dvs::ctl {
+
+/// A value by the form's rule: text, number, padded text, or bytes as hexadecimal digits or base64.
+boost::json::value ValueToJson(Bytes value);
+
+/// A name: a string where it is UTF-8, else its bytes.
+boost::json::value NameToJson(std::string_view name);
+
+boost::json::object PropertyToJson(const Property &property);
+
+/// The member "switches".
+boost::json::array SwitchesToJson(const State &state);
+
+/// The whole document as text.
+std::string StateToJsonText(const State &state);
+
+/// The serialized state that the document describes. Throws Error(Malformed) with the place in the document.
+std::vector<std::uint8_t> StateFromJsonText(std::string_view text);
+
+/// Longest value that is written as hexadecimal digits; longer ones are base64.
+inline constexpr std::size_t kMostHexBytes = 64;
+/// Widest slot of a list of names, for the same reason as below.
+inline constexpr std::size_t kMostSlotBytes = 128;
+/// Largest size of a padded text; keeps a short document from describing a huge value.
+inline constexpr std::size_t kMostPaddedBytes = 4096;
+
+} // namespace dvs::ctl
+
+#endif

@@ -1,0 +1,204 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The strict parser. The JSON library's own document builder keeps the last of several equal keys, silently;
+// here its event parser drives the same builder through a handler that knows the path and refuses the second
+// key.
+
+#include "tools/dvsctl/json_parse.h"
+
+#include <algorithm>
+#include <cctype>
+#include <string>
+#include <unordered_set>
+#include <vector>
+
+#include <boost/json/basic_parser_impl.hpp>
+#include <boost/json/monotonic_resource.hpp>
+#include <boost/json/value_stack.hpp>
+#include <fmt/format.h>
+
+#include "tools/dvsctl/error.h"
+#include "tools/dvsctl/text.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+namespace json = boost::json;
+using Code = json::error_code;
+using View = json::string_view;
+
+constexpr std::size_t kMostDepth = 32;
+
+// An object's keys are looked through one by one until there are more than this.
+constexpr std::size_t kFewKeys = 16;
+
+class Handler {
+public:
+    // Limits the event parser asks for; depth is its own option.
+    static constexpr std::size_t max_object_size = SIZE_MAX;
+    static constexpr std::size_t max_array_size = SIZE_MAX;
+    static constexpr std::size_t max_key_size = SIZE_MAX;
+    static constexpr std::size_t max_string_size = SIZE_MAX;
+
+    bool on_document_begin(Code &) {
+        stack_.reset(json::make_shared_resource<json::monotonic_resource>());
+        return true;
+    }
+    bool on_document_end(Code &) { return true; }
+
+    bool on_object_begin(Code &) {
+        levels_.emplace_back();
+        levels_.back().isObject = true;
+        return true;
+    }
+    bool on_object_end(std::size_t count, Code &) {
+        stack_.push_object(count);
+        return Leave();
+    }
+    bool on_array_begin(Code &) {
+        levels_.emplace_back();
+        return true;
+    }
+    bool on_array_end(std::size_t count, Code &) {
+        stack_.push_array(count);
+        return Leave();
+    }
+
+    bool on_key_part(View part, std::size_t, Code &) {
+        key_.append(part.data(), part.size());
+        stack_.push_chars(part);
+        return true;
+    }
+    bool on_key(View part, std::size_t, Code &code) {
+        key_.append(part.data(), part.size());
+        stack_.push_key(part);
+        const bool isNew = levels_.back().AddKey(std::move(key_));
+        key_.clear();
+        if (!isNew) {
+            why_ = "the key stands there twice";
+            code = json::make_error_code(json::error::syntax);
+        }
+        return isNew;
+    }
+
+    bool on_string_part(View part, std::size_t, Code &) {
+        stack_.push_chars(part);
+        return true;
+    }
+    bool on_string(View part, std::size_t, Code &) {
+        stack_.push_string(part);
+        return Done();
+    }
+    bool on_number_part(View, Code &) { return true; }
+    bool on_int64(std::int64_t value, View, Code &) {
+        stack_.push_int64(value);
+        return Done();
+    }
+    bool on_uint64(std::uint64_t value, View, Code &) {
+        stack_.push_uint64(value);
+        return Done();
+    }
+    bool on_double(double value, View, Code &) {
+        stack_.push_double(value);
+        return Done();
+    }
+    bool on_bool(bool value, Code &) {
+        stack_.push_bool(value);
+        return Done();
+    }
+    bool on_null(Code &) {
+        stack_.push_null();
+        return Done();
+    }
+    bool on_comment_part(View, Code &) { return true; }
+    bool on_comment(View, Code &) { return true; }
+
+    json::value Take() { return stack_.release(); }
+
+    /// The reason of a refusal of this handler's own; empty when it was the parser's.
+    const std::string &Why() const { return why_; }
+
+    /// Where the parser is.
+    std::string Path() const {
+        std::string path = "$";
+        for (const Level &level : levels_)
+            path += !level.isObject      ? fmt::format("[{}]", level.count)
+                    : level.keys.empty() ? ""
+                                         : "." + level.keys.back();
+        return path;
+    }
+
+private:
+    struct Level {
+        bool isObject = false;
+        std::size_t count = 0;                 // elements that are complete
+        std::vector<std::string> keys;         // in order; the last one is current
+        std::unordered_set<std::string> index; // of the same keys, once there are many
+
+        bool AddKey(std::string &&key) {
+            bool isNew;
+            if (keys.size() < kFewKeys) {
+                isNew = std::find(keys.begin(), keys.end(), key) == keys.end();
+            } else {
+                if (index.empty()) index.insert(keys.begin(), keys.end());
+                isNew = index.insert(key).second;
+            }
+            keys.push_back(std::move(key));
+            return isNew;
+        }
+    };
+
+    bool Done() {
+        if (!levels_.empty()) ++levels_.back().count;
+        return true;
+    }
+    bool Leave() {
+        levels_.pop_back();
+        return Done();
+    }
+
+    json::value_stack stack_;
+    std::vector<Level> levels_;
+    std::string key_;
+    std::string why_;
+};
+
+std::string LineAndColumn(std::string_view text, std::size_t offset) {
+    const std::string_view before = text.substr(0, offset);
+    const auto line = std::count(before.begin(), before.end(), '\n') + 1;
+    const std::size_t lineStart = before.rfind('\n') + 1; // 0 when there is none
+    return fmt::format("line {}, column {}", line, offset - lineStart + 1);
+}
+
+[[noreturn]] void Refuse(std::string_view text, std::size_t offset, const std::string &path,
+                         std::string why) {
+    throw Error(Exit::Malformed, "the JSON document is malformed")
+        .At(fmt::format("{}, {}", path, LineAndColumn(text, offset)))
+        .Offset(offset)
+        .Because(std::move(why))
+        .Try("correct the document there; nothing was changed");
+}
+
+} // namespace
+
+json::value ParseJson(std::string_view text) {
+    json::parse_options options;
+    options.max_depth = kMostDepth;
+    json::basic_parser<Handler> parser(options);
+    Code code;
+    const std::size_t used = parser.write_some(false, text.data(), text.size(), code);
+    if (code) {
+        const Handler &handler = parser.handler();
+        const std::string why =
+            !handler.Why().empty()          ? handler.Why()
+            : code == json::error::too_deep ? fmt::format("more than {} levels deep", kMostDepth)
+            : text.find_first_not_of(" \t\r\n") == std::string_view::npos ? "it is empty"
+                                                                          : code.message();
+        Refuse(text, used, handler.Path(), why);
+    }
+    const std::size_t rest = text.find_first_not_of(" \t\r\n", used);
+    if (rest != std::string_view::npos) Refuse(text, rest, "$", "there is more behind the document");
+    return parser.handler().Take();
+}
+
+} // namespace dvs::ctl

@@ -1,0 +1,19 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSCTL_JSON_PARSE_H
+#define DVSCTL_JSON_PARSE_H
+
+// JSON text from outside into a document, strictly: UTF-8 only, no duplicate keys, no absurd depth, nothing
+// behind the value.
+
+#include <string_view>
+
+#include <boost/json/value.hpp>
+
+namespace dvs::ctl {
+
+/// Throws Error(Malformed) with line, column and the path ("$.switches[0].ports[3]") of the fault.
+boost::json::value ParseJson(std::string_view text);
+
+} // namespace dvs::ctl
+
+#endif

@@ -1,0 +1,42 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSCTL_OPTIONS_H
+#define DVSCTL_OPTIONS_H
+
+// What the command line was given. Filled by cli.cpp from the option rows of the command table; every verb
+// reads the members it asked for. A member that was not given keeps its default.
+
+#include <optional>
+#include <string>
+
+namespace dvs::ctl {
+
+struct Options {
+    // Every verb has these.
+    bool json = false;                  ///< results and errors as one JSON document on standard output
+    bool quiet = false;                 ///< no remarks, only results and errors
+    bool verbose = false;               ///< the library's messages on standard error as they come
+    bool noHeadings = false;            ///< tables without their first line
+    bool noPager = false;               ///< never start a pager
+    bool ifExists = false;              ///< what is not there counts as empty, and is not an error
+    double timeout = 30;                ///< seconds that waiting for somebody else may take
+    std::optional<std::string> columns; ///< names of the columns to show, separated by commas
+
+    // What changes something has these.
+    bool dryRun = false;    ///< show what would change, change nothing
+    bool mayExist = false;  ///< what is to be made may be there already
+    bool noReplace = false; ///< the opposite, for copies: refuse a target that holds something
+
+    // Operands and the options of single verbs.
+    std::string source;                  ///< SRC, A or FROM
+    std::string target;                  ///< B or TO
+    std::optional<std::string> switchId; ///< only this switch
+    std::optional<std::string> portId;   ///< only this port (of any kind)
+    std::optional<std::string> props;    ///< only properties whose names match this pattern
+    bool full = false;                   ///< long values whole
+    bool order = false;                  ///< the order of entries counts as a difference
+    bool ignoreTypes = false;            ///< type words do not count as a difference
+};
+
+} // namespace dvs::ctl
+
+#endif

@@ -1,0 +1,84 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSCTL_SOURCE_H
+#define DVSCTL_SOURCE_H
+
+// A source is a place that holds switch state, named "scheme:rest" on the command line (a plain path is
+// file:). Verbs see only this interface; each scheme is a file in sources/ and a row of the table in
+// sources/schemes.cpp. What all sources have in common is the serialized state buffer: it is what they read
+// and what they are given to write.
+
+#include <cstdint>
+#include <memory>
+#include <optional>
+#include <span>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "tools/dvsctl/context.h"
+#include "tools/dvsctl/text.h"
+
+namespace dvs::ctl {
+
+/// What was read: the state buffer, perhaps with padding behind it, not looked into yet.
+struct StateBytes {
+    std::vector<std::uint8_t> bytes;
+    std::string complaint; ///< why the place is not in order although bytes came (tolerant reads only)
+};
+
+enum class ReadMode {
+    Strict,   ///< refuse what the library would refuse to read
+    Tolerant, ///< give whatever bytes there are, with a complaint: for looking at damage
+};
+
+class Source {
+public:
+    explicit Source(std::string name) : name_(std::move(name)) {}
+    virtual ~Source() = default;
+    Source(const Source &) = delete;
+    Source &operator=(const Source &) = delete;
+
+    /// The source as "scheme:rest".
+    const std::string &Name() const { return name_; }
+
+    /// True when byte offsets mean something to the user: the bytes lie in the source as they are.
+    virtual bool HasOffsets() const { return false; }
+
+    /// True when the bytes go to standard output, so that nothing else may.
+    virtual bool IsStandardOutput() const { return false; }
+
+    /// The state, or nothing where the source holds none. Throws Error.
+    virtual std::optional<StateBytes> Read(Context &context, ReadMode mode) = 0;
+
+    /// Replaces what the source holds by a state that has been verified: the whole of it or, with an Error,
+    /// nothing.
+    virtual void Write(Context &context, Bytes state) = 0;
+
+    /// Why Read found nothing, for the error of those who need something.
+    virtual std::string WhyAbsent() const { return "it does not exist"; }
+
+private:
+    std::string name_;
+};
+
+struct Scheme {
+    const char *name;                                       ///< "file"
+    const char *form;                                       ///< "file:PATH"
+    const char *summary;                                    ///< one line of help
+    std::unique_ptr<Source> (*open)(std::string_view rest); ///< reads nothing yet
+};
+
+std::span<const Scheme> Schemes();
+
+/// The source that the text names. Throws Error(Usage).
+std::unique_ptr<Source> OpenSource(std::string_view text);
+
+/// The error of a verb that needs a state where there is none.
+Error AbsentError(const Source &source);
+
+/// Reads; where there is nothing, throws Error(Failed), or with --if-exists gives an empty state.
+StateBytes ReadState(Context &context, Source &source, ReadMode mode = ReadMode::Strict);
+
+} // namespace dvs::ctl
+
+#endif

@@ -1,0 +1,24 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The table of sources. The first row is what a name without a scheme means.
+
+#include "tools/dvsctl/sources/schemes.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+constexpr Scheme kSchemes[] = {
+    // name, form, summary, opener
+    {"file", "file:PATH", "a state file; a plain PATH means the same", OpenFileSource},
+    {"json", "json:PATH",
+     "a state as a JSON document, for people and programs; json:- is standard input or output",
+     OpenJsonSource},
+};
+
+} // namespace
+
+std::span<const Scheme> Schemes() {
+    return kSchemes;
+}
+
+} // namespace dvs::ctl
