@@ -58,8 +58,8 @@ std::uint32_t SerializedSize(const DVSData *list, const Filter &filter) {
 }
 
 std::uint8_t *ImageWriter::Claim(std::size_t size) {
-    if (size > size_ - at_) {
-        overflow_ = true;
+    if (failed_ || size > size_ - at_) {
+        failed_ = true;
         return nullptr;
     }
     std::uint8_t *const at = begin_ + at_;
@@ -85,7 +85,7 @@ void ImageWriter::EndBuffer() {
     assert(depth_ > 0);
     const Level level = levels_[--depth_];
     Zero(kMarkerSize);
-    if (overflow_) return;
+    if (failed_) return;
 
     const Bytes written(begin_, at_);
     const std::size_t size = at_ - level.start;
@@ -118,10 +118,10 @@ void ImageWriter::BeginEntry(std::string_view name, std::uint32_t propType, std:
 }
 
 void ImageWriter::EndEntry() {
-    assert(depth_ > 0 && (overflow_ || at_ <= levels_[depth_ - 1].entryEnd));
+    assert(depth_ > 0 && (failed_ || at_ <= levels_[depth_ - 1].entryEnd));
     const std::size_t end = levels_[depth_ - 1].entryEnd;
     if (end < at_)
-        overflow_ = true; // More value than announced.
+        failed_ = true; // More value than announced.
     else
         Zero(end - at_);
 }
@@ -139,14 +139,14 @@ HYP_ReturnStatus ImageWriter::List(const DVSData *list, const Filter &filter, st
     for (const DVSDataEntry *entry = list->head; entry; entry = entry->next) {
         const std::uint32_t size = entry->serialSize;
         if (size >= remaining) [[unlikely]]
-            return LengthChanged(bufSize, remaining, entry->name, size);
+            return Refuse(LengthChanged(bufSize, remaining, entry->name, size));
         remaining -= size;
         if (!filter.IsNone() && !filter.Keeps(entry)) continue;
         if (Emits(kDetail)) [[unlikely]]
             EmitWriting(entry->name, entry->dataLen, size);
         Image(entry);
     }
-    if (remaining != kMarkerSize) return LengthChanged(bufSize, remaining, "NULL", 0);
+    if (remaining != kMarkerSize) return Refuse(LengthChanged(bufSize, remaining, "NULL", 0));
     if (extra) {
         const auto dataLen = static_cast<std::uint32_t>(extra->value.size());
         EmitWriting(extra->name, dataLen, EntrySize(dataLen));
@@ -154,6 +154,12 @@ HYP_ReturnStatus ImageWriter::List(const DVSData *list, const Filter &filter, st
     }
     EndBuffer();
     return HYP_OK;
+}
+
+HYP_ReturnStatus ImageWriter::Refuse(HYP_ReturnStatus status) {
+    --depth_;
+    failed_ = true;
+    return status;
 }
 
 } // namespace dvs::data

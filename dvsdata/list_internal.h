@@ -125,7 +125,7 @@ public:
                                         const Extra *extra = nullptr);
 
     [[nodiscard]] std::size_t Position() const { return at_; }
-    [[nodiscard]] bool Complete() const { return !overflow_ && depth_ == 0 && at_ == size_; }
+    [[nodiscard]] bool Complete() const { return !failed_ && depth_ == 0 && at_ == size_; }
 
 private:
     struct Level {
@@ -138,13 +138,14 @@ private:
     std::uint8_t *Claim(std::size_t size);
     void Put(const void *bytes, std::size_t size);
     void Zero(std::size_t size);
+    HYP_ReturnStatus Refuse(HYP_ReturnStatus status);
 
     std::uint8_t *begin_;
     std::size_t size_;
     std::size_t at_ = 0;
     std::array<Level, kMaxDepth> levels_{};
     std::size_t depth_ = 0;
-    bool overflow_ = false;
+    bool failed_ = false; // for good: nothing is written any more
 };
 
 // ---- Reading
