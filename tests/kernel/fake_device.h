@@ -1,0 +1,94 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef TESTS_KERNEL_FAKE_DEVICE_H
+#define TESTS_KERNEL_FAKE_DEVICE_H
+
+// A scripted switching module behind platform/device.h: it notes every call with all bytes of its record, and
+// answers as a test says. Test programs that link it leave the embedded device out.
+
+#include <cstdint>
+#include <deque>
+#include <functional>
+#include <map>
+#include <set>
+#include <string>
+#include <vector>
+
+#include "dvs/hyp.h"
+
+namespace dvs::test {
+
+/// One ioctl as the module saw it going in.
+struct DeviceCall {
+    int fd;
+    int request;
+    std::string record; // 424 bytes
+    std::string value;  // what `data` held, where it is a value
+};
+
+/// One answer: what becomes of the record, the errno, the bytes written.
+struct Step {
+    int error = 0;       // 0: the call succeeds
+    int64_t status = -1; // -1: left as preset
+    int64_t length = -1; // dataLen or cmdOutLen; -1: left
+    std::string reply;   // copied into the receive buffer, as much as its capacity allows
+};
+
+class FakeDevice {
+public:
+    /// The one that HostDevice_* answer for; emptied between tests.
+    static FakeDevice &Get();
+    void Reset();
+
+    bool present = true;
+    std::deque<Step> script; // consumed first
+    std::map<int, std::string>
+        replies;                // then: what a fetch of this command yields, with a module's growing sizes
+    std::map<int, Step> always; // then: what this command is answered every time
+
+    std::vector<DeviceCall> calls;
+    std::set<int> open;
+    unsigned opened = 0;
+    unsigned closed = 0;
+    std::vector<std::string> openedPaths;
+
+    int Open(const char *path);
+    int Ioctl(int fd, int request, DVSHYPRequest *record);
+    int Close(int fd);
+
+private:
+    int Answer(int request, DVSHYPRequest *record, const Step &step);
+    int nextFd_ = 1000;
+};
+
+/// Writes fields at their offsets into a record of zeroes; built by hand, apart from the library's record
+/// type.
+class RecordBytes {
+public:
+    RecordBytes();
+    RecordBytes &Text(std::size_t offset, const std::string &text);
+    RecordBytes &Word(std::size_t offset, uint32_t value);
+    RecordBytes &Address(std::size_t offset, const void *address);
+    const std::string &Bytes() const { return bytes_; }
+
+private:
+    std::string bytes_;
+};
+
+/// The messages of the library while it lives, as "level:text".
+class MessageLog {
+public:
+    MessageLog();
+    ~MessageLog();
+    std::vector<std::string> lines;
+};
+
+/// Starts every test with a fresh device, an empty table and a log of the messages.
+struct FakeDeviceTest {
+    FakeDeviceTest() { FakeDevice::Get().Reset(); }
+    FakeDevice &device = FakeDevice::Get();
+    MessageLog log;
+};
+
+} // namespace dvs::test
+
+#endif
