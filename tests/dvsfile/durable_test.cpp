@@ -39,6 +39,14 @@ TEST_F(DurableWrite, PadsAsThePlainWriteDoes) {
     EXPECT_TRUE(messages_.empty());
 }
 
+TEST_F(DurableWrite, LeavesOtherFilesUnpadded) {
+    ASSERT_EQ(dvs::file::WriteDurable(path_.c_str(), "text\n", 5, std::chrono::seconds(5),
+                                      dvs::file::Padding::None),
+              HYP_OK);
+    EXPECT_EQ(Contents(path_), "text\n");
+    EXPECT_EQ(Mode(path_) & 07777, 0600u);
+}
+
 TEST_F(DurableWrite, RefusesNothingWithNothingTouched) {
     Put(path_, "old");
     Put(StaleName('1'), "stale");
