@@ -5,20 +5,13 @@
 #include "dvs/configstore.h"
 
 #include "configstore/log.h"
-#include "dvs/status.h"
+#include "dvs/hyp.h"
 #include "platform/status_text.h"
-
-// The kernel interface is not part of every build yet; without it there is nothing to fetch.
-extern "C" {
-HYP_ReturnStatus DVSHYP_PersistentStateGet(void **out, uint32_t *outLen) __attribute__((weak));
-void DVSHYP_DataFree(void *buf) __attribute__((weak));
-}
 
 int32_t DVSState_SaveToConfigStore_ByInstance(const char *switchId) {
     void *buf = nullptr;
     uint32_t len = 0;
-    const HYP_ReturnStatus status =
-        DVSHYP_PersistentStateGet ? DVSHYP_PersistentStateGet(&buf, &len) : HYP_ReturnStatus{HYP_FAILURE};
+    const HYP_ReturnStatus status = DVSHYP_PersistentStateGet(&buf, &len);
     if (status != HYP_OK) {
         dvs::config::LogError(
             "Failed to save DVS config to configstore when get DVS buffrom hyp. Error: %s\n",

@@ -60,22 +60,6 @@ bool IsSupported(uint32_t version) {
     });
 }
 
-HYP_ReturnStatus ReadHostLimit(const char *switchId) {
-    HYP_ReturnStatus status = KIT_CheckSig(kKitSignature, kKitVersion);
-    if (status != HYP_OK) {
-        Message(kError, "DVSState_SwitchAdd %s, KIT signature check failed. Error: %s\n", switchId,
-                Text(status));
-        return status;
-    }
-    status = KIT_Get(KIT_NODE_net_maxPortsSystemWide, nullptr, &uwMaxNumActivePortsSystemWide,
-                     sizeof uwMaxNumActivePortsSystemWide);
-    if (status != HYP_OK) {
-        Message(kError, "DVSState_SwitchAdd %s, failed to get max ports systemwide. Error: %s\n", switchId,
-                Text(status));
-    }
-    return status;
-}
-
 /// Fits the text into a field of `size` bytes: cut, terminated, zero behind it.
 void CopyText(char *field, std::size_t size, std::string_view text) {
     const std::size_t length = std::min(text.size(), size - 1);
@@ -103,6 +87,22 @@ HYP_ReturnStatus InsertSwitch(const char *switchId, std::string_view className, 
 }
 
 } // namespace
+
+HYP_ReturnStatus ReadHostLimit(const char *switchId) {
+    HYP_ReturnStatus status = KIT_CheckSig(kKitSignature, kKitVersion);
+    if (status != HYP_OK) {
+        Message(kError, "DVSState_SwitchAdd %s, KIT signature check failed. Error: %s\n", switchId,
+                Text(status));
+        return status;
+    }
+    status = KIT_Get(KIT_NODE_net_maxPortsSystemWide, nullptr, &uwMaxNumActivePortsSystemWide,
+                     sizeof uwMaxNumActivePortsSystemWide);
+    if (status != HYP_OK) {
+        Message(kError, "DVSState_SwitchAdd %s, failed to get max ports systemwide. Error: %s\n", switchId,
+                Text(status));
+    }
+    return status;
+}
 
 uint32_t ClassFlags(std::string_view className) {
     const auto *row = std::ranges::find(kClasses, className, &SwitchClass::name);

@@ -39,6 +39,10 @@ private:
     MXUserRecLock *lock_;
 };
 
+/// Reads the host-wide port limit into uwMaxNumActivePortsSystemWide. For the first add of a switch, and for
+/// whoever has to know the limit before it. The id is for the messages.
+[[nodiscard]] HYP_ReturnStatus ReadHostLimit(const char *switchId);
+
 /// The worker of DVSState_SwitchAdd. The class name comes from a buffer, so it may be of any length.
 [[nodiscard]] HYP_ReturnStatus DVSStateSwitchAdd(const char *switchId, std::string_view className,
                                                  uint32_t maxPorts, uint32_t version);

@@ -10,36 +10,38 @@ extern "C" {
 #endif
 
 /*
- * The switches in the host's configuration store: saving a state buffer, loading one back, carrying an older host's
- * state file over, and the tables that say where each property lives in the store.
+ * The switches in the host's configuration store: saving a state buffer, loading one back, carrying an older
+ * host's state file over, and the tables that say where each property lives in the store.
  *
- * Results are int32_t: 0, the store's own status (6 for what is absent, 2 for a busy store, …), or -1 for a failure of
- * the library's own. State buffers are those of DVSState_ConfigSerialize.
+ * Results are int32_t: 0, the store's own status (6 for what is absent, 2 for a busy store, …), or -1 for a
+ * failure of the library's own. State buffers are those of DVSState_ConfigSerialize.
  *
- * Every save and the upgrade take the switch-state lock for their whole run and use the process-wide switch table as
- * scratch: it is reset before and after, so a caller must not keep switches of its own in it meanwhile. The load and
- * GetDvsBasicInfoFromFileHyp take no lock; run one operation of this family at a time.
+ * Every save and the upgrade take the switch-state lock for their whole run and use the process-wide switch
+ * table as scratch: it is reset before and after, so a caller must not keep switches of its own in it
+ * meanwhile. The load and GetDvsBasicInfoFromFileHyp take no lock; run one operation of this family at a
+ * time.
  *
- * Messages go to standard output as far as dvsconfigstore_debug lets them, the saves' and the upgrade's start, end and
- * timings to syslog. A sink set with DVSLog_SetSink gets all of them.
+ * Messages go to standard output as far as dvsconfigstore_debug lets them, the saves' and the upgrade's
+ * start, end and timings to syslog. A sink set with DVSLog_SetSink gets all of them.
  */
 
 /* Level of the messages: errors print at 0 or above, traces above 0. 10 at start. */
 extern int32_t dvsconfigstore_debug;
 
 /*
- * Saves the switches of a state buffer, each as one store object, all in one transaction: an object that exists is
- * emptied of everything this library writes and written afresh.
+ * Saves the switches of a state buffer, each as one store object, all in one transaction: an object that
+ * exists is emptied of everything this library writes and written afresh.
  *
- * buf, len  the state buffer. A buffer that does not deserialize counts as one without switches, which in a save of
- *           all deletes every switch of the store: DVSState_SaveBufToConfigStoreChecked refuses such a buffer.
- * switchId  saves this switch only and leaves all other objects alone. Where the buffer lacks it, its own object is
- *           deleted. NULL saves all, and deletes the objects of switches that the buffer does not hold.
+ * buf, len  the state buffer. A buffer that does not deserialize counts as one without switches, which in a
+ * save of all deletes every switch of the store: DVSState_SaveBufToConfigStoreChecked refuses such a buffer.
+ * switchId  saves this switch only and leaves all other objects alone. Where the buffer lacks it, its own
+ * object is deleted. NULL saves all, and deletes the objects of switches that the buffer does not hold.
  *
- * Returns 0 when everything is committed; -1 when the store cannot be opened, an object cannot be created, memory is
- * short or a value cannot be expressed; else the status of the store call that failed. The store is then as it was.
- * The switch-state lock stays held, and the table loaded, where the store cannot be opened (-1) or the transaction
- * cannot be begun (its status): callers of those two paths release it with DVSwitchHandleUnlock.
+ * Returns 0 when everything is committed; -1 when the store cannot be opened, an object cannot be created,
+ * memory is short or a value cannot be expressed; else the status of the store call that failed. The store is
+ * then as it was. The switch-state lock stays held, and the table loaded, where the store cannot be opened
+ * (-1) or the transaction cannot be begun (its status): callers of those two paths release it with
+ * DVSwitchHandleUnlock.
  */
 int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId);
 
@@ -59,32 +61,34 @@ int32_t DVSState_SaveToConfigStore(void);
  * The save for everyone who is not sure of the buffer: verifies it first, every level of it, then saves as
  * DVSState_SaveBufToConfigStore_ByInstance does.
  *
- * Returns, with neither the store nor the switch table touched, the HYP_ReturnStatus of the fault as a signed number
- * where the buffer does not verify: HYP_BAD_PARAM (malformed), HYP_BAD_CHECKSUM, HYP_NOT_FOUND (a switch without a
- * field it must have), HYP_NOT_SUPPORTED (a switch version that this library does not know), HYP_EXISTS (a port or switch twice),
- * HYP_LIMIT_EXCEEDED (more switches or ports than this host takes). The cause is printed with the place of the fault.
+ * Returns, with neither the store nor the switch table touched, the HYP_ReturnStatus of the fault as a signed
+ * number where the buffer does not verify: HYP_BAD_PARAM (malformed), HYP_BAD_CHECKSUM, HYP_NOT_FOUND (a
+ * switch without a field it must have), HYP_EXISTS (a port twice), HYP_LIMIT_EXCEEDED (more switches or ports
+ * than this host takes), or what the host answers when asked for its limit. A message names the fault and
+ * where it is.
  */
 int32_t DVSState_SaveBufToConfigStoreChecked(const void *buf, uint32_t len, const char *switchId);
 
 /*
  * Rebuilds a state buffer from the store's switch objects.
  *
- * out, outLen  receive the buffer and its length in bytes; released with free(). Untouched unless a buffer was made.
- * desired      loads the desired user configuration, each object completed with the "portset_name" of the current
- *              object at the same position; -1 where the two layers hold different numbers of switches.
+ * out, outLen  receive the buffer and its length in bytes; released with free(). Untouched unless a buffer
+ * was made. desired      loads the desired user configuration, each object completed with the "portset_name"
+ * of the current object at the same position; -1 where the two layers hold different numbers of switches.
  *
- * Returns 0 or the failing status. A switch that cannot be rebuilt ends the load WITHOUT a buffer and, where its
- * "uuid" still reads, with the result 0: test the buffer as well as the result.
+ * Returns 0 or the failing status. A switch that cannot be rebuilt ends the load WITHOUT a buffer and, where
+ * its "uuid" still reads, with the result 0: test the buffer as well as the result.
  */
 int32_t DVSState_LoadFromConfigStoreAsBuf(void **out, uint32_t *outLen, bool desired);
 
 /*
- * Carries the identity of every switch of the host's state file into the store: name, uuid, port limit and, from the
- * host property "com.orbeno.common.host.portset", the port set's name. Switches without that property are left as they
- * are. A state file that is empty or cannot be read is no failure and touches nothing.
+ * Carries the identity of every switch of the host's state file into the store: name, uuid, port limit and,
+ * from the host property "com.orbeno.common.host.portset", the port set's name. Switches without that
+ * property are left as they are. A state file that is empty or cannot be read is no failure and touches
+ * nothing.
  *
- * Returns 0, -1 or the failing store status. As with the saves, the switch-state lock stays held where the store
- * cannot be opened or the transaction cannot be begun.
+ * Returns 0, -1 or the failing store status. As with the saves, the switch-state lock stays held where the
+ * store cannot be opened or the transaction cannot be begun.
  */
 int32_t DVSState_RetrieveDVSUpgradeInfo(void);
 
@@ -101,8 +105,8 @@ typedef struct {
 } DvsBasicInfo;
 
 /*
- * Lists the switches of the host's state file. The switches stay in the switch table and the file's buffer stays
- * allocated: what the result points to is valid until the table is next reset. Takes no lock.
+ * Lists the switches of the host's state file. The switches stay in the switch table and the file's buffer
+ * stays allocated: what the result points to is valid until the table is next reset. Takes no lock.
  */
 DvsBasicInfo GetDvsBasicInfoFromFileHyp(void);
 
@@ -116,11 +120,13 @@ enum {
     DVS_PROP_CLASS_PORT = 2    /* a property of one port */
 };
 
-/* One row of a mapping table: where a property lives in the store, and which converter carries it there and back. */
+/* One row of a mapping table: where a property lives in the store, and which converter carries it there and
+ * back. */
 typedef struct {
-    const char *key;        /* the property's key; "DEFAULT" in the row that takes what no other does; NULL at the end */
-    char path[5][128];      /* names from the switch's or port's object down to the leaf; unused slots all zero */
-    uint32_t depth;         /* how many names the path has; 0 at the end */
+    const char
+        *key; /* the property's key; "DEFAULT" in the row that takes what no other does; NULL at the end */
+    char path[5][128]; /* names from the switch's or port's object down to the leaf; unused slots all zero */
+    uint32_t depth;    /* how many names the path has; 0 at the end */
     uint32_t converterType; /* 0 to 36; 37 at the end */
     uint32_t loadPropType;  /* type word of what a load rebuilds from this row: 16; 0 at the end */
     uint32_t reserved;      /* always 0 */
@@ -133,8 +139,9 @@ _Static_assert(sizeof(DVSProp2ConfigEntry) == 664, "the rows are exported data")
 #endif
 
 /*
- * The mapping tables, read from their first row to the end row: a save takes the first row of a key, a load goes
- * through them in order. Ordinary writable data: a changed row counts from the next property on; nothing locks them.
+ * The mapping tables, read from their first row to the end row: a save takes the first row of a key, a load
+ * goes through them in order. Ordinary writable data: a changed row counts from the next property on; nothing
+ * locks them.
  */
 extern DVSProp2ConfigEntry dvsGlobalProp2Config[], dvsPortProp2Config[], dvsHostProp2Config[];
 
@@ -144,16 +151,16 @@ extern DVSProp2ConfigEntry *dvsConfigMaps[];
 /* dvsConfigMaps[kind]; the kind is not checked. */
 DVSProp2ConfigEntry *GetConfigMap(int kind);
 
-/* What a save clears out of an object that exists, each list ended by NULL: values, singleton sub-objects, and lists
- * of instances. */
+/* What a save clears out of an object that exists, each list ended by NULL: values, singleton sub-objects,
+ * and lists of instances. */
 extern const char *UNUSED_PRIMITIVE_PROPS[], *UNUSED_SINGLETON_PROPS[], *UNUSED_NON_SINGLETON_PROPS[];
 
 /*
- * Enumerations: the store's text at the index of the value, NULL in an empty slot; and, named the other way round, the
- * value at the position of the text.
+ * Enumerations: the store's text at the index of the value, NULL in an empty slot; and, named the other way
+ * round, the value at the position of the text.
  */
-extern const char *TEAMING_POLICY_SCHEMA[];           /* 7 slots, the first and the last empty */
-extern int32_t TEAMING_POLICY_ENUM[];                 /* 6 values by slot of TEAMING_POLICY_SCHEMA; not its inverse */
+extern const char *TEAMING_POLICY_SCHEMA[]; /* 7 slots, the first and the last empty */
+extern int32_t TEAMING_POLICY_ENUM[];       /* 6 values by slot of TEAMING_POLICY_SCHEMA; not its inverse */
 extern const char *NIC_TEAMING_POLICY_MODE_2_CHARS[]; /* 6 slots: the kernel's order, the first empty */
 extern const char *PVLAN_2_CHARS[];                   /* 5 slots, the first and the last empty */
 extern int32_t CHARS_2_PVLAN[];                       /* 5 values */
