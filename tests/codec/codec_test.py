@@ -13,6 +13,7 @@ import argparse
 import json
 import os
 import random
+import re
 import struct
 import subprocess
 import sys
@@ -216,6 +217,16 @@ def check_golden(probe, folder, write):
     print(f"{len(cases)} golden files agree")
 
 
+def check_document(folder):
+    """The worked example's hex lines in the document are the golden file."""
+    path = os.path.join(folder, "..", "..", "docs", "buffer-format.md")
+    with open(path, encoding="utf-8") as file:
+        rows = re.findall(r"^[0-9a-f]{8}  ((?:[0-9a-f]{2} ?)+)$", file.read(), re.MULTILINE)
+    with open(os.path.join(folder, "worked_example.bin"), "rb") as file:
+        if bytes.fromhex("".join(rows)) != file.read():
+            sys.exit(f"{path}: the worked example is not the golden file")
+
+
 def main():
     parser = argparse.ArgumentParser()
     parser.add_argument("probe")
@@ -225,6 +236,7 @@ def main():
     parser.add_argument("--write-golden", action="store_true")
     args = parser.parse_args()
     check_golden(args.probe, args.golden, args.write_golden)
+    check_document(args.golden)
     check_random(args.probe, args.count, args.seed)
 
 
