@@ -89,13 +89,19 @@ std::uint32_t SumPortable(Bytes bytes) {
 
 } // namespace
 
-std::uint32_t Sum(Bytes bytes) {
+std::uint32_t SumBaseline(Bytes bytes) {
 #if defined(__x86_64__)
-    if (__builtin_cpu_supports("avx2")) return SumAvx2(bytes);
     return SumSse2(bytes);
 #else
     return SumPortable(bytes);
 #endif
+}
+
+std::uint32_t Sum(Bytes bytes) {
+#if defined(__x86_64__)
+    if (__builtin_cpu_supports("avx2")) return SumAvx2(bytes);
+#endif
+    return SumBaseline(bytes);
 }
 
 } // namespace dvs::data

@@ -102,6 +102,9 @@ inline void Store16(void *to, std::uint16_t value) {
 /// pieces add up to the sum of the whole as long as every piece but the last is a multiple of 4 long.
 [[nodiscard]] std::uint32_t Sum(Bytes bytes);
 
+/// Sum() as every processor of the family can do it; for tests that hold the two against each other.
+[[nodiscard]] std::uint32_t SumBaseline(Bytes bytes);
+
 /// Checksum of a whole buffer: the sum of all but its first 32 bytes, hence 0 for a buffer of up to 32.
 [[nodiscard]] inline std::uint32_t Checksum(Bytes buffer) {
     return buffer.size() <= kUnsummedSize ? 0 : Sum(buffer.subspan(kUnsummedSize));

@@ -90,6 +90,15 @@ TEST(DataSerialize, ChecksumIsThatOfThePlainDefinition) {
     }
 }
 
+TEST(DataSerialize, SumsAreTheSameOnEveryProcessor) {
+    for (std::size_t size = 0; size < 700; ++size) {
+        Buffer bytes(size);
+        for (std::size_t i = 0; i < size; ++i)
+            bytes[i] = static_cast<std::uint8_t>(i * 73 + 130);
+        ASSERT_EQ(data::SumBaseline(ExactBlock(bytes).bytes()), data::Sum(ExactBlock(bytes).bytes())) << size;
+    }
+}
+
 TEST(DataSerialize, SumsOfPiecesAddUp) {
     Buffer bytes(4099);
     for (std::size_t i = 0; i < bytes.size(); ++i)
