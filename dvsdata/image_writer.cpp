@@ -111,8 +111,7 @@ void ImageWriter::BeginEntry(std::string_view name, std::uint32_t propType, std:
     std::uint8_t *const fixed = Claim(kEntryFixedSize);
     if (!fixed) return;
     Store32(fixed + kEntrySizeOffset, EntrySize(dataLen));
-    std::memset(fixed + kNameOffset, 0, kNameSize);
-    std::memcpy(fixed + kNameOffset, name.data(), std::min<std::size_t>(name.size(), kMaxNameLen));
+    StoreName(fixed + kNameOffset, name);
     Store32(fixed + kPropTypeOffset, propType);
     Store32(fixed + kDataLenOffset, dataLen);
 }

@@ -61,8 +61,7 @@ void FillEntry(DVSDataEntry *entry, std::uint32_t serialSize, std::string_view n
     std::memset(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset + serialSize - 8, 0, 8);
     entry->next = nullptr;
     entry->serialSize = serialSize;
-    std::memset(entry->name, 0, kNameSize);
-    std::memcpy(entry->name, name.data(), std::min<std::size_t>(name.size(), kMaxNameLen));
+    StoreName(entry->name, name);
     entry->propType = propType;
     entry->dataLen = dataLen;
 }
