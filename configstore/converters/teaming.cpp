@@ -75,8 +75,8 @@ constexpr Field kTeamingFields[] = {
     {"full_duplex",         9,    1, Kind::kBool,     nullptr,          "an uplink that is not full duplex counts as failed"},
     {"speed",              10,    2, Kind::kUnsigned, nullptr,          "an uplink below this speed counts as failed"},
     {"behaviour_flags",    12,    4, Kind::kFlags,    &kBehaviourFlags, "how a failover is done"},
-    {"active_count",       16,    4, Kind::kUnsigned, nullptr,          "how many of the names, from the first on, are active uplinks"},
-    {"standby_count",      20,    4, Kind::kUnsigned, nullptr,          "how many of the names behind those are standby uplinks"},
+    {"active_count",       16,    4, Kind::kCount,    nullptr,          "how many of the names, from the first on, are active uplinks"},
+    {"standby_count",      20,    4, Kind::kCount,    nullptr,          "how many of the names behind those are standby uplinks"},
 };
 constexpr Part kTeamingParts[] = {
     {"names", &kName, CountBy::kFixed, kNameSlots, nullptr, nullptr, 0, "the active uplinks' names, then the standby uplinks'"},

@@ -10,10 +10,13 @@
 namespace dvs::layout {
 namespace {
 
+constexpr const char *kModeTexts[] = {"always", "normal"};
+constexpr Domain kModes = {"transmit-uplink modes", kModeTexts, 2, {}};
+
 // clang-format off
 constexpr Field kTxUplinkFields[] = {
-    // name offset width kind            domain   meaning
-    {"mode",     0,    7, Kind::kLiteral, nullptr, "\"always\" or \"normal\", with its NUL"},
+    // name offset width kind           domain   meaning
+    {"mode",     0,    7, Kind::kLiteral, &kModes, "\"always\" or \"normal\", with its NUL"},
 };
 // clang-format on
 

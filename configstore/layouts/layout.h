@@ -23,7 +23,7 @@ enum class Kind : uint8_t {
     kFlags,    // a number whose bits the domain names
     kEnum,     // a number whose values the domain names
     kMagic,    // a number that is always the same
-    kCount,    // how many elements a part of this record has
+    kCount,    // how many elements a part of this record has, or how many of its slots are in use
     kShare,    // how many elements of a part of the enclosing record belong to this one
     kText,     // NUL-terminated text in a slot of fixed size, or up to the value's end when the width is 0
     kLiteral,  // a text that takes one of a few stated values; no terminator is needed to tell them apart
@@ -53,7 +53,7 @@ struct Field {
     uint32_t offset; // bytes from the start of the record
     uint32_t width;  // bytes; 0: up to the value's end
     Kind kind;
-    const Domain *domain; // of an enumeration or of flags, else null
+    const Domain *domain; // of an enumeration, of flags or of a literal, else null
     const char *meaning;
 };
 
@@ -103,8 +103,9 @@ consteval bool IsSound(const Record &record) {
         if (number && field.width != 1 && field.width != 2 && field.width != 4 && field.width != 8)
             return false;
         if (field.width == 0 && &field != &record.fields.back()) return false;
-        if ((field.kind == Kind::kEnum || field.kind == Kind::kFlags) != (field.domain != nullptr))
-            return false;
+        const bool named =
+            field.kind == Kind::kEnum || field.kind == Kind::kFlags || field.kind == Kind::kLiteral;
+        if (named != (field.domain != nullptr)) return false;
         end += field.width;
     }
     for (const Part &part : record.parts) {

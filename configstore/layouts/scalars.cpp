@@ -7,6 +7,11 @@
 namespace dvs::layout {
 namespace {
 
+constexpr const char *kBoolTexts[] = {"true", "false"};
+constexpr Domain kBools = {"truth values", kBoolTexts, 2, {}};
+constexpr const char *kEnabledTexts[] = {"enabled", ""};
+constexpr Domain kEnabled = {"enabled or not", kEnabledTexts, 2, {}};
+
 // clang-format off
 constexpr Field kNumberFields[] = {
     // name   offset width kind             domain   meaning
@@ -22,10 +27,10 @@ constexpr Field kBoolFields[] = {
     {"value",      0,    1, Kind::kBool,     nullptr, "0 or 1"},
 };
 constexpr Field kBoolTextFields[] = {
-    {"text",       0,    0, Kind::kLiteral,  nullptr, "\"true\" with a NUL, or anything else for false"},
+    {"text",       0,    0, Kind::kLiteral,  &kBools,   "\"true\" with a NUL, or anything else for false"},
 };
 constexpr Field kEnabledFields[] = {
-    {"text",       0,    0, Kind::kLiteral,  nullptr, "\"enabled\" with a NUL, or anything else for false"},
+    {"text",       0,    0, Kind::kLiteral,  &kEnabled, "\"enabled\" with a NUL, or anything else for false"},
 };
 constexpr Field kPassthroughFields[] = {
     {"value",      0,    4, Kind::kUnsigned, nullptr, "2: allowed; 0: not allowed"},

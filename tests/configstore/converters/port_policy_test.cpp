@@ -116,6 +116,13 @@ TEST_F(PortPolicy, VlanFieldsThatCannotBeReadAreZero) {
     EXPECT_EQ(0, loadStatus);
 }
 
+TEST_F(PortPolicy, APriorityAloneLoadsVlanZeroToo) {
+    ASSERT_EQ(0, Save(kPort, "com.orbeno.vswitch.port.priority", Bytes().U32(3)));
+    const Properties loaded = Load(kPort);
+    EXPECT_EQ(Bytes().U32(3), loaded.at("com.orbeno.vswitch.port.priority"));
+    EXPECT_EQ(Bytes().Zeros(8), loaded.at(kVlan[0])) << "the priority stands inside the VLAN policy";
+}
+
 TEST_F(PortPolicy, TransmitUplinkLoadsForTheFamilysKey) {
     const struct {
         Bytes value;
