@@ -99,18 +99,25 @@ inline void Store16(void *to, std::uint16_t value) {
     std::memcpy(to, &value, sizeof value);
 }
 
-/// Fills a name field: at most 127 characters, then zeros. In pieces of fixed size, because for a length that is only
-/// known to be small compilers emit string instructions, which take longer than all the rest of an append.
+/// Fills a name field: at most 127 characters, then zeros. In pieces of fixed size, because for a length that
+/// is only known to be small compilers emit string instructions, which take longer than all the rest of an
+/// append.
 inline void StoreName(void *field, std::string_view name) {
     constexpr std::size_t kPiece = 16;
     auto *const to = static_cast<char *>(field);
     const std::size_t size = name.size() < kMaxNameLen ? name.size() : kMaxNameLen;
-    for (std::size_t at = 0; at < kNameSize; at += kPiece) std::memset(to + at, 0, kPiece);
+    using Wide = char __attribute__((vector_size(64)));
+    const Wide zeros{};
+    std::memcpy(to, &zeros, sizeof zeros);
+    std::memcpy(to + sizeof zeros, &zeros, sizeof zeros);
+    static_assert(2 * sizeof zeros == kNameSize);
     if (size < kPiece) {
-        for (std::size_t at = 0; at < size; ++at) to[at] = name[at];
+        for (std::size_t at = 0; at < size; ++at)
+            to[at] = name[at];
         return;
     }
-    for (std::size_t at = 0; at + kPiece <= size; at += kPiece) std::memcpy(to + at, name.data() + at, kPiece);
+    for (std::size_t at = 0; at + kPiece <= size; at += kPiece)
+        std::memcpy(to + at, name.data() + at, kPiece);
     std::memcpy(to + size - kPiece, name.data() + size - kPiece, kPiece);
 }
 
