@@ -109,7 +109,7 @@ TEST_F(DamagedState, IsJudgedAlikeWithEachByteChanged) {
 
 TEST_F(DamagedState, IsJudgedAlikeWithEachByteChangedAndChecksumsMended) {
     for (std::size_t at = 0; at < state_.size(); at++) {
-        for (const int change : {0x01, 0x80, 0xff}) {
+        for (const int change : {0x01, 0x80}) {
             Buffer damaged = state_;
             damaged[at] ^= static_cast<std::uint8_t>(change);
             MendState(&damaged);
