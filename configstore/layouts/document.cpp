@@ -119,7 +119,9 @@ std::string CountText(const Part &part) {
     return "to the end of the value";
 }
 
-std::string RecordText(const Record &record) {
+// Empty for a record that the document has already.
+std::string RecordText(const Record &record, std::set<const Record *> *described) {
+    if (!described->insert(&record).second) return "";
     std::string text = std::string("\n*") + record.name + "*";
     if (record.size) text += ", " + std::to_string(record.size) + " bytes";
     for (const Part &part : record.parts) {
@@ -136,7 +138,7 @@ std::string RecordText(const Record &record) {
                 " |\n";
     }
     for (const Part &part : record.parts)
-        text += RecordText(*part.element);
+        text += RecordText(*part.element, described);
     return text;
 }
 
@@ -170,11 +172,9 @@ std::string Types() {
         text += "\n### Type " + std::to_string(type) + "\n\n" + info->name + "." +
                 (*info->quirks ? " " : "") + info->quirks + "\n";
         for (const Record *record : {info->record, info->wide}) {
-            if (described.insert(record).second) {
-                text += RecordText(*record);
-            } else if (record == info->record) {
-                text += std::string("\nThe value is a *") + record->name + "* as above.\n";
-            }
+            const std::string layout = RecordText(*record, &described);
+            const bool isRepeated = layout.empty() && record == info->record;
+            text += isRepeated ? std::string("\nThe value is a *") + record->name + "* as above.\n" : layout;
         }
         text += "\n| in the store | form | meaning |\n|---|---|---|\n" + FormText(*info->form, LeafOf(type));
     }
