@@ -164,7 +164,7 @@ TEST(DataDeserialize, AnyChangedByteFromOffset32OnIsABadChecksum) {
 
 TEST(DataDeserialize, ReservedBytesAndTheFirstNamesBeginningAreNotSummed) {
     const Buffer written = SerializedOf(kTwo);
-    for (std::size_t i : {10, 11, 16, 17, 20, 31}) {
+    for (const std::size_t i : {10u, 11u, 16u, 17u, 20u, 31u}) {
         Buffer buffer = written;
         buffer[i] ^= 0x40;
         EXPECT_EQ(Read(buffer).first, HYP_OK) << i;

@@ -95,7 +95,7 @@ TEST(DamagedBuffer, SizesAndLengthsThatLieAreReadTheSameByAll) {
     for (std::uint32_t lie = 0; lie < written.size() + 20; ++lie)
         lies.push_back(lie);
     for (const std::size_t entry : {std::size_t{12}, std::size_t{160}, std::size_t{160 + 344}})
-        for (const std::size_t field : {0, 136})
+        for (const std::size_t field : {std::size_t{0}, std::size_t{136}})
             for (const std::uint32_t lie : lies) {
                 Buffer buffer = written;
                 SetU32(&buffer, entry + field, lie);
