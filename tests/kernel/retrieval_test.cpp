@@ -154,15 +154,6 @@ TEST_F(RetrievalWithFile, AFileThatCannotBeReadFailsWithItsStatus) {
     EXPECT_TRUE(log.lines.empty() || log.lines[0].find("ConfigDeserialize") == std::string::npos);
 }
 
-TEST_F(RetrievalWithFile, AFileThatDoesNotLoadFailsWithAMessage) {
-    const std::string path = File("this is no state, whatever its length may be");
-    ServeUnpersisted();
-    EXPECT_EQ(Persist(path.c_str(), HYP_BAD_PARAM), "");
-    ASSERT_FALSE(log.lines.empty());
-    EXPECT_EQ(log.lines.back().rfind("-1:DVSState_ConfigDeserialize failed: ", 0), 0U) << log.lines.back();
-    EXPECT_EQ(log.lines.back().back(), '\n');
-}
-
 TEST_F(Retrieval, FailuresOfFetchAndLoadLeaveTheOutputs) {
     for (int round = 0; round < 2; round++) {
         int marker = 0;
