@@ -278,6 +278,25 @@ Flaw WriteMember(const StoreField &form, const Place &place, const Node &node, c
     return {path, "has no typed form"};
 }
 
+Flaw FindLongTextAt(const StoreField &form, const Node &node, const std::string &path) {
+    if (node.kind == Node::Kind::kText && form.maxText && node.text.size() > form.maxText) {
+        return {path, "has no end inside its field"};
+    }
+    for (std::size_t i = 0; i < node.items.size(); ++i) {
+        const Node &item = node.items[i];
+        if (node.kind == Node::Kind::kList) {
+            if (Flaw flaw = FindLongTextAt(form, item, path + "[" + std::to_string(i) + "]")) return flaw;
+            continue;
+        }
+        for (const StoreField &member : form.members) {
+            if (item.name != member.name) continue;
+            if (Flaw flaw = FindLongTextAt(member, item, path.empty() ? item.name : path + "." + item.name))
+                return flaw;
+        }
+    }
+    return {};
+}
+
 void CompareAt(const Node &given, const Node *found, const std::string &path, std::vector<std::string> *out) {
     if (given.kind == Node::Kind::kObject && found) {
         for (const Node &item : given.items) {
@@ -345,6 +364,10 @@ Node Normalized(const layout::StoreField &form, const Node &node) {
 
 Flaw WriteTree(const layout::StoreField &form, const Place &place, const Node &node) {
     return WriteMember(form, place, node, "");
+}
+
+Flaw FindLongText(const layout::StoreField &form, const Node &node) {
+    return FindLongTextAt(form, node, "");
 }
 
 std::vector<std::string> Compare(const Node &given, const Node &found) {

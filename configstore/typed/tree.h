@@ -36,6 +36,9 @@ Node Normalized(const layout::StoreField &form, const Node &node);
 /// Writes a normalized tree to a place. At the first flaw it stops.
 Flaw WriteTree(const layout::StoreField &form, const Place &place, const Node &node);
 
+/// The first text that is longer than its field, which no sound value has: its NUL is missing.
+Flaw FindLongText(const layout::StoreField &form, const Node &node);
+
 /// What `given` has that `found` has not, or has otherwise: one line a value.
 std::vector<std::string> Compare(const Node &given, const Node &found);
 

@@ -217,8 +217,14 @@ View Describe(uint32_t propClass, std::string_view key, std::span<const uint8_t>
         view.reason = ReasonOf(bench.record(), value, status);
         return view;
     }
+    Node tree = ReadTree(*bench.type().form, bench.place());
+    // Must not get to a load: of filters, such texts end the process there.
+    if (const Flaw flaw = FindLongText(*bench.type().form, tree)) {
+        view.reason = flaw.field + " " + flaw.reason;
+        return view;
+    }
     view.state = State::kTyped;
-    view.tree = ReadTree(*bench.type().form, bench.place());
+    view.tree = std::move(tree);
     view.summary = Summarize(bench.type().type, view.tree);
     JudgeExactness(&bench, value, &view);
     return view;
