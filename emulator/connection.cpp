@@ -100,7 +100,7 @@ Call Connection::Request() const {
     return call;
 }
 
-void Connection::Finish() {
+bool Connection::Finish() {
     // A client that did not wait for its answer has begun the next request already.
     const std::size_t surplus = received_ - needed_;
     if (surplus > 0) std::memmove(in_.get(), in_.get() + needed_, surplus);
@@ -114,6 +114,7 @@ void Connection::Finish() {
         budget_->Return(Counted(capacity_));
         capacity_ = kFirstCapacity;
     }
+    return !HasHeader() || JudgeHeader();
 }
 
 bool Connection::Send(const wire::ReplyHeader &header, Payload payload) {

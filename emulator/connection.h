@@ -51,12 +51,12 @@ public:
     [[nodiscard]] bool Receive();
 
     /// True when a whole request has arrived; Request gives it, lent until Finish.
-    bool HasRequest() const { return needed_ > 0 && received_ >= needed_ && HasHeader(); }
+    bool HasRequest() const { return judged_ && received_ >= needed_; }
     wire::Kind RequestKind() const;
     Call Request() const;
 
-    /// Forgets the request.
-    void Finish();
+    /// Forgets the request. False when what follows it is none.
+    [[nodiscard]] bool Finish();
 
     /// Sends an answer, now as far as it goes and the rest with Flush; a lent payload is copied if it has to
     /// wait. False when the client is to be given up.
@@ -92,7 +92,7 @@ private:
     std::size_t capacity_ = 0;
     std::size_t received_ = 0;
     std::size_t needed_ = sizeof(wire::RequestHeader);
-    bool judged_ = false;
+    bool judged_ = false; // the header has arrived and is one, so `needed_` is the whole request's
 
     // The answer.
     bool sending_ = false;

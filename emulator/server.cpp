@@ -257,8 +257,7 @@ bool Server::CarryOut(Connection *client, const Fault &fault) {
     reply.dataLen = answer.dataLen;
     reply.cmdOutLen = answer.cmdOutLen;
     reply.payloadSize = answer.payload.size;
-    client->Finish();
-    return client->Send(reply, std::move(answer.payload));
+    return client->Finish() && client->Send(reply, std::move(answer.payload));
 }
 
 bool Server::AnswerLimits(Connection *client) {
@@ -267,8 +266,7 @@ bool Server::AnswerLimits(Connection *client) {
     payload.data = reinterpret_cast<const char *>(&uwMaxNumActivePortsSystemWide);
     payload.size = sizeof uwMaxNumActivePortsSystemWide;
     reply.payloadSize = payload.size;
-    client->Finish();
-    return client->Send(reply, std::move(payload));
+    return client->Finish() && client->Send(reply, std::move(payload));
 }
 
 } // namespace dvs::emulator

@@ -1,0 +1,217 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Clients that do not keep to the wire form: random and mutated requests, floods, clients that stop in the
+// middle. The emulator lives on and serves its other clients meanwhile.
+
+#include <cstring>
+#include <random>
+
+#include <gtest/gtest.h>
+#include <poll.h>
+#include <sys/socket.h>
+#include <unistd.h>
+
+#include "dvs/dvs.h"
+#include "emulator/emulator_process.h"
+#include "emulator/hyp_support.h"
+#include "platform/embedded/emulator_client.h"
+
+namespace dvs::test {
+namespace {
+
+/// One connection below the device: bytes out, a reply in.
+class RawClient {
+public:
+    explicit RawClient(const std::string &socket) : fd_(embedded::ConnectEmulator(socket.c_str())) {}
+    ~RawClient() { close(fd_); }
+    RawClient(const RawClient &) = delete;
+    RawClient &operator=(const RawClient &) = delete;
+
+    void Send(const std::string &bytes) {
+        iovec part{const_cast<char *>(bytes.data()), bytes.size()};
+        (void)embedded::SendWhole(fd_, &part, 1); // the emulator may have hung up
+    }
+
+    /// True when a reply or the end of the connection came within `ms`.
+    bool Answered(int ms, bool *ended = nullptr) {
+        pollfd polled{fd_, POLLIN, 0};
+        if (poll(&polled, 1, ms) != 1) return false;
+        char buffer[65536];
+        const ssize_t got = recv(fd_, buffer, sizeof buffer, MSG_DONTWAIT);
+        if (ended) *ended = got <= 0;
+        return true;
+    }
+
+private:
+    int fd_;
+};
+
+struct Parts {
+    wire::RequestHeader header{};
+    DVSHYPRequest record{};
+    std::string value;
+    std::string cmdIn;
+
+    std::string Bytes() const {
+        std::string bytes(reinterpret_cast<const char *>(&header), sizeof header);
+        bytes.append(reinterpret_cast<const char *>(&record), sizeof record);
+        return bytes + value + cmdIn;
+    }
+};
+
+Parts ValidRequest(int command, const std::string &value = {}) {
+    Parts parts;
+    parts.header.magic = wire::kMagic;
+    parts.header.version = wire::kVersion;
+    parts.header.kind = static_cast<uint16_t>(wire::Kind::Ioctl);
+    parts.header.request = command;
+    parts.header.flags = wire::HasData | wire::HasCmdIn | wire::HasCmdOut;
+    parts.header.dataSize = static_cast<uint32_t>(value.size());
+    std::strcpy(parts.record.switchName, "s");
+    std::strcpy(parts.record.portId, "p");
+    std::strcpy(parts.record.propName, command == 26 || command == 27 ? "1" : "name");
+    std::strcpy(parts.record.cmd, "ports s");
+    parts.record.status = HYP_FAILURE;
+    parts.record.dataLen = value.empty() ? 32768 : static_cast<uint32_t>(value.size());
+    parts.record.cmdOutLen = 32768;
+    parts.value = value;
+    return parts;
+}
+
+class HostileClients : public testing::Test {
+protected:
+    HostileClients() { Populate(); }
+
+    void Populate() {
+        (void)DVSHYP_SwitchAdd("s", "vswitch", 0, 110);
+        (void)AddPort("s", "p", {{"name", "value"}});
+        (void)DVSHYP_GlobalPropSet("s", "name", "value", 5, 16);
+    }
+    LiveEmulator emulator_;
+};
+
+TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
+    const unsigned count = CountFromEnvironment("DVS_TEST_HOSTILE_REQUESTS", 2000);
+    std::mt19937 random(20240501);
+    const auto below = [&](uint32_t limit) { return static_cast<uint32_t>(random() % limit); };
+    for (unsigned i = 0; i < count; i++) {
+        std::string value;
+        if (below(2)) value = PortData({{"a", std::string(below(100), 'v')}}, below(6));
+        Parts parts = ValidRequest(static_cast<int>(below(34)), value);
+        if (below(3) == 0) parts.record.dataLen = static_cast<uint32_t>(random());
+        if (below(3) == 0) parts.header.flags = static_cast<uint32_t>(random());
+        std::string bytes = parts.Bytes();
+        // Bytes changed anywhere, the text fields' ends included; now and then a whole stretch, or a cut.
+        for (uint32_t change = below(8); change > 0; change--)
+            bytes[below(static_cast<uint32_t>(bytes.size()))] = static_cast<char>(random());
+        if (below(4) == 0) {
+            const uint32_t at = below(static_cast<uint32_t>(bytes.size()));
+            bytes.replace(at, 200, std::min<std::size_t>(200, bytes.size() - at), 'A');
+        }
+        if (below(8) == 0) bytes.resize(below(static_cast<uint32_t>(bytes.size())));
+        if (below(16) == 0) bytes.insert(0, std::string(1 + below(50), static_cast<char>(random())));
+        RawClient client(emulator_.Socket());
+        client.Send(bytes);
+        if (below(4)) (void)client.Answered(1);
+        if (i % 50 == 0) {
+            Populate();
+            ASSERT_EQ(Fetch(DVSHYP_GlobalPropGet, "s", "name").status, HYP_OK) << i;
+            ASSERT_EQ(Exec("fault clear").status, HYP_OK) << i;
+        }
+    }
+    EXPECT_EQ(emulator_.Process().Stop(SIGTERM), 0);
+}
+
+TEST_F(HostileClients, FieldsWithoutNulAreBadParameters) {
+    const struct { std::size_t offset, size; } fields[] = {{0, 64}, {64, 48}, {112, 128}, {272, 128}};
+    for (const auto &field : fields) {
+        Parts parts = ValidRequest(20);
+        std::memset(reinterpret_cast<char *>(&parts.record) + field.offset, 'x', field.size);
+        const int fd = embedded::ConnectEmulator(emulator_.Socket().c_str());
+        std::string bytes = parts.Bytes();
+        iovec part{bytes.data(), bytes.size()};
+        ASSERT_TRUE(embedded::SendWhole(fd, &part, 1));
+        wire::ReplyHeader reply{};
+        ASSERT_TRUE(embedded::ReceiveReply(fd, &reply, nullptr, 0));
+        EXPECT_EQ(reply.status, HYP_BAD_PARAM) << field.offset;
+        EXPECT_EQ(reply.error, EINVAL);
+        close(fd);
+    }
+}
+
+TEST_F(HostileClients, WhatIsNoRequestEndsTheConnection) {
+    Parts wrong[4] = {ValidRequest(20), ValidRequest(20), ValidRequest(20), ValidRequest(0)};
+    wrong[0].header.magic++;
+    wrong[1].header.version++;
+    wrong[2].header.kind = 7;
+    wrong[3].header.dataSize = (256U << 20) + 1;
+    for (const Parts &parts : wrong) {
+        RawClient client(emulator_.Socket());
+        client.Send(parts.Bytes());
+        bool ended = false;
+        EXPECT_TRUE(client.Answered(5000, &ended));
+        EXPECT_TRUE(ended);
+    }
+}
+
+TEST_F(HostileClients, AnnouncedSizesCostNothingUntilTheyArrive) {
+    Parts parts = ValidRequest(0);
+    parts.header.dataSize = parts.record.dataLen = 256U << 20;
+    std::vector<std::unique_ptr<RawClient>> clients;
+    for (int i = 0; i < 100; i++) {
+        clients.push_back(std::make_unique<RawClient>(emulator_.Socket()));
+        clients.back()->Send(parts.Bytes());
+    }
+    EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s", "name").text, "value");
+}
+
+TEST_F(HostileClients, ARequestCutOffIsNotCarriedOut) {
+    const std::string whole = ValidRequest(5).Bytes(); // switch remove
+    for (const std::size_t size : {std::size_t{1}, std::size_t{24}, whole.size() - 1}) {
+        RawClient client(emulator_.Socket());
+        client.Send(whole.substr(0, size));
+    }
+    EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_OK);
+    RawClient client(emulator_.Socket());
+    client.Send(whole);
+    EXPECT_TRUE(client.Answered(5000));
+    EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
+}
+
+TEST_F(HostileClients, ByteByByteIsStillARequest) {
+    RawClient client(emulator_.Socket());
+    for (const char byte : ValidRequest(5).Bytes())
+        client.Send(std::string(1, byte));
+    EXPECT_TRUE(client.Answered(5000));
+    EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
+}
+
+TEST_F(HostileClients, RequestsSentAheadAreAnsweredInOrder) {
+    RawClient client(emulator_.Socket());
+    std::string bytes;
+    for (int i = 0; i < 50; i++)
+        bytes += ValidRequest(20).Bytes();
+    client.Send(bytes + ValidRequest(5).Bytes());
+    for (int i = 0; i < 100 && DVSHYP_PortFind("s", "p") == HYP_OK; i++)
+        usleep(10000);
+    EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
+}
+
+TEST_F(HostileClients, AClientThatTakesNoAnswersHoldsUpNobody) {
+    const std::string value(8 << 20, 'v');
+    ASSERT_EQ(DVSHYP_GlobalPropSet("s", "name", value.data(), static_cast<uint32_t>(value.size()), 16),
+              HYP_OK);
+    std::vector<std::unique_ptr<RawClient>> clients;
+    for (int i = 0; i < 20; i++) {
+        clients.push_back(std::make_unique<RawClient>(emulator_.Socket()));
+        Parts parts = ValidRequest(8);
+        parts.record.dataLen = 64 << 20;
+        clients.back()->Send(parts.Bytes());
+    }
+    EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s", "name").text, value);
+    // What was lent for those answers was copied: changing the value changes none of them.
+    EXPECT_EQ(DVSHYP_GlobalPropClear("s", "name"), HYP_OK);
+    EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
+}
+
+} // namespace
+} // namespace dvs::test
