@@ -1,0 +1,97 @@
+#!/bin/bash
+# From a bare machine to a first look: installs what is missing, builds, and takes the example site through a state
+# file, verification, display, a change, the difference, and back. Works in a directory of its own and leaves nothing
+# behind but build/release.
+set -euo pipefail
+cd "$(dirname "$0")"
+
+case ${1:-} in
+'') ;;
+--help | -h)
+    echo "Usage: ./quickstart.sh"
+    echo "Installs missing packages (apt, as root or through sudo), builds build/release, shows dvsctl at work."
+    exit 0
+    ;;
+*)
+    echo "Usage: ./quickstart.sh" >&2
+    exit 2
+    ;;
+esac
+
+work=$(mktemp -d)
+trap 'rm -rf "$work"' EXIT
+
+say() { printf '\n\033[1m== %s\033[0m\n' "$*"; }
+[ -t 1 ] && [ -z "${NO_COLOR:-}" ] || say() { printf '\n== %s\n' "$*"; }
+# Prints a command as one would type it, then runs it.
+run() {
+    printf '$ dvsctl %s\n' "${*//$work\//}"
+    "$dvsctl" "$@" --no-pager
+}
+
+cmake/install-packages.sh
+
+say "Building build/release (the first time takes a few minutes)"
+cmake --preset release >"$work/configure.log" 2>&1 || { cat "$work/configure.log" >&2; exit 1; }
+cmake --build --preset release --target dvs dvsctl -- --quiet
+dvsctl=$PWD/build/release/bin/dvsctl
+example=$PWD/examples/site-basic.json
+
+say "The example site, written as JSON, becomes a state file"
+run copy "json:$example" "$work/site.db"
+
+say "Every nested buffer of it is checked"
+run verify "$work/site.db"
+
+say "What is in it: the storage switch"
+run show "$work/site.db" --switch storage
+
+say "One setting of every switch and port, one line each"
+run show "$work/site.db" --props '*.alias' --columns switch,port,kind,value
+
+say "Its first bytes, and what they are"
+run hexdump "$work/site.db" | head -n 24 || true
+
+say "A colleague edits a copy: larger frames, a port unblocked, a new port"
+run copy "$work/site.db" "json:$work/edit.json"
+python3 - "$work/edit.json" <<'PYTHON'
+import json
+import sys
+
+path = sys.argv[1]
+with open(path, encoding="utf-8") as file:
+    site = json.load(file)
+storage = site["switches"][1]
+for setting in storage["global"]:
+    if setting["name"].endswith(".mtu"):
+        setting["value"] = 9000
+for port in storage["ports"]:
+    if port["id"] == "105":
+        port["properties"] = [p for p in port["properties"] if not p["name"].endswith(".block")]
+storage["ports"].append({
+    "id": "107",
+    "properties": [{"name": "com.orbeno.common.port.alias", "type": 16, "value": "nfs-c"}],
+})
+with open(path, "w", encoding="utf-8") as file:
+    json.dump(site, file, ensure_ascii=False)
+PYTHON
+
+say "What the edit would change, without changing it"
+run copy --dry-run "json:$work/edit.json" "$work/site.db"
+
+say "The edit goes to a state file of its own; the difference to the first one"
+run copy "json:$work/edit.json" "$work/edited.db"
+run diff "$work/site.db" "$work/edited.db" && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
+
+say "And back: state file to JSON to state file gives the same bytes"
+run copy "$work/site.db" "json:$work/back.json"
+run copy "json:$work/back.json" "$work/back.db"
+cmp "$work/site.db" "$work/back.db"
+echo "site.db and back.db are equal, byte for byte."
+
+say "A damaged file is recognised, down to the byte"
+cp "$work/site.db" "$work/damaged.db"
+printf 'X' | dd of="$work/damaged.db" bs=1 seek=20000 conv=notrunc status=none
+run verify "$work/damaged.db" && exit 1 || [ $? -eq 6 ] # 6: malformed
+
+printf '\nThat was dvsctl. Next: %s --help, README.md, docs/json-form.md; ./test.sh runs the tests.\n' build/release/bin/dvsctl

@@ -1,0 +1,64 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Columns line up, and only those asked for are there.
+
+#include "tools/dvsctl/table.h"
+
+#include <gtest/gtest.h>
+
+#include "tools/dvsctl/error.h"
+#include "tools/dvsctl/options.h"
+
+namespace {
+
+using namespace dvs::ctl;
+
+constexpr Column kColumns[] = {{"name", false, true}, {"size", true, true}, {"extra"}};
+
+std::string Render(const Options &options) {
+    testing::internal::CaptureStdout();
+    Output out;
+    Table table(kColumns, options);
+    table.Add({{"a"}, {"1"}, {"x"}});
+    table.Add({{"Zürich"}, {"1000"}, {""}});
+    table.Write(out);
+    out.Finish();
+    return testing::internal::GetCapturedStdout();
+}
+
+TEST(Table, AlignsByWhatIsSeen) {
+    EXPECT_EQ(Render({}), "NAME    SIZE\n"
+                          "a          1\n"
+                          "Zürich  1000\n");
+}
+
+TEST(Table, ShowsTheColumnsAskedForInTheirOrder) {
+    Options options;
+    options.columns = "extra,name";
+    EXPECT_EQ(Render(options), "EXTRA  NAME\n"
+                               "x      a\n"
+                               "       Zürich\n");
+}
+
+TEST(Table, LeavesHeadingsOut) {
+    Options options;
+    options.noHeadings = true;
+    options.columns = "size";
+    EXPECT_EQ(Render(options), "   1\n1000\n");
+}
+
+TEST(Table, RefusesAnUnknownColumn) {
+    for (const char *columns : {"nmae", "", "name,", ",name", "name,,size"}) {
+        Options options;
+        options.columns = columns;
+        try {
+            Render(options);
+            ADD_FAILURE() << columns;
+        } catch (const Error &error) {
+            EXPECT_EQ(error.status, Exit::Usage);
+            EXPECT_EQ(error.why, "the columns are name, size, extra");
+        }
+        testing::internal::GetCapturedStdout();
+    }
+}
+
+} // namespace
