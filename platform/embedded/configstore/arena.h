@@ -11,6 +11,7 @@
 #include <cstring>
 #include <new>
 #include <string_view>
+#include <sys/mman.h>
 
 namespace configstore {
 
@@ -53,7 +54,16 @@ private:
         std::size_t size;
     };
     static constexpr std::size_t kFirstChunk = 2048;
-    static constexpr std::size_t kLargestChunk = std::size_t{1} << 20;
+    static constexpr std::size_t kLargestChunk = std::size_t{1} << 21; // a huge page
+
+    /// A tree of thousands of ports takes megabytes, used once: its page faults cost more than all the rest, unless
+    /// they are few.
+    static void *TakeBlock(std::size_t size) {
+        if (size != kLargestChunk) return std::malloc(size);
+        void *const block = std::aligned_alloc(kLargestChunk, size);
+        if (block) (void)madvise(block, size, MADV_HUGEPAGE);
+        return block;
+    }
 
     void *AllocateSlow(std::size_t size) {
         // A large piece gets a chunk of its own behind the current one, so that the current one's rest stays
@@ -61,7 +71,7 @@ private:
         const bool alone = size > nextChunk_ / 4;
         const std::size_t room = alone ? size : nextChunk_ - sizeof(Chunk);
         if (room > SIZE_MAX - sizeof(Chunk)) throw std::bad_alloc();
-        auto *const chunk = static_cast<Chunk *>(std::malloc(sizeof(Chunk) + room));
+        auto *const chunk = static_cast<Chunk *>(TakeBlock(sizeof(Chunk) + room));
         if (!chunk) throw std::bad_alloc();
         chunk->size = room;
         char *const start = reinterpret_cast<char *>(chunk + 1);

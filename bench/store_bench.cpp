@@ -1,0 +1,235 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Saving one switch to the config store and loading it back, beside SQLite alone storing and reading one ready
+// document of the same size: all of it in one run, on the same disk, with the same durability. Prints milliseconds
+// (the median of the rounds) and ratios, and the peak memory. See README.md.
+//
+//   store_bench [--ports N[,N…]] [--rounds N] [--dir DIRECTORY]
+
+#include <algorithm>
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <functional>
+#include <sqlite3.h>
+#include <string>
+#include <sys/resource.h>
+#include <unistd.h>
+#include <vector>
+
+#include "dvs/configstore.h"
+#include "dvs/log.h"
+#include "dvs/state.h"
+
+namespace {
+
+[[noreturn]] void Fail(const char *what) {
+    std::fprintf(stderr, "store_bench: %s failed\n", what);
+    std::exit(1);
+}
+
+void Check(bool good, const char *what) {
+    if (!good) Fail(what);
+}
+
+struct Setting {
+    const char *key;
+    std::string value;
+};
+
+template <typename Number> std::string Bytes(Number value) {
+    return std::string(reinterpret_cast<const char *>(&value), sizeof value);
+}
+
+std::string Text(const std::string &text) { return text + '\0'; }
+
+/// Twelve settings of a port: texts, numbers, flags and records, as a host has them.
+std::vector<Setting> SettingsOf(int port, int version) {
+    const std::string number = std::to_string(port);
+    std::string vlan(8, '\0');
+    vlan[2] = static_cast<char>(port % 100 + 1);
+    std::string shaping;
+    for (const uint64_t value : {1000000ULL, 2000000ULL, 100000ULL})
+        shaping += Bytes(value);
+    return {
+        {"com.orbeno.common.port.alias", Text("port number " + number)},
+        {"com.orbeno.common.port.connectid", Bytes(static_cast<uint32_t>(1000 + port + version))},
+        {"com.orbeno.common.port.block", Text("false")},
+        {"com.orbeno.common.port.ptAllowed", Bytes(uint32_t{2})},
+        {"com.orbeno.etherswitch.port.txUplink", Text("normal")},
+        {"com.orbeno.common.port.portgroupid", Text("portgroup-" + std::to_string(port % 16))},
+        {"com.orbeno.etherswitch.port.vlan", vlan},
+        {"com.orbeno.etherswitch.port.ipfix", Text("enabled")},
+        {"com.orbeno.common.port.shaper.input", shaping},
+        {"com.orbeno.etherswitch.port.security", Bytes(uint32_t{5})},
+        {"com.orbeno.common.port.backingType", Text("regular")},
+        {"com.orbeno.port.extraConfig.note", Text("set by the site's tools, change " + number)},
+    };
+}
+
+struct State {
+    void *buffer = nullptr;
+    uint32_t len = 0;
+};
+
+State BuildState(int ports, int version) {
+    constexpr const char *kSwitch = "50 2d 6b 7c 1a 2b 3c 4d-5e 6f 70 81 92 a3 b4 c5";
+    Check(DVSState_SwitchAdd(kSwitch, "etherswitch", static_cast<uint32_t>(ports), 9) == HYP_OK, "the switch");
+    const std::string name = Text("bench");
+    Check(DVSState_GlobalPropSet(kSwitch, "com.orbeno.common.alias", name.data(), static_cast<uint32_t>(name.size()), 0x20) ==
+              HYP_OK,
+          "the alias");
+    const uint32_t number = 9;
+    Check(DVSState_GlobalPropSet(kSwitch, "com.orbeno.common.version", &number, 4, 0x20) == HYP_OK, "the version");
+    for (int port = 0; port < ports; port++) {
+        DVSData *data = nullptr;
+        Check(DVSData_Alloc(&data, [](uint64_t size) { return std::malloc(size); }, [](void *block) { std::free(block); }) == HYP_OK,
+              "a port's list");
+        for (const Setting &setting : SettingsOf(port, version))
+            Check(DVSData_Append(data, setting.key, setting.value.data(), static_cast<uint32_t>(setting.value.size()),
+                                 std::strstr(setting.key, "extraConfig") ? 0x00 : 0x20) == HYP_OK,
+                  "a setting");
+        Check(DVSState_PortAdd(kSwitch, std::to_string(port).c_str(), data) == HYP_OK, "a port");
+    }
+    State state;
+    Check(DVSState_ConfigSerialize(&state.buffer, &state.len) == HYP_OK, "the state's buffer");
+    Check(DVSState_ConfigReset() == HYP_OK, "the reset");
+    return state;
+}
+
+double MedianMs(int rounds, const std::function<void(int)> &work) {
+    std::vector<double> times;
+    for (int round = 0; round < rounds; round++) {
+        const auto start = std::chrono::steady_clock::now();
+        work(round);
+        times.push_back(std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - start).count());
+    }
+    std::nth_element(times.begin(), times.begin() + rounds / 2, times.end());
+    return times[static_cast<std::size_t>(rounds / 2)];
+}
+
+/// SQLite with the store's durability and nothing else: a table of documents.
+class Plain {
+  public:
+    explicit Plain(std::string path) : path_(std::move(path)) { Open(); }
+    ~Plain() { sqlite3_close(db_); }
+    void Open() {
+        Check(sqlite3_open(path_.c_str(), &db_) == SQLITE_OK, "sqlite3_open");
+        Run("PRAGMA journal_mode=WAL");
+        Run("PRAGMA synchronous=FULL");
+        Run("CREATE TABLE IF NOT EXISTS document (id TEXT PRIMARY KEY, text TEXT)");
+    }
+    void Close() {
+        sqlite3_close(db_);
+        db_ = nullptr;
+    }
+    void Store(const std::string &text) {
+        Run("BEGIN IMMEDIATE");
+        sqlite3_stmt *statement = nullptr;
+        sqlite3_prepare_v2(db_, "REPLACE INTO document VALUES ('one', ?)", -1, &statement, nullptr);
+        sqlite3_bind_text64(statement, 1, text.data(), text.size(), SQLITE_STATIC, SQLITE_UTF8);
+        Check(sqlite3_step(statement) == SQLITE_DONE, "the document");
+        sqlite3_finalize(statement);
+        Run("COMMIT");
+    }
+    std::string Read() {
+        sqlite3_stmt *statement = nullptr;
+        sqlite3_prepare_v2(db_, "SELECT text FROM document WHERE id = 'one'", -1, &statement, nullptr);
+        Check(sqlite3_step(statement) == SQLITE_ROW, "the document's row");
+        std::string text(reinterpret_cast<const char *>(sqlite3_column_text(statement, 0)),
+                         static_cast<std::size_t>(sqlite3_column_bytes(statement, 0)));
+        sqlite3_finalize(statement);
+        return text;
+    }
+
+  private:
+    void Run(const char *sql) { Check(sqlite3_exec(db_, sql, nullptr, nullptr, nullptr) == SQLITE_OK, sql); }
+    std::string path_;
+    sqlite3 *db_ = nullptr;
+};
+
+std::string StoredDocument(const std::string &path) {
+    sqlite3 *db = nullptr;
+    Check(sqlite3_open(path.c_str(), &db) == SQLITE_OK, "the store");
+    sqlite3_stmt *statement = nullptr;
+    sqlite3_prepare_v2(db, "SELECT document FROM object", -1, &statement, nullptr);
+    Check(sqlite3_step(statement) == SQLITE_ROW, "the stored object");
+    std::string text(reinterpret_cast<const char *>(sqlite3_column_text(statement, 0)),
+                     static_cast<std::size_t>(sqlite3_column_bytes(statement, 0)));
+    sqlite3_finalize(statement);
+    sqlite3_close(db);
+    return text;
+}
+
+void Row(const char *work, double ours, double plain) {
+    std::printf("%-44s %9.2f %9.2f %7.2f\n", work, ours, plain, ours / plain);
+}
+
+void Bench(int ports, int rounds, const std::string &directory) {
+    const std::string path = directory + "/store.db";
+    setenv("DVS_CONFIGSTORE", path.c_str(), 1);
+    std::filesystem::remove_all(directory);
+    std::filesystem::create_directories(directory);
+    const State states[2] = {BuildState(ports, 0), BuildState(ports, 1)};
+    // Two documents in turn, so that each save changes something. The first save of all is measured alone.
+    const double first = MedianMs(1, [&](int) {
+        Check(DVSState_SaveBufToConfigStore(states[1].buffer, states[1].len) == 0, "the first save");
+    });
+    const double save = MedianMs(rounds, [&](int round) {
+        Check(DVSState_SaveBufToConfigStore(states[round % 2].buffer, states[round % 2].len) == 0, "the save");
+    });
+    const double load = MedianMs(rounds, [&](int) {
+        void *out = nullptr;
+        uint32_t len = 0;
+        Check(DVSState_LoadFromConfigStoreAsBuf(&out, &len, false) == 0 && out, "the load");
+        std::free(out);
+    });
+    rusage usage{};
+    getrusage(RUSAGE_SELF, &usage);
+    const std::string document = StoredDocument(path);
+    Plain plain(directory + "/plain.db");
+    plain.Store(document);
+    const double plainStore = MedianMs(rounds, [&](int) { plain.Store(document); });
+    const double plainRead = MedianMs(rounds, [&](int) { Check(plain.Read().size() == document.size(), "the read"); });
+    plain.Close();
+    const auto around = [&](const std::function<void()> &work) {
+        return MedianMs(rounds, [&](int) {
+            plain.Open();
+            work();
+            plain.Close();
+        });
+    };
+    const double openStore = around([&] { plain.Store(document); });
+    const double openRead = around([&] { (void)plain.Read(); });
+    std::printf("%d ports x 12 settings: a document of %zu bytes, a state of %u; peak memory %ld MB\n", ports, document.size(),
+                states[0].len, usage.ru_maxrss / 1024);
+    std::printf("%-44s %9s %9s %7s\n", "milliseconds", "ours", "SQLite", "ratio");
+    Row("first save, into a new store", first, plainStore);
+    Row("save again (history), SQLite kept open", save, plainStore);
+    Row("save again (history), SQLite opened each time", save, openStore);
+    Row("load, SQLite kept open", load, plainRead);
+    Row("load, SQLite opened each time", load, openRead);
+    for (const State &state : states)
+        std::free(state.buffer);
+    std::filesystem::remove_all(directory);
+}
+
+} // namespace
+
+int main(int argc, char **argv) {
+    std::string ports = "4096,16384";
+    std::string directory = std::filesystem::temp_directory_path() / ("store_bench." + std::to_string(getpid()));
+    int rounds = 15;
+    for (int i = 1; i + 1 < argc; i += 2) {
+        if (std::strcmp(argv[i], "--ports") == 0) ports = argv[i + 1];
+        if (std::strcmp(argv[i], "--rounds") == 0) rounds = std::max(1, std::atoi(argv[i + 1]));
+        if (std::strcmp(argv[i], "--dir") == 0) directory = std::string(argv[i + 1]) + "/store_bench";
+    }
+    dvsconfigstore_debug = dvs_debug = dvsdata_debug = -1;
+    setenv("DVS_MAX_PORTS", "131072", 0);
+    for (char *at = ports.data(); *at; at += *at == ',') {
+        Bench(static_cast<int>(std::strtol(at, &at, 10)), rounds, directory);
+    }
+    return 0;
+}
