@@ -56,8 +56,8 @@ private:
     static constexpr std::size_t kFirstChunk = 2048;
     static constexpr std::size_t kLargestChunk = std::size_t{1} << 21; // a huge page
 
-    /// A tree of thousands of ports takes megabytes, used once: its page faults cost more than all the rest, unless
-    /// they are few.
+    /// A tree of thousands of ports takes megabytes, used once: its page faults cost more than all the rest,
+    /// unless they are few.
     static void *TakeBlock(std::size_t size) {
         if (size != kLargestChunk) return std::malloc(size);
         void *const block = std::aligned_alloc(kLargestChunk, size);

@@ -86,19 +86,18 @@ int32_t KeepMemoryDatabase() {
 }
 
 /// Nothing in the file is trusted: no functions from its schema, no writes to what SQLite keeps for itself.
-int32_t Harden(Store *store) {
+int32_t Harden(Store *store, bool keepLog) {
     sqlite3 *const db = store->db.get();
     sqlite3_extended_result_codes(db, 1);
     sqlite3_busy_timeout(db, kBusyTimeoutMs);
-    constexpr struct {
+    const struct {
         int option, value;
     } kOptions[] = {
-        {SQLITE_DBCONFIG_DEFENSIVE, 1},      //
-        {SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0}, //
-        {SQLITE_DBCONFIG_ENABLE_TRIGGER, 0}, //
-        {SQLITE_DBCONFIG_ENABLE_VIEW, 0},    // ours are for people
-        {SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE,
-         1}, // until the file is known to be ours, closing must not change it
+        {SQLITE_DBCONFIG_DEFENSIVE, 1},              //
+        {SQLITE_DBCONFIG_TRUSTED_SCHEMA, 0},         //
+        {SQLITE_DBCONFIG_ENABLE_TRIGGER, 0},         //
+        {SQLITE_DBCONFIG_ENABLE_VIEW, 0},            // ours are for people
+        {SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, keepLog}, // closing must not change what may not be ours
     };
     for (const auto &option : kOptions) {
         if (sqlite3_db_config(db, option.option, option.value, nullptr) != SQLITE_OK) return FAILED;
@@ -238,8 +237,11 @@ std::string StorePath() {
 int32_t OpenStore(const std::string &path, Access access, std::unique_ptr<Store> *out) {
     auto store = std::make_unique<Store>();
     store->path = path;
+    // Without a log there is nothing that closing could move into the file, and its own empty one goes away.
+    struct stat log {};
+    const bool keepLog = stat((path + "-wal").c_str(), &log) == 0 && log.st_size > 0;
     int32_t status = OpenFile(store.get(), access);
-    if (status == OK) status = Harden(store.get());
+    if (status == OK) status = Harden(store.get(), keepLog);
     if (status != OK) return status;
     store->readOnly = sqlite3_db_readonly(store->db.get(), "main") != 0;
     status = Migrate(store.get());

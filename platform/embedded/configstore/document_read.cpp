@@ -73,8 +73,10 @@ public:
         return true;
     }
 
-    bool on_object_end(std::size_t, error_code &ec) {
+    bool on_object_end(std::size_t count, error_code &ec) {
         Frame &frame = frames_[depth_ - 1];
+        if (strict_ && rawDepth_ == 0 && frame.kind == Kind::Instances && count > frame.node->field->maxItems)
+            return Refuse(ec, "more than " + std::to_string(frame.node->field->maxItems) + " instances");
         const auto from = hashes_.begin() + static_cast<std::ptrdiff_t>(frame.hashes);
         std::sort(from, hashes_.end());
         const bool twice = std::adjacent_find(from, hashes_.end()) != hashes_.end();

@@ -34,6 +34,7 @@ void Relax(json::value &node, Strictness strictness) {
     if (strictness == Strictness::Store) {
         object->erase("enum");
         object->erase("maxItems");
+        object->erase("maxProperties");
         const json::value *const additional = object->if_contains("additionalProperties");
         if (additional && additional->is_bool()) object->erase("additionalProperties");
     }

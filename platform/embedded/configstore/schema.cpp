@@ -132,6 +132,8 @@ private:
             const bool instances = additional && additional->is_object();
             field.type = instances ? FieldType::Instances : FieldType::Object;
             field.shape = ShapeOf(instances ? *additional : node);
+            if (const json::value *most = keywords.if_contains("maxProperties"))
+                field.maxItems = most->to_number<uint64_t>();
         } else {
             throw std::runtime_error("an unknown type: " + std::string(name));
         }

@@ -36,7 +36,7 @@ struct Field {
     int64_t minimum = INT64_MIN;
     int64_t maximum = INT64_MAX;
     uint64_t maxBytes = UINT64_MAX;
-    uint64_t maxItems = UINT64_MAX; // imports only
+    uint64_t maxItems = UINT64_MAX; // of a list, or instances; imports only
     const Shape *shape = nullptr;
     std::string prefix; // the name as a document writes it: "name":
 };

@@ -1,0 +1,223 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Database files that nobody vouches for: each is refused or read, never followed into harm, and what is
+// refused is left as it was. STORE_FLIP_ROUNDS sets how many damaged copies are looked at.
+
+#include "platform/configstore/support.h"
+
+#include <filesystem>
+#include <fstream>
+#include <random>
+#include <sqlite3.h>
+#include <sys/stat.h>
+
+#include "platform/embedded/configstore/admin.h"
+#include "platform/embedded/configstore/log.h"
+
+using namespace configstore;
+using namespace store_test;
+
+namespace {
+
+std::string ReadFile(const std::string &path) {
+    std::ifstream file(path, std::ios::binary);
+    return std::string(std::istreambuf_iterator<char>(file), {});
+}
+
+void WriteFile(const std::string &path, const std::string &bytes) {
+    std::ofstream(path, std::ios::binary) << bytes;
+}
+
+class StoreHostileDatabase : public StoreTest {
+protected:
+    /// GetStore gives the status and names the file; the file's bytes stay.
+    void ExpectRefused(int32_t wanted, const std::string &why) {
+        const bool file = std::filesystem::is_regular_file(path_);
+        const std::string before = file ? ReadFile(path_) : "";
+        const MessageCollector messages;
+        Store *store = nullptr;
+        EXPECT_EQ(GetStore(&store), wanted);
+        EXPECT_EQ(store, nullptr);
+        EXPECT_NE(messages.Text().find("config store " + path_ + ": "), std::string::npos) << messages.Text();
+        EXPECT_NE(messages.Text().find(why), std::string::npos) << messages.Text();
+        if (file) {
+            EXPECT_TRUE(ReadFile(path_) == before);
+        }
+    }
+
+    /// A good store's bytes, in one file.
+    std::string GoodStore() {
+        {
+            const StorePtr store = Open();
+            for (int version = 0; version < 3; version++) {
+                for (const char *id : {"a", "b", "c"}) {
+                    std::string json = R"({"name":"version )" + std::to_string(version) + R"(","ports":{)";
+                    for (int port = 0; port < 40; port++)
+                        json += (port > 0 ? ",\"" : "\"") + std::to_string(port) + R"(":{"name":"port"})";
+                    Save(store.get(), json + "}}", id);
+                }
+            }
+        }
+        EXPECT_FALSE(std::filesystem::exists(path_ + "-wal"));
+        return ReadFile(path_);
+    }
+
+    /// Does all there is to do with whatever the file is; everything may be refused, with the file's name.
+    void Exercise() {
+        const MessageCollector messages;
+        Store *store = nullptr;
+        bool failed = GetStore(&store) != OK;
+        const StorePtr owner(store);
+        if (store) {
+            FilterSpec *spec = nullptr;
+            ASSERT_EQ(CreateFilterSpecObject(kKey, kGroup, kComponent, "", &spec), OK);
+            const SpecPtr specOwner(spec);
+            Object **objects = nullptr;
+            int32_t count = 0;
+            if (GetInstances(store, spec, &objects, &count) == OK)
+                DestroyObjects(objects, count);
+            else
+                failed = true;
+            std::vector<admin::Problem> problems;
+            failed |= admin::Check(store, &problems) != OK;
+            const ObjectPtr object = NewSwitch(R"({"name":"new"})", "b");
+            EXPECT_EQ(BeginTransaction(store), OK);
+            int32_t status = Set(store, object.get(), "EXTERNAL");
+            if (status == OK) status = Delete(store, kKey, kGroup, kComponent, "a");
+            if (status == OK || status == NOT_FOUND) status = CommitTransaction(store);
+            if (status != OK) {
+                failed = true;
+                EXPECT_EQ(CancelTransaction(store), OK);
+            }
+        }
+        if (failed) {
+            EXPECT_NE(messages.Text().find(path_), std::string::npos) << messages.Text();
+        }
+    }
+};
+
+TEST_F(StoreHostileDatabase, RandomDamage) {
+    const char *const wanted = std::getenv("STORE_FLIP_ROUNDS");
+    const int rounds = wanted ? std::atoi(wanted) : 60;
+    const std::string good = GoodStore();
+    std::mt19937_64 random(11);
+    for (int round = 0; round < rounds; round++) {
+        SCOPED_TRACE(round);
+        std::string bad = good;
+        if (round % 4 == 3) {
+            bad.resize(random() % bad.size());
+        } else {
+            // A few bytes anywhere, or many in one page.
+            const std::size_t page = random() % (bad.size() / 4096) * 4096;
+            for (uint64_t flips = round % 4 == 2 ? 200 : 1 + random() % 8; flips > 0; flips--) {
+                const std::size_t at = round % 4 == 2 ? page + random() % 4096 : random() % bad.size();
+                bad[at] = static_cast<char>(random());
+            }
+        }
+        for (const char *suffix : {"-wal", "-shm"})
+            std::filesystem::remove(path_ + suffix);
+        WriteFile(path_, bad);
+        Exercise();
+    }
+}
+
+TEST_F(StoreHostileDatabase, DamagedDocumentIsCorruptAndNamed) {
+    const StorePtr store = Open();
+    Save(store.get(), R"({"name":"a"})");
+    Run("UPDATE document SET text = '{\"name\":'");
+    const MessageCollector messages;
+    Object *object = nullptr;
+    EXPECT_EQ(Get(store.get(), kKey, kGroup, kComponent, "sw1", &object), CORRUPT);
+    EXPECT_EQ(object, nullptr);
+    EXPECT_NE(messages.Text().find(path_), std::string::npos);
+    EXPECT_NE(messages.Text().find("switches/network_vds/qel[sw1]"), std::string::npos);
+}
+
+TEST_F(StoreHostileDatabase, NewerVersionIsRefusedUntouched) {
+    GoodStore();
+    Run("PRAGMA user_version=2");
+    ExpectRefused(FAILED, "newer release");
+    EXPECT_FALSE(std::filesystem::exists(path_ + "-wal"));
+}
+
+TEST_F(StoreHostileDatabase, NewerVersionWithAWriteAheadLogIsRefusedUntouched) {
+    GoodStore();
+    sqlite3 *db = nullptr;
+    ASSERT_EQ(sqlite3_open(path_.c_str(), &db), SQLITE_OK);
+    ASSERT_EQ(
+        sqlite3_exec(db, "PRAGMA wal_autocheckpoint=0; PRAGMA user_version=2", nullptr, nullptr, nullptr),
+        SQLITE_OK);
+    sqlite3_db_config(db, SQLITE_DBCONFIG_NO_CKPT_ON_CLOSE, 1, nullptr);
+    sqlite3_close(db);
+    ASSERT_TRUE(std::filesystem::exists(path_ + "-wal"));
+    const std::string log = ReadFile(path_ + "-wal");
+    ExpectRefused(FAILED, "newer release");
+    EXPECT_TRUE(ReadFile(path_ + "-wal") == log);
+}
+
+TEST_F(StoreHostileDatabase, ForeignDatabaseIsRefusedUntouched) {
+    Run("CREATE TABLE songs (title TEXT); INSERT INTO songs VALUES ('x')");
+    ExpectRefused(CORRUPT, "not a config store");
+}
+
+TEST_F(StoreHostileDatabase, ForeignDatabaseWithAVersionIsRefusedUntouched) {
+    Run("PRAGMA user_version=1");
+    ExpectRefused(CORRUPT, "not a config store");
+}
+
+TEST_F(StoreHostileDatabase, OtherTablesUnderOurMarkAreRefused) {
+    GoodStore();
+    Run("CREATE TRIGGER t AFTER INSERT ON document BEGIN DELETE FROM object_row; END");
+    ExpectRefused(CORRUPT, "tables");
+    Run("DROP TRIGGER t; DROP VIEW history; CREATE VIEW history AS SELECT 1");
+    ExpectRefused(CORRUPT, "tables");
+}
+
+TEST_F(StoreHostileDatabase, TextFileIsRefusedUntouched) {
+    WriteFile(path_, std::string(5000, 'x'));
+    ExpectRefused(CORRUPT, "not a database");
+}
+
+TEST_F(StoreHostileDatabase, SymbolicLinkIsRefusedAndNotFollowed) {
+    const std::string target = directory_ + "/target.db";
+    ASSERT_EQ(symlink(target.c_str(), path_.c_str()), 0);
+    ExpectRefused(IO_ERROR, "symbolic link");
+    EXPECT_FALSE(std::filesystem::exists(target));
+}
+
+TEST_F(StoreHostileDatabase, DirectoryAndFifoAreRefused) {
+    ASSERT_EQ(mkdir(path_.c_str(), 0700), 0);
+    ExpectRefused(IO_ERROR, "a directory");
+    std::filesystem::remove(path_);
+    ASSERT_EQ(mkfifo(path_.c_str(), 0600), 0);
+    ExpectRefused(IO_ERROR, "not a regular file");
+}
+
+TEST_F(StoreHostileDatabase, MissingDirectoryAboveIsRefused) {
+    path_ = directory_ + "/no/such/store.db";
+    setenv("DVS_CONFIGSTORE", path_.c_str(), 1);
+    ExpectRefused(IO_ERROR, "directory");
+}
+
+TEST_F(StoreHostileDatabase, EmptyFileBecomesAStore) {
+    WriteFile(path_, "");
+    EXPECT_TRUE(StoredIds(Open().get()).empty());
+}
+
+TEST_F(StoreHostileDatabase, WideModesAreTakenBack) {
+    GoodStore();
+    ASSERT_EQ(chmod(path_.c_str(), 0666), 0);
+    (void)Open();
+    struct stat info {};
+    ASSERT_EQ(stat(path_.c_str(), &info), 0);
+    EXPECT_EQ(info.st_mode & 0777, 0600U);
+}
+
+TEST_F(StoreHostileDatabase, PathThatLooksLikeAUriIsAFileName) {
+    ASSERT_EQ(chdir(directory_.c_str()), 0);
+    setenv("DVS_CONFIGSTORE", "file:x.db?mode=memory", 1);
+    Save(Open().get(), "{}");
+    EXPECT_TRUE(std::filesystem::exists(directory_ + "/file:x.db?mode=memory"));
+    ASSERT_EQ(chdir("/"), 0);
+}
+
+} // namespace
