@@ -22,8 +22,9 @@ namespace {
 const ratio::Goal kGoals[] = {
     {"port-add+remove/512", 2.0},   {"port-add+remove/2048", 2.0}, {"port-add+remove/16384", 2.0},
     {"port-add+remove/65536", 2.0}, {"port-find/512", 1.5},        {"port-find/16384", 1.5},
-    {"port-find/65536", 1.5},       {"16384-adds-of-2048", 10.0},  {"encode/32x512", 1.15},
-    {"encode/1x16384", 1.15},       {"decode/32x512", 1.1},        {"decode/1x16384", 1.1},
+    {"port-find/65536", 1.5},       {"16384-adds-of-2048", 10.0},  {"encode-warm/32x512", 1.15},
+    {"encode-warm/1x16384", 1.15},  {"encode-cold/32x512", 0.5},   {"encode-cold/1x16384", 0.5},
+    {"decode/32x512", 1.1},         {"decode/1x16384", 1.1},
 };
 
 constexpr std::uint32_t kVersion = 9;
@@ -161,7 +162,8 @@ std::vector<std::uint8_t> StateOf(const Shape &shape) {
     return state;
 }
 
-void Encode(benchmark::State &state, Shape shape) {
+/// Into a new block each time.
+void EncodeCold(benchmark::State &state, Shape shape) {
     BuildTable(shape);
     for (auto _ : state) {
         void *buf = nullptr;
@@ -170,6 +172,19 @@ void Encode(benchmark::State &state, Shape shape) {
         benchmark::DoNotOptimize(buf);
         std::free(buf);
     }
+    DVSState_ConfigReset();
+}
+
+/// Into one block, whose pages are there.
+void EncodeWarm(benchmark::State &state, Shape shape) {
+    BuildTable(shape);
+    void *buf = nullptr;
+    std::uint32_t len = 0;
+    for (auto _ : state) {
+        DVSState_ConfigSerialize(&buf, &len);
+        benchmark::ClobberMemory();
+    }
+    std::free(buf);
     DVSState_ConfigReset();
 }
 
@@ -199,11 +214,14 @@ FloorState BuildFloor(const Shape &shape) {
 
 constexpr std::uint32_t kFixedSize = 140;
 
-std::uint8_t *EncodeFloor(const FloorState &ports, std::uint32_t *len) {
+std::size_t SizeOf(const FloorState &ports) {
     std::size_t size = 16;
     for (const auto &port : ports)
         size += kFixedSize + 4 + port->size;
-    auto *const buf = static_cast<std::uint8_t *>(std::malloc(size));
+    return size;
+}
+
+void EncodeFloor(const FloorState &ports, std::uint8_t *buf, std::size_t size) {
     std::uint8_t *out = buf + 12;
     for (const auto &port : ports) {
         const std::uint32_t fixed[2] = {kFixedSize + 4 + port->size, port->size};
@@ -221,29 +239,41 @@ std::uint8_t *EncodeFloor(const FloorState &ports, std::uint32_t *len) {
         out += 8;
     }
     std::memset(out, 0, 4);
-    *len = static_cast<std::uint32_t>(size);
-    const std::uint32_t header[3] = {*len, bench::floor::Checksum(buf, size), 1};
+    const std::uint32_t header[3] = {static_cast<std::uint32_t>(size), bench::floor::Checksum(buf, size), 1};
     std::memcpy(buf, header, 12);
-    return buf;
 }
 
-void EncodeStateFloor(benchmark::State &state, Shape shape) {
+void EncodeColdFloor(benchmark::State &state, Shape shape) {
     const FloorState ports = BuildFloor(shape);
-    std::uint32_t len = 0;
     for (auto _ : state) {
-        std::uint8_t *buf = EncodeFloor(ports, &len);
+        const std::size_t size = SizeOf(ports);
+        auto *const buf = static_cast<std::uint8_t *>(std::malloc(size));
+        EncodeFloor(ports, buf, size);
         benchmark::DoNotOptimize(buf);
         std::free(buf);
     }
 }
 
-void DecodeStateFloor(benchmark::State &state, Shape shape) {
-    std::uint32_t len = 0;
-    std::uint8_t *const buf = EncodeFloor(BuildFloor(shape), &len);
+void EncodeWarmFloor(benchmark::State &state, Shape shape) {
+    const FloorState ports = BuildFloor(shape);
+    std::vector<std::uint8_t> buf(SizeOf(ports));
     for (auto _ : state) {
-        if (bench::floor::Checksum(buf, len) != bench::floor::SizeAt(buf + 4)) std::abort();
+        EncodeFloor(ports, buf.data(), SizeOf(ports));
+        benchmark::ClobberMemory();
+    }
+}
+
+void DecodeFloor(benchmark::State &state, Shape shape) {
+    std::vector<std::uint8_t> buf;
+    {
+        const FloorState ports = BuildFloor(shape);
+        buf.resize(SizeOf(ports));
+        EncodeFloor(ports, buf.data(), buf.size());
+    }
+    for (auto _ : state) {
+        if (bench::floor::Checksum(buf.data(), buf.size()) != bench::floor::SizeAt(&buf[4])) std::abort();
         FloorState ports;
-        for (const std::uint8_t *at = buf + 12; const std::uint32_t size = bench::floor::SizeAt(at);
+        for (const std::uint8_t *at = &buf[12]; const std::uint32_t size = bench::floor::SizeAt(at);
              at += size) {
             auto port = std::make_unique<bench::floor::List>();
             const std::uint8_t *prop = at + kFixedSize + 12;
@@ -257,7 +287,6 @@ void DecodeStateFloor(benchmark::State &state, Shape shape) {
         }
         benchmark::DoNotOptimize(ports.data());
     }
-    std::free(buf);
 }
 
 template <typename Argument, typename Dvs, typename Floor>
@@ -275,9 +304,11 @@ int main(int argc, char **argv) {
     }
     benchmark::RegisterBenchmark("16384-adds-of-2048/dvs", AddOnly, 16384);
     benchmark::RegisterBenchmark("16384-adds-of-2048/floor", AddOnly, 2048);
-    Pair("encode/32x512", Shape{32, 512}, Encode, EncodeStateFloor);
-    Pair("encode/1x16384", Shape{1, 16384}, Encode, EncodeStateFloor);
-    Pair("decode/32x512", Shape{32, 512}, Decode, DecodeStateFloor);
-    Pair("decode/1x16384", Shape{1, 16384}, Decode, DecodeStateFloor);
+    for (const Shape shape : {Shape{32, 512}, Shape{1, 16384}}) {
+        const std::string size = "/" + std::to_string(shape.switches) + "x" + std::to_string(shape.ports);
+        Pair("encode-warm" + size, shape, EncodeWarm, EncodeWarmFloor);
+        Pair("encode-cold" + size, shape, EncodeCold, EncodeColdFloor);
+        Pair("decode" + size, shape, Decode, DecodeFloor);
+    }
     return ratio::Main(argc, argv, kGoals);
 }

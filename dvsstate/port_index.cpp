@@ -30,44 +30,36 @@ uint32_t HashOf(std::string_view id) {
     return static_cast<uint32_t>(hash);
 }
 
-uint32_t &BucketFor(DVSwitch *sw, uint32_t hash) {
+DVSPort *&BucketFor(DVSwitch *sw, uint32_t hash) {
     return BucketsOf(sw)[hash & (FrontOf(sw).bucketNum - 1)];
 }
 
-/// The port that a link names; none at a bucket's end.
-DVSPort *Follow(DVSwitch *sw, uint32_t link) {
-    return link == 0 ? nullptr : sw->ports[link - 1];
+/// The port of a bucket behind which one of this slot belongs. The bucket's first port stands before that
+/// slot.
+DVSPort *Before(DVSPort *head, uint32_t slot) {
+    DVSPort *port = head;
+    while (FrontOf(port).next && FrontOf(FrontOf(port).next).slot < slot)
+        port = FrontOf(port).next;
+    return port;
 }
 
 /// Links a port into its bucket, in slot order. Ports mostly come in slot order, so the bucket's last one is
 /// tried first.
 void Link(DVSwitch *sw, DVSPort *port) {
     PortFront &front = FrontOf(port);
-    const uint32_t link = front.slot + 1;
-    uint32_t &bucket = BucketFor(sw, front.hash);
-    front.next = 0;
-    DVSPort *head = Follow(sw, bucket);
-    if (!head) {
-        front.tail = bucket = link;
+    DVSPort *&bucket = BucketFor(sw, front.hash);
+    DVSPort *head = bucket;
+    if (!head || front.slot < FrontOf(head).slot) {
+        front.next = head;
+        front.tail = head ? FrontOf(head).tail : port;
+        bucket = port;
         return;
     }
     PortFront &headFront = FrontOf(head);
-    if (link < bucket) {
-        front.next = bucket;
-        front.tail = headFront.tail;
-        bucket = link;
-        return;
-    }
-    if (link > headFront.tail) {
-        FrontOf(Follow(sw, headFront.tail)).next = link;
-        headFront.tail = link;
-        return;
-    }
-    PortFront *before = &headFront;
-    while (before->next < link)
-        before = &FrontOf(Follow(sw, before->next));
-    front.next = before->next;
-    before->next = link;
+    DVSPort *before = front.slot > FrontOf(headFront.tail).slot ? headFront.tail : Before(head, front.slot);
+    front.next = FrontOf(before).next;
+    FrontOf(before).next = port;
+    if (before == headFront.tail) headFront.tail = port;
 }
 
 /// Empties the buckets, now `bucketNum` of them, and links every port anew.
@@ -75,7 +67,7 @@ void Rebuild(DVSwitch *sw, uint32_t bucketNum) {
     SwitchFront &front = FrontOf(sw);
     front.bucketNum = std::min(bucketNum, front.bucketCapacity);
     front.portNum = 0;
-    std::memset(BucketsOf(sw), 0, front.bucketNum * sizeof(uint32_t));
+    std::fill_n(BucketsOf(sw), front.bucketNum, nullptr);
     for (uint32_t slot = 0; slot < front.usedSlots; slot++) {
         DVSPort *port = sw->ports[slot];
         if (!port) continue;
@@ -92,13 +84,10 @@ bool HasIndex(DVSwitch *sw) {
 
 DVSPort *IndexFind(DVSwitch *sw, std::string_view portId, uint32_t kind) {
     const uint32_t hash = HashOf(portId);
-    DVSPort *port = Follow(sw, BucketFor(sw, hash));
-    while (port) {
-        const PortFront &front = FrontOf(port);
-        if (front.hash == hash && port->portType == kind && portId == port->portId) return port;
-        port = Follow(sw, front.next);
-    }
-    return nullptr;
+    DVSPort *port = BucketFor(sw, hash);
+    while (port && !(FrontOf(port).hash == hash && port->portType == kind && portId == port->portId))
+        port = FrontOf(port).next;
+    return port;
 }
 
 void IndexAdd(DVSwitch *sw, DVSPort *port, uint32_t slot) {
@@ -120,20 +109,16 @@ void IndexAdd(DVSwitch *sw, DVSPort *port, uint32_t slot) {
 
 void IndexRemove(DVSwitch *sw, DVSPort *port) {
     const PortFront &front = FrontOf(port);
-    const uint32_t link = front.slot + 1;
-    uint32_t &bucket = BucketFor(sw, front.hash);
+    DVSPort *&bucket = BucketFor(sw, front.hash);
     FrontOf(sw).portNum--;
-    if (bucket == link) {
-        if (DVSPort *next = Follow(sw, front.next)) FrontOf(next).tail = front.tail;
+    if (bucket == port) {
+        if (front.next) FrontOf(front.next).tail = front.tail;
         bucket = front.next;
         return;
     }
-    PortFront &head = FrontOf(Follow(sw, bucket));
-    PortFront *before = &head;
-    while (before->next != link)
-        before = &FrontOf(Follow(sw, before->next));
-    before->next = front.next;
-    if (head.tail == link) head.tail = before->slot + 1;
+    DVSPort *before = Before(bucket, front.slot);
+    FrontOf(before).next = front.next;
+    if (FrontOf(bucket).tail == port) FrontOf(bucket).tail = before;
 }
 
 } // namespace dvs::state

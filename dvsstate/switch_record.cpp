@@ -15,7 +15,7 @@ namespace dvs::state {
 // Fronts leave the records behind them aligned, as the bucket array does with the front.
 static_assert(sizeof(SwitchFront) % alignof(DVSwitch) == 0);
 static_assert(sizeof(PortFront) % alignof(DVSPort) == 0);
-static_assert(kWalkedSlots * sizeof(uint32_t) % alignof(DVSwitch) == 0);
+static_assert(alignof(DVSPort *) == alignof(DVSwitch));
 
 SwitchFront &FrontOf(DVSwitch *sw) {
     return *(reinterpret_cast<SwitchFront *>(sw) - 1);
@@ -25,9 +25,9 @@ PortFront &FrontOf(DVSPort *port) {
     return *(reinterpret_cast<PortFront *>(port) - 1);
 }
 
-uint32_t *BucketsOf(DVSwitch *sw) {
+DVSPort **BucketsOf(DVSwitch *sw) {
     SwitchFront &front = FrontOf(sw);
-    return reinterpret_cast<uint32_t *>(&front) - front.bucketCapacity;
+    return reinterpret_cast<DVSPort **>(&front) - front.bucketCapacity;
 }
 
 namespace {
@@ -41,7 +41,7 @@ std::size_t BucketCapacity(uint32_t slotNum) {
 DVSwitch *NewRecord(uint32_t slotNum) {
     const std::size_t capacity = BucketCapacity(slotNum);
     if (capacity > UINT32_MAX) return nullptr;
-    const std::size_t bucketSize = capacity * sizeof(uint32_t);
+    const std::size_t bucketSize = capacity * sizeof(DVSPort *);
     const std::size_t recordSize = sizeof(DVSwitch) + std::size_t{slotNum} * sizeof(DVSPort *);
     auto *block = static_cast<unsigned char *>(std::malloc(bucketSize + sizeof(SwitchFront) + recordSize));
     if (!block) return nullptr;

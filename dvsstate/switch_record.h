@@ -28,10 +28,10 @@ struct SwitchFront {
 
 /// Private fields of a port: its links in the switch's index. Meaningless while the switch has none.
 struct PortFront {
+    DVSPort *next; // in the bucket, in slot order; null at its end
+    DVSPort *tail; // in a bucket's first port: its last one
     uint32_t hash; // of the id
     uint32_t slot; // where the port stands
-    uint32_t next; // slot + 1 of the next port in the bucket, 0 at its end
-    uint32_t tail; // in a bucket's first port: slot + 1 of its last one
 };
 
 // A switch with few slots in use is walked; an index would cost it more than it saves.
@@ -39,7 +39,7 @@ inline constexpr uint32_t kWalkedSlots = 64;
 
 [[nodiscard]] SwitchFront &FrontOf(DVSwitch *sw);
 [[nodiscard]] PortFront &FrontOf(DVSPort *port);
-[[nodiscard]] uint32_t *BucketsOf(DVSwitch *sw);
+[[nodiscard]] DVSPort **BucketsOf(DVSwitch *sw);
 
 /// A record with `slotNum` empty slots, its bit vector and both property lists empty. HYP_NO_MEMORY when any
 /// of its blocks cannot be had; nothing is left behind then.
