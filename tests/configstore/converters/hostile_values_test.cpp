@@ -44,6 +44,7 @@ struct Hostile : ConverterTest {
     ~Hostile() override { dvsconfigstore_debug = 10; }
 
     void Renew(const char *className, bool wide) {
+        fake_store::Reset(); // the double keeps a record of all its calls
         configstore::DestroyObject(object);
         ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "id", "{}", &object));
         BecomeSwitch(className, "7.0.3", wide);

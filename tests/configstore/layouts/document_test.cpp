@@ -5,7 +5,9 @@
 
 #include <gtest/gtest.h>
 
+#include <filesystem>
 #include <fstream>
+#include <regex>
 #include <sstream>
 
 #include "configstore/layouts/registry.h"
@@ -14,11 +16,16 @@ using namespace dvs::layout;
 
 namespace {
 
-TEST(PropertiesDocument, IsUpToDate) {
-    std::ifstream file(DVS_SOURCE_DIR "/docs/properties.md");
+std::string Read(const std::filesystem::path &path) {
+    std::ifstream file(path);
     std::stringstream text;
     text << file.rdbuf();
-    EXPECT_TRUE(text.str() == PropertiesDocument()) << "run docs/generate-properties.sh";
+    return text.str();
+}
+
+TEST(PropertiesDocument, IsUpToDate) {
+    EXPECT_TRUE(Read(DVS_SOURCE_DIR "/docs/properties.md") == PropertiesDocument())
+        << "run docs/generate-properties.sh";
 }
 
 TEST(PropertiesDocument, ExplainsEveryKey) {
@@ -35,6 +42,23 @@ TEST(PropertiesDocument, ExplainsEveryKey) {
     EXPECT_EQ(nullptr, FindType(30));
     EXPECT_EQ(nullptr, MeaningOf(0, "com.acme.other"));
     EXPECT_EQ(nullptr, RecordOf(0, "com.acme.other", false));
+}
+
+// Every test that docs/config-store.md names for an oddity.
+TEST(DeliberateOddities, NameTestsThatThereAre) {
+    std::string sources;
+    for (const auto &entry : std::filesystem::recursive_directory_iterator(DVS_SOURCE_DIR "/tests")) {
+        if (entry.path().extension() == ".cpp") sources += Read(entry.path());
+    }
+    const std::string document = Read(DVS_SOURCE_DIR "/docs/config-store.md");
+    const std::regex name("`(\\w+)\\.(\\w+)` \\|");
+    int rows = 0;
+    for (std::sregex_iterator each(document.begin(), document.end(), name), end; each != end;
+         ++each, ++rows) {
+        const std::string test = "(" + (*each)[1].str() + ", " + (*each)[2].str() + ")";
+        EXPECT_NE(std::string::npos, sources.find(test)) << test;
+    }
+    EXPECT_GT(rows, 30);
 }
 
 } // namespace
