@@ -25,7 +25,7 @@ say() { printf '\n\033[1m== %s\033[0m\n' "$*"; }
 [ -t 1 ] && [ -z "${NO_COLOR:-}" ] || say() { printf '\n== %s\n' "$*"; }
 # Prints a command as one would type it, then runs it.
 run() {
-    printf '$ dvsctl %s\n' "${*//$work\//}"
+    printf '$ dvsctl %s\n' "$*"
     "$dvsctl" "$@" --no-pager
 }
 
@@ -35,26 +35,28 @@ say "Building build/release (the first time takes a few minutes)"
 cmake --preset release >"$work/configure.log" 2>&1 || { cat "$work/configure.log" >&2; exit 1; }
 cmake --build --preset release --target dvs dvsctl -- --quiet
 dvsctl=$PWD/build/release/bin/dvsctl
-example=$PWD/examples/site-basic.json
+root=$PWD
+cp examples/site-basic.json "$work/"
+cd "$work"
 
 say "The example site, written as JSON, becomes a state file"
-run copy "json:$example" "$work/site.db"
+run copy json:site-basic.json site.db
 
 say "Every nested buffer of it is checked"
-run verify "$work/site.db"
+run verify site.db
 
 say "What is in it: the storage switch"
-run show "$work/site.db" --switch storage
+run show site.db --switch storage
 
 say "One setting of every switch and port, one line each"
-run show "$work/site.db" --props '*.alias' --columns switch,port,kind,value
+run show site.db --props '*.alias' --columns switch,port,kind,value
 
 say "Its first bytes, and what they are"
-run hexdump "$work/site.db" | head -n 24 || true
+run hexdump site.db | head -n 24 || true
 
 say "A colleague edits a copy: larger frames, a port unblocked, a new port"
-run copy "$work/site.db" "json:$work/edit.json"
-python3 - "$work/edit.json" <<'PYTHON'
+run copy site.db json:edit.json
+python3 - edit.json <<'PYTHON'
 import json
 import sys
 
@@ -77,21 +79,22 @@ with open(path, "w", encoding="utf-8") as file:
 PYTHON
 
 say "What the edit would change, without changing it"
-run copy --dry-run "json:$work/edit.json" "$work/site.db"
+run copy --dry-run json:edit.json site.db
 
 say "The edit goes to a state file of its own; the difference to the first one"
-run copy "json:$work/edit.json" "$work/edited.db"
-run diff "$work/site.db" "$work/edited.db" && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
+run copy json:edit.json edited.db
+run diff site.db edited.db && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
 
 say "And back: state file to JSON to state file gives the same bytes"
-run copy "$work/site.db" "json:$work/back.json"
-run copy "json:$work/back.json" "$work/back.db"
-cmp "$work/site.db" "$work/back.db"
+run copy site.db json:back.json
+run copy json:back.json back.db
+cmp site.db back.db
 echo "site.db and back.db are equal, byte for byte."
 
-say "A damaged file is recognised, down to the byte"
-cp "$work/site.db" "$work/damaged.db"
-printf 'X' | dd of="$work/damaged.db" bs=1 seek=20000 conv=notrunc status=none
-run verify "$work/damaged.db" && exit 1 || [ $? -eq 6 ] # 6: malformed
+say "One wrong byte in the name of port nfs-b: recognised, and located"
+cp site.db damaged.db
+offset=$(grep -abo nfs-b damaged.db | head -n 1 | cut -d: -f1)
+printf 'X' | dd of=damaged.db bs=1 seek="$offset" conv=notrunc status=none
+run verify damaged.db && exit 1 || [ $? -eq 6 ] # 6: malformed
 
-printf '\nThat was dvsctl. Next: %s --help, README.md, docs/json-form.md; ./test.sh runs the tests.\n' build/release/bin/dvsctl
+printf '\nThat was dvsctl. Next: %s --help, README.md, docs/json-form.md; ./test.sh runs the tests.\n' "${dvsctl#"$root"/}"

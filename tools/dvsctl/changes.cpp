@@ -108,6 +108,11 @@ std::string PortTitle(const Entry &port) {
     return fmt::format("port {} ({})", ShowName(port.name), ShowKind(port.kind));
 }
 
+std::string SwitchTitle(const Switch &sw) {
+    const std::string_view alias = AliasOf(sw);
+    return "switch " + ShowName(sw.name) + (alias.empty() ? "" : " " + Quote(alias));
+}
+
 /// Prints the headings under which a change stands, each once.
 class Listing {
 public:
@@ -115,7 +120,7 @@ public:
 
     void Add(const Change &change) {
         const bool isSwitch = change.subject == Subject::Switch;
-        if (!isSwitch) Enter(0, switch_, change.sw, "switch " + ShowName(change.sw->name));
+        if (!isSwitch) Enter(0, switch_, change.sw, SwitchTitle(*change.sw));
         if (isSwitch) switch_ = nullptr;
         if (isSwitch || !change.sw) container_ = nullptr;
         if (change.subject == Subject::Property) {

@@ -39,11 +39,7 @@ constexpr OptionRow kCopyOptions[] = {
     {"--no-replace", nullptr, &Options::noReplace, "refuse when TO holds something already"},
     kFull,
 };
-constexpr OptionRow kHexdumpOptions[] = {
-    kSource,
-    {"--switch", "ID", &Options::switchId, "only the bytes of the switch of this id"},
-    {"--port", "ID", &Options::portId, "only the bytes of ports of this id"},
-};
+constexpr OptionRow kHexdumpOptions[] = {kSource, kSwitch, kPort};
 
 constexpr Command kCommands[] = {
     {"show", "Show switches, ports and properties as a tree", kShowOptions,

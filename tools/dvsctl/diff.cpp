@@ -23,10 +23,10 @@ void FilterBoth(Context &context, const Source &a, State &before, State &after) 
     Options lenient = context.options;
     lenient.ifExists = true;
     State untouched = before;
-    ApplyFilter(lenient, a, before);
-    ApplyFilter(lenient, a, after);
+    ApplyFilter(lenient, a.Name(), before);
+    ApplyFilter(lenient, a.Name(), after);
     if (before.switches.empty() && after.switches.empty())
-        ApplyFilter(context.options, a, untouched); // throws
+        ApplyFilter(context.options, a.Name(), untouched); // throws
 }
 
 } // namespace

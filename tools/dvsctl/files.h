@@ -19,7 +19,8 @@ bool FileExists(const std::string &path);
 
 enum class Accept { FilesOnly, Pipes };
 
-/// The file's bytes. A pipe (where accepted) is read until its end or the deadline. Throws Error with `source` as the place.
+/// The file's bytes. A pipe (where accepted) is read until its end or the deadline. Throws Error with
+/// `source` as the place.
 std::string ReadWholeFile(Context &context, const std::string &path, const std::string &source,
                           Accept accept);
 

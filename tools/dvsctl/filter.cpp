@@ -23,10 +23,10 @@ bool KeepNamed(std::vector<Item> &items, std::string_view name, IsCandidate isCa
     return found;
 }
 
-[[noreturn]] void ThrowNotThere(const Source &source, std::string what, std::string_view name,
+[[noreturn]] void ThrowNotThere(const std::string &source, std::string what, std::string_view name,
                                 std::string next) {
     throw Error(Exit::NotThere, "there is no " + what + " \"" + std::string(name) + "\"")
-        .In(source.Name())
+        .In(source)
         .Try(std::move(next));
 }
 
@@ -71,16 +71,8 @@ std::string_view AliasOf(const Entry &port) {
     return TextOf(port.list, state::kPortAlias);
 }
 
-bool IsSwitch(const Switch &sw, std::string_view text) {
-    return sw.name == text || AliasOf(sw) == text;
-}
-
-bool IsPort(const Entry &port, std::string_view text) {
-    return port.role == Role::Port && (port.name == text || AliasOf(port) == text);
-}
-
-void ApplyFilter(const Options &options, const Source &source, State &state) {
-    const std::string list = "dvsctl show " + source.Name() + " lists what there is";
+void ApplyFilter(const Options &options, const std::string &source, State &state) {
+    const std::string list = "dvsctl show " + source + " lists what there is";
     if (options.switchId &&
         !KeepNamed(state.switches, *options.switchId, [](const Switch &) { return true; }) &&
         !options.ifExists)

@@ -10,11 +10,6 @@
 
 namespace dvs::ctl {
 
-/// True when the text is the switch's id or its alias.
-bool IsSwitch(const Switch &sw, std::string_view text);
-/// True when the text is the port's id or its alias.
-bool IsPort(const Entry &port, std::string_view text);
-
 /// The text of a property in a list, up to its NUL; empty when it is not there.
 std::string_view TextOf(const std::vector<Property> &list, std::string_view name);
 std::string_view AliasOf(const Switch &sw);
@@ -22,7 +17,7 @@ std::string_view AliasOf(const Entry &port);
 
 /// Keeps what the options ask for. Throws Error(NotThere) when a switch, port or property that was asked for
 /// is not in the state, unless --if-exists.
-void ApplyFilter(const Options &options, const Source &source, State &state);
+void ApplyFilter(const Options &options, const std::string &source, State &state);
 
 } // namespace dvs::ctl
 

@@ -9,6 +9,7 @@
 
 #include "tools/dvsctl/commands.h"
 #include "tools/dvsctl/envelope.h"
+#include "tools/dvsctl/filter.h"
 #include "tools/dvsctl/hexdump.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/source.h"
@@ -88,6 +89,22 @@ public:
     boost::json::array ranges;
 };
 
+// The walk knows ids only; an alias is what nothing has as its id.
+DumpFilter ResolveAliases(const Options &options, Bytes bytes) {
+    DumpFilter filter{options.switchId, options.portId};
+    Options lenient;
+    lenient.switchId = options.switchId;
+    lenient.portId = options.portId;
+    lenient.ifExists = true;
+    State state = ParseState(bytes);
+    ApplyFilter(lenient, "", state);
+    if (state.switches.empty()) return filter;
+    const Switch &sw = state.switches.front();
+    if (filter.switchId) filter.switchId = sw.name;
+    if (filter.portId && !sw.entries.empty()) filter.portId = sw.entries.front().name;
+    return filter;
+}
+
 } // namespace
 
 Exit RunHexdump(Context &context) {
@@ -96,7 +113,7 @@ Exit RunHexdump(Context &context) {
     const StateBytes read = ReadState(context, *source, ReadMode::Tolerant);
     const state::StateVerdict verdict = state::VerifyState(read.bytes);
     const bool damaged = verdict.first || !read.complaint.empty();
-    const DumpFilter filter{options.switchId, options.portId};
+    const DumpFilter filter = ResolveAliases(options, read.bytes);
     bool found;
     if (options.json) {
         JsonWriter writer;

@@ -48,6 +48,7 @@ int WriteAll(int fd, std::string_view text) {
 [[noreturn]] void ThrowOutputError(int error) {
     Error failure(Exit::Failed, "cannot write to standard output");
     failure.why = std::strerror(error);
+    failure.isSilent = error == EPIPE; // `dvsctl … | head` is a failure, but no news
     failure.next =
         "what was printed so far is not complete; free space or name another destination, and repeat";
     throw failure;

@@ -185,7 +185,7 @@ Exit RunShow(Context &context) {
     const Options &options = context.options;
     const auto source = OpenSource(options.source);
     LoadedState loaded = LoadState(context, *source);
-    ApplyFilter(options, *source, loaded.state);
+    ApplyFilter(options, source->Name(), loaded.state);
     const StateCount count = CountState(loaded.state);
     if (options.json) {
         boost::json::object document = Envelope("show");
