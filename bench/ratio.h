@@ -41,7 +41,9 @@ public:
             if (slash == std::string::npos) continue;
             double &best =
                 best_[name.substr(0, slash)].try_emplace(name.substr(slash + 1), kNone).first->second;
-            best = std::min(best, run.GetAdjustedCPUTime());
+            // Where part of the work is another process's, the benchmark asks for real time.
+            const bool real = !run.run_name.time_type.empty();
+            best = std::min(best, real ? run.GetAdjustedRealTime() : run.GetAdjustedCPUTime());
         }
     }
 

@@ -24,6 +24,7 @@ namespace {
 constexpr std::size_t kMaxClients = 1024;
 constexpr std::size_t kMaxClientsOfProcess = 256;
 constexpr std::size_t kReservedDescriptors = 32; // state file, signals, standard streams
+constexpr int kSendBuffer = 2 << 20;
 constexpr uint64_t kWaitingBytes = 1ULL << 30;
 constexpr std::chrono::seconds kStall{60};
 constexpr std::chrono::seconds kFarewell{5};
@@ -81,6 +82,13 @@ int ListenAt(const sockaddr_un &address, std::string *why) {
     return -1;
 }
 
+/// Room for a large reply to leave in few pieces. Beyond the system's limit where that is allowed.
+void WidenSendBuffer(int fd) {
+    const int size = kSendBuffer;
+    if (setsockopt(fd, SOL_SOCKET, SO_SNDBUFFORCE, &size, sizeof size) != 0)
+        (void)setsockopt(fd, SOL_SOCKET, SO_SNDBUF, &size, sizeof size); // the default is slower, not wrong
+}
+
 wire::ReplyHeader NewReply() {
     wire::ReplyHeader reply{};
     reply.magic = wire::kMagic;
@@ -131,6 +139,7 @@ void Server::Accept() {
             close(fd);
             continue;
         }
+        WidenSendBuffer(fd);
         clients_.push_back(std::make_unique<Connection>(fd, peer.pid, &budget_));
     }
 }
