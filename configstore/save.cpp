@@ -13,6 +13,7 @@
 #include "configstore/converters/common.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
+#include "configstore/maps/prop_saver.h"
 #include "configstore/switch_object.h"
 #include "dvs/state.h"
 
@@ -39,34 +40,26 @@ ContextOwner NewContext(configstore::Store *store) {
     return context;
 }
 
-// One list of properties of one class into one object, and the first status that is not 0.
-struct PropRun {
-    configstore::Object *object;
-    uint32_t propClass;
-    const char *trace; // null for none
-    int32_t status;
-};
-
-bool SaveEntry(DVSDataEntry *entry, void *arg) {
-    auto *run = static_cast<PropRun *>(arg);
-    void *value = nullptr;
-    const uint32_t len = DVSData_Data(entry, &value);
-    const char *key = DVSData_Name(entry);
-    if (run->trace && Tracing()) LogTrace("%s: %s\n", run->trace, key);
-    run->status = SaveProp(run->object, key, value, len, run->propClass, DVSData_PropType(entry));
-    return run->status != 0;
-}
-
-int32_t SaveList(DVSData *list, PropRun run) {
+// One list of properties of one class into one object. `trace` is null for none.
+int32_t SaveList(PropSaver *saver, DVSData *list, configstore::Object *object, uint32_t propClass,
+                 const char *trace) {
+    int32_t status = 0;
+    saver->Begin(object, propClass);
     DVSDataEntry *entry = nullptr;
-    while (list && DVSData_Next(list, entry, &entry) == HYP_OK) {
-        if (SaveEntry(entry, &run)) break;
+    while (status == 0 && list && DVSData_Next(list, entry, &entry) == HYP_OK) {
+        void *value = nullptr;
+        const uint32_t len = DVSData_Data(entry, &value);
+        const char *key = DVSData_Name(entry);
+        if (trace && Tracing()) LogTrace("%s: %s\n", trace, key);
+        status = saver->Save(key, value, len, DVSData_PropType(entry));
     }
-    return run.status;
+    saver->End();
+    return status;
 }
 
 struct PortRun {
     configstore::Object *switchObject;
+    PropSaver *saver;
     int32_t status;
 };
 
@@ -74,7 +67,8 @@ bool SavePort(DVSPort *port, void *arg) {
     auto *run = static_cast<PortRun *>(arg);
     configstore::Object *object = nullptr;
     run->status = GetOrCreateSubObject(true, run->switchObject, "ports", DVS_PortId(port), &object);
-    if (run->status == 0) run->status = SaveList(port->portData, {object, DVS_PROP_CLASS_PORT, nullptr, 0});
+    if (run->status == 0)
+        run->status = SaveList(run->saver, port->portData, object, DVS_PROP_CLASS_PORT, nullptr);
     return run->status != 0;
 }
 
@@ -89,11 +83,14 @@ int32_t FillObject(configstore::Object *object, DVSwitch *sw) {
     if (const int32_t status = SaveMaxPorts(object, sw)) return status;
     LogTrace("SaveDVS: %s\n", DVS_SwitchName(sw));
     if (const int32_t status = SaveIdentity(object, sw)) return status;
-    const PropRun global = {object, DVS_PROP_CLASS_GLOBAL, "SaveGlobalProp", 0};
-    if (const int32_t status = SaveList(sw->globalPropList, global)) return status;
-    const PropRun host = {object, DVS_PROP_CLASS_HOST, "SaveHostProp", 0};
-    if (const int32_t status = SaveList(sw->hostPropList, host)) return status;
-    PortRun ports = {object, 0};
+    PropSaver saver;
+    if (const int32_t status =
+            SaveList(&saver, sw->globalPropList, object, DVS_PROP_CLASS_GLOBAL, "SaveGlobalProp"))
+        return status;
+    if (const int32_t status =
+            SaveList(&saver, sw->hostPropList, object, DVS_PROP_CLASS_HOST, "SaveHostProp"))
+        return status;
+    PortRun ports = {object, &saver, 0};
     DVSState_PortForEach(sw, SavePort, &ports);
     return ports.status;
 }

@@ -6,6 +6,7 @@
 
 #include <algorithm>
 #include <cstdlib>
+#include <cstring>
 #include <iterator>
 
 #include <time.h>
@@ -14,6 +15,7 @@
 #include "configstore/converters/table.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_lookup.h"
+#include "configstore/maps/prop_saver.h"
 #include "dvsstate/owned_list.h"
 
 uint32_t dvsSwitchClass = 0;
@@ -25,6 +27,7 @@ namespace {
 
 using dvs::config::LogError;
 using dvs::config::LogTrace;
+using dvs::config::Tracing;
 using dvs::convert::ConverterFor;
 
 constexpr int32_t kFailed = -1;
@@ -41,18 +44,40 @@ const char *Leaf(const DVSProp2ConfigEntry &row) {
     return row.path[std::max(Depth(row), 1U) - 1];
 }
 
-int32_t RunSave(const DVSProp2ConfigEntry &row, const dvs::convert::SaveArgs &args) {
-    const auto *converter = ConverterFor(row.converterType);
-    if (!converter) {
-        LogError("Unknow prop type: %d\n", static_cast<int>(row.converterType));
-        return kFailed;
-    }
-    return converter->save(args);
+std::span<const uint8_t> Bytes(const void *value, uint32_t len) {
+    return {static_cast<const uint8_t *>(value), len};
+}
+
+uint32_t KnownClass(uint32_t propClass) {
+    const bool known = propClass == DVS_PROP_CLASS_HOST || propClass == DVS_PROP_CLASS_PORT;
+    return known ? propClass : uint32_t{DVS_PROP_CLASS_GLOBAL};
+}
+
+uint32_t DefaultType(uint32_t propClass) {
+    return propClass == DVS_PROP_CLASS_PORT ? dvs::convert::kTypePortDefault
+                                            : dvs::convert::kTypeSwitchDefault;
 }
 
 int32_t FailedToSet(const char *key, int32_t status) {
     LogError("Set prop: %s failed\n", key);
     return status;
+}
+
+int32_t UnknownKey(const char *key) {
+    LogError("Unknow prop: %s\n", key);
+    return FailedToSet(key, kFailed);
+}
+
+int32_t FailedToReach(const char *key, int32_t status) {
+    LogError("Failed to get/create sub object for dvs prop:%s stop and return\n", key);
+    return FailedToSet(key, status);
+}
+
+int32_t RunSave(const DVSProp2ConfigEntry &row, const dvs::convert::SaveArgs &args) {
+    const auto *converter = ConverterFor(row.converterType);
+    if (!converter) LogError("Unknow prop type: %d\n", static_cast<int>(row.converterType));
+    const int32_t status = converter ? converter->save(args) : kFailed;
+    return status ? FailedToSet(args.key, status) : 0;
 }
 
 // The list under construction and where it comes from, as every row's converter is given them.
@@ -68,9 +93,39 @@ int32_t FailedToLoad(const char *key, const char *leaf, uint32_t type, int32_t s
     return status;
 }
 
-int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row) {
+// Sub-objects of the object being loaded that rows have asked for: most rows of a table lead through the same
+// one.
+class KnownParents {
+public:
+    // As GetSubObjectByPath without creating; only rows of two names are remembered.
+    [[nodiscard]] int32_t Reach(const DVSProp2ConfigEntry &row, configstore::Object *object,
+                                configstore::Object **parent) {
+        constexpr uint32_t kRememberedDepth = 2;
+        if (Depth(row) != kRememberedDepth)
+            return GetSubObjectByPath(row.path, Depth(row), object, parent, false);
+        for (uint32_t i = 0; i < num_; ++i) {
+            if (std::strcmp(known_[i].name, row.path[0]) != 0) continue;
+            *parent = known_[i].object;
+            return known_[i].status;
+        }
+        const int32_t status = GetSubObjectByPath(row.path, kRememberedDepth, object, parent, false);
+        if (num_ < std::size(known_)) known_[num_++] = {row.path[0], *parent, status};
+        return status;
+    }
+
+private:
+    struct Known {
+        const char *name;
+        configstore::Object *object;
+        int32_t status;
+    };
+    Known known_[4];
+    uint32_t num_ = 0;
+};
+
+int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row, KnownParents *parents) {
     configstore::Object *parent = nullptr;
-    int32_t status = GetSubObjectByPath(row.path, Depth(row), run.object, &parent, false);
+    int32_t status = parents->Reach(row, run.object, &parent);
     if (status == configstore::NOT_FOUND) return 0;
     if (status) return status;
     const auto *converter = ConverterFor(row.converterType);
@@ -81,8 +136,9 @@ int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row) {
 }
 
 int32_t LoadRows(const LoadRun &run, configstore::Object *trafficResources) {
+    KnownParents parents;
     for (const auto *row = GetConfigMap(static_cast<int>(run.propClass)); row->key; ++row) {
-        if (const int32_t status = LoadRow(run, *row)) return status;
+        if (const int32_t status = LoadRow(run, *row, &parents)) return status;
     }
     if (run.propClass != DVS_PROP_CLASS_PORT || !trafficResources) return 0;
     return ConverterFor(dvs::convert::kTypeTrafficResources)
@@ -141,30 +197,19 @@ int32_t GetSubObjectByPath(const char (*path)[128], uint32_t depth, configstore:
 
 int32_t SaveProp(configstore::Object *object, const char *key, const void *value, uint32_t len,
                  uint32_t propClass, uint32_t propType) {
-    const uint32_t known = propClass == DVS_PROP_CLASS_HOST || propClass == DVS_PROP_CLASS_PORT
-                               ? propClass
-                               : uint32_t{DVS_PROP_CLASS_GLOBAL};
-    const uint32_t defaultType =
-        known == DVS_PROP_CLASS_PORT ? dvs::convert::kTypePortDefault : dvs::convert::kTypeSwitchDefault;
-    const auto *row = dvs::config::FindRow(GetConfigMap(static_cast<int>(known)), key, defaultType);
-    if (!row) {
-        LogError("Unknow prop: %s\n", key);
-        return FailedToSet(key, kFailed);
-    }
-    LogTrace("Compare %s : %s success\n", key, row->key);
+    const uint32_t known = KnownClass(propClass);
+    const auto *row = dvs::config::FindRow(GetConfigMap(static_cast<int>(known)), key, DefaultType(known));
+    if (!row) return UnknownKey(key);
+    if (Tracing()) LogTrace("Compare %s : %s success\n", key, row->key);
 
     configstore::Object *parent = object;
-    int32_t status = GetSubObjectByPath(row->path, Depth(*row), object, &parent, true);
-    if (status) {
-        LogError("Failed to get/create sub object for dvs prop:%s stop and return\n", key);
-        return FailedToSet(key, status);
-    }
+    if (const int32_t status = GetSubObjectByPath(row->path, Depth(*row), object, &parent, true))
+        return FailedToReach(key, status);
     const int64_t start = dvsConfigStoreNowMs();
-    status = RunSave(
-        *row,
-        {object, parent, Leaf(*row), {static_cast<const uint8_t *>(value), len}, key, propClass, propType});
+    const int32_t status =
+        RunSave(*row, {object, parent, Leaf(*row), Bytes(value, len), key, propClass, propType});
     dvsConfigStoreTimeMs += dvsConfigStoreNowMs() - start;
-    return status ? FailedToSet(key, status) : 0;
+    return status;
 }
 
 int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
@@ -175,3 +220,47 @@ int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *o
     if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
     return status;
 }
+
+namespace dvs::config {
+
+void PropSaver::Begin(configstore::Object *object, uint32_t propClass) {
+    object_ = object;
+    propClass_ = propClass;
+    lastName_ = nullptr;
+    index_ = &indexes_[propClass];
+    index_->Refresh(GetConfigMap(static_cast<int>(propClass)), DefaultType(propClass));
+    startMs_ = dvsConfigStoreNowMs();
+}
+
+int32_t PropSaver::Save(const char *key, const void *value, uint32_t len, uint32_t propType) {
+    const auto *row = index_->Find(key);
+    if (!row) return UnknownKey(key);
+    if (Tracing()) LogTrace("Compare %s : %s success\n", key, row->key);
+    configstore::Object *parent = object_;
+    if (const int32_t status = ParentOf(*row, &parent)) return FailedToReach(key, status);
+    return RunSave(*row, {object_, parent, Leaf(*row), Bytes(value, len), key, propClass_, propType});
+}
+
+int32_t PropSaver::ParentOf(const DVSProp2ConfigEntry &row, configstore::Object **parent) {
+    constexpr uint32_t kRememberedDepth = 2;
+    if (Depth(row) != kRememberedDepth) {
+        // A row that writes the remembered sub-object itself might make another of it.
+        if (Depth(row) < kRememberedDepth && lastName_ && std::strcmp(lastName_, row.path[0]) == 0)
+            lastName_ = nullptr;
+        return GetSubObjectByPath(row.path, Depth(row), object_, parent, true);
+    }
+    if (lastName_ && std::strcmp(lastName_, row.path[0]) == 0) {
+        *parent = lastParent_;
+        return 0;
+    }
+    const int32_t status = GetSubObjectByPath(row.path, kRememberedDepth, object_, parent, true);
+    lastName_ = status ? nullptr : row.path[0];
+    lastParent_ = *parent;
+    return status;
+}
+
+void PropSaver::End() {
+    dvsConfigStoreTimeMs += dvsConfigStoreNowMs() - startMs_;
+}
+
+} // namespace dvs::config
