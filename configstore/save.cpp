@@ -3,7 +3,7 @@
 // one store object, all of them in one transaction. Exported (dvs/configstore.h); stands on the property
 // frame for the single property and on switch_object.h for the object around it.
 
-#include "dvs/configstore.h"
+#include "configstore/save.h"
 
 #include <cstdlib>
 #include <memory>
@@ -15,6 +15,7 @@
 #include "configstore/maps/prop_frame.h"
 #include "configstore/maps/prop_saver.h"
 #include "configstore/switch_object.h"
+#include "dvs/configstore.h"
 #include "dvs/state.h"
 
 namespace {
@@ -194,10 +195,15 @@ int32_t RunTransaction(configstore::Store *store, const char *switchId, Existing
 
 } // namespace
 
-int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId) {
+int32_t dvs::config::SaveBuffer(const void *buf, uint32_t len, const char *switchId, Unloadable policy) {
     MXUserRecLock *lock = DVSwitchHandleLock();
     (void)DVSState_ConfigReset();
-    (void)DVSState_ConfigDeserialize(buf, len); // a buffer that does not load counts as one without switches
+    const HYP_ReturnStatus loaded = DVSState_ConfigDeserialize(buf, len);
+    if (loaded != HYP_OK && policy == Unloadable::IsRefused) {
+        (void)DVSState_ConfigReset();
+        DVSwitchHandleUnlock(lock);
+        return static_cast<int32_t>(loaded);
+    }
     LogSystem(LOG_DEBUG, "Start DVSState_SaveBufToConfigStore_ByInstance, swId:[%s]",
               switchId ? switchId : "");
     dvsConfigStoreTimeMs = 0;
@@ -213,6 +219,10 @@ int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, 
     (void)DVSState_ConfigReset();
     DVSwitchHandleUnlock(lock);
     return status;
+}
+
+int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId) {
+    return dvs::config::SaveBuffer(buf, len, switchId, Unloadable::CountsAsEmpty);
 }
 
 int32_t DVSState_SaveBufToConfigStore(const void *buf, uint32_t len) {

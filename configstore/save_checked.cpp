@@ -6,6 +6,7 @@
 #include "dvs/configstore.h"
 
 #include "configstore/log.h"
+#include "configstore/save.h"
 #include "dvs/state.h"
 #include "dvsstate/state_view.h"
 #include "dvsstate/switch_table.h"
@@ -41,5 +42,6 @@ HYP_ReturnStatus Verify(const void *buf, uint32_t len) {
 int32_t DVSState_SaveBufToConfigStoreChecked(const void *buf, uint32_t len, const char *switchId) {
     const HYP_ReturnStatus status = Verify(buf, len);
     if (status != HYP_OK) return static_cast<int32_t>(status);
-    return DVSState_SaveBufToConfigStore_ByInstance(buf, len, switchId);
+    // What is sound may still not load, for want of memory.
+    return dvs::config::SaveBuffer(buf, len, switchId, dvs::config::Unloadable::IsRefused);
 }

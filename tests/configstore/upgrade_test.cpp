@@ -13,7 +13,25 @@
 
 using namespace state_builder;
 
+#if defined(__SANITIZE_ADDRESS__)
+#include <sanitizer/lsan_interface.h>
+#define DVS_LEAK_CHECK 1
+#elif defined(__has_feature)
+#if __has_feature(address_sanitizer)
+#include <sanitizer/lsan_interface.h>
+#define DVS_LEAK_CHECK 1
+#endif
+#endif
+
 namespace {
+
+// The list of switches leaves the file's buffer allocated; the sanitizer is told, the test below counts it.
+DvsBasicInfo BasicInfoLeaving(const std::string &path) {
+#ifdef DVS_LEAK_CHECK
+    const __lsan::ScopedDisabler leaves;
+#endif
+    return BasicInfoFrom(path.c_str());
+}
 
 constexpr const char *kPortset = "com.orbeno.common.host.portset";
 
@@ -157,7 +175,7 @@ TEST_F(UpgradeTest, NamesTheSwitchThatFails) {
 TEST_F(UpgradeTest, BasicInfoListsTheSwitchesOfTheFile) {
     Write({Small("a", "ps-a"), Small("b", "")});
     const int64_t blocks = fault_live_blocks();
-    const DvsBasicInfo info = BasicInfoFrom(path.c_str());
+    const DvsBasicInfo info = BasicInfoLeaving(path);
     ASSERT_EQ(2, info.count);
     EXPECT_STREQ("a", info.entries[0].switchId);
     EXPECT_STREQ("name of a", info.entries[0].name);
@@ -172,7 +190,7 @@ TEST_F(UpgradeTest, BasicInfoListsTheSwitchesOfTheFile) {
 TEST_F(UpgradeTest, BasicInfoReplacesWhatTheTableHeld) {
     ASSERT_EQ(HYP_OK, DVSState_SwitchAdd("mine", "vswitch", 8, 9));
     Write({});
-    EXPECT_EQ(0, BasicInfoFrom(path.c_str()).count);
+    EXPECT_EQ(0, BasicInfoLeaving(path).count);
     EXPECT_EQ(0, SwitchesInTable());
 }
 

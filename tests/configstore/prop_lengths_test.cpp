@@ -1,0 +1,74 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Values of every length from 0 to 300 for every row, each in a block of exactly its size, so that a
+// sanitizer sees any look past it: saved, and what was stored loaded again. DVS_LENGTH_FILLS sets how many
+// contents each length gets.
+
+#include <random>
+
+#include "configstore/frame_fixture.h"
+
+using namespace state_builder;
+
+namespace {
+
+constexpr std::size_t kMaxLength = 300;
+
+struct PropLengths : FrameTest {
+    PropLengths() {
+        dvsconfigstore_debug = -1;
+        if (const char *text = std::getenv("DVS_LENGTH_FILLS")) fills = std::atoi(text);
+    }
+    ~PropLengths() override { dvsconfigstore_debug = 10; }
+
+    Bytes Fill(std::size_t length, int fill) {
+        Bytes value(length, 0xff);
+        if (fill == 0) return value;
+        // Small numbers pass for counts, lengths and indexes that hold; now and then a large one.
+        for (auto &byte : value) {
+            const auto number = random();
+            byte = static_cast<uint8_t>(number % 8 < 5 ? 0 : number % 8 < 7 ? number / 8 % 4 : number / 8);
+        }
+        return value;
+    }
+
+    void SaveAndLoad(const std::string &key, const Bytes &value, uint32_t propClass, uint32_t propType) {
+        fake_store::Reset();
+        configstore::DestroyObject(object);
+        ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "sw", "{}", &object));
+        const int32_t saved = Save(key, value, propClass, propType);
+        EXPECT_TRUE(saved == 0 || saved == -1 || saved == configstore::BAD_PARAMETER) << key << " " << saved;
+        if (propClass != DVS_PROP_CLASS_PORT) MakeSwitch();
+        dvsLoadedSwitch = nullptr;
+        (void)Load(propClass);
+    }
+
+    void EveryRow(uint32_t propClass) {
+        for (const auto *row = GetConfigMap(static_cast<int>(propClass)); row->key; ++row) {
+            for (std::size_t length = 0; length <= kMaxLength; ++length) {
+                for (int fill = 0; fill < fills; ++fill) {
+                    dvsSwitchClass = static_cast<uint32_t>((length + static_cast<std::size_t>(fill)) % 3);
+                    dvsWidePortRecords = length % 2 != 0;
+                    SaveAndLoad(row->key, Fill(length, fill), propClass, static_cast<uint32_t>(length * 8));
+                    if (HasFatalFailure()) return;
+                }
+            }
+        }
+    }
+
+    int fills = 2;
+    std::mt19937 random{20250711};
+};
+
+TEST_F(PropLengths, OfEveryGlobalRow) {
+    EveryRow(DVS_PROP_CLASS_GLOBAL);
+}
+
+TEST_F(PropLengths, OfEveryHostRow) {
+    EveryRow(DVS_PROP_CLASS_HOST);
+}
+
+TEST_F(PropLengths, OfEveryPortRow) {
+    EveryRow(DVS_PROP_CLASS_PORT);
+}
+
+} // namespace
