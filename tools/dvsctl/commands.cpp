@@ -16,11 +16,13 @@ constexpr OptionRow kPort = {"--port", "ID", &Options::portId, "only ports of th
 constexpr OptionRow kProps = {"--props", "GLOB", &Options::props,
                               "only properties whose names match, as '*.mtu'"};
 constexpr OptionRow kFull = {"--full", nullptr, &Options::full, "long values whole"};
+constexpr OptionRow kPersistent = {"--persistent", nullptr, &Options::persistent,
+                                   "of kernel: only what is worth keeping"};
 constexpr OptionRow kDryRun = {"--dry-run", nullptr, &Options::dryRun,
                                "show what would change, and change nothing"};
 
-constexpr OptionRow kShowOptions[] = {kSource, kSwitch, kPort, kProps, kFull};
-constexpr OptionRow kVerifyOptions[] = {kSource};
+constexpr OptionRow kShowOptions[] = {kSource, kSwitch, kPort, kProps, kFull, kPersistent};
+constexpr OptionRow kVerifyOptions[] = {kSource, kPersistent};
 constexpr OptionRow kDiffOptions[] = {
     {"A", nullptr, &Options::source, "the source before"},
     {"B", nullptr, &Options::target, "the source after"},
@@ -30,6 +32,7 @@ constexpr OptionRow kDiffOptions[] = {
     {"--order", nullptr, &Options::order, "another order of the same entries is a difference too"},
     {"--ignore-types", nullptr, &Options::ignoreTypes, "another type word with the same value is none"},
     kFull,
+    kPersistent,
 };
 constexpr OptionRow kCopyOptions[] = {
     {"FROM", nullptr, &Options::source, "the source to read"},
@@ -38,6 +41,7 @@ constexpr OptionRow kCopyOptions[] = {
     {"--may-exist", nullptr, &Options::mayExist, "replace what TO holds (this is the default)"},
     {"--no-replace", nullptr, &Options::noReplace, "refuse when TO holds something already"},
     kFull,
+    kPersistent,
 };
 constexpr OptionRow kHexdumpOptions[] = {kSource, kSwitch, kPort};
 

@@ -127,6 +127,7 @@ Exit RunCopy(Context &context) {
     if (options.mayExist && options.noReplace)
         throw Error(Exit::Usage, "--may-exist and --no-replace exclude each other");
 
+    from->CopiesTo(*to);
     // Here an absent source is not an empty state: copying that would empty the target.
     std::optional<StateBytes> read = from->Read(context, ReadMode::Strict);
     if (!read && options.ifExists) return NothingToCopy(context, *from, *to);

@@ -35,6 +35,7 @@ struct Options {
     bool full = false;                   ///< long values whole
     bool order = false;                  ///< the order of entries counts as a difference
     bool ignoreTypes = false;            ///< type words do not count as a difference
+    bool persistent = false;             ///< of kernel: only what is worth keeping
 };
 
 } // namespace dvs::ctl

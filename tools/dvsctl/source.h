@@ -47,6 +47,12 @@ public:
     /// True when the bytes go to standard output, so that nothing else may.
     virtual bool IsStandardOutput() const { return false; }
 
+    /// True when it keeps states beyond the host's uptime, so that what is volatile has no place in it.
+    virtual bool KeepsPersistentState() const { return false; }
+
+    /// Told before Read which source the state is copied to.
+    virtual void CopiesTo(const Source &) {}
+
     /// The state, or nothing where the source holds none. Throws Error.
     virtual std::optional<StateBytes> Read(Context &context, ReadMode mode) = 0;
 

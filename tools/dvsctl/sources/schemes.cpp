@@ -13,6 +13,8 @@ constexpr Scheme kSchemes[] = {
     {"json", "json:PATH",
      "a state as a JSON document, for people and programs; json:- is standard input or output",
      OpenJsonSource},
+    {"kernel", "kernel:", "the live state of the switching module (or of the emulator at DVS_EMULATOR)",
+     OpenKernelSource},
 };
 
 } // namespace

@@ -13,6 +13,7 @@ namespace dvs::ctl {
 
 std::unique_ptr<Source> OpenFileSource(std::string_view path);
 std::unique_ptr<Source> OpenJsonSource(std::string_view path);
+std::unique_ptr<Source> OpenKernelSource(std::string_view rest);
 
 } // namespace dvs::ctl
 
