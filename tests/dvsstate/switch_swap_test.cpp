@@ -2,6 +2,7 @@
 // Reset, strip, swap and free over the whole table.
 
 #include <cstring>
+#include <utility>
 
 #include "dvsstate/state_support.h"
 
