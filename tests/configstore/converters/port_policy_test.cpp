@@ -2,6 +2,7 @@
 // The small policies of a port: transmit uplink, VLAN, shaping, MAC security, LACP, resource pools.
 
 #include "configstore/converters/converter_fixture.h"
+#include "configstore/converters/shaping.h"
 
 using namespace converter_test;
 
@@ -179,6 +180,15 @@ TEST_F(PortPolicy, ShapingDividesWithSignAndTakesUnreadableLimitsForZero) {
     const auto loaded = LoadOne(kPort, "com.orbeno.common.port.shaper.input");
     EXPECT_EQ(Bytes().U64(0).U64(static_cast<uint64_t>(INT64_MIN / 8)).U64(1ULL << 59), loaded);
     EXPECT_EQ(-1, Save(kPort, "com.orbeno.common.port.shaper.input", Bytes().Zeros(23)));
+}
+
+TEST_F(PortPolicy, ShapingLoadsADirectionFromItsOwnLeafOnly) {
+    ASSERT_EQ(0, Save(kPort, "com.orbeno.common.port.shaper.output", Bytes().U64(1).U64(2).U64(3)));
+    const char *input = "com.orbeno.common.port.shaper.input";
+    EXPECT_EQ(0, dvs::convert::LoadShaping(
+                     {object, Sub("settings"), nullptr, "out_shaping_policy", input, 16, kPort}));
+    EXPECT_EQ(0, dvs::convert::LoadShaping(
+                     {object, Sub("settings"), nullptr, "out_shaping_policy", "other", 16, kPort}));
 }
 
 TEST_F(PortPolicy, SecuritySavesWhatIsAllowed) {

@@ -335,4 +335,51 @@ TEST_F(Typed, PortRecordsOfSessionsFollowTheVersion) {
                                    .state);
 }
 
+TEST_F(Typed, BuildsListsOfNumbersAndComparesWhatIsNotThere) {
+    const Node session = Object({Text("s", "key"), Text("REMOTE_MIRROR_DEST", "session_type"),
+                                 Object({List({Number(5), Number(4094)}, "vlans")}, "source_recv_port")});
+    const Built built = Build(kGlobal, "com.orbeno.etherswitch.mirrorSessions", List({session}));
+    ASSERT_TRUE(built.ok) << built.reason;
+    ASSERT_EQ(1u, built.differences.size());
+    EXPECT_EQ("[0].source_recv_port.vlans: 5, 4094 reads back as none", built.differences[0]);
+    const Node tooLarge =
+        Object({Text("s", "key"), Object({List({Number(65536)}, "vlans")}, "source_recv_port")});
+    EXPECT_EQ("[0].source_recv_port.vlans[0]",
+              Build(kGlobal, "com.orbeno.etherswitch.mirrorSessions", List({tooLarge})).field);
+    EXPECT_EQ("is null, expected a number", Build(kGlobal, "com.orbeno.etherswitch.mtu", Node()).reason);
+}
+
+// A store that fails is a store without memory: there is an answer, with a reason, and nothing is leaked.
+TEST_F(Typed, AnswersWhateverTheStoreDoes) {
+    const Node tree = Object({Bool(true, "reverse_policy"), Text("LOADBALANCE_IP", "policy"),
+                              Object({List({Text("u")}, "active_uplink_ports")}, "uplink_port_order")});
+    const Node trunk = Object({List({Object({Number(1, "start")})}, "trunk_vlan_ids")});
+    const std::pair<const char *, const Node &> builds[] = {{kTeaming, tree}, {kVlan, trunk}};
+    for (const auto &[key, node] : builds) {
+        for (int call = 1;; ++call) {
+            fake_store::FailCall(call, configstore::NO_MEMORY);
+            const Built built = Build(kPort, key, node);
+            if (!fake_store::Failed()) break;
+            EXPECT_EQ(built.ok, built.reason.empty()) << call;
+        }
+        fake_store::FailCall(0);
+    }
+    const std::pair<const char *, Bytes> views[] = {
+        {kTeaming, Teaming(4)},
+        {kVlan, Bytes().U16(1).U32(0).U16(1).U16(3).U16(4)},
+        {"com.orbeno.etherswitch.port.lacp", Bytes().U32(1).U32(1)},
+        {"com.orbeno.common.port.alias", Bytes().Text("a", 2)}};
+    for (const auto &[key, value] : views) {
+        for (int call = 1;; ++call) {
+            fake_store::FailCall(call, configstore::NO_MEMORY);
+            const View view = Describe(kPort, key, value);
+            if (!fake_store::Failed()) break;
+            EXPECT_EQ(view.state == State::kDamaged, !view.reason.empty()) << call;
+            EXPECT_TRUE(view.state == State::kDamaged || view.exact || !view.differences.empty())
+                << key << call;
+        }
+        fake_store::FailCall(0);
+    }
+}
+
 } // namespace
