@@ -38,6 +38,9 @@ struct Command {
     Exit (*run)(Context &context);      ///< throws Error for anything but its plain results
 };
 
+/// The part of the table that is about a config store.
+std::span<const Command> StoreCommands();
+
 /// The table, in the order of the help.
 std::span<const Command> Commands();
 

@@ -3,6 +3,8 @@
 
 #include "tools/dvsctl/commands.h"
 
+#include <vector>
+
 #include "tools/dvsctl/command.h"
 
 namespace dvs::ctl {
@@ -21,7 +23,15 @@ constexpr OptionRow kPersistent = {"--persistent", nullptr, &Options::persistent
 constexpr OptionRow kDryRun = {"--dry-run", nullptr, &Options::dryRun,
                                "show what would change, and change nothing"};
 
-constexpr OptionRow kShowOptions[] = {kSource, kSwitch, kPort, kProps, kFull, kPersistent};
+constexpr OptionRow kShowOptions[] = {
+    kSource,
+    kSwitch,
+    kPort,
+    kProps,
+    {"--raw", nullptr, &Options::raw, "bytes also where the source keeps typed fields"},
+    kFull,
+    kPersistent,
+};
 constexpr OptionRow kVerifyOptions[] = {kSource, kPersistent};
 constexpr OptionRow kDiffOptions[] = {
     {"A", nullptr, &Options::source, "the source before"},
@@ -37,6 +47,7 @@ constexpr OptionRow kDiffOptions[] = {
 constexpr OptionRow kCopyOptions[] = {
     {"FROM", nullptr, &Options::source, "the source to read"},
     {"TO", nullptr, &Options::target, "the source to replace"},
+    {"--switch", "ID", &Options::switchId, "only the switch of this id or alias; a store keeps its others"},
     kDryRun,
     {"--may-exist", nullptr, &Options::mayExist, "replace what TO holds (this is the default)"},
     {"--no-replace", nullptr, &Options::noReplace, "refuse when TO holds something already"},
@@ -110,7 +121,12 @@ constexpr OptionRow kCommonOptions[] = {
 } // namespace
 
 std::span<const Command> Commands() {
-    return kCommands;
+    static const std::vector<Command> all = [] {
+        std::vector<Command> commands(std::begin(kCommands), std::end(kCommands));
+        commands.insert(commands.end(), StoreCommands().begin(), StoreCommands().end());
+        return commands;
+    }();
+    return all;
 }
 
 std::span<const OptionRow> CommonOptions() {

@@ -14,6 +14,17 @@ Exit RunDiff(Context &context);
 Exit RunCopy(Context &context);
 Exit RunHexdump(Context &context);
 
+Exit RunStoreList(Context &context);
+Exit RunStoreExport(Context &context);
+Exit RunStoreImport(Context &context);
+Exit RunStoreDelete(Context &context);
+Exit RunStoreHistory(Context &context);
+Exit RunStoreRestore(Context &context);
+Exit RunStoreBackup(Context &context);
+Exit RunStoreUpgrade(Context &context);
+Exit RunStoreCheck(Context &context);
+Exit RunSchema(Context &context);
+
 } // namespace dvs::ctl
 
 #endif

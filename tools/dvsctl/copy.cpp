@@ -2,6 +2,8 @@
 // `dvsctl copy`: a verified state from one source to another. Nothing is written before everything has been
 // read and judged; what then goes wrong leaves the target as it was.
 
+#include <algorithm>
+
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
 #include <boost/json/value.hpp>
@@ -11,6 +13,7 @@
 #include "tools/dvsctl/compare.h"
 #include "tools/dvsctl/encode.h"
 #include "tools/dvsctl/envelope.h"
+#include "tools/dvsctl/filter.h"
 #include "tools/dvsctl/show.h"
 #include "tools/dvsctl/source.h"
 
@@ -34,7 +37,7 @@ Target LookAtTarget(Context &context, Source &to) {
         read = to.Read(context, ReadMode::Tolerant);
         target.exists = read.has_value();
     } catch (const Error &error) {
-        if (error.status != Exit::Malformed) throw;
+        if (error.status != Exit::Malformed && !error.isDamage) throw;
         target.exists = true;
         target.damage = error.why;
     }
@@ -51,8 +54,30 @@ Target LookAtTarget(Context &context, Source &to) {
     return target;
 }
 
-void RefuseIfTaken(const Options &options, const Source &to, const Target &target) {
-    if (!options.noReplace || !target.exists) return;
+// Whether a copy would replace something, as --no-replace means it.
+bool IsTaken(const Source &to, const Target &target, const State &state) {
+    if (!target.exists || !target.isSound) return target.exists;
+    const auto &held = target.loaded.state.switches;
+    if (to.CountsWhenEmpty()) return true;
+    if (!to.ReplacesSingle() || state.switches.size() != 1) return !held.empty();
+    return std::any_of(held.begin(), held.end(),
+                       [&](const Switch &sw) { return sw.name == state.switches.front().name; });
+}
+
+// The state of the one switch that --switch asks for.
+LoadedState OnlySwitch(Context &context, const Source &from, const LoadedState &loaded) {
+    State narrowed = loaded.state;
+    Options wanted = context.options;
+    wanted.ifExists = false; // there is nothing to copy then
+    ApplyFilter(wanted, from, narrowed);
+    std::vector<NewEntry> entries;
+    for (const Switch &sw : narrowed.switches)
+        entries.push_back({std::string(sw.name), sw.type, {sw.value.begin(), sw.value.end()}});
+    return JudgeState(from, {EncodeList(entries), {}});
+}
+
+void RefuseIfTaken(const Options &options, const Source &to, const Target &target, const State &state) {
+    if (!options.noReplace || !IsTaken(to, target, state)) return;
     throw Error(Exit::Failed, "the target holds something already")
         .In(to.Name())
         .Because("--no-replace was given")
@@ -132,16 +157,19 @@ Exit RunCopy(Context &context) {
     std::optional<StateBytes> read = from->Read(context, ReadMode::Strict);
     if (!read && options.ifExists) return NothingToCopy(context, *from, *to);
     if (!read) throw Error(AbsentError(*from));
-    const LoadedState loaded = JudgeState(*from, std::move(*read));
+    LoadedState loaded = JudgeState(*from, std::move(*read));
+    if (options.switchId) loaded = OnlySwitch(context, *from, loaded);
     const Bytes state = Bytes(loaded.raw.bytes).first(loaded.state.size);
     Outcome outcome{*from, *to, CountState(loaded.state), state.size(), false};
 
     Target target;
     std::vector<Change> changes;
     if (options.dryRun || options.noReplace) target = LookAtTarget(context, *to);
-    RefuseIfTaken(options, *to, target);
+    RefuseIfTaken(options, *to, target, loaded.state);
+    LoadedState planned;
     if (options.dryRun) {
-        changes = Compare(target.loaded.state, loaded.state, {});
+        planned = JudgeState(*to, {to->Plan(context, state), {}});
+        changes = Compare(target.loaded.state, planned.state, {});
     } else {
         to->Write(context, state);
         outcome.isWritten = true;

@@ -58,6 +58,7 @@ struct Error : std::exception {
     std::string why;                     ///< why
     std::vector<std::string> messages;   ///< why: what the library said meanwhile
     std::string next;                    ///< what to do next
+    bool isDamage = false;               ///< what is there is damaged, whatever the status
     bool isSilent = false;               ///< nobody wants to read it: the reader of the output left
 
 private:

@@ -31,12 +31,17 @@ constexpr std::string_view kStatuses = R"(Exit status:
 )";
 
 constexpr std::string_view kEnvironment = R"(Environment:
-  NO_COLOR   set to anything: no colour, also on a terminal
-  PAGER      the pager for output longer than the terminal (default: less; empty or cat: none)
+  DVS_CONFIGSTORE  the config store's database, where none is named (default: /var/lib/dvs/configstore.db)
+  NO_COLOR         set to anything: no colour, also on a terminal
+  PAGER            the pager for output longer than the terminal (default: less; empty or cat: none)
 )";
 
 bool IsOperand(const OptionRow &row) {
     return row.name[0] != '-';
+}
+
+bool IsOptional(const OptionRow &row) {
+    return std::holds_alternative<std::optional<std::string> Options::*>(row.target);
 }
 
 std::string Left(const OptionRow &row) {
@@ -108,7 +113,8 @@ std::string OverviewHelp() {
 std::string CommandHelp(const Command &command) {
     std::string usage = fmt::format("Usage: dvsctl {}", command.name);
     for (const OptionRow &row : command.options)
-        if (IsOperand(row)) usage += std::string(" ") + row.name;
+        if (IsOperand(row))
+            usage += IsOptional(row) ? fmt::format(" [{}]", row.name) : fmt::format(" {}", row.name);
     std::string text = usage + " [OPTIONS]\n\n" + command.summary + ".\n\n";
     if (*command.details) text += std::string(command.details) + "\n";
     text += Section("Operands", RowLines(command.options, true));

@@ -32,6 +32,11 @@ struct Options {
     std::optional<std::string> switchId; ///< only this switch
     std::optional<std::string> portId;   ///< only this port (of any kind)
     std::optional<std::string> props;    ///< only properties whose names match this pattern
+    std::optional<std::string> store;    ///< the config store's database, for verbs that are about a store
+    std::optional<std::string> layer;    ///< "current" or "desired"
+    std::optional<std::string> revision; ///< of the store, a number
+    std::optional<std::string> name;     ///< an operand that may be absent: a switch, a field, a file
+    bool raw = false;                    ///< bytes, not typed fields
     bool full = false;                   ///< long values whole
     bool order = false;                  ///< the order of entries counts as a difference
     bool ignoreTypes = false;            ///< type words do not count as a difference

@@ -13,6 +13,7 @@
 #include "tools/dvsctl/show.h"
 #include "tools/dvsctl/source.h"
 #include "tools/dvsctl/table.h"
+#include "tools/dvsctl/typed_fields.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -45,7 +46,8 @@ constexpr FieldRow kFields[] = {
 
 class Tree {
 public:
-    explicit Tree(const Options &options) : options_(options), table_(kColumns, options) {
+    /// With `typed`, values are the typed fields of the config store.
+    Tree(const Options &options, bool typed) : options_(options), typed_(typed), table_(kColumns, options) {
         // With a column that says where a line belongs there is no need for the lines between.
         flat_ =
             table_.Shows("switch") || table_.Shows("port") || table_.Shows("list") || table_.Shows("kind");
@@ -91,8 +93,18 @@ private:
             break;
         }
         for (const Property &property : entry.list)
-            Line(2, property, ShowName(property.name), ShowValue(property.value, options_.full));
+            AddProperty(entry, property);
         entry_ = nullptr;
+    }
+
+    void AddProperty(const Entry &entry, const Property &property) {
+        const TypedText text = typed_ ? DescribeProperty(*switch_, entry, property) : TypedText();
+        std::string value = text.summary.empty() ? ShowValue(property.value, options_.full) : text.summary;
+        if (!text.damage.empty()) value += " (does not fit: " + text.damage + ")";
+        Line(2, property, ShowName(property.name), std::move(value));
+        if (flat_) return;
+        for (const FieldLine &line : text.lines)
+            table_.Add({{}, {}, {}, {}, {Indented(3 + line.depth, line.name)}, {}, {}, {line.value}, {}});
     }
 
     void AddField(const Entry &entry) {
@@ -136,6 +148,7 @@ private:
     }
 
     const Options &options_;
+    bool typed_;
     Table table_;
     bool flat_ = false;
     const Switch *switch_ = nullptr;
@@ -187,15 +200,18 @@ Exit RunShow(Context &context) {
     LoadedState loaded = LoadState(context, *source);
     ApplyFilter(options, source->Name(), loaded.state);
     const StateCount count = CountState(loaded.state);
+    const bool typed = source->HoldsTyped() && !options.raw;
     if (options.json) {
         boost::json::object document = Envelope("show");
         document["source"] = ValidUtf8(source->Name());
         document["summary"] = CountJson(count);
-        document["switches"] = SwitchesToJson(loaded.state);
+        boost::json::array switches = SwitchesToJson(loaded.state);
+        if (typed) AddTypedFields(loaded.state, switches);
+        document["switches"] = std::move(switches);
         context.out.Json(std::move(document));
         return Exit::Done;
     }
-    Tree tree(options);
+    Tree tree(options, typed);
     for (const Switch &sw : loaded.state.switches)
         tree.Add(sw);
     if (!options.noHeadings && !options.columns)

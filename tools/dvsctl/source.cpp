@@ -44,7 +44,7 @@ std::unique_ptr<Source> OpenSource(std::string_view text) {
 }
 
 Error AbsentError(const Source &source) {
-    return Error(Exit::Failed, "cannot read the state")
+    return Error(source.AbsentStatus(), "cannot read the state")
         .In(source.Name())
         .Because(source.WhyAbsent())
         .Try("check the name; with --if-exists an absent source is no error");

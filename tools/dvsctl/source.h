@@ -57,11 +57,28 @@ public:
     virtual std::optional<StateBytes> Read(Context &context, ReadMode mode) = 0;
 
     /// Replaces what the source holds by a state that has been verified: the whole of it or, with an Error,
-    /// nothing.
+    /// nothing. Where --switch was given the state is that switch alone, and a source that ReplacesSingle
+    /// keeps its other switches.
     virtual void Write(Context &context, Bytes state) = 0;
 
-    /// Why Read found nothing, for the error of those who need something.
+    /// The state that Read would give after such a Write. Changes nothing; throws what the Write would.
+    virtual std::vector<std::uint8_t> Plan(Context &, Bytes state) { return {state.begin(), state.end()}; }
+
+    /// Looks at more of the place than a Read does. Throws Error when something is wrong there.
+    virtual void CheckPlace(Context &) {}
+
+    /// True when the source keeps settings as typed fields, so that these are what people want to see.
+    virtual bool HoldsTyped() const { return false; }
+
+    /// True when a Write can replace one switch and leave the others.
+    virtual bool ReplacesSingle() const { return false; }
+
+    /// True when a source without switches holds something all the same: bytes that a Write would replace.
+    virtual bool CountsWhenEmpty() const { return true; }
+
+    /// Why Read found nothing, for the error of those who need something, and its exit status.
     virtual std::string WhyAbsent() const { return "it does not exist"; }
+    virtual Exit AbsentStatus() const { return Exit::Failed; }
 
 private:
     std::string name_;

@@ -61,6 +61,7 @@ void WriteReport(Context &context, const Source &source, const std::optional<Err
 
 Exit RunVerify(Context &context) {
     const auto source = OpenSource(context.options.source);
+    source->CheckPlace(context); // what is wrong with the place explains what is wrong with the state
     const StateBytes read = ReadState(context, *source, ReadMode::Tolerant);
     const state::StateVerdict verdict = state::VerifyState(read.bytes);
     const std::optional<Error> damage = FindDamage(*source, read, verdict);

@@ -13,6 +13,11 @@ constexpr Scheme kSchemes[] = {
     {"json", "json:PATH",
      "a state as a JSON document, for people and programs; json:- is standard input or output",
      OpenJsonSource},
+    {"store", "store:[PATH]",
+     "the host's config store, current configuration (default: DVS_CONFIGSTORE or the host's own)",
+     OpenStoreSource},
+    {"store-desired", "store-desired:[PATH]", "the same, desired user configuration; can only be read",
+     OpenStoreDesiredSource},
     {"kernel", "kernel:", "the live state of the switching module (or of the emulator at DVS_EMULATOR)",
      OpenKernelSource},
 };

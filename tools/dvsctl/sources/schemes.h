@@ -13,6 +13,8 @@ namespace dvs::ctl {
 
 std::unique_ptr<Source> OpenFileSource(std::string_view path);
 std::unique_ptr<Source> OpenJsonSource(std::string_view path);
+std::unique_ptr<Source> OpenStoreSource(std::string_view path);
+std::unique_ptr<Source> OpenStoreDesiredSource(std::string_view path);
 std::unique_ptr<Source> OpenKernelSource(std::string_view rest);
 
 } // namespace dvs::ctl

@@ -1,0 +1,197 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// store: and store-desired: the host's configuration store. Reading is the library's load, writing its
+// checked save, so that a copy is what an agent's save or load would be. Stands on store/.
+
+#include <cstdlib>
+#include <memory>
+
+#include <fmt/format.h>
+
+#include "dvs/configstore.h"
+#include "dvs/status.h"
+#include "platform/status_text.h"
+#include "tools/dvsctl/encode.h"
+#include "tools/dvsctl/files.h"
+#include "tools/dvsctl/model.h"
+#include "tools/dvsctl/show.h"
+#include "tools/dvsctl/sources/schemes.h"
+#include "tools/dvsctl/store/access.h"
+#include "tools/dvsctl/store/progress.h"
+#include "tools/dvsctl/store/scratch.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+// Statuses of the library itself begin here; smaller ones are the store's.
+constexpr std::int32_t kFirstLibraryStatus = HYP_FAILURE;
+
+struct FreeBuffer {
+    void operator()(void *buffer) const { std::free(buffer); }
+};
+
+std::size_t CountLayer(const OpenStore &store, admin::Layer layer) {
+    std::size_t count = 0;
+    for (const admin::Entry &entry : store.List())
+        count += entry.address.layer == layer;
+    return count;
+}
+
+class StoreSource : public Source {
+public:
+    StoreSource(const char *scheme, std::string path, bool desired)
+        : Source(std::string(scheme) + path), path_(std::move(path)), desired_(desired) {}
+
+    bool HoldsTyped() const override { return true; }
+    bool CountsWhenEmpty() const override { return false; }
+    bool ReplacesSingle() const override { return true; }
+
+    std::optional<StateBytes> Read(Context &context, ReadMode mode) override {
+        if (!FileExists(path_)) return std::nullopt;
+        const OpenStore store(context, path_, true); // tells what is wrong with it, and changes nothing
+        if (desired_) RefuseUnequalLayers(store);
+        try {
+            return StateBytes{Load(context), {}};
+        } catch (Error &error) {
+            // For looks at what would be replaced, switches that do not load are damage like any other.
+            if (mode == ReadMode::Tolerant && error.status == Exit::Store) error.isDamage = true;
+            throw;
+        }
+    }
+
+    void Write(Context &context, Bytes state) override {
+        RefuseDesired();
+        AwaitTurn(context);
+        const Progress progress(context, "saving " + ShowCount(CountState(ParseState(state))));
+        PointLibraryAt(path_);
+        Save(context, state);
+    }
+
+    std::vector<std::uint8_t> Plan(Context &context, Bytes state) override {
+        RefuseDesired();
+        const ScratchStore scratch(context, path_);
+        Save(context, state);
+        return LoadHere(context);
+    }
+
+    void CheckPlace(Context &context) override {
+        if (!FileExists(path_)) return;
+        const OpenStore store(context, path_, true);
+        std::vector<admin::Problem> problems;
+        store.Require(admin::Check(store.get(), &problems), "cannot check the config store");
+        if (problems.empty()) return;
+        Error error(Exit::Store, "the config store is damaged");
+        error.source = Name();
+        error.why = problems.front().where + ": " + problems.front().what;
+        if (problems.size() > 1)
+            error.why += fmt::format(" (and {})", Count(problems.size() - 1, "more problem"));
+        error.next = "dvsctl store check lists everything; dvsctl store restore brings back past documents";
+        throw Error(error);
+    }
+
+    Exit AbsentStatus() const override { return Exit::Store; }
+    std::string WhyAbsent() const override { return "there is no database file"; }
+
+private:
+    void RefuseDesired() const {
+        if (desired_)
+            throw Error(Exit::Usage, "store-desired: can only be read")
+                .In(Name())
+                .Because("saves write the current configuration; the desired one is its users' own")
+                .Try("dvsctl store import --layer desired FILE puts a document there");
+    }
+
+    void RefuseUnequalLayers(const OpenStore &store) const {
+        const std::size_t desired = CountLayer(store, admin::Layer::Desired);
+        const std::size_t current = CountLayer(store, admin::Layer::Current);
+        if (desired != current)
+            throw Error(Exit::Store, "cannot load the desired switches")
+                .In(Name())
+                .Because(fmt::format("the desired layer has {}, the current one {}: a load matches them by "
+                                     "position and wants as many of both",
+                                     Count(desired, "object"), Count(current, "object")))
+                .Try("dvsctl store list shows both layers");
+    }
+
+    std::vector<std::uint8_t> Load(Context &context) {
+        PointLibraryAt(path_);
+        return LoadHere(context);
+    }
+
+    std::vector<std::uint8_t> LoadHere(Context &context) {
+        (void)context.log.Take(); // what was said before has been told
+        const configstore::MessageCollector messages;
+        void *out = nullptr;
+        std::uint32_t length = 0;
+        const std::int32_t status = DVSState_LoadFromConfigStoreAsBuf(&out, &length, desired_);
+        const std::unique_ptr<void, FreeBuffer> buffer(out);
+        if (status == 0 && out) {
+            const auto *bytes = static_cast<const std::uint8_t *>(out);
+            return {bytes, bytes + length};
+        }
+        Error error = Failure(context, status, "cannot load the switches of the config store", messages);
+        if (status == 0) error.why = "the load ended at a switch that it could not load, and gave nothing";
+        if (error.status == Exit::Malformed || error.status == Exit::NotThere || error.status == Exit::Failed)
+            error.status = Exit::Store; // what is wrong here lies in the store
+        error.next = "dvsctl store check looks for damage; dvsctl store export shows a switch's document";
+        throw Error(error);
+    }
+
+    // Waits as long as --timeout allows: the library's own wait is fixed.
+    void AwaitTurn(Context &context) const {
+        const OpenStore store(context, path_, false);
+        std::int64_t revision = 0;
+        std::int32_t status = configstore::BeginTransaction(store.get());
+        if (status == configstore::OK) status = admin::LatestRevision(store.get(), &revision);
+        (void)configstore::CancelTransaction(store.get()); // nothing has been written
+        store.Require(status, "cannot save to the config store");
+    }
+
+    void Save(Context &context, Bytes state) const {
+        // The state was narrowed to the one switch then.
+        std::optional<std::string> single;
+        if (context.options.switchId) single = std::string(ParseState(state).switches.at(0).name);
+        (void)context.log.Take();
+        for (;;) {
+            const configstore::MessageCollector messages;
+            const std::int32_t status = DVSState_SaveBufToConfigStoreChecked(
+                state.data(), static_cast<std::uint32_t>(state.size()), single ? single->c_str() : nullptr);
+            if (status == 0) return;
+            if (status != configstore::BUSY || context.deadline.IsOver())
+                throw Error(Failure(context, status, "the config store refuses the state", messages));
+        }
+    }
+
+    Error Failure(Context &context, std::int32_t status, std::string title,
+                  const configstore::MessageCollector &messages) const {
+        Error error = StoreError(status, std::move(title), path_, messages.Text());
+        error.source = Name();
+        if (status < 0) {
+            error.status = Exit::Malformed;
+            error.why = "a value is not one that the config store can express";
+        } else if (status >= kFirstLibraryStatus) {
+            const auto library = static_cast<HYP_ReturnStatus>(status);
+            error.status =
+                library == HYP_LIMIT_EXCEEDED || library == HYP_NO_MEMORY ? Exit::Failed : Exit::Malformed;
+            error.why = HYP_ReturnStatusToString(library);
+        }
+        for (std::string &message : context.log.Take())
+            error.messages.push_back(std::move(message));
+        return error;
+    }
+
+    std::string path_;
+    bool desired_;
+};
+
+} // namespace
+
+std::unique_ptr<Source> OpenStoreSource(std::string_view path) {
+    return std::make_unique<StoreSource>("store:", StorePathOf(path), false);
+}
+
+std::unique_ptr<Source> OpenStoreDesiredSource(std::string_view path) {
+    return std::make_unique<StoreSource>("store-desired:", StorePathOf(path), true);
+}
+
+} // namespace dvs::ctl

@@ -1,0 +1,99 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSCTL_STORE_ACCESS_H
+#define DVSCTL_STORE_ACCESS_H
+
+// How dvsctl gets at a config store: which database is meant, opening it with the time that --timeout leaves,
+// and store statuses as errors with the store's own words as their cause. Stands on the operators' functions
+// (platform/embedded/configstore/admin.h); the store sources and the store verbs stand on this.
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "platform/embedded/configstore/admin.h"
+#include "platform/embedded/configstore/log.h"
+#include "tools/dvsctl/context.h"
+
+namespace dvs::ctl {
+
+namespace admin = configstore::admin;
+
+/// The database that `given` names; where it is empty, the one that the library would open. Throws
+/// Error(Usage) for a store in memory, which ends with this program.
+std::string StorePathOf(std::string_view given);
+
+/// "store:PATH".
+std::string StoreName(const std::string &path);
+
+/// Makes `path` the store that the library's own functions open from now on.
+void PointLibraryAt(const std::string &path);
+
+/// The exit status for a store status other than 0.
+Exit StoreExit(std::int32_t status);
+
+/// The error for a store status other than 0; `cause` is what the store said meanwhile, or empty.
+Error StoreError(std::int32_t status, std::string title, const std::string &path, const std::string &cause);
+
+/// The error of those who need a store where there is none.
+Error NoStoreError(const std::string &path);
+
+/// The error of those who need an object that the store does not hold.
+Error NoSwitchError(const std::string &path, std::string_view name, admin::Layer layer);
+
+/// One open store.
+class OpenStore {
+public:
+    /// Throws Error. Reading never makes a database: where there is none, that is an error.
+    OpenStore(Context &context, const std::string &path, bool readOnly);
+    ~OpenStore() { configstore::DestroyStore(store_); }
+    OpenStore(const OpenStore &) = delete;
+    OpenStore &operator=(const OpenStore &) = delete;
+
+    [[nodiscard]] configstore::Store *get() const { return store_; }
+    [[nodiscard]] const std::string &Path() const { return path_; }
+
+    /// Throws the error for a status other than 0.
+    void Require(std::int32_t status, const char *title) const;
+
+    [[nodiscard]] std::vector<admin::Entry> List() const;
+    [[nodiscard]] std::vector<admin::PastEntry> History() const;
+    [[nodiscard]] std::int64_t LatestRevision() const;
+    /// The object's document; nothing where there is none.
+    [[nodiscard]] std::optional<std::string> Document(const admin::Address &address) const;
+    /// As of a revision; nothing where there was none.
+    [[nodiscard]] std::optional<std::string> DocumentAsOf(const admin::Address &address,
+                                                          std::int64_t revision) const;
+
+private:
+    void Relieve();
+
+    configstore::MessageCollector messages_;
+    configstore::Store *store_ = nullptr;
+    std::string path_;
+};
+
+/// The layer that --layer names, the current one by default. Throws Error(Usage).
+admin::Layer LayerOf(const Options &options);
+
+/// The address of a switch's object.
+admin::Address SwitchAddress(admin::Layer layer, std::string id);
+
+/// The object that the text names: by switch id, else by the switch's name; with `withPast`, also one that is
+/// gone.
+/// Throws Error(NotThere).
+admin::Address FindObject(const OpenStore &store, admin::Layer layer, const std::string &text, bool withPast);
+
+/// The member "name" of a document; empty where there is none.
+std::string NameInDocument(std::string_view document);
+
+/// Milliseconds since 1970 as "2026-11-21T11:40:02Z".
+std::string ShowTime(std::int64_t milliseconds);
+
+/// The number that --revision gives; nothing without it. Throws Error(Usage).
+std::optional<std::int64_t> RevisionOf(const Options &options);
+
+} // namespace dvs::ctl
+
+#endif

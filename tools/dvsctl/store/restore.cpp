@@ -1,0 +1,107 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// `dvsctl store restore`: one switch, or the whole store, as of a revision.
+
+#include <algorithm>
+#include <tuple>
+
+#include <boost/json/value.hpp>
+#include <fmt/format.h>
+
+#include "tools/dvsctl/commands.h"
+#include "tools/dvsctl/store/access.h"
+#include "tools/dvsctl/store/document.h"
+#include "tools/dvsctl/store/verbs.h"
+#include "tools/dvsctl/text.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+std::vector<admin::Address> AllAddresses(const OpenStore &store) {
+    std::vector<admin::Address> addresses;
+    for (const admin::Entry &entry : store.List())
+        addresses.push_back(entry.address);
+    for (const admin::PastEntry &past : store.History())
+        addresses.push_back(past.entry.address);
+    const auto order = [](const admin::Address &a) {
+        return std::tie(a.layer, a.key, a.group, a.component, a.instance);
+    };
+    std::sort(addresses.begin(), addresses.end(),
+              [&](const auto &a, const auto &b) { return order(a) < order(b); });
+    addresses.erase(std::unique(addresses.begin(), addresses.end(),
+                                [&](const auto &a, const auto &b) { return order(a) == order(b); }),
+                    addresses.end());
+    return addresses;
+}
+
+std::optional<boost::json::value> Parsed(const std::optional<std::string> &text) {
+    if (!text) return std::nullopt;
+    auto document = ReadDocument(*text);
+    return document ? document : boost::json::value(ValidUtf8(*text));
+}
+
+ObjectChange PlanOne(const OpenStore &store, const admin::Address &address, std::int64_t revision) {
+    return {address, Parsed(store.Document(address)), Parsed(store.DocumentAsOf(address, revision))};
+}
+
+void CheckRevision(const OpenStore &store, std::int64_t revision) {
+    const std::int64_t latest = store.LatestRevision();
+    if (revision > latest)
+        throw Error(Exit::Failed, fmt::format("there is no revision {} yet", revision))
+            .In(StoreName(store.Path()))
+            .Because(fmt::format("the latest is {}", latest))
+            .Try("dvsctl store history lists them");
+}
+
+std::vector<ObjectChange> Plan(const OpenStore &store, const std::optional<admin::Address> &only,
+                               std::int64_t revision) {
+    if (!only) {
+        std::vector<ObjectChange> plan;
+        for (const admin::Address &address : AllAddresses(store))
+            plan.push_back(PlanOne(store, address, revision));
+        return plan;
+    }
+    ObjectChange change = PlanOne(store, *only, revision);
+    if (!change.after)
+        throw Error(Exit::NotThere, fmt::format("the store held no such switch as of revision {}", revision))
+            .In(StoreName(store.Path()))
+            .Try("dvsctl store history shows when it was there; dvsctl store delete removes it");
+    return {std::move(change)};
+}
+
+} // namespace
+
+Exit RunStoreRestore(Context &context) {
+    const Options &options = context.options;
+    const auto revision = RevisionOf(options);
+    if (!revision)
+        throw Error(Exit::Usage, "store restore needs --revision N")
+            .Try("dvsctl store history lists the revisions");
+    const std::string path = StorePathOf(options.store.value_or(""));
+    std::optional<admin::Address> only;
+    std::vector<ObjectChange> plan;
+    {
+        const OpenStore store(context, path, true);
+        CheckRevision(store, *revision);
+        if (options.name) only = FindObject(store, LayerOf(options), *options.name, true);
+        plan = Plan(store, only, *revision);
+    }
+    if (!options.dryRun) {
+        const OpenStore store(context, path, false);
+        std::vector<admin::Change> changes;
+        if (only)
+            store.Require(admin::RestoreObject(store.get(), *only, *revision), "cannot restore the switch");
+        else
+            store.Require(admin::RestoreStore(store.get(), *revision, &changes), "cannot restore the store");
+    }
+    const auto changed =
+        std::count_if(plan.begin(), plan.end(), [](const ObjectChange &c) { return c.before != c.after; });
+    const std::string what = only ? "switch " + ShowName(only->instance) : ShowName(StoreName(path));
+    WriteReport(context, {"store restore", path,
+                          fmt::format("restored {} as of revision {}: {}", what, *revision,
+                                      Count(static_cast<std::uint64_t>(changed), "object") + " changed"),
+                          std::move(plan)});
+    return Exit::Done;
+}
+
+} // namespace dvs::ctl
