@@ -69,7 +69,7 @@ LoadedState OnlySwitch(Context &context, const Source &from, const LoadedState &
     State narrowed = loaded.state;
     Options wanted = context.options;
     wanted.ifExists = false; // there is nothing to copy then
-    ApplyFilter(wanted, from, narrowed);
+    ApplyFilter(wanted, from.Name(), narrowed);
     std::vector<NewEntry> entries;
     for (const Switch &sw : narrowed.switches)
         entries.push_back({std::string(sw.name), sw.type, {sw.value.begin(), sw.value.end()}});

@@ -45,6 +45,7 @@ public:
     bool HoldsTyped() const override { return true; }
     bool CountsWhenEmpty() const override { return false; }
     bool ReplacesSingle() const override { return true; }
+    bool KeepsPersistentState() const override { return true; }
 
     std::optional<StateBytes> Read(Context &context, ReadMode mode) override {
         if (!FileExists(path_)) return std::nullopt;
