@@ -61,7 +61,11 @@ TEST_F(Verbs, ShowFindsSwitchesAndPortsByIdAndAlias) {
     EXPECT_EQ(byAlias.status, 0);
     EXPECT_NE(byAlias.out.find("x.blob"), std::string::npos);
     EXPECT_EQ(byAlias.out.find("shadow of 1"), std::string::npos);
+    EXPECT_NE(byAlias.out.find("switch alpha"), std::string::npos);
+    EXPECT_NE(byAlias.out.find("\"production\""), std::string::npos)
+        << "the alias is shown, whatever else is not";
     EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", "beta", "--port", "1"}).status, 4);
+    EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", ""}).status, 4) << "no alias is no empty alias";
 }
 
 TEST_F(Verbs, ShowKeepsMatchingProperties) {
@@ -196,6 +200,17 @@ TEST_F(Verbs, HexdumpAnnotatesEveryByte) {
         at += range.at("size").as_int64();
     }
     EXPECT_EQ(at, static_cast<std::int64_t>(Get("a.db").size()));
+}
+
+TEST_F(Verbs, HexdumpFindsSwitchesAndPortsByIdAndAlias) {
+    const std::string byId = Dvsctl({"hexdump", At("a.db"), "--switch", "alpha", "--port", "2"}).out;
+    EXPECT_NE(byId.find("active port 2: entry of"), std::string::npos);
+    EXPECT_EQ(byId.find("port 1"), std::string::npos);
+    EXPECT_EQ(Dvsctl({"hexdump", At("a.db"), "--switch", "production", "--port", "2"}).out, byId);
+    EXPECT_NE(Dvsctl({"hexdump", At("a.db"), "--port", "web-1"}).out.find("active port 1: entry of"),
+              std::string::npos);
+    EXPECT_EQ(Dvsctl({"hexdump", At("a.db"), "--switch", "gamma"}).status, 4);
+    EXPECT_EQ(Dvsctl({"hexdump", At("a.db"), "--switch", "gamma", "--if-exists"}).out, "");
 }
 
 TEST_F(Verbs, HexdumpGoesUpToAFaultAndBehindIt) {

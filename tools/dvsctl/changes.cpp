@@ -9,7 +9,6 @@
 #include <fmt/format.h>
 
 #include "tools/dvsctl/compare.h"
-#include "tools/dvsctl/filter.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/options.h"
 #include "tools/dvsctl/output.h"
@@ -109,7 +108,7 @@ std::string PortTitle(const Entry &port) {
 }
 
 std::string SwitchTitle(const Switch &sw) {
-    const std::string_view alias = AliasOf(sw);
+    const std::string_view alias = sw.alias;
     return "switch " + ShowName(sw.name) + (alias.empty() ? "" : " " + Quote(alias));
 }
 

@@ -3,8 +3,6 @@
 
 #include "tools/dvsctl/filter.h"
 
-#include "dvsstate/names.h"
-
 namespace dvs::ctl {
 
 namespace {
@@ -16,7 +14,8 @@ bool KeepNamed(std::vector<Item> &items, std::string_view name, IsCandidate isCa
     for (const Item &item : items)
         hasId = hasId || (isCandidate(item) && item.name == name);
     std::erase_if(items, [&](const Item &item) {
-        const bool keep = isCandidate(item) && (item.name == name || (!hasId && AliasOf(item) == name));
+        const bool keep =
+            isCandidate(item) && (item.name == name || (!hasId && !name.empty() && item.alias == name));
         found = found || keep;
         return !keep;
     });
@@ -52,24 +51,6 @@ bool KeepProperties(State &state, std::string_view pattern) {
 }
 
 } // namespace
-
-std::string_view TextOf(const std::vector<Property> &list, std::string_view name) {
-    for (const Property &property : list) {
-        if (property.name != name) continue;
-        const std::string_view text = AsText(property.value);
-        return text.substr(0, text.find('\0'));
-    }
-    return {};
-}
-
-std::string_view AliasOf(const Switch &sw) {
-    const Entry *global = sw.Find(Role::GlobalList);
-    return global ? TextOf(global->list, state::kSwitchAlias) : std::string_view();
-}
-
-std::string_view AliasOf(const Entry &port) {
-    return TextOf(port.list, state::kPortAlias);
-}
 
 void ApplyFilter(const Options &options, const std::string &source, State &state) {
     const std::string list = "dvsctl show " + source + " lists what there is";

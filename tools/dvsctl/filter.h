@@ -10,11 +10,6 @@
 
 namespace dvs::ctl {
 
-/// The text of a property in a list, up to its NUL; empty when it is not there.
-std::string_view TextOf(const std::vector<Property> &list, std::string_view name);
-std::string_view AliasOf(const Switch &sw);
-std::string_view AliasOf(const Entry &port);
-
 /// Keeps what the options ask for. Throws Error(NotThere) when a switch, port or property that was asked for
 /// is not in the state, unless --if-exists.
 void ApplyFilter(const Options &options, const std::string &source, State &state);

@@ -59,6 +59,25 @@ void AddItem(State &state, const state::StateItem &item) {
     }
 }
 
+// The text of a property, up to its NUL; empty when it is not there.
+std::string_view TextOf(const std::vector<Property> &list, std::string_view name) {
+    for (const Property &property : list) {
+        if (property.name != name) continue;
+        const std::string_view text = AsText(property.value);
+        return text.substr(0, text.find('\0'));
+    }
+    return {};
+}
+
+void FindAliases(State &state) {
+    for (Switch &sw : state.switches) {
+        if (const Entry *global = sw.Find(Role::GlobalList))
+            sw.alias = TextOf(global->list, dvs::state::kSwitchAlias);
+        for (Entry &entry : sw.entries)
+            if (entry.role == Role::Port) entry.alias = TextOf(entry.list, dvs::state::kPortAlias);
+    }
+}
+
 } // namespace
 
 const std::string_view kKindProperty = dvs::state::kPortKind;
@@ -136,6 +155,7 @@ State ParseState(Bytes bytes) {
         if (item.kind == state::StateItemKind::State) state.size = item.buffer->Header().totalLength;
         AddItem(state, item);
     }
+    FindAliases(state);
     return state;
 }
 

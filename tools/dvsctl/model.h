@@ -34,6 +34,7 @@ struct Entry : Property {
     Role role = Role::Port;
     std::vector<Property> list; ///< of a property list or port
     std::uint32_t kind = 1;     ///< of a port
+    std::string_view alias;     ///< of a port; empty when it has none
 
     bool IsList() const { return role >= Role::GlobalList && role <= Role::Port; }
 };
@@ -41,6 +42,7 @@ struct Entry : Property {
 struct Switch : Property {
     bool isOther = false; ///< its type is one that a load passes over; it has no entries then
     std::vector<Entry> entries;
+    std::string_view alias; ///< empty when it has none
 
     /// The first entry of the role; null when there is none. Not for ports.
     const Entry *Find(Role role) const;

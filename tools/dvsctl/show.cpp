@@ -57,7 +57,7 @@ public:
         switch_ = &sw;
         std::string summary = fmt::format("{}, {}", Count(sw.PortCount(), "port"),
                                           Count(sw.PropertyCount(), "property", "properties"));
-        if (!AliasOf(sw).empty()) summary = Quote(AliasOf(sw)) + ", " + summary;
+        if (!sw.alias.empty()) summary = Quote(sw.alias) + ", " + summary;
         if (sw.isOther) summary = "not loaded: its type has none of the bits a load asks for";
         Header(0, "switch " + ShowName(sw.name), sw.type, std::move(summary));
         for (const Entry &entry : sw.entries)
@@ -83,7 +83,7 @@ private:
             Header(1, "host", entry.type, count);
             break;
         case Role::Port: {
-            const std::string alias = AliasOf(entry).empty() ? "" : Quote(AliasOf(entry)) + ", ";
+            const std::string alias = entry.alias.empty() ? "" : Quote(entry.alias) + ", ";
             Header(1, "port " + ShowName(entry.name), entry.type,
                    alias + ShowKind(entry.kind) + ", " + count);
             break;
