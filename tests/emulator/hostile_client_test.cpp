@@ -114,7 +114,9 @@ TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
         if (below(4)) (void)client.Answered(1);
         if (i % 50 == 0) {
             Populate();
-            ASSERT_EQ(Fetch(DVSHYP_GlobalPropGet, "s", "name").status, HYP_OK) << i;
+            // A request that is still in hand may be a valid removal: this client is served either way.
+            const HYP_ReturnStatus status = Fetch(DVSHYP_GlobalPropGet, "s", "name").status;
+            ASSERT_TRUE(status == HYP_OK || status == HYP_NOT_FOUND) << i;
             ASSERT_EQ(Exec("fault clear").status, HYP_OK) << i;
         }
     }
