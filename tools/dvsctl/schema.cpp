@@ -88,8 +88,10 @@ std::string MembersOf(const json::object &schema) {
 Place Walk(const json::object &root, const std::string &path) {
     Place place{&root, &root};
     std::string_view rest = path;
+    // Errors and differences write paths with slashes, for ids may have dots in them.
+    const char separator = path.find('/') != std::string::npos ? '/' : '.';
     for (bool more = !rest.empty(); more;) {
-        const std::size_t end = rest.find_first_of("./");
+        const std::size_t end = rest.find(separator);
         const std::string_view word = rest.substr(0, end);
         more = end != std::string_view::npos;
         const json::object *next = Step(*place.schema, word);

@@ -26,6 +26,9 @@ namespace {
 // Statuses of the library itself begin here; smaller ones are the store's.
 constexpr std::int32_t kFirstLibraryStatus = HYP_FAILURE;
 
+// What a save tells the system's log about its times is no cause of anything.
+constexpr const char *kTimingText = "DVSState_SaveBufToConfigStore_ByInstance";
+
 struct FreeBuffer {
     void operator()(void *buffer) const { std::free(buffer); }
 };
@@ -167,7 +170,11 @@ private:
                   const configstore::MessageCollector &messages) const {
         Error error = StoreError(status, std::move(title), path_, messages.Text());
         error.source = Name();
-        if (status < 0) {
+        if (status < 0 && !messages.Text().empty()) {
+            error.status =
+                Exit::Store; // the library has one status of its own for a store that does not open
+            error.why = "the config store cannot be opened";
+        } else if (status < 0) {
             error.status = Exit::Malformed;
             error.why = "a value is not one that the config store can express";
         } else if (status >= kFirstLibraryStatus) {
@@ -177,7 +184,7 @@ private:
             error.why = HYP_ReturnStatusToString(library);
         }
         for (std::string &message : context.log.Take())
-            error.messages.push_back(std::move(message));
+            if (message.find(kTimingText) == std::string::npos) error.messages.push_back(std::move(message));
         return error;
     }
 

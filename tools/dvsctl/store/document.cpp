@@ -21,7 +21,7 @@ constexpr std::size_t kMostDepth = 512; // the store itself takes no deeper ones
 constexpr std::size_t kShownBytes = 100;
 
 std::string Below(const std::string &path, std::string_view member) {
-    return path.empty() ? std::string(member) : fmt::format("{}.{}", path, member);
+    return path.empty() ? std::string(member) : fmt::format("{}/{}", path, member);
 }
 
 // A whole object that came or went is one change; at the root its members are, for a document has no name.

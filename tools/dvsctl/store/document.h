@@ -20,7 +20,7 @@ std::optional<boost::json::value> ReadDocument(std::string_view text);
 
 /// One field that is in one document only, or has another value in the other.
 struct FieldChange {
-    std::string path; ///< "ports.7.settings.blocked", not escaped; empty for the document
+    std::string path; ///< "ports/7/settings/blocked", not escaped; empty for the document
     std::optional<boost::json::value> before, after;
 };
 
