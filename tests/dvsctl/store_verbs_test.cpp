@@ -61,7 +61,7 @@ TEST_F(StoreVerbs, ImportRefusesWithTheFieldAndStoresNothing) {
     Save();
     const std::string before = Get("store.db");
     const BadDocument cases[] = {
-        {"unknown member", R"({"uuid": "alpha", "settings": {"max_mtuu": 1}})", "max_mtuu"},
+        {"unknown member", R"({"uuid": "alpha", "settings": {"max_mtuu": 1}})", "field settings/max_mtuu"},
         {"type", R"({"uuid": "alpha", "max_ports": "many"})", "max_ports"},
         {"range", R"({"uuid": "alpha", "settings": {"max_mtu": -1}})", "settings/max_mtu"},
         {"duplicate key", R"({"uuid": "alpha", "name": "a", "name": "b"})", "name"},

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // `dvsctl schema`: the schema of the store's documents, whole or field by field.
 
-#include <algorithm>
+#include "tools/dvsctl/schema.h"
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
@@ -154,7 +154,32 @@ void ShowPlace(Context &context, const json::object &root, const Place &place, c
     table.Write(out);
 }
 
+json::value ReadSchema() {
+    const admin::Address address = SwitchAddress(admin::Layer::Current, "");
+    return json::parse(admin::Schema(address.key, address.group));
+}
+
+// Goes only where both the document and the schema have members.
+std::string FindUnknown(const json::object &root, const json::object &given, const json::value &value,
+                        const std::string &path) {
+    const json::object &schema = Resolve(root, given);
+    if (!value.is_object() || (!schema.contains("properties") && !Instances(schema))) return {};
+    for (const auto &[name, member] : value.as_object()) {
+        const std::string below =
+            path.empty() ? std::string(name) : fmt::format("{}/{}", path, std::string_view(name));
+        const json::object *next = Step(schema, name);
+        if (!next) return below;
+        if (std::string found = FindUnknown(root, *next, member, below); !found.empty()) return found;
+    }
+    return {};
+}
+
 } // namespace
+
+std::string UnknownField(const json::value &document) {
+    const json::value schema = ReadSchema();
+    return FindUnknown(schema.as_object(), schema.as_object(), document, "");
+}
 
 Exit RunSchema(Context &context) {
     const admin::Address address = SwitchAddress(admin::Layer::Current, "");
