@@ -44,6 +44,9 @@ std::span<const Command> StoreCommands();
 /// The table, in the order of the help.
 std::span<const Command> Commands();
 
+/// The part of the table that is about the switching module.
+std::span<const Command> KernelCommands();
+
 /// The options every verb has.
 std::span<const OptionRow> CommonOptions();
 

@@ -124,6 +124,7 @@ std::span<const Command> Commands() {
     static const std::vector<Command> all = [] {
         std::vector<Command> commands(std::begin(kCommands), std::end(kCommands));
         commands.insert(commands.end(), StoreCommands().begin(), StoreCommands().end());
+        commands.insert(commands.end(), KernelCommands().begin(), KernelCommands().end());
         return commands;
     }();
     return all;

@@ -41,6 +41,19 @@ struct Options {
     bool order = false;                  ///< the order of entries counts as a difference
     bool ignoreTypes = false;            ///< type words do not count as a difference
     bool persistent = false;             ///< of kernel: only what is worth keeping
+
+    // Verbs about the switching module. Numbers are read by the verbs, which know what they are for.
+    std::string switchName, portName, propName;                    ///< what it is about
+    std::string number;                                            ///< VERSION, PORTS or UPLINK
+    std::string text;                                              ///< TEXT or EXTERNAL-ID
+    std::optional<std::string> value;                              ///< VALUE
+    std::optional<std::string> file;                               ///< the bytes of this file instead
+    std::optional<std::string> as;                                 ///< how VALUE is meant
+    std::optional<std::string> type;                               ///< type word
+    std::optional<std::string> kind;                               ///< of ports
+    std::optional<std::string> className, maxPorts, switchVersion; ///< of a new switch
+    bool global = false, host = false;                             ///< which list of a switch
+    bool smartNic = false;                                         ///< asked of the SmartNIC
 };
 
 } // namespace dvs::ctl

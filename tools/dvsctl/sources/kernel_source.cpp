@@ -46,6 +46,8 @@ public:
         throw Error(error);
     }
 
+    bool CountsWhenEmpty() const override { return false; }
+    Exit AbsentStatus() const override { return Exit::NoDevice; }
     std::string WhyAbsent() const override { return "the switching module's device is not there"; }
 
 private:
