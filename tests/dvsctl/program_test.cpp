@@ -4,6 +4,7 @@
 #include <gtest/gtest.h>
 
 #include <cstdlib>
+#include <sstream>
 #include <string>
 
 #include <boost/json/object.hpp>
@@ -37,14 +38,19 @@ TEST_F(Program, HelpsWithEveryVerb) {
     EXPECT_EQ(Dvsctl({"-h"}).out, overview.out);
     for (const dvs::ctl::Command &command : dvs::ctl::Commands()) {
         EXPECT_NE(overview.out.find(command.name), std::string::npos);
-        const Result help = Dvsctl({command.name, "--help"});
+        std::vector<std::string> words;
+        std::istringstream name(command.name); // some are of two words
+        for (std::string word; name >> word;)
+            words.push_back(word);
+        words.emplace_back("--help");
+        const Result help = Dvsctl(words);
         EXPECT_EQ(help.status, 0) << command.name;
         EXPECT_EQ(help.out.find("Usage: dvsctl " + std::string(command.name)), 0u);
         EXPECT_NE(help.out.find("Examples:\n  dvsctl "), std::string::npos) << command.name;
         for (const dvs::ctl::OptionRow &row : command.options) {
-            const std::string name = row.name;
-            EXPECT_NE(help.out.find(name.substr(name.rfind(',') + 1)), std::string::npos)
-                << command.name << " " << name;
+            const std::string option = row.name;
+            EXPECT_NE(help.out.find(option.substr(option.rfind(',') + 1)), std::string::npos)
+                << command.name << " " << option;
         }
     }
     EXPECT_EQ(Json(Dvsctl({"show", "--help", "--json"})).at("schema_version"), 1);
