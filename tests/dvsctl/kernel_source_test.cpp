@@ -1,0 +1,191 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// The source kernel:, and everything that can go wrong between the program and the module: no device, a
+// module that refuses, hangs, dies or lies.
+
+#include <csignal>
+#include <thread>
+
+#include <sys/socket.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+#include <boost/json/array.hpp>
+#include <boost/json/object.hpp>
+
+#include "kernel_fixture.h"
+#include "platform/embedded/emulator_wire.h"
+
+namespace {
+
+using namespace dvs::ctl::test;
+
+class KernelSource : public KernelTest {};
+
+TEST_F(KernelSource, ShowsAndVerifiesTheLiveState) {
+    EXPECT_EQ(Json(Kernel({"show", "kernel:", "--json"})).at("switches").as_array().size(), 2u);
+    EXPECT_NE(Kernel({"verify", "kernel:"}).out.find("sound"), std::string::npos);
+    EXPECT_EQ(Kernel({"show", "kernel:", "--switch", "none"}).status, 4);
+    EXPECT_EQ(Kernel({"show", "kernel:1"}).status, 2);
+}
+
+TEST_F(KernelSource, PersistentLeavesOutWhatIsNotWorthKeeping) {
+    EXPECT_NE(Kernel({"show", "kernel:"}).out.find("shadow of 1"), std::string::npos);
+    EXPECT_EQ(Kernel({"show", "kernel:", "--persistent"}).out.find("shadow of 1"), std::string::npos);
+    EXPECT_EQ(Kernel({"diff", "kernel:", "kernel:", "--persistent"}).status, 0);
+}
+
+TEST_F(KernelSource, CopiesGoIntoFilesAndBack) {
+    ASSERT_EQ(Kernel({"copy", "kernel:", At("live.db")}).status, 0);
+    ASSERT_EQ(Verb({"prop", "set", "alpha", "x.mtu", "1", "--as", "number"}).status, 0);
+    EXPECT_EQ(Kernel({"diff", "kernel:", At("live.db")}).status, 1);
+    const std::string before = Everything();
+    const Result plan = Kernel({"copy", At("live.db"), "kernel:", "--dry-run", "--json"});
+    EXPECT_EQ(Json(plan).at("changes").as_array().size(), 1u);
+    EXPECT_EQ(Everything(), before);
+    EXPECT_EQ(Kernel({"copy", At("live.db"), "kernel:", "--no-replace"}).status, 1);
+    EXPECT_EQ(Everything(), before);
+    ASSERT_EQ(Kernel({"copy", At("live.db"), "kernel:"}).status, 0);
+    EXPECT_EQ(Kernel({"diff", "kernel:", At("live.db")}).status, 0);
+}
+
+TEST_F(KernelSource, ACopyIntoTheStoreTakesThePersistentState) {
+    ASSERT_EQ(Kernel({"copy", "json:" DVS_SOURCE_DIR "/examples/site-basic.json", "kernel:"}).status, 0);
+    EXPECT_NE(Verb({"ports", "production"}).out.find("shadow"), std::string::npos);
+    ASSERT_EQ(Kernel({"copy", "kernel:", "store:"}).status, 0);
+    ASSERT_EQ(Verb({"state", "cleanup"}).status, 0);
+    const Result back = Kernel({"copy", "store:", "kernel:"});
+    ASSERT_EQ(back.status, 0) << back.err;
+    EXPECT_EQ(Verb({"port", "find", "production", "web-1"}).status, 0);
+    EXPECT_EQ(Verb({"ports", "production"}).out.find("shadow"), std::string::npos);
+}
+
+TEST_F(KernelSource, AMissingDeviceSaysHowToGetOne) {
+    for (const std::vector<std::string> &args : {std::vector<std::string>{"show", "kernel:"},
+                                                 {"copy", At("start.db"), "kernel:"},
+                                                 {"kernel", "switch", "remove", "alpha"},
+                                                 {"kernel", "exec", "", "help"},
+                                                 {"kernel", "ports", "alpha", "--json"}}) {
+        const Result result = RunProgram({.args = args});
+        EXPECT_EQ(result.status, 5) << args[0];
+        EXPECT_NE((result.out + result.err).find("DVS_EMULATOR"), std::string::npos) << result.err;
+    }
+    emulator_.Stop(SIGTERM);
+    const Result gone = Kernel({"show", "kernel:"});
+    EXPECT_EQ(gone.status, 5);
+    EXPECT_NE(gone.err.find(Socket()), std::string::npos);
+    EXPECT_NE(gone.err.find("cause:  failed to open dvsdev device"), std::string::npos) << gone.err;
+}
+
+TEST_F(KernelSource, FaultsOfTheModuleBecomeClearErrors) {
+    const struct {
+        const char *fault;
+        int status;
+        const char *says;
+    } rows[] = {
+        {"command=5,nth=1,errno=EBUSY", 8, "busy"},
+        {"command=5,nth=1,errno=EIO", 1, "ioctl failed: Input/output error"},
+        {"command=5,nth=1,status=0x0bad0014", 1, "memory"},
+        {"command=5,nth=1,status=0x0bad0006", 1, "limit"},
+        {"command=5,nth=1,status=0x0bad0077", 1, "0x0bad0077"},
+        {"command=5,nth=1,drop", 1, "failed"},
+    };
+    const std::string before = Everything();
+    for (const auto &row : rows) {
+        Fault(row.fault);
+        const Result result = Verb({"switch", "remove", "alpha"});
+        EXPECT_EQ(result.status, row.status) << row.fault << result.err;
+        EXPECT_NE(result.err.find(row.says), std::string::npos) << row.fault << '\n' << result.err;
+        EXPECT_EQ(Everything(), before) << row.fault;
+    }
+    Fault("command=0,nth=1,status=0x0bad0006");
+    EXPECT_EQ(Kernel({"copy", At("start.db"), "kernel:"}).status, 1);
+    Fault("command=3,nth=1,status=0x0bad0014");
+    EXPECT_EQ(Kernel({"show", "kernel:"}).status, 1);
+}
+
+TEST_F(KernelSource, AModuleThatHangsIsATimeout) {
+    Fault("command=3,nth=1,delay=30s");
+    const Result late = Kernel({"show", "kernel:", "--timeout", "0.2", "--json"});
+    EXPECT_EQ(late.status, 3);
+    EXPECT_EQ(Json(late).at("error").at("name"), "timeout");
+    kill(emulator_.Pid(), SIGSTOP);
+    EXPECT_EQ(Kernel({"verify", "kernel:", "--timeout", "0.2"}).status, 3);
+    EXPECT_EQ(Verb({"prop", "get", "alpha", "x.mtu", "--timeout", "0.2"}).status, 3);
+    EXPECT_EQ(Verb({"switch", "remove", "alpha", "--timeout", "0.2"}).status, 3);
+    kill(emulator_.Pid(), SIGCONT);
+}
+
+// A module that answers each of its connections with the same bytes, whatever it is asked.
+class Liar {
+public:
+    Liar(const std::string &path, std::string reply) : reply_(std::move(reply)) {
+        listener_ = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
+        sockaddr_un address{};
+        address.sun_family = AF_UNIX;
+        path.copy(address.sun_path, sizeof address.sun_path - 1);
+        EXPECT_EQ(bind(listener_, reinterpret_cast<sockaddr *>(&address), sizeof address), 0);
+        EXPECT_EQ(listen(listener_, 8), 0);
+        thread_ = std::thread([this] { Serve(); });
+    }
+    ~Liar() {
+        shutdown(listener_, SHUT_RDWR);
+        thread_.join();
+        close(listener_);
+    }
+    Liar(const Liar &) = delete;
+    Liar &operator=(const Liar &) = delete;
+
+private:
+    void Serve() {
+        for (int peer; (peer = accept4(listener_, nullptr, nullptr, SOCK_CLOEXEC)) >= 0; close(peer)) {
+            char request[4096];
+            if (recv(peer, request, sizeof request, 0) > 0)
+                (void)send(peer, reply_.data(), reply_.size(), MSG_NOSIGNAL);
+        }
+    }
+
+    std::string reply_;
+    int listener_ = -1;
+    std::thread thread_;
+};
+
+std::string Reply(std::uint32_t claimed, const std::string &payload) {
+    dvs::wire::ReplyHeader header{};
+    header.magic = dvs::wire::kMagic;
+    header.version = dvs::wire::kVersion;
+    header.dataLen = claimed;
+    header.cmdOutLen = claimed;
+    header.payloadSize = static_cast<std::uint32_t>(payload.size());
+    return std::string(reinterpret_cast<const char *>(&header), sizeof header) + payload;
+}
+
+TEST_F(KernelSource, RepliesThatLieAreErrorsAndNothingElse) {
+    const std::string rows[] = {
+        {},
+        "x",
+        std::string(4096, '\xff'),
+        Reply(0, ""),
+        Reply(1, "x"),
+        Reply(100, "short"),
+        Reply(0xffffffff, "x"),
+        Reply(64, std::string(64, '\xff')),
+        Reply(16, std::string("\x10\0\0\0\1\2\3\4\1\0\0\0\0\0\0\0", 16)),
+    };
+    for (std::size_t i = 0; i < std::size(rows); ++i) {
+        const std::string path = At("liar" + std::to_string(i));
+        const Liar liar(path, rows[i]);
+        for (const std::vector<std::string> &args : {std::vector<std::string>{"show", "kernel:"},
+                                                     {"verify", "kernel:"},
+                                                     {"show", "kernel:", "--persistent"},
+                                                     {"kernel", "port", "state", "a", "1"},
+                                                     {"kernel", "ports", "a"},
+                                                     {"kernel", "vendor-props", "a", "--port", "1"}}) {
+            const Result result =
+                RunProgram({.args = args, .environment = {"DVS_EMULATOR=" + path, "DVS_MAX_PORTS=100"}});
+            EXPECT_TRUE(result.status == 1 || result.status == 6 || result.status == 4)
+                << i << ' ' << args[1] << ' ' << result.status << result.err;
+        }
+    }
+}
+
+} // namespace
