@@ -33,8 +33,9 @@ cmake/install-packages.sh
 
 say "Building build/release (the first time takes a few minutes)"
 cmake --preset release >"$work/configure.log" 2>&1 || { cat "$work/configure.log" >&2; exit 1; }
-cmake --build --preset release --target dvs dvsctl -- --quiet
+cmake --build --preset release --target dvs dvsctl dvs-emulator -- --quiet
 dvsctl=$PWD/build/release/bin/dvsctl
+emulator=$PWD/build/release/bin/dvs-emulator
 root=$PWD
 cp examples/site-basic.json "$work/"
 cd "$work"
@@ -130,5 +131,34 @@ run store history
 run store restore --revision 1 --dry-run
 run store restore --revision 1
 run diff loaded.db store:
+
+say "A live switching module: the emulator, started on the example's state file"
+cp site.db module.db
+export DVS_EMULATOR=$work/module.socket DVS_CONFIGSTORE=$work/live.db
+"$emulator" --socket "$DVS_EMULATOR" --state module.db >ready &
+module=$!
+trap 'kill "$module" 2>/dev/null || true; rm -rf "$work"' EXIT
+until [ -s ready ]; do kill -0 "$module" && sleep 0.1; done
+cat ready
+run verify kernel:
+run copy kernel: store:
+run copy store: saved.db
+
+say "Changes to the live module: one VLAN, one new port"
+run kernel prop set production com.orbeno.etherswitch.port.vlan '{"vlan_id": 100}' --port web-1 --dry-run
+run kernel prop set production com.orbeno.etherswitch.port.vlan '{"vlan_id": 100}' --port web-1
+run kernel port add production 77
+run kernel ports production
+
+say "The live state goes into the store; what that changed there"
+run copy kernel: store:
+run diff saved.db store: && exit 1 || [ $? -eq 1 ]
+
+say "Loaded back into an emptied module"
+run kernel state cleanup
+run copy store: kernel:
+run kernel prop get production com.orbeno.etherswitch.port.vlan --port web-1
+kill "$module"
+wait "$module" # it saves its state and ends with 0
 
 printf '\nThat was dvsctl. Next: %s --help, README.md, docs/json-form.md; ./test.sh runs the tests.\n' "${dvsctl#"$root"/}"

@@ -43,6 +43,7 @@ TEST_F(KernelSource, CopiesGoIntoFilesAndBack) {
     EXPECT_EQ(Json(plan).at("changes").as_array().size(), 1u);
     EXPECT_EQ(Everything(), before);
     EXPECT_EQ(Kernel({"copy", At("live.db"), "kernel:", "--no-replace"}).status, 1);
+    EXPECT_EQ(Kernel({"copy", At("live.db"), "kernel:", "--switch", "alpha"}).status, 2);
     EXPECT_EQ(Everything(), before);
     ASSERT_EQ(Kernel({"copy", At("live.db"), "kernel:"}).status, 0);
     EXPECT_EQ(Kernel({"diff", "kernel:", At("live.db")}).status, 0);

@@ -32,6 +32,7 @@ constexpr std::string_view kStatuses = R"(Exit status:
 
 constexpr std::string_view kEnvironment = R"(Environment:
   DVS_CONFIGSTORE  the config store's database, where none is named (default: /var/lib/dvs/configstore.db)
+  DVS_EMULATOR     the socket of a dvs-emulator that stands in for the switching module's device
   NO_COLOR         set to anything: no colour, also on a terminal
   PAGER            the pager for output longer than the terminal (default: less; empty or cat: none)
 )";

@@ -28,7 +28,13 @@ public:
         return StateBytes{answer.bytes, {}};
     }
 
+    std::vector<std::uint8_t> Plan(Context &context, Bytes state) override {
+        RefuseSingle(context);
+        return {state.begin(), state.end()};
+    }
+
     void Write(Context &context, Bytes state) override {
+        RefuseSingle(context);
         const Answer answer = CallDevice(context, [&](std::vector<std::uint8_t> &) {
             return DVSHYP_StateInit(state.data(), static_cast<std::uint32_t>(state.size()));
         });
@@ -51,6 +57,15 @@ public:
     std::string WhyAbsent() const override { return "the switching module's device is not there"; }
 
 private:
+    // The module takes whole states only: a switch alone would end all others, live.
+    void RefuseSingle(const Context &context) const {
+        if (!context.options.switchId) return;
+        throw Error(Exit::Usage, "a copy into the switching module is of the whole state")
+            .In(Name())
+            .Because("with --switch the module would lose all its other switches")
+            .Try("dvsctl kernel switch and kernel prop change single things");
+    }
+
     // The library says only that the state does not load; the whole state says where.
     [[noreturn]] void RefuseUnsound(Context &context, const Answer &refusal) {
         const Answer whole = FetchFromDevice(context, DVSHYP_StateGet);
