@@ -57,13 +57,6 @@ bool IsDefault(const DVSProp2ConfigEntry &row) {
     return std::string_view(row.key) == "DEFAULT";
 }
 
-std::string PathOf(const DVSProp2ConfigEntry &row) {
-    std::string path;
-    for (uint32_t i = 0; i < row.depth; ++i)
-        path += std::string(i ? "/" : "") + row.path[i];
-    return path;
-}
-
 // The heading's anchor as renderers make it.
 std::string TypeLink(uint32_t type) {
     const std::string number = std::to_string(type);
@@ -86,39 +79,6 @@ std::string Keys() {
     return text;
 }
 
-std::string DomainText(const Field &field) {
-    if (!field.domain) return "";
-    std::string text;
-    for (uint32_t i = 0; i < field.domain->textCount; ++i) {
-        const char *name = field.domain->texts[i];
-        if (!name) continue;
-        text += text.empty() ? "" : ", ";
-        text +=
-            field.kind == Kind::kEnum ? std::to_string(i) + " `" + name + "`" : std::string("`") + name + "`";
-    }
-    for (const Flag &flag : field.domain->flags) {
-        char bit[16];
-        std::snprintf(bit, sizeof bit, "0x%x", flag.bit);
-        text += std::string(text.empty() ? "" : "; ") + bit + " `" + flag.name + "` " + flag.meaning;
-    }
-    return ": " + text;
-}
-
-std::string CountText(const Part &part) {
-    switch (part.countBy) {
-    case CountBy::kFixed:
-        return std::to_string(part.count) + " of them";
-    case CountBy::kField:
-        return std::string("`") + part.field + "` of them" +
-               (part.gate ? std::string(" where `") + part.gateField + "` calls for them" : "");
-    case CountBy::kShare:
-        return "as many as the elements before say together";
-    case CountBy::kRest:
-        break;
-    }
-    return "to the end of the value";
-}
-
 // Empty for a record that the document has already.
 std::string RecordText(const Record &record, std::set<const Record *> *described) {
     if (!described->insert(&record).second) return "";
@@ -134,8 +94,7 @@ std::string RecordText(const Record &record, std::set<const Record *> *described
     for (const Field &field : record.fields) {
         text += "| " + std::to_string(field.offset) + " | " +
                 (field.width ? std::to_string(field.width) : "rest") + " | `" + field.name + "` | " +
-                kKinds[static_cast<std::size_t>(field.kind)] + " | " + field.meaning + DomainText(field) +
-                " |\n";
+                Word(field.kind) + " | " + field.meaning + DomainText(field) + " |\n";
     }
     for (const Part &part : record.parts)
         text += RecordText(*part.element, described);
@@ -143,7 +102,7 @@ std::string RecordText(const Record &record, std::set<const Record *> *described
 }
 
 std::string FormText(const StoreField &field, const std::string &path) {
-    std::string text = "| `" + path + "` | " + kForms[static_cast<std::size_t>(field.form)];
+    std::string text = "| `" + path + "` | " + Word(field.form);
     if (field.id) text += std::string(" by `") + field.id + "`";
     if (*field.unit) text += std::string(", ") + field.unit;
     if (field.maxText) text += ", at most " + std::to_string(field.maxText) + " bytes";
@@ -182,6 +141,54 @@ std::string Types() {
 }
 
 } // namespace
+
+std::string PathOf(const DVSProp2ConfigEntry &row) {
+    std::string path;
+    for (uint32_t i = 0; i < row.depth; ++i)
+        path += std::string(i ? "/" : "") + row.path[i];
+    return path;
+}
+
+std::string DomainText(const Field &field) {
+    if (!field.domain) return "";
+    std::string text;
+    for (uint32_t i = 0; i < field.domain->textCount; ++i) {
+        const char *name = field.domain->texts[i];
+        if (!name) continue;
+        text += text.empty() ? "" : ", ";
+        text +=
+            field.kind == Kind::kEnum ? std::to_string(i) + " `" + name + "`" : std::string("`") + name + "`";
+    }
+    for (const Flag &flag : field.domain->flags) {
+        char bit[16];
+        std::snprintf(bit, sizeof bit, "0x%x", flag.bit);
+        text += std::string(text.empty() ? "" : "; ") + bit + " `" + flag.name + "` " + flag.meaning;
+    }
+    return ": " + text;
+}
+
+std::string CountText(const Part &part) {
+    switch (part.countBy) {
+    case CountBy::kFixed:
+        return std::to_string(part.count) + " of them";
+    case CountBy::kField:
+        return std::string("`") + part.field + "` of them" +
+               (part.gate ? std::string(" where `") + part.gateField + "` calls for them" : "");
+    case CountBy::kShare:
+        return "as many as the elements before say together";
+    case CountBy::kRest:
+        break;
+    }
+    return "to the end of the value";
+}
+
+const char *Word(Kind kind) {
+    return kKinds[static_cast<std::size_t>(kind)];
+}
+
+const char *Word(Form form) {
+    return kForms[static_cast<std::size_t>(form)];
+}
 
 std::string PropertiesDocument() {
     return kIntroduction + Keys() + Types();

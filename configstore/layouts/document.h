@@ -2,11 +2,29 @@
 #ifndef CONFIGSTORE_LAYOUTS_DOCUMENT_H
 #define CONFIGSTORE_LAYOUTS_DOCUMENT_H
 
-// docs/properties.md, made of the mapping tables and the registry.
+// docs/properties.md, made of the mapping tables and the registry, and the words in which it and others who
+// explain properties put the tables. Names in these words stand in backticks.
 
 #include <string>
 
+#include "configstore/layouts/store_form.h"
+#include "dvs/configstore.h"
+
 namespace dvs::layout {
+
+/// "number", "text", …
+const char *Word(Kind kind);
+/// "uint32", "list of texts", …
+const char *Word(Form form);
+
+/// "settings/vlan".
+std::string PathOf(const DVSProp2ConfigEntry &row);
+
+/// What a field may hold, behind a colon: ": 0 `GRE`, 1 `ERSPAN2`"; empty for a field without a domain.
+std::string DomainText(const Field &field);
+
+/// How many elements a part has: "`count` of them".
+std::string CountText(const Part &part);
 
 /// The whole document. It depends on nothing but the tables, so the same tables give the same bytes.
 std::string PropertiesDocument();

@@ -361,7 +361,7 @@ TEST(JsonForm, SaysWhatIsWrongAndWhere) {
              R"("kind": "shadow", "properties": [{"name": "com.orbeno.common.port.volatile.type", "value": 3}]}]})"),
          "$.switches[0].ports[0].kind", "says otherwise"},
         {Document(port + R"("properties": [{"name": "n"}]}]})"), "$.switches[0].ports[0].properties[0]",
-         "\"value\" is missing"},
+         "\"typed\" is missing"},
         {WithValue("true"), "$.switches[0].global[0].value", "it is a boolean"},
         {WithValue("null"), "$.switches[0].global[0].value", "it is null"},
         {WithValue("[1]"), "$.switches[0].global[0].value", "it is an array"},

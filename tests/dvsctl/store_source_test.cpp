@@ -54,7 +54,7 @@ TEST_F(StoreSource, ShowPrintsTypedFieldsAndBytesWhenAsked) {
     for (const auto &property : document.at("switches").at(0).at("global").as_array())
         if (property.at("name") == "com.orbeno.common.version") {
             found = true;
-            EXPECT_EQ(property.at("fields"), "7.0.2");
+            EXPECT_EQ(property.at("typed"), "7.0.2");
             EXPECT_EQ(property.at("value"), 8);
         }
     EXPECT_TRUE(found);

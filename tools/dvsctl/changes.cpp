@@ -1,19 +1,23 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Differences on their way out: as a list for people, as a table, as JSON.
 
+#include <algorithm>
 #include <array>
+#include <map>
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
+#include "dvs/configstore.h"
 #include "tools/dvsctl/compare.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/options.h"
 #include "tools/dvsctl/output.h"
 #include "tools/dvsctl/show.h"
 #include "tools/dvsctl/table.h"
+#include "tools/dvsctl/typed_fields.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -62,8 +66,40 @@ std::string Name(const Change &change) {
     return ShowName(Either(change).name);
 }
 
-// What one side holds, for the column or the arrow.
-std::string Side(const Change &change, const Property *side, const Options &options) {
+Owner OwnerOf(const Change &change, const Property *side) {
+    const Switch &sw = side == change.after && change.now ? *change.now : *change.sw;
+    const std::string_view list = change.list;
+    const std::uint32_t propClass = list == "global" ? DVS_PROP_CLASS_GLOBAL
+                                    : list == "host" ? DVS_PROP_CLASS_HOST
+                                                     : DVS_PROP_CLASS_PORT;
+    return {propClass, sw.Number(Role::Version).value_or(0)};
+}
+
+/// Changes in words.
+class Words {
+public:
+    explicit Words(const Options &options) : options_(options) {}
+
+    /// What one side holds, for the column or the arrow.
+    std::string Side(const Change &change, const Property *side);
+
+    struct Both {
+        std::string text;                ///< "VLAN 100 -> VLAN 200 (type 0x10 -> 0x20)": only what differs
+        std::vector<std::string> fields; ///< fields of a typed value that differ, one line each
+    };
+    Both Sides(const Change &change);
+
+    TypedText Typed(const Change &change, const Property *side) {
+        if (!side || options_.raw || change.subject != Subject::Property) return {};
+        return DescribeProperty(views_, OwnerOf(change, side), *side);
+    }
+
+private:
+    const Options &options_;
+    TypedViews views_;
+};
+
+std::string Words::Side(const Change &change, const Property *side) {
     if (!side) return "";
     switch (change.subject) {
     case Subject::Switch: {
@@ -72,7 +108,7 @@ std::string Side(const Change &change, const Property *side, const Options &opti
                            Count(sw.PropertyCount(), "property", "properties"));
     }
     case Subject::Field:
-        return ShowField(static_cast<const Entry &>(*side), options.full);
+        return ShowField(static_cast<const Entry &>(*side), options_.full);
     case Subject::Port: {
         const auto &port = static_cast<const Entry &>(*side);
         return fmt::format("{}, {}", ShowKind(port.kind), Count(port.list.size(), "property", "properties"));
@@ -83,24 +119,59 @@ std::string Side(const Change &change, const Property *side, const Options &opti
     case Subject::Entry:
         break;
     }
-    return ShowValue(side->value, options.full);
+    const TypedText typed = Typed(change, side);
+    if (!typed.summary.empty()) return typed.summary;
+    const std::string value = ShowValue(side->value, options_.full);
+    return typed.damage.empty() ? value : value + " (does not fit: " + typed.damage + ")";
 }
 
-// "1500 -> 9000 (type 0x10 -> 0x20)": only what differs.
-std::string Sides(const Change &change, const Options &options) {
-    if (change.kind == ChangeKind::Reordered) return "the order differs";
-    std::string before = Side(change, change.before, options), after = Side(change, change.after, options);
-    if (!change.before || !change.after) return before + after;
-    if (before == after && AsText(change.before->value) != AsText(change.after->value) &&
+// The fields by their whole names: "failure_criteria.check_beacon".
+std::map<std::string, std::string> FieldsByName(const TypedText &typed) {
+    std::map<std::string, std::string> fields;
+    std::vector<std::string> above;
+    for (const FieldLine &line : typed.lines) {
+        above.resize(line.depth);
+        std::string name = above.empty() ? "" : above.back();
+        name += (name.empty() || line.name.starts_with('[') ? "" : ".") + line.name;
+        above.push_back(name);
+        if (!line.value.empty()) fields[name] = line.value;
+    }
+    return fields;
+}
+
+std::vector<std::string> FieldChanges(const TypedText &before, const TypedText &after) {
+    const auto left = FieldsByName(before), right = FieldsByName(after);
+    if (left.empty() || right.empty()) return {};
+    std::vector<std::string> lines;
+    for (const auto &[name, value] : left) {
+        const auto now = right.find(name);
+        if (now == right.end())
+            lines.push_back(fmt::format("- {}: {}", name, value));
+        else if (now->second != value)
+            lines.push_back(fmt::format("~ {}: {} -> {}", name, value, now->second));
+    }
+    for (const auto &[name, value] : right)
+        if (!left.contains(name)) lines.push_back(fmt::format("+ {}: {}", name, value));
+    return lines;
+}
+
+Words::Both Words::Sides(const Change &change) {
+    if (change.kind == ChangeKind::Reordered) return {"the order differs", {}};
+    std::string before = Side(change, change.before), after = Side(change, change.after);
+    if (!change.before || !change.after) return {before + after, {}};
+    Both both;
+    both.fields = FieldChanges(Typed(change, change.before), Typed(change, change.after));
+    if (before == after && both.fields.empty() &&
+        AsText(change.before->value) != AsText(change.after->value) &&
         (change.subject == Subject::Property || change.subject == Subject::Entry)) {
-        // Cut at the same place: what differs lies behind it.
+        // What differs lies behind the cut of a long value, or in bytes that its fields do not show.
         before = ShowValue(change.before->value, true);
         after = ShowValue(change.after->value, true);
     }
-    std::string text = before == after ? before : before + " -> " + after;
+    both.text = before == after ? before : before + " -> " + after;
     if (change.before->type != change.after->type)
-        text += fmt::format(" (type 0x{:02x} -> 0x{:02x})", change.before->type, change.after->type);
-    return text;
+        both.text += fmt::format(" (type 0x{:02x} -> 0x{:02x})", change.before->type, change.after->type);
+    return both;
 }
 
 std::string PortTitle(const Entry &port) {
@@ -115,7 +186,7 @@ std::string SwitchTitle(const Switch &sw) {
 /// Prints the headings under which a change stands, each once.
 class Listing {
 public:
-    Listing(const Options &options, Output &out) : options_(options), out_(out) {}
+    Listing(const Options &options, Output &out) : words_(options), out_(out) {}
 
     void Add(const Change &change) {
         const bool isSwitch = change.subject == Subject::Switch;
@@ -131,9 +202,11 @@ public:
             container_ = nullptr;
         }
         const std::size_t depth = isSwitch ? 0 : change.subject == Subject::Property ? 2 : 1;
-        const std::string line =
-            RowOf(change).sign + std::string(" ") + Label(change) + Sides(change, options_);
+        const Words::Both sides = words_.Sides(change);
+        const std::string line = RowOf(change).sign + std::string(" ") + Label(change) + sides.text;
         out_.Write(std::string(depth * 2, ' ') + out_.Paint(RowOf(change).style, line) + "\n");
+        for (const std::string &field : sides.fields)
+            out_.Write(std::string(depth * 2 + 2, ' ') + out_.Paint(RowOf(change).style, field) + "\n");
     }
 
 private:
@@ -157,7 +230,7 @@ private:
                    out_.Paint(depth == 0 ? Style::Heading : Style::Name, title) + "\n");
     }
 
-    const Options &options_;
+    Words words_;
     Output &out_;
     const void *switch_ = nullptr;
     const void *container_ = nullptr;
@@ -172,6 +245,7 @@ constexpr Column kColumns[] = {
 
 void WriteTable(const std::vector<Change> &changes, const Options &options, Output &out) {
     Table table(kColumns, options);
+    Words words(options);
     const auto type = [](const Property *side) {
         return side ? fmt::format("0x{:02x}", side->type) : std::string();
     };
@@ -182,8 +256,8 @@ void WriteTable(const std::vector<Change> &changes, const Options &options, Outp
                    {change.port ? ShowName(change.port->name) : ""},
                    {change.list},
                    {Name(change)},
-                   {Side(change, change.before, options)},
-                   {Side(change, change.after, options)},
+                   {words.Side(change, change.before)},
+                   {words.Side(change, change.after)},
                    {type(change.before)},
                    {type(change.after)}});
     table.Write(out);
@@ -225,7 +299,17 @@ json::value SideJson(const Change &change, const Property &side) {
     return ValueToJson(side.value);
 }
 
-json::object ChangeJson(const Change &change) {
+// Beside the value, what it means.
+void AddTyped(json::object &object, const Change &change, const Property *side, const char *name,
+              TypedViews &views) {
+    if (!side) return;
+    const TypedViews::Found &found = views.Of(OwnerOf(change, side), *side);
+    if (found.view.state == typed::State::kTyped) object[fmt::format("typed_{}", name)] = found.tree;
+    if (found.view.state == typed::State::kDamaged)
+        object[fmt::format("damage_{}", name)] = ValidUtf8(found.view.reason);
+}
+
+json::object ChangeJson(const Change &change, TypedViews *views) {
     json::object object;
     object["change"] = RowOf(change).word;
     object["what"] = SubjectWord(change);
@@ -243,6 +327,10 @@ json::object ChangeJson(const Change &change) {
         object["name"] = NameToJson(Either(change).name);
     if (change.before) object["before"] = SideJson(change, *change.before);
     if (change.after) object["after"] = SideJson(change, *change.after);
+    if (views && change.subject == Subject::Property) {
+        AddTyped(object, change, change.before, "before", *views);
+        AddTyped(object, change, change.after, "after", *views);
+    }
     if (change.before && change.after && change.before->type != change.after->type) {
         object["type_before"] = change.before->type;
         object["type_after"] = change.after->type;
@@ -273,10 +361,11 @@ void WriteChanges(const std::vector<Change> &changes, const Options &options, Ou
         listing.Add(change);
 }
 
-json::array ChangesJson(const std::vector<Change> &changes) {
+json::array ChangesJson(const std::vector<Change> &changes, const Options &options) {
+    TypedViews views;
     json::array array;
     for (const Change &change : changes)
-        array.emplace_back(ChangeJson(change));
+        array.emplace_back(ChangeJson(change, options.raw ? nullptr : &views));
     return array;
 }
 

@@ -18,19 +18,15 @@ constexpr OptionRow kPort = {"--port", "ID", &Options::portId, "only ports of th
 constexpr OptionRow kProps = {"--props", "GLOB", &Options::props,
                               "only properties whose names match, as '*.mtu'"};
 constexpr OptionRow kFull = {"--full", nullptr, &Options::full, "long values whole"};
+constexpr OptionRow kRaw = {"--raw", nullptr, &Options::raw,
+                            "bytes also of properties whose meaning is known"};
 constexpr OptionRow kPersistent = {"--persistent", nullptr, &Options::persistent,
                                    "of kernel: only what is worth keeping"};
 constexpr OptionRow kDryRun = {"--dry-run", nullptr, &Options::dryRun,
                                "show what would change, and change nothing"};
 
 constexpr OptionRow kShowOptions[] = {
-    kSource,
-    kSwitch,
-    kPort,
-    kProps,
-    {"--raw", nullptr, &Options::raw, "bytes also where the source keeps typed fields"},
-    kFull,
-    kPersistent,
+    kSource, kSwitch, kPort, kProps, kRaw, kFull, kPersistent,
 };
 constexpr OptionRow kVerifyOptions[] = {kSource, kPersistent};
 constexpr OptionRow kDiffOptions[] = {
@@ -41,6 +37,7 @@ constexpr OptionRow kDiffOptions[] = {
     kProps,
     {"--order", nullptr, &Options::order, "another order of the same entries is a difference too"},
     {"--ignore-types", nullptr, &Options::ignoreTypes, "another type word with the same value is none"},
+    kRaw,
     kFull,
     kPersistent,
 };
@@ -51,10 +48,15 @@ constexpr OptionRow kCopyOptions[] = {
     kDryRun,
     {"--may-exist", nullptr, &Options::mayExist, "replace what TO holds (this is the default)"},
     {"--no-replace", nullptr, &Options::noReplace, "refuse when TO holds something already"},
+    kRaw,
     kFull,
     kPersistent,
 };
 constexpr OptionRow kHexdumpOptions[] = {kSource, kSwitch, kPort};
+
+constexpr OptionRow kPropsOptions[] = {
+    {"NAME", nullptr, &Options::name, "a property's name, or a pattern as '*.vlan'"},
+};
 
 constexpr Command kCommands[] = {
     {"show", "Show switches, ports and properties as a tree", kShowOptions,
@@ -104,6 +106,17 @@ constexpr Command kCommands[] = {
      "  dvsctl hexdump broken.db | grep '!!'\n"
      "  dvsctl hexdump state.db --switch dvs-1 --port 7\n",
      RunHexdump},
+    {"props", "List and explain the properties whose meaning is known", kPropsOptions,
+     "Without NAME a table. With it, of each property: its list, what it is for, where the store has it, "
+     "what "
+     "is odd\n"
+     "about it, the layout of its bytes, and the fields of its typed form.\n"
+     "Columns: list, name, path, type, converter, size, form, quirks, meaning.\n",
+     "  dvsctl props\n"
+     "  dvsctl props com.orbeno.etherswitch.port.vlan\n"
+     "  dvsctl props '*.teaming*'\n"
+     "  dvsctl props --columns name,quirks\n",
+     RunProps},
 };
 
 constexpr OptionRow kCommonOptions[] = {

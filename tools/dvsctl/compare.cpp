@@ -96,6 +96,7 @@ public:
         const auto byId = [](const Switch &sw) { return std::pair(sw.isOther, sw.name); };
         const auto pairs = PairUp(Pointers(before.switches), Pointers(after.switches), byId);
         for (const Pair<Switch> &pair : pairs) {
+            now_ = pair.before ? pair.after : nullptr;
             if (!pair.before || !pair.after)
                 Report(Subject::Switch, pair.before ? *pair.before : *pair.after, nullptr, "", pair.before,
                        pair.after);
@@ -115,7 +116,7 @@ private:
         const ChangeKind kind = !before  ? ChangeKind::Added
                                 : !after ? ChangeKind::Removed
                                          : ChangeKind::Changed;
-        changes_.push_back({kind, subject, &sw, port, list, before, after});
+        changes_.push_back({kind, subject, &sw, port, list, before, after, now_});
     }
 
     bool SameType(const Property &a, const Property &b) const {
@@ -216,6 +217,7 @@ private:
     }
 
     const CompareOptions &options_;
+    const Switch *now_ = nullptr;
     std::vector<Change> changes_;
 };
 

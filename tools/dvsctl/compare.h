@@ -32,6 +32,7 @@ struct Change {
     const char *list = "";       ///< "global", "host", "port" of a property, a list or an order
     const Property *before = nullptr; ///< what was there; null when added
     const Property *after = nullptr;  ///< what is there now; null when removed
+    const Switch *now = nullptr;      ///< the switch after, where both sides have it
 };
 
 struct CompareOptions {
@@ -49,7 +50,7 @@ std::string ShowChangeCount(const std::vector<Change> &changes);
 /// The changes as an indented list with + - ~ before each, or with --columns as a table.
 void WriteChanges(const std::vector<Change> &changes, const Options &options, Output &out);
 
-boost::json::array ChangesJson(const std::vector<Change> &changes);
+boost::json::array ChangesJson(const std::vector<Change> &changes, const Options &options);
 
 } // namespace dvs::ctl
 

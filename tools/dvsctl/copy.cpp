@@ -128,7 +128,7 @@ void Report(Context &context, const Outcome &outcome, const Target &target,
     if (options.dryRun) {
         document["target_exists"] = target.exists;
         document["target_is_sound"] = target.exists && target.isSound;
-        document["changes"] = ChangesJson(changes);
+        document["changes"] = ChangesJson(changes, options);
     }
     context.out.Json(std::move(document));
 }

@@ -44,7 +44,7 @@ Exit RunDiff(Context &context) {
         document["before"] = ValidUtf8(a->Name());
         document["after"] = ValidUtf8(b->Name());
         document["is_same"] = changes.empty();
-        document["changes"] = ChangesJson(changes);
+        document["changes"] = ChangesJson(changes, options);
         context.out.Json(std::move(document));
     } else if (changes.empty()) {
         context.out.Remark(fmt::format("no differences: {}\n", ShowCount(CountState(before.state))));

@@ -24,11 +24,18 @@ boost::json::value NameToJson(std::string_view name);
 
 boost::json::object PropertyToJson(const Property &property);
 
+/// What becomes of properties whose meaning is known.
+enum class TypedForm {
+    None,    ///< bytes, as of any other
+    Beside,  ///< "value" for the bytes, "typed" and "summary" (or "damage") beside it: for looking
+    Instead, ///< "typed" where it stands for these very bytes and says more than they do: for keeping
+};
+
 /// The member "switches".
-boost::json::array SwitchesToJson(const State &state);
+boost::json::array SwitchesToJson(const State &state, TypedForm form);
 
 /// The whole document as text.
-std::string StateToJsonText(const State &state);
+std::string StateToJsonText(const State &state, TypedForm form = TypedForm::Instead);
 
 /// The serialized state that the document describes. Throws Error(Malformed) with the place in the document.
 std::vector<std::uint8_t> StateFromJsonText(std::string_view text);

@@ -11,12 +11,14 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
+#include "dvs/configstore.h"
 #include "dvs/state.h"
 #include "dvsdata/format.h"
 #include "tools/dvsctl/encode.h"
 #include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/json_parse.h"
+#include "tools/dvsctl/typed_json.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -41,9 +43,12 @@ struct Place {
     Place Member(std::string_view name) const { return {this, name, 0}; }
     Place Element(std::size_t at) const { return {this, {}, at}; }
 
-    [[noreturn]] void Refuse(std::string why) const {
+    /// `field` is inside of a typed value.
+    [[noreturn]] void Refuse(std::string why, const std::string &field = {}) const {
+        const bool isMember = !field.empty() && field.front() != '[';
         throw Error(Exit::Malformed, "the JSON document does not describe a state")
-            .At(Text())
+            .At(Text() + (isMember ? "." : "") + field)
+            .Field(field)
             .Because(std::move(why))
             .Try("correct the document there (its form is in json-form.md); nothing was changed");
     }
@@ -219,19 +224,53 @@ std::uint32_t TypeAt(const Place &place, const json::object &object, std::uint32
     return type ? NumberAt(place.Member("type"), *type) : otherwise;
 }
 
-NewEntry PropertyAt(const Place &place, const json::value &value) {
+// The typed form of a property whose meaning is known.
+Buffer TypedAt(const Place &place, const json::value &value, const Owner &owner, const std::string &name) {
+    NodeFlaw flaw;
+    const auto node = NodeFromJson(value, flaw);
+    if (!node) place.Refuse(flaw.reason, flaw.field);
+    typed::Built built = typed::Build(owner.propClass, name, *node, {owner.version});
+    if (!built.ok) place.Refuse(built.reason, built.field);
+    if (!built.differences.empty())
+        place.Refuse("the property cannot hold it as it is given; it would read back otherwise: " +
+                     built.differences.front());
+    return std::move(built.bytes);
+}
+
+// Beside "value", "typed" only says what the bytes mean. A document in which they disagree was edited in one
+// of the two places, and which one was meant cannot be known.
+void CheckTyped(const Place &place, const json::value &value, const Owner &owner, const NewEntry &entry) {
+    const typed::View view = typed::Describe(owner.propClass, entry.name, entry.value, {owner.version});
+    if (view.state == typed::State::kTyped && NodeToJson(view.tree) == value) return;
+    place.Refuse("\"value\" says something else; leave out the one that is not meant");
+}
+
+NewEntry PropertyAt(const Place &place, const json::value &value, const Owner &owner) {
+    const json::object &object = ObjectAt(place, value);
+    AllowOnly(place, object, {"name", "type", "value", "typed", "summary", "damage"});
+    NewEntry entry{NameAt(place.Member("name"), Require(place, object, "name")), 0, {}};
+    const json::value *raw = Find(object, "value"), *typed = Find(object, "typed");
+    entry.type = TypeAt(place, object, typed && !raw ? kStateType : kDefaultType);
+    if (!raw && !typed) place.Refuse("the key \"value\" or \"typed\" is missing");
+    if (raw) entry.value = ValueAt(place.Member("value"), *raw);
+    if (raw && typed) CheckTyped(place.Member("typed"), *typed, owner, entry);
+    if (!raw) entry.value = TypedAt(place.Member("typed"), *typed, owner, entry.name);
+    return entry;
+}
+
+NewEntry FieldAt(const Place &place, const json::value &value) {
     const json::object &object = ObjectAt(place, value);
     AllowOnly(place, object, {"name", "type", "value"});
     return {NameAt(place.Member("name"), Require(place, object, "name")), TypeAt(place, object, kDefaultType),
             ValueAt(place.Member("value"), Require(place, object, "value"))};
 }
 
-std::vector<NewEntry> PropertiesAt(const Place &place, const json::value &value) {
+std::vector<NewEntry> PropertiesAt(const Place &place, const json::value &value, const Owner &owner) {
     const json::array &array = ArrayAt(place, value);
     std::vector<NewEntry> list;
     list.reserve(array.size());
     for (std::size_t i = 0; i < array.size(); ++i)
-        list.push_back(PropertyAt(place.Element(i), array[i]));
+        list.push_back(PropertyAt(place.Element(i), array[i], owner));
     return list;
 }
 
@@ -252,25 +291,36 @@ void ApplyKind(const Place &place, const json::value &value, std::vector<NewEntr
     }
 }
 
-NewEntry PortAt(const Place &place, const json::value &value) {
+NewEntry PortAt(const Place &place, const json::value &value, std::uint32_t version) {
     const json::object &object = ObjectAt(place, value);
     AllowOnly(place, object, {"id", "type", "kind", "properties"});
     NewEntry port{
         NameAt(place.Member("id"), Require(place, object, "id")), TypeAt(place, object, kStateType), {}};
     std::vector<NewEntry> list;
     if (const json::value *properties = Find(object, "properties"))
-        list = PropertiesAt(place.Member("properties"), *properties);
+        list = PropertiesAt(place.Member("properties"), *properties, {DVS_PROP_CLASS_PORT, version});
     if (const json::value *kind = Find(object, "kind")) ApplyKind(place.Member("kind"), *kind, list);
     port.value = EncodeList(list);
     return port;
 }
 
-NewEntry EntryAt(const Place &place, const json::value &value) {
+// `version` is the switch's so far: its entry stands before the lists in all but the oddest switches.
+NewEntry EntryAt(const Place &place, const json::value &value, std::uint32_t *version) {
     const json::object &object = ObjectAt(place, value);
-    if (!Find(object, "properties")) return PropertyAt(place, value);
+    if (!Find(object, "properties")) {
+        NewEntry field = FieldAt(place, value);
+        if (field.name == RoleName(Role::Version)) *version = AsNumber(field.value).value_or(0);
+        return field;
+    }
     AllowOnly(place, object, {"name", "type", "properties"});
-    return {NameAt(place.Member("name"), Require(place, object, "name")), TypeAt(place, object, kStateType),
-            EncodeList(PropertiesAt(place.Member("properties"), object.at("properties")))};
+    NewEntry entry{
+        NameAt(place.Member("name"), Require(place, object, "name")), TypeAt(place, object, kStateType), {}};
+    const std::uint32_t propClass = entry.name == RoleName(Role::GlobalList) ? DVS_PROP_CLASS_GLOBAL
+                                    : entry.name == RoleName(Role::HostList) ? DVS_PROP_CLASS_HOST
+                                                                             : DVS_PROP_CLASS_PORT;
+    entry.value =
+        EncodeList(PropertiesAt(place.Member("properties"), object.at("properties"), {propClass, *version}));
+    return entry;
 }
 
 template <typename Decode>
@@ -287,16 +337,21 @@ std::vector<NewEntry> UsualEntriesAt(const Place &place, const json::object &obj
         if (const json::value *value = Find(object, key))
             entries.push_back({RoleName(role), kStateType, decode(place.Member(key), *value)});
     };
-    const auto list = [](const Place &at, const json::value &value) {
-        return EncodeList(PropertiesAt(at, value));
+    std::uint32_t version = 0;
+    const auto list = [&](std::uint32_t propClass) {
+        return [&version, propClass](const Place &at, const json::value &value) {
+            return EncodeList(PropertiesAt(at, value, {propClass, version}));
+        };
     };
+    const auto port = [&](const Place &at, const json::value &value) { return PortAt(at, value, version); };
     add("version", Role::Version, ValueAt);
+    if (!entries.empty()) version = AsNumber(entries.front().value).value_or(0);
     add("class", Role::ClassName, ClassAt);
     add("max_ports", Role::MaxPorts, ValueAt);
-    add("global", Role::GlobalList, list);
-    add("host", Role::HostList, list);
+    add("global", Role::GlobalList, list(DVS_PROP_CLASS_GLOBAL));
+    add("host", Role::HostList, list(DVS_PROP_CLASS_HOST));
     if (const json::value *ports = Find(object, "ports"))
-        AppendEach(place.Member("ports"), *ports, entries, PortAt);
+        AppendEach(place.Member("ports"), *ports, entries, port);
     return entries;
 }
 
@@ -312,7 +367,9 @@ NewEntry SwitchAt(const Place &place, const json::value &value) {
     std::vector<NewEntry> entries;
     if (const json::value *all = Find(object, "entries")) {
         AllowOnly(place, object, {"id", "type", "entries"});
-        AppendEach(place.Member("entries"), *all, entries, EntryAt);
+        std::uint32_t version = 0;
+        AppendEach(place.Member("entries"), *all, entries,
+                   [&](const Place &at, const json::value &entry) { return EntryAt(at, entry, &version); });
     } else {
         entries = UsualEntriesAt(place, object);
     }

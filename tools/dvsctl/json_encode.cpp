@@ -11,6 +11,7 @@
 #include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/output.h"
+#include "tools/dvsctl/typed_json.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -47,11 +48,32 @@ json::object NamesToJson(Bytes value, std::size_t slot) {
     return object;
 }
 
-json::array PropertiesToJson(std::span<const Property> list) {
+struct Notation {
+    TypedForm form;
+    TypedViews views = {};
+};
+
+void AddTyped(json::object &object, const TypedViews::Found &found, TypedForm form) {
+    const bool isTyped = found.view.state == typed::State::kTyped;
+    if (form == TypedForm::Beside) {
+        if (found.view.state == typed::State::kDamaged) object["damage"] = ValidUtf8(found.view.reason);
+        if (isTyped) object["typed"] = found.tree;
+        if (isTyped && !found.view.summary.empty()) object["summary"] = ValidUtf8(found.view.summary);
+    } else if (isTyped && found.isExact && found.tree != object.at("value")) {
+        object.erase("value");
+        object["typed"] = found.tree;
+    }
+}
+
+json::array PropertiesToJson(Notation &notation, const Owner &owner, std::span<const Property> list) {
     json::array properties;
     properties.reserve(list.size());
-    for (const Property &property : list)
-        properties.emplace_back(PropertyToJson(property));
+    for (const Property &property : list) {
+        json::object object = PropertyToJson(property);
+        if (notation.form != TypedForm::None)
+            AddTyped(object, notation.views.Of(owner, property), notation.form);
+        properties.emplace_back(std::move(object));
+    }
     return properties;
 }
 
@@ -79,14 +101,14 @@ bool KindStandsForProperty(const Entry &port) {
                          [](const Property &p) { return p.name == kKindProperty; }) == 1;
 }
 
-json::object PortToJson(const Entry &port) {
+json::object PortToJson(Notation &notation, const Switch &sw, const Entry &port) {
     json::object object;
     object["id"] = NameToJson(port.name);
     if (port.type != kStateType) object["type"] = port.type;
     if (KindName(port.kind)) object["kind"] = KindName(port.kind);
     std::span<const Property> list = port.list;
     if (KindStandsForProperty(port)) list = list.first(list.size() - 1);
-    object["properties"] = PropertiesToJson(list);
+    object["properties"] = PropertiesToJson(notation, OwnerOf(sw, port), list);
     return object;
 }
 
@@ -101,7 +123,9 @@ bool IsUsual(const Switch &sw) {
     return true;
 }
 
-json::array EntriesToJson(const Switch &sw) {
+// Here nothing but the name tells what a list is, so bytes are what is kept.
+json::array EntriesToJson(const Switch &sw, TypedForm form) {
+    Notation notation{form == TypedForm::Instead ? TypedForm::None : form};
     json::array entries;
     for (const Entry &entry : sw.entries) {
         if (!entry.IsList()) {
@@ -111,13 +135,13 @@ json::array EntriesToJson(const Switch &sw) {
         json::object object;
         object["name"] = NameToJson(entry.name);
         object["type"] = entry.type;
-        object["properties"] = PropertiesToJson(entry.list);
+        object["properties"] = PropertiesToJson(notation, OwnerOf(sw, entry), entry.list);
         entries.emplace_back(std::move(object));
     }
     return entries;
 }
 
-void UsualToJson(const Switch &sw, json::object &object) {
+void UsualToJson(Notation &notation, const Switch &sw, json::object &object) {
     json::array ports;
     for (const Entry &entry : sw.entries) {
         switch (entry.role) {
@@ -131,13 +155,13 @@ void UsualToJson(const Switch &sw, json::object &object) {
             object["max_ports"] = NumberFieldToJson(entry.value);
             break;
         case Role::GlobalList:
-            object["global"] = PropertiesToJson(entry.list);
+            object["global"] = PropertiesToJson(notation, OwnerOf(sw, entry), entry.list);
             break;
         case Role::HostList:
-            object["host"] = PropertiesToJson(entry.list);
+            object["host"] = PropertiesToJson(notation, OwnerOf(sw, entry), entry.list);
             break;
         case Role::Port:
-            ports.emplace_back(PortToJson(entry));
+            ports.emplace_back(PortToJson(notation, sw, entry));
             break;
         case Role::Other:
             break; // not in a usual switch
@@ -178,7 +202,8 @@ json::object PropertyToJson(const Property &property) {
     return object;
 }
 
-json::array SwitchesToJson(const State &state) {
+json::array SwitchesToJson(const State &state, TypedForm form) {
+    Notation notation{form};
     json::array switches;
     for (const Switch &sw : state.switches) {
         json::object object;
@@ -187,17 +212,17 @@ json::array SwitchesToJson(const State &state) {
         if (sw.isOther)
             object["value"] = ValueToJson(sw.value);
         else if (IsUsual(sw))
-            UsualToJson(sw, object);
+            UsualToJson(notation, sw, object);
         else
-            object["entries"] = EntriesToJson(sw);
+            object["entries"] = EntriesToJson(sw, form);
         switches.emplace_back(std::move(object));
     }
     return switches;
 }
 
-std::string StateToJsonText(const State &state) {
+std::string StateToJsonText(const State &state, TypedForm form) {
     json::object document = Envelope("");
-    document["switches"] = SwitchesToJson(state);
+    document["switches"] = SwitchesToJson(state, form);
     return PrettyJson(std::move(document));
 }
 

@@ -46,7 +46,7 @@ constexpr FieldRow kFields[] = {
 
 class Tree {
 public:
-    /// With `typed`, values are the typed fields of the config store.
+    /// With `typed`, known properties are shown as the typed fields that the config store keeps them in.
     Tree(const Options &options, bool typed) : options_(options), typed_(typed), table_(kColumns, options) {
         // With a column that says where a line belongs there is no need for the lines between.
         flat_ =
@@ -98,7 +98,8 @@ private:
     }
 
     void AddProperty(const Entry &entry, const Property &property) {
-        const TypedText text = typed_ ? DescribeProperty(*switch_, entry, property) : TypedText();
+        const TypedText text =
+            typed_ ? DescribeProperty(views_, OwnerOf(*switch_, entry), property) : TypedText();
         std::string value = text.summary.empty() ? ShowValue(property.value, options_.full) : text.summary;
         if (!text.damage.empty()) value += " (does not fit: " + text.damage + ")";
         Line(2, property, ShowName(property.name), std::move(value));
@@ -149,6 +150,7 @@ private:
 
     const Options &options_;
     bool typed_;
+    TypedViews views_;
     Table table_;
     bool flat_ = false;
     const Switch *switch_ = nullptr;
@@ -200,18 +202,16 @@ Exit RunShow(Context &context) {
     LoadedState loaded = LoadState(context, *source);
     ApplyFilter(options, source->Name(), loaded.state);
     const StateCount count = CountState(loaded.state);
-    const bool typed = source->HoldsTyped() && !options.raw;
     if (options.json) {
         boost::json::object document = Envelope("show");
         document["source"] = ValidUtf8(source->Name());
         document["summary"] = CountJson(count);
-        boost::json::array switches = SwitchesToJson(loaded.state);
-        if (typed) AddTypedFields(loaded.state, switches);
-        document["switches"] = std::move(switches);
+        document["switches"] =
+            SwitchesToJson(loaded.state, options.raw ? TypedForm::None : TypedForm::Beside);
         context.out.Json(std::move(document));
         return Exit::Done;
     }
-    Tree tree(options, typed);
+    Tree tree(options, !options.raw);
     for (const Switch &sw : loaded.state.switches)
         tree.Add(sw);
     if (!options.noHeadings && !options.columns)

@@ -67,9 +67,6 @@ public:
     /// Looks at more of the place than a Read does. Throws Error when something is wrong there.
     virtual void CheckPlace(Context &) {}
 
-    /// True when the source keeps settings as typed fields, so that these are what people want to see.
-    virtual bool HoldsTyped() const { return false; }
-
     /// True when a Write can replace one switch and leave the others.
     virtual bool ReplacesSingle() const { return false; }
 

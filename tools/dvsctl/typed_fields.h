@@ -8,9 +8,7 @@
 #include <string>
 #include <vector>
 
-#include <boost/json/fwd.hpp>
-
-#include "tools/dvsctl/model.h"
+#include "tools/dvsctl/typed_json.h"
 
 namespace dvs::ctl {
 
@@ -27,12 +25,8 @@ struct TypedText {
     std::vector<FieldLine> lines; ///< what does not fit on one line
 };
 
-/// The property of an entry of a switch, in words.
-TypedText DescribeProperty(const Switch &sw, const Entry &entry, const Property &property);
-
-/// Adds "fields" and "summary" to each known property of the document's "switches" (or "damage", where its
-/// bytes do not fit it); `switches` is SwitchesToJson of the state.
-void AddTypedFields(const State &state, boost::json::array &switches);
+/// The property in words. A plain text has no summary: it is shown as any value that is text.
+TypedText DescribeProperty(TypedViews &views, const Owner &owner, const Property &property);
 
 } // namespace dvs::ctl
 

@@ -80,7 +80,7 @@ void Report(Context &context, const KernelChange &change, Outcome outcome,
         document["is_changed"] = outcome == Outcome::Changed;
         if (outcome == Outcome::WasThere || outcome == Outcome::WasAbsent)
             document["was_there"] = outcome == Outcome::WasThere;
-        if (outcome == Outcome::Planned) document["changes"] = ChangesJson(changes);
+        if (outcome == Outcome::Planned) document["changes"] = ChangesJson(changes, context.options);
         out.Json(std::move(document));
         return;
     }

@@ -23,7 +23,8 @@ public:
     }
 
     void Write(Context &context, Bytes state) override {
-        const std::string text = StateToJsonText(ParseState(state));
+        const auto form = context.options.raw ? TypedForm::None : TypedForm::Instead;
+        const std::string text = StateToJsonText(ParseState(state), form);
         if (path_ == "-")
             context.out.Write(text);
         else

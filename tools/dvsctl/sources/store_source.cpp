@@ -45,7 +45,6 @@ public:
     StoreSource(const char *scheme, std::string path, bool desired)
         : Source(std::string(scheme) + path), path_(std::move(path)), desired_(desired) {}
 
-    bool HoldsTyped() const override { return true; }
     bool CountsWhenEmpty() const override { return false; }
     bool ReplacesSingle() const override { return true; }
     bool KeepsPersistentState() const override { return true; }

@@ -1,0 +1,120 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Trees into JSON and out of it (typed_json.h).
+
+#include "tools/dvsctl/typed_json.h"
+
+#include <algorithm>
+
+#include <boost/json/array.hpp>
+#include <boost/json/object.hpp>
+#include <fmt/format.h>
+
+#include "dvs/configstore.h"
+#include "tools/dvsctl/text.h"
+
+namespace dvs::ctl {
+
+namespace {
+
+namespace json = boost::json;
+using typed::Node;
+
+// Keeps the memory of a state with many different values within bounds.
+constexpr std::size_t kMostRemembered = 4096;
+
+std::optional<Node> ItemFromJson(const json::value &value, const std::string &path, NodeFlaw &flaw) {
+    Node node;
+    if (value.is_bool()) {
+        node.kind = Node::Kind::kBool;
+        node.flag = value.get_bool();
+    } else if (value.is_int64()) {
+        node.kind = Node::Kind::kNumber;
+        node.number = value.get_int64();
+    } else if (value.is_number()) {
+        flaw = {path, "it is no whole number from -9223372036854775808 to 9223372036854775807"};
+        return std::nullopt;
+    } else if (value.is_string()) {
+        node.kind = Node::Kind::kText;
+        node.text.assign(value.get_string().data(), value.get_string().size());
+    } else if (value.is_array()) {
+        node.kind = Node::Kind::kList;
+        for (const json::value &element : value.get_array()) {
+            auto item = ItemFromJson(element, fmt::format("{}[{}]", path, node.items.size()), flaw);
+            if (!item) return std::nullopt;
+            node.items.push_back(std::move(*item));
+        }
+    } else if (value.is_object()) {
+        node.kind = Node::Kind::kObject;
+        for (const auto &member : value.get_object()) {
+            const std::string name(member.key());
+            auto item = ItemFromJson(member.value(), path.empty() ? name : path + "." + name, flaw);
+            if (!item) return std::nullopt;
+            item->name = name;
+            node.items.push_back(std::move(*item));
+        }
+    }
+    return node;
+}
+
+bool BuildsAgain(const Owner &owner, const Property &property, const json::value &tree) {
+    NodeFlaw flaw;
+    const auto node = NodeFromJson(tree, flaw);
+    if (!node) return false;
+    const typed::Built built = typed::Build(owner.propClass, property.name, *node, {owner.version});
+    return built.ok && built.differences.empty() && std::ranges::equal(built.bytes, property.value);
+}
+
+} // namespace
+
+Owner OwnerOf(const Switch &sw, const Entry &entry) {
+    const std::uint32_t propClass = entry.role == Role::GlobalList ? DVS_PROP_CLASS_GLOBAL
+                                    : entry.role == Role::HostList ? DVS_PROP_CLASS_HOST
+                                                                   : DVS_PROP_CLASS_PORT;
+    return {propClass, sw.Number(Role::Version).value_or(0)};
+}
+
+json::value NodeToJson(const Node &node) {
+    switch (node.kind) {
+    case Node::Kind::kBool:
+        return node.flag;
+    case Node::Kind::kNumber:
+        return node.number;
+    case Node::Kind::kText:
+        return json::value(ValidUtf8(node.text));
+    case Node::Kind::kList: {
+        json::array array;
+        for (const Node &item : node.items)
+            array.emplace_back(NodeToJson(item));
+        return array;
+    }
+    case Node::Kind::kObject: {
+        json::object object;
+        for (const Node &item : node.items)
+            object[ValidUtf8(item.name)] = NodeToJson(item);
+        return object;
+    }
+    case Node::Kind::kNull:
+        break;
+    }
+    return nullptr;
+}
+
+std::optional<Node> NodeFromJson(const json::value &value, NodeFlaw &flaw) {
+    return ItemFromJson(value, "", flaw);
+}
+
+const TypedViews::Found &TypedViews::Of(const Owner &owner, const Property &property) {
+    std::string key = fmt::format("{} {} ", owner.propClass, owner.version);
+    key.append(property.name).push_back('\0');
+    key.append(AsText(property.value));
+    if (const auto known = found_.find(key); known != found_.end()) return known->second;
+    if (found_.size() >= kMostRemembered) found_.clear();
+    Found &found = found_[std::move(key)];
+    found.view = typed::Describe(owner.propClass, property.name, property.value, {owner.version});
+    if (found.view.state != typed::State::kTyped) return found;
+    found.tree = NodeToJson(found.view.tree);
+    found.isExact = found.view.exact && BuildsAgain(owner, property, found.tree);
+    return found;
+}
+
+} // namespace dvs::ctl

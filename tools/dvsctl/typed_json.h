@@ -1,0 +1,55 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef DVSCTL_TYPED_JSON_H
+#define DVSCTL_TYPED_JSON_H
+
+// The library's typed values (configstore/typed/) as JSON and back: what "typed" holds in documents.
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+
+#include <boost/json/value.hpp>
+
+#include "configstore/typed/typed_value.h"
+#include "tools/dvsctl/model.h"
+
+namespace dvs::ctl {
+
+/// Whose a property is, as far as its meaning depends on it.
+struct Owner {
+    std::uint32_t propClass = 0; ///< DVS_PROP_CLASS_*
+    std::uint32_t version = 0;   ///< of the switch
+};
+
+/// Of the properties of an entry of the switch.
+Owner OwnerOf(const Switch &sw, const Entry &entry);
+
+boost::json::value NodeToJson(const typed::Node &node);
+
+/// What makes a JSON value no tree: a number that is not whole, or too large.
+struct NodeFlaw {
+    std::string field, reason;
+};
+/// Empty, with the flaw told, where the value is no tree.
+std::optional<typed::Node> NodeFromJson(const boost::json::value &value, NodeFlaw &flaw);
+
+/// Descriptions of properties. Ports are much alike, so each value is looked into only once.
+class TypedViews {
+public:
+    struct Found {
+        typed::View view;
+        boost::json::value tree; ///< of a typed one
+        bool isExact = false;    ///< the tree, read as JSON again, builds these very bytes
+    };
+    /// Valid until the next call.
+    const Found &Of(const Owner &owner, const Property &property);
+
+private:
+    std::unordered_map<std::string, Found> found_;
+};
+
+} // namespace dvs::ctl
+
+#endif
