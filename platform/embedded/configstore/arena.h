@@ -40,6 +40,12 @@ public:
         return AllocateSlow(size);
     }
 
+    /// About so much will be asked for: the chunks are to be few.
+    void Expect(std::size_t size) {
+        while (nextChunk_ < kLargestChunk && nextChunk_ < size)
+            nextChunk_ *= 2;
+    }
+
     /// A copy of the bytes with a NUL behind them.
     char *Copy(std::string_view bytes) {
         auto *const copy = static_cast<char *>(Allocate(bytes.size() + 1));
@@ -59,7 +65,7 @@ private:
     /// A tree of thousands of ports takes megabytes, used once: its page faults cost more than all the rest,
     /// unless they are few.
     static void *TakeBlock(std::size_t size) {
-        if (size != kLargestChunk) return std::malloc(size);
+        if (size < kLargestChunk) return std::malloc(size);
         void *const block = std::aligned_alloc(kLargestChunk, size);
         if (block) (void)madvise(block, size, MADV_HUGEPAGE);
         return block;

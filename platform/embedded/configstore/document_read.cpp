@@ -1,13 +1,15 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Reads a document into a tree (document.h). Boost.JSON's event parser does the syntax, UTF-8 and depth; the
 // events become nodes at once, without a document model in between, guided by the schema's shapes. Content
-// that the shapes do not describe is kept as compact JSON text.
+// that the shapes do not describe is kept as compact JSON text. Documents as the store writes them never come
+// this far: document_plain.cpp reads them.
 
 #include <algorithm>
 #include <boost/json/basic_parser_impl.hpp>
 #include <charconv>
 
 #include "platform/embedded/configstore/document.h"
+#include "platform/embedded/configstore/document_plain.h"
 #include "platform/embedded/configstore/text_code.h"
 
 namespace configstore {
@@ -16,20 +18,6 @@ namespace {
 
 namespace json = boost::json;
 using json::error_code;
-
-uint64_t HashName(std::string_view name) {
-    static const uint64_t seed = reinterpret_cast<uintptr_t>(&name) * 0x9e3779b97f4a7c15U;
-    uint64_t hash = seed ^ name.size();
-    while (!name.empty()) {
-        uint64_t word = 0;
-        const std::size_t step = std::min<std::size_t>(name.size(), 8);
-        std::memcpy(&word, name.data(), step);
-        hash = (hash ^ word) * 0xff51afd7ed558ccdU;
-        hash ^= hash >> 32;
-        name.remove_prefix(step);
-    }
-    return hash;
-}
 
 /// Takes the parser's events.
 class Builder {
@@ -258,7 +246,7 @@ private:
         const std::vector<const Field *> &fields = frame.shape->Fields();
         if (frame.next < fields.size() && fields[frame.next]->name == key) return fields[frame.next];
         const Field *const field = frame.shape->Find(key);
-        if (field) frame.next = frame.shape->IndexOf(field);
+        if (field) frame.next = field->index;
         return field;
     }
 
@@ -438,6 +426,7 @@ bool Parse(std::string_view text, Tree *tree, Object *root, bool open, Reading r
 } // namespace
 
 bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why) {
+    if (reading == Reading::Tolerant && ReadPlainDocument(text, tree)) return true;
     return Parse(text, tree, &tree->root, false, reading, why);
 }
 

@@ -21,22 +21,12 @@ const Name *NewName(Arena &arena, std::string_view text) {
     return name;
 }
 
-Object *NewNode(Arena &arena, Object *parent) {
-    auto *const node = static_cast<Object *>(arena.Allocate(sizeof(Object)));
-    node->parent = parent;
-    node->next = nullptr;
-    node->integer = 0;
-    node->kind = Kind::Null;
-    node->described = false;
-    node->bad = false;
-    node->isRoot = false;
-    return node;
-}
+} // namespace
 
-uint64_t HashId(std::string_view id) {
-    // Ids come from documents too. The seed keeps their writers from choosing ids that all fall together.
+uint64_t HashName(std::string_view id) {
+    // Names come from documents too. The seed keeps their writers from choosing names that all fall together.
     static const uint64_t seed =
-        (reinterpret_cast<uintptr_t>(&id) ^ reinterpret_cast<uintptr_t>(&HashId)) * 0x9e3779b97f4a7c15U;
+        (reinterpret_cast<uintptr_t>(&id) ^ reinterpret_cast<uintptr_t>(&HashName)) * 0x9e3779b97f4a7c15U;
     uint64_t hash = seed ^ id.size();
     const char *at = id.data();
     std::size_t left = id.size();
@@ -52,9 +42,11 @@ uint64_t HashId(std::string_view id) {
     return hash;
 }
 
+namespace {
+
 void Insert(InstanceTable *table, Object *instance) {
     const std::size_t mask = table->slotCount - 1;
-    std::size_t at = static_cast<std::size_t>(HashId(NameOf(instance))) & mask;
+    std::size_t at = static_cast<std::size_t>(HashName(NameOf(instance))) & mask;
     while (table->slots[at])
         at = (at + 1) & mask;
     table->slots[at] = instance;
@@ -114,16 +106,13 @@ const Shape *ShapeOf(const Object *object) {
     return nullptr;
 }
 
+// Names are told apart by the shape or by their texts, and the texts are enough: where the shape knows a name,
+// every member of that name has its field. Objects are small; comparing lengths costs less than a hash.
 Object *FindMember(Object *object, std::string_view name) {
-    const Shape *const shape = ShapeOf(object);
-    if (const Field *const field = shape ? shape->Find(name) : nullptr) {
-        for (Object *member = object->members.first; member; member = member->next) {
-            if (member->field == field) return member;
-        }
-        return nullptr;
-    }
     for (Object *member = object->members.first; member; member = member->next) {
-        if (!member->described && NameOf(member) == name) return member;
+        const std::string_view own = NameOf(member);
+        if (own.size() == name.size() && std::memcmp(own.data(), name.data(), name.size()) == 0)
+            return member;
     }
     return nullptr;
 }
@@ -138,7 +127,7 @@ Object *FindInstance(Object *list, std::string_view id) {
         return nullptr;
     }
     const std::size_t mask = table->slotCount - 1;
-    for (std::size_t at = static_cast<std::size_t>(HashId(id)) & mask; table->slots[at];
+    for (std::size_t at = static_cast<std::size_t>(HashName(id)) & mask; table->slots[at];
          at = (at + 1) & mask) {
         if (NameOf(table->slots[at]) == id) return table->slots[at];
     }
@@ -158,18 +147,11 @@ std::string PathOf(const Object *node) {
 }
 
 Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name) {
-    const Name *const ownName = field ? nullptr : NewName(tree->arena, name);
+    if (field) return AddDescribed(tree, object, field);
+    const Name *const ownName = NewName(tree->arena, name);
     Object *const member = NewNode(tree->arena, object);
-    member->described = field != nullptr;
-    if (field)
-        member->field = field;
-    else
-        member->name = ownName;
-    if (object->members.last)
-        object->members.last->next = member;
-    else
-        object->members.first = member;
-    object->members.last = member;
+    member->name = ownName;
+    LinkMember(object, member);
     return member;
 }
 
@@ -198,11 +180,6 @@ Object *AddInstance(Tree *tree, Object *list, std::string_view id) {
         BuildIndex(table);
     }
     return instance;
-}
-
-void MakeObject(Object *node) {
-    node->kind = Kind::Object;
-    node->members = {nullptr, nullptr};
 }
 
 void MakeInstances(Tree *tree, Object *node) {

@@ -57,6 +57,11 @@ struct Name {
     char text[1]; // a NUL follows
 };
 
+struct Members {
+    Object *first;
+    Object *last;
+};
+
 struct InstanceTable {
     Object *first;
     Object *last;
@@ -81,10 +86,7 @@ struct Object {
         Span span; // Text, Binary, Raw
         PackedList *list;
         InstanceTable *table;
-        struct {
-            Object *first;
-            Object *last;
-        } members; // Object
+        Members members; // Object
     };
     Kind kind;
     bool described;
@@ -126,15 +128,45 @@ struct FilterSpec {
 /// "settings/vlan/vlan_id", with the ids of instances in brackets.
 [[nodiscard]] std::string PathOf(const Object *node);
 
+/// Of a name or id, seeded once a process.
+[[nodiscard]] uint64_t HashName(std::string_view name);
+
 // Changing. All may throw std::bad_alloc, with the tree as it was.
 
+/// A node of no place yet, of the kind Null.
+inline Object *NewNode(Arena &arena, Object *parent) {
+    auto *const node = static_cast<Object *>(arena.Allocate(sizeof(Object)));
+    node->parent = parent;
+    node->next = nullptr;
+    node->integer = 0;
+    node->kind = Kind::Null;
+    node->described = false;
+    node->bad = false;
+    node->isRoot = false;
+    return node;
+}
+inline void LinkMember(Object *object, Object *member) {
+    (object->members.last ? object->members.last->next : object->members.first) = member;
+    object->members.last = member;
+}
+/// AddMember of a field that the shape has.
+inline Object *AddDescribed(Tree *tree, Object *object, const Field *field) {
+    Object *const member = NewNode(tree->arena, object);
+    member->described = true;
+    member->field = field;
+    LinkMember(object, member);
+    return member;
+}
 /// A new last member; `field` is the shape's field of that name, if any. Its kind is Null until it is given
 /// another.
 Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name);
 Object *AddMember(Tree *tree, Object *object, std::string_view name);
 /// A new last instance, an empty Object. The id is not there yet.
 Object *AddInstance(Tree *tree, Object *list, std::string_view id);
-void MakeObject(Object *node);
+inline void MakeObject(Object *node) {
+    node->kind = Kind::Object;
+    node->members = {nullptr, nullptr};
+}
 void MakeInstances(Tree *tree, Object *node);
 void RemoveChild(Object *container, Object *child);
 void RemoveAllChildren(Object *container);

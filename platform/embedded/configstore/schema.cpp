@@ -42,16 +42,9 @@ const Field *Shape::Find(std::string_view name) const {
     return nullptr;
 }
 
-std::size_t Shape::IndexOf(const Field *field) const {
-    for (std::size_t i = 0; i < fields_.size(); i++) {
-        if (fields_[i] == field) return i;
-    }
-    assert(!"the field is another shape's");
-    return 0;
-}
-
 void Shape::Add(Field field) {
     field.prefix = '"' + field.name + "\":";
+    field.index = fields_.size();
     owned_.push_back(std::move(field));
     fields_.push_back(&owned_.back());
     Rehash();

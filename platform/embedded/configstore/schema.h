@@ -38,6 +38,7 @@ struct Field {
     uint64_t maxBytes = UINT64_MAX;
     uint64_t maxItems = UINT64_MAX; // of a list, or instances; imports only
     const Shape *shape = nullptr;
+    std::size_t index = 0; // among the fields of the shape that has it
     std::string prefix; // the name as a document writes it: "name":
 };
 
@@ -48,7 +49,6 @@ public:
 
     [[nodiscard]] const Field *Find(std::string_view name) const;
     [[nodiscard]] const std::vector<const Field *> &Fields() const { return fields_; }
-    [[nodiscard]] std::size_t IndexOf(const Field *field) const;
     void Add(Field field);
 
 private:

@@ -1,0 +1,314 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Reads the documents that the store writes itself, several times as fast as a general parser could
+// (document_plain.h). It knows well-formed documents of described fields only and gives up at anything else:
+// white space, names that the schema does not know, \u escapes, numbers that are not whole, content of
+// another type than the schema has for it, anything doubtful.
+
+#include "platform/embedded/configstore/document_plain.h"
+
+#include <algorithm>
+#include <array>
+#include <bit>
+#include <cstring>
+#include <string>
+#include <vector>
+
+#include "platform/embedded/configstore/document.h"
+#include "platform/embedded/configstore/text_code.h"
+
+namespace configstore {
+
+namespace {
+
+constexpr std::size_t kMaxPlainDepth = 16; // below the general reader's limit, which has a message
+static_assert(kMaxPlainDepth < kMaxDepth);
+
+constexpr std::size_t kWord = sizeof(uint64_t);
+
+/// Marks the bytes that end a run of plain characters: control characters, quotes, backslashes and all beyond
+/// ASCII. Exact up to the first mark, which is all that is asked for.
+uint64_t SpecialBytes(uint64_t word) {
+    constexpr uint64_t kOnes = 0x0101010101010101U;
+    constexpr uint64_t kHighs = 0x8080808080808080U;
+    const uint64_t quote = word ^ kOnes * '"';
+    const uint64_t backslash = word ^ kOnes * '\\';
+    return (((word - kOnes * 0x20) & ~word) | ((quote - kOnes) & ~quote) |
+            ((backslash - kOnes) & ~backslash) | word) &
+           kHighs;
+}
+
+class PlainReader {
+public:
+    /// The text is not empty.
+    PlainReader(std::string_view text, Tree *tree)
+        : tree_(tree), at_(text.data()), last_(text.data() + text.size() - 1) {}
+
+    bool Read() {
+        return *last_ == '}' && Take('{') && Members(&tree_->root, tree_->shape, 1) && at_ == last_ + 1;
+    }
+
+private:
+    // The last byte is a brace. Only the end of the root object may step over it, so that nothing else need
+    // ask whether there is a byte to look at.
+
+    bool TakeEnd(std::size_t depth) { return Take('}') && (at_ <= last_ || depth == 1); }
+
+    bool Take(char c) {
+        if (*at_ != c) return false;
+        at_++;
+        return true;
+    }
+
+    /// Behind the opening brace, through the closing one.
+    bool Members(Object *object, const Shape *shape, std::size_t depth) {
+        if (!shape || depth > kMaxPlainDepth) return false;
+        if (*at_ == '}') return TakeEnd(depth);
+        uint64_t seen = 0;
+        const void *before = shape;
+        do {
+            const Field *const field = NextField(shape, before);
+            if (!field) return false;
+            const uint64_t bit = uint64_t{1} << field->index;
+            if (seen & bit) return false;
+            seen |= bit;
+            before = field;
+            Object *const member = AddDescribed(tree_, object, field);
+            if (!Value(member, field, depth)) return false;
+        } while (Take(','));
+        return TakeEnd(depth);
+    }
+
+    /// A name with its colon. What came behind a field once, mostly comes behind it again.
+    const Field *NextField(const Shape *shape, const void *before) {
+        Guess &guess = guesses_[(reinterpret_cast<uintptr_t>(before) / sizeof(Field)) % guesses_.size()];
+        if (guess.before == before) {
+            const std::string &prefix = guess.field->prefix;
+            if (prefix.size() <= static_cast<std::size_t>(last_ - at_) &&
+                std::memcmp(at_, prefix.data(), prefix.size()) == 0) {
+                at_ += prefix.size();
+                return guess.field;
+            }
+        }
+        std::string_view name;
+        if (!Text(&name) || !Take(':')) return nullptr;
+        const Field *const field = shape->Find(name);
+        if (field) guess = {before, field};
+        return field;
+    }
+
+    bool Value(Object *node, const Field *field, std::size_t depth) {
+        switch (*at_) {
+        case '{':
+            at_++;
+            if (field->type == FieldType::Object) {
+                MakeObject(node);
+                return Members(node, field->shape, depth + 1);
+            }
+            if (field->type != FieldType::Instances) return false;
+            MakeInstances(tree_, node);
+            return Instances(node, field->shape, depth + 1);
+        case '[':
+            at_++;
+            return List(node, field);
+        case '"':
+            return TextValue(node, field);
+        case 't':
+            return Literal(node, "true", Kind::Bool, true);
+        case 'f':
+            return Literal(node, "false", Kind::Bool, false);
+        case 'n':
+            return Literal(node, "null", Kind::Null, false);
+        default:
+            if (!Integer(&node->integer)) return false;
+            node->kind = Kind::Integer;
+            Judge(tree_, node);
+            return true;
+        }
+    }
+
+    /// Behind the opening brace, through the closing one.
+    bool Instances(Object *list, const Shape *shape, std::size_t depth) {
+        if (depth > kMaxPlainDepth) return false;
+        if (*at_ == '}') return TakeEnd(depth);
+        const std::size_t firstId = ids_.size();
+        do {
+            std::string_view id;
+            if (!Text(&id) || !Take(':') || !Take('{')) return false;
+            ids_.push_back(HashName(id));
+            if (!Members(AddInstance(tree_, list, id), shape, depth + 1)) return false;
+        } while (Take(','));
+        if (!TakeEnd(depth)) return false;
+        const auto from = ids_.begin() + static_cast<std::ptrdiff_t>(firstId);
+        std::sort(from, ids_.end());
+        const bool twice = std::adjacent_find(from, ids_.end()) != ids_.end();
+        ids_.resize(firstId);
+        return !twice;
+    }
+
+    /// Behind the opening bracket, through the closing one.
+    bool List(Object *node, const Field *field) {
+        node->kind = Kind::EmptyList;
+        if (field->type != FieldType::TextList && field->type != FieldType::IntegerList &&
+            field->type != FieldType::Instances)
+            return false;
+        if (Take(']')) {
+            Judge(tree_, node);
+            return true;
+        }
+        if (field->type == FieldType::Instances) return false;
+        PackedList *const list = NewList(tree_);
+        do {
+            std::string_view text;
+            int64_t number = 0;
+            if (field->type == FieldType::TextList) {
+                if (!Text(&text)) return false;
+                AppendText(tree_, list, text);
+            } else {
+                if (!Integer(&number)) return false;
+                AppendInteger(tree_, list, number);
+            }
+        } while (Take(','));
+        node->kind = field->type == FieldType::TextList ? Kind::TextList : Kind::IntegerList;
+        node->list = list;
+        Judge(tree_, node);
+        return Take(']');
+    }
+
+    bool TextValue(Object *node, const Field *field) {
+        std::string_view text;
+        if (!Text(&text)) return false;
+        std::size_t size = 0;
+        if (field->type == FieldType::Binary && DecodeBase64Into(text, &size, node)) {
+            Judge(tree_, node);
+            return true;
+        }
+        node->kind = Kind::Text;
+        node->span = {tree_->arena.Copy(text), text.size()};
+        Judge(tree_, node);
+        return true;
+    }
+
+    bool DecodeBase64Into(std::string_view text, std::size_t *size, Object *node) {
+        auto *const bytes = static_cast<char *>(tree_->arena.Allocate(text.size() / 4 * 3 + 1));
+        if (!DecodeBase64(text, bytes, size)) return false;
+        node->kind = Kind::Binary;
+        node->span = {bytes, *size};
+        return true;
+    }
+
+    bool Literal(Object *node, std::string_view word, Kind kind, bool value) {
+        if (static_cast<std::size_t>(last_ - at_) < word.size() ||
+            std::memcmp(at_, word.data(), word.size()) != 0)
+            return false;
+        at_ += word.size();
+        node->kind = kind;
+        if (kind == Kind::Bool) node->boolean = value;
+        Judge(tree_, node);
+        return true;
+    }
+
+    bool Integer(int64_t *number) {
+        constexpr std::ptrdiff_t kSafeDigits = 18; // of any such number fits
+        const bool negative = Take('-');
+        const char *const digits = at_;
+        int64_t value = 0;
+        while (*at_ >= '0' && *at_ <= '9' && at_ - digits < kSafeDigits)
+            value = value * 10 + (*at_++ - '0');
+        const std::ptrdiff_t count = at_ - digits;
+        if (count == 0 || (*digits == '0' && (count > 1 || negative))) return false;
+        if (*at_ != ',' && *at_ != '}' && *at_ != ']') return false;
+        *number = negative ? -value : value;
+        return true;
+    }
+
+    /// A text with its quotes; good until the next one.
+    bool Text(std::string_view *text) {
+        if (!Take('"')) return false;
+        const char *run = at_;
+        SkipPlain();
+        if (*at_ == '"') {
+            *text = {run, static_cast<std::size_t>(at_++ - run)};
+            return true;
+        }
+        unescaped_.clear();
+        while (*at_ == '\\') {
+            const char unescaped = Unescaped(at_[1]);
+            if (!unescaped) return false;
+            unescaped_.append(run, at_).push_back(unescaped);
+            run = at_ += 2;
+            SkipPlain();
+        }
+        if (*at_ != '"')
+            return false; // a control character, a stray byte, one that stands for a byte, the end
+        *text = unescaped_.append(run, at_++);
+        return true;
+    }
+
+    /// On to the next quote, backslash, control character or byte that is no part of an ordinary character,
+    /// or to the last byte.
+    void SkipPlain() {
+        while (at_ < last_) {
+            uint64_t word = 0;
+            if (static_cast<std::size_t>(last_ - at_) >= kWord)
+                std::memcpy(&word, at_, kWord);
+            else
+                std::memcpy(&word, at_, static_cast<std::size_t>(last_ - at_));
+            const uint64_t special = SpecialBytes(word); // zeros where the text is shorter than a word
+            if (special == 0) {
+                at_ += kWord;
+                continue;
+            }
+            at_ += std::countr_zero(special) / 8;
+            if (static_cast<unsigned char>(*at_) < 0x80) return;
+            const std::size_t length = PlainSequence(at_, last_);
+            if (length == 0) return;
+            at_ += length;
+        }
+    }
+
+    static char Unescaped(char escape) {
+        switch (escape) {
+        case '"':
+        case '\\':
+        case '/':
+            return escape;
+        case 'n':
+            return '\n';
+        case 'r':
+            return '\r';
+        case 't':
+            return '\t';
+        case 'b':
+            return '\b';
+        case 'f':
+            return '\f';
+        default:
+            return '\0';
+        }
+    }
+
+    struct Guess {
+        const void *before = nullptr; // the field before, or the shape
+        const Field *field = nullptr;
+    };
+
+    Tree *const tree_;
+    const char *at_;
+    const char *const last_;
+    std::array<Guess, 128> guesses_{};
+    std::string unescaped_;
+    std::vector<uint64_t> ids_; // of the lists of instances being read
+};
+
+} // namespace
+
+bool ReadPlainDocument(std::string_view text, Tree *tree) {
+    tree->arena.Expect(text.size() / 4);
+    if (!text.empty() && PlainReader(text, tree).Read()) return true;
+    MakeObject(&tree->root);
+    tree->tables = nullptr; // no list has an index yet
+    tree->suspect = false;
+    return false;
+}
+
+} // namespace configstore
