@@ -16,12 +16,14 @@
 // A transaction takes one revision for all that it changes, at its first change.
 
 #include <cstdint>
+#include <map>
 #include <memory>
 #include <sqlite3.h>
 #include <string>
 #include <string_view>
 
 #include "platform/configstore.h"
+#include "platform/embedded/configstore/document.h"
 
 namespace configstore {
 
@@ -38,12 +40,20 @@ struct DatabaseCloser {
 };
 using Database = std::unique_ptr<sqlite3, DatabaseCloser>;
 
+/// A document that this transaction has read.
+struct ReadBefore {
+    std::shared_ptr<const std::string> text;
+    Outline outline;
+};
+
 struct Store {
     std::string path;
     Database db;
     int64_t revision = 0; // of the open transaction, once it has changed something
     int32_t refusal = 0;  // what every call of this transaction answers: it could not begin, or is lost
     bool inTransaction = false;
+    /// By id. A save lists all objects and then fetches each, mostly to replace what is in it.
+    std::map<int64_t, ReadBefore> readBefore;
     bool readOnly = false;
 };
 

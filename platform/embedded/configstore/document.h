@@ -61,10 +61,23 @@ enum class Reading {
 /// The deepest nesting that a document may have.
 inline constexpr std::size_t kMaxDepth = 32;
 
+/// Where a document that has been read has its longest list of instances; a field of null is for nowhere.
+struct Outline {
+    const Field *field = nullptr;
+    std::size_t begin = 0;
+    std::size_t end = 0;
+};
+
 /// Fills an empty tree. What the schema does not allow is marked in the tree and is no failure. False, with
 /// the reason and the place, for what is not JSON, not an object, too deep, has a name twice or a NUL in a
 /// name or text; the tree then holds what had been read.
-[[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why);
+/// `outline`, which may be null, is filled for a document that the store might have written.
+[[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why,
+                                Outline *outline = nullptr);
+
+/// Fills an empty tree from a document that was read before, all but the list of the outline, which stays
+/// text for now. False, with the tree in an unknown state, when it was not for an object of this kind.
+[[nodiscard]] bool ReadAgain(std::shared_ptr<const std::string> text, const Outline &outline, Tree *tree);
 
 } // namespace configstore
 

@@ -9,6 +9,7 @@
 #include <algorithm>
 #include <array>
 #include <bit>
+#include <cassert>
 #include <cstring>
 #include <string>
 #include <vector>
@@ -39,13 +40,23 @@ uint64_t SpecialBytes(uint64_t word) {
 
 class PlainReader {
 public:
-    /// The text is not empty.
-    PlainReader(std::string_view text, Tree *tree)
-        : tree_(tree), at_(text.data()), last_(text.data() + text.size() - 1) {}
+    /// The text is not empty. `known` is the outline to go by, if there is one.
+    PlainReader(std::string_view text, Tree *tree, const Outline *known = nullptr)
+        : tree_(tree), start_(text.data()), at_(text.data()), last_(text.data() + text.size() - 1),
+          known_(known) {}
 
     bool Read() {
         return *last_ == '}' && Take('{') && Members(&tree_->root, tree_->shape, 1) && at_ == last_ + 1;
     }
+
+    /// The text of a list of instances.
+    void ReadList(Object *list) {
+        MakeInstances(tree_, list);
+        [[maybe_unused]] const bool read = Take('{') && Instances(list, list->field->shape, 1);
+        assert(read);
+    }
+
+    [[nodiscard]] const Outline &Found() const { return found_; }
 
 private:
     // The last byte is a brace. Only the end of the root object may step over it, so that nothing else need
@@ -105,8 +116,7 @@ private:
                 return Members(node, field->shape, depth + 1);
             }
             if (field->type != FieldType::Instances) return false;
-            MakeInstances(tree_, node);
-            return Instances(node, field->shape, depth + 1);
+            return depth == 1 ? RootInstances(node, field) : NewInstances(node, field, depth);
         case '[':
             at_++;
             return List(node, field);
@@ -124,6 +134,26 @@ private:
             Judge(tree_, node);
             return true;
         }
+    }
+
+    bool NewInstances(Object *node, const Field *field, std::size_t depth) {
+        MakeInstances(tree_, node);
+        return Instances(node, field->shape, depth + 1);
+    }
+
+    bool RootInstances(Object *node, const Field *field) {
+        const auto begin = static_cast<std::size_t>(at_ - 1 - start_);
+        if (known_ && known_->field == field && known_->begin == begin) {
+            // Nobody writes to it.
+            node->span = {const_cast<char *>(at_ - 1), known_->end - begin};
+            node->kind = Kind::Later;
+            at_ = start_ + known_->end;
+            return true;
+        }
+        if (!NewInstances(node, field, 1)) return false;
+        const auto end = static_cast<std::size_t>(at_ - start_);
+        if (node->table->count > 0 && end - begin > found_.end - found_.begin) found_ = {field, begin, end};
+        return true;
     }
 
     /// Behind the opening brace, through the closing one.
@@ -293,8 +323,11 @@ private:
     };
 
     Tree *const tree_;
+    const char *const start_;
     const char *at_;
     const char *const last_;
+    const Outline *const known_;
+    Outline found_;
     std::array<Guess, 128> guesses_{};
     std::string unescaped_;
     std::vector<uint64_t> ids_; // of the lists of instances being read
@@ -302,13 +335,36 @@ private:
 
 } // namespace
 
-bool ReadPlainDocument(std::string_view text, Tree *tree) {
+bool ReadPlainDocument(std::string_view text, Tree *tree, Outline *outline) {
     tree->arena.Expect(text.size() / 4);
-    if (!text.empty() && PlainReader(text, tree).Read()) return true;
+    if (!text.empty()) {
+        PlainReader reader(text, tree);
+        if (reader.Read()) {
+            // What has to be refused when it is written must be there to be found.
+            if (outline && !tree->suspect) *outline = reader.Found();
+            return true;
+        }
+    }
     MakeObject(&tree->root);
     tree->tables = nullptr; // no list has an index yet
     tree->suspect = false;
     return false;
+}
+
+bool ReadAgain(std::shared_ptr<const std::string> text, const Outline &outline, Tree *tree) {
+    tree->text = std::move(text);
+    return PlainReader(*tree->text, tree, &outline).Read();
+}
+
+void ReadLater(Tree *tree, Object *node) {
+    const Span text = node->span;
+    try {
+        PlainReader({text.data, text.size}, tree).ReadList(node);
+    } catch (...) {
+        node->kind = Kind::Later;
+        node->span = text;
+        throw;
+    }
 }
 
 } // namespace configstore

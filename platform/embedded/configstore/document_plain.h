@@ -7,13 +7,18 @@
 
 #include <string_view>
 
+#include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/node.h"
 
 namespace configstore {
 
 /// Fills an empty tree, exactly as the general reader would in its tolerant way. False for a document that
 /// this reader leaves to the general one, sound or not: the tree is empty again then.
-[[nodiscard]] bool ReadPlainDocument(std::string_view text, Tree *tree);
+/// `outline` may be null.
+[[nodiscard]] bool ReadPlainDocument(std::string_view text, Tree *tree, Outline *outline);
+
+/// Reads the instances of a Later node.
+void ReadLater(Tree *tree, Object *node);
 
 } // namespace configstore
 

@@ -425,12 +425,16 @@ bool Parse(std::string_view text, Tree *tree, Object *root, bool open, Reading r
 
 } // namespace
 
-bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why) {
-    if (reading == Reading::Tolerant && ReadPlainDocument(text, tree)) return true;
+bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why, Outline *outline) {
+    if (reading == Reading::Tolerant && ReadPlainDocument(text, tree, outline)) return true;
     return Parse(text, tree, &tree->root, false, reading, why);
 }
 
 bool Expand(Tree *tree, Object *node) {
+    if (node->kind == Kind::Later) {
+        ReadLater(tree, node);
+        return true;
+    }
     if (node->kind != Kind::Raw || node->bad) return false;
     const Span raw = node->span;
     std::string why;

@@ -170,6 +170,7 @@ void WriteNode(const Object &node, Buffer *out) {
         WriteList(node, out);
         break;
     case Kind::Raw:
+    case Kind::Later:
         out->Put({node.span.data, node.span.size});
         break;
     case Kind::Object:

@@ -106,8 +106,8 @@ const Shape *ShapeOf(const Object *object) {
     return nullptr;
 }
 
-// Names are told apart by the shape or by their texts, and the texts are enough: where the shape knows a name,
-// every member of that name has its field. Objects are small; comparing lengths costs less than a hash.
+// Names are told apart by the shape or by their texts, and the texts are enough: where the shape knows a
+// name, every member of that name has its field. Objects are small; comparing lengths costs less than a hash.
 Object *FindMember(Object *object, std::string_view name) {
     for (Object *member = object->members.first; member; member = member->next) {
         const std::string_view own = NameOf(member);

@@ -12,6 +12,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <memory>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -37,6 +38,7 @@ enum class Kind : uint8_t {
     Raw,       // JSON text of an array or object without a usable description
     Object,    // a singleton, an instance, or the root
     Instances, // a list of instances
+    Later,     // instances, some, of a sound document: still its text, until somebody asks for one
 };
 
 struct Span {
@@ -83,7 +85,7 @@ struct Object {
         int64_t integer;
         uint64_t unsignedInteger;
         double real;
-        Span span; // Text, Binary, Raw
+        Span span; // Text, Binary, Raw; Later, whose bytes are the tree's text's
         PackedList *list;
         InstanceTable *table;
         Members members; // Object
@@ -99,7 +101,8 @@ struct Tree {
     Arena arena;
     const Shape *shape = nullptr;
     InstanceTable *tables = nullptr;
-    bool suspect = false; // some node was bad once
+    bool suspect = false;                    // some node was bad once
+    std::shared_ptr<const std::string> text; // that its Later nodes are in
     std::string key, group, component, instance;
 
     Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent,
@@ -115,6 +118,10 @@ struct FilterSpec {
 };
 
 // Walking.
+
+[[nodiscard]] inline bool HoldsObjects(const Object *node) {
+    return node->kind == Kind::Object || node->kind == Kind::Instances || node->kind == Kind::Later;
+}
 
 [[nodiscard]] inline std::string_view NameOf(const Object *node) {
     return node->described ? std::string_view(node->field->name)
@@ -171,7 +178,8 @@ void MakeInstances(Tree *tree, Object *node);
 void RemoveChild(Object *container, Object *child);
 void RemoveAllChildren(Object *container);
 
-/// Turns Raw content that somebody asks for into nodes. False when it is not what it would have to be.
+/// Turns Raw or Later content that somebody asks for into nodes. False when it is not what it would have to
+/// be.
 bool Expand(Tree *tree, Object *node);
 /// Makes the content of an undescribed Object a list of instances. False when some of it is not an object.
 bool TreatAsInstances(Tree *tree, Object *node);

@@ -24,7 +24,7 @@ bool IsObject(const Object *object) {
 
 /// A member as a list of instances: null when it is something else.
 Object *AsInstances(Tree *tree, Object *member) {
-    if (member->kind == Kind::Raw && !Expand(tree, member)) return nullptr;
+    if ((member->kind == Kind::Raw || member->kind == Kind::Later) && !Expand(tree, member)) return nullptr;
     if (member->kind == Kind::Object && !TreatAsInstances(tree, member)) return nullptr;
     return member->kind == Kind::Instances ? member : nullptr;
 }
@@ -126,6 +126,10 @@ int32_t Select(Tree *tree, Object *object, const FilterSpec &spec, std::vector<O
 
 bool DeleteSelected(Tree *tree, Object *object, const FilterSpec &spec) {
     if (Object *const member = FindMember(object, spec.key)) {
+        if (member->kind == Kind::Later && spec.instance.empty()) {
+            RemoveChild(object, member);
+            return true;
+        }
         std::vector<Object *> found;
         if (SelectMember(tree, member, spec, &found) != OK) {
             // Something among the instances is not one; deleting them all gets rid of that as well.

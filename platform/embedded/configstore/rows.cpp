@@ -86,7 +86,10 @@ int32_t FindRow(Store *store, const char *layer, const FilterSpec &address, std:
 int32_t AddDocument(Store *store, std::string_view text, int64_t *id) {
     Statement statement(store, "INSERT INTO document (text) VALUES (?)");
     const int32_t status = statement.Bind(text).Run();
-    if (status == OK) *id = sqlite3_last_insert_rowid(store->db.get());
+    if (status == OK) {
+        *id = sqlite3_last_insert_rowid(store->db.get());
+        store->readBefore.erase(*id); // deleted since, and the number given out again
+    }
     return status;
 }
 
@@ -116,10 +119,10 @@ int32_t DeleteRow(Store *store, const char *layer, const FilterSpec &address) {
 }
 
 int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view text,
-                 std::unique_ptr<Tree> *tree) {
+                 std::unique_ptr<Tree> *tree, Outline *outline) {
     auto loaded = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
     std::string why;
-    if (!ReadDocument(text, Reading::Tolerant, loaded.get(), &why)) {
+    if (!ReadDocument(text, Reading::Tolerant, loaded.get(), &why, outline)) {
         Log("config store %s: the document of %s/%s/%s[%s] is damaged: %s", store->path.c_str(),
             address.key.c_str(), address.group.c_str(), address.component.c_str(), address.instance.c_str(),
             why.c_str());
@@ -135,6 +138,9 @@ int32_t SaveTree(Store *store, const char *layer, Tree *tree) {
             tree->group.c_str(), tree->component.c_str(), tree->instance.c_str(), PathOf(bad).c_str(),
             Describe(bad).c_str());
         return SCHEMA_VIOLATION;
+    }
+    for (Object *member = tree->root.members.first; member; member = member->next) {
+        if (member->kind == Kind::Later) (void)Expand(tree, member); // a document is written in one form
     }
     Buffer text;
     WriteDocument(*tree, &text);

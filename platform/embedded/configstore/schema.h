@@ -39,7 +39,7 @@ struct Field {
     uint64_t maxItems = UINT64_MAX; // of a list, or instances; imports only
     const Shape *shape = nullptr;
     std::size_t index = 0; // among the fields of the shape that has it
-    std::string prefix; // the name as a document writes it: "name":
+    std::string prefix;    // the name as a document writes it: "name":
 };
 
 /// The fields of one kind of object, found by name.

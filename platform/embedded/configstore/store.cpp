@@ -33,7 +33,7 @@ int32_t HandOut(Trees *trees, Object ***objects, int32_t *count) {
 int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***objects, int32_t *count) {
     // The primary key has this order already.
     Statement statement(
-        store, "SELECT instance, text FROM object_row o JOIN document d ON d.id = o.document "
+        store, "SELECT instance, text, o.document FROM object_row o JOIN document d ON d.id = o.document "
                "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND (?5 = '' OR instance = ?5) "
                "ORDER BY instance");
     statement.Bind(layer).Bind(spec.key).Bind(spec.group).Bind(spec.component).Bind(spec.instance);
@@ -41,11 +41,28 @@ int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***
     while (statement.Step()) {
         std::unique_ptr<Tree> tree;
         const FilterSpec address{spec.key, spec.group, spec.component, std::string(statement.Text(0))};
-        const int32_t status = LoadTree(store, address, statement.Text(1), &tree);
+        Outline outline;
+        const int32_t status = LoadTree(store, address, statement.Text(1), &tree, &outline);
         if (status != OK) return status;
+        if (store->inTransaction && outline.field)
+            store->readBefore[statement.Integer(2)] = {std::make_shared<const std::string>(statement.Text(1)),
+                                                       outline};
         trees.push_back(std::move(tree));
     }
     return statement.Status() == OK ? HandOut(&trees, objects, count) : statement.Status();
+}
+
+/// The object from what the transaction remembers of it. Whatever goes wrong is for the ordinary way to find.
+bool FetchAgain(Store *store, const FilterSpec &address, Object **object) {
+    if (store->readBefore.empty()) return false;
+    std::optional<Row> row;
+    if (FindRow(store, kCurrentLayer, address, &row) != OK || !row) return false;
+    const auto known = store->readBefore.find(row->document);
+    if (known == store->readBefore.end()) return false;
+    auto tree = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
+    if (!ReadAgain(known->second.text, known->second.outline, tree.get())) return false;
+    *object = &tree.release()->root;
+    return true;
 }
 
 int32_t RefuseReadOnly(const Store *store) {
@@ -56,6 +73,7 @@ int32_t RefuseReadOnly(const Store *store) {
 int32_t EndTransaction(Store *store, const char *sql) {
     const int32_t status = Execute(store, sql);
     if (status != OK) return status;
+    store->readBefore.clear();
     store->inTransaction = false;
     store->revision = 0;
     return OK;
@@ -101,6 +119,7 @@ int32_t CancelTransaction(Store *store) {
     return Guarded([&] {
         store->refusal = OK;
         if (!sqlite3_get_autocommit(store->db.get())) return EndTransaction(store, "ROLLBACK");
+        store->readBefore.clear();
         store->inTransaction = false;
         store->revision = 0;
         return static_cast<int32_t>(OK);
@@ -126,6 +145,7 @@ int32_t Get(Store *store, const char *key, const char *group, const char *compon
     if (const int32_t status = Ready(store); status != OK) return status;
     return Guarded([&]() -> int32_t {
         const FilterSpec address{key, group, component, instanceId ? instanceId : ""};
+        if (FetchAgain(store, address, object)) return OK;
         Statement statement(store,
                             "SELECT text FROM object_row o JOIN document d ON d.id = o.document "
                             "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND instance = ?");

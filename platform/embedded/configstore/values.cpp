@@ -26,8 +26,7 @@ template <typename Fill> int32_t Put(Object *object, const char *name, Fill &&fi
         Tree *const tree = CheckTarget(object, name);
         if (!tree) return BAD_PARAMETER;
         Object *member = FindMember(object, name);
-        if (member && (member->kind == Kind::Object || member->kind == Kind::Instances))
-            return SCHEMA_VIOLATION;
+        if (member && HoldsObjects(member)) return SCHEMA_VIOLATION;
         // What needs memory comes first: without it nothing is changed.
         Object content{};
         fill(tree, &content);
@@ -330,8 +329,7 @@ int32_t RemoveValue(Object *object, const char *name) {
     Object *const member = FindMember(object, name);
     if (!member) return NOT_FOUND;
     const bool anything = !member->described || member->field->type == FieldType::Any;
-    if ((member->kind == Kind::Object || member->kind == Kind::Instances) && !anything)
-        return SCHEMA_VIOLATION;
+    if (HoldsObjects(member) && !anything) return SCHEMA_VIOLATION;
     if (member->kind == Kind::Instances) RemoveAllChildren(member);
     RemoveChild(object, member);
     return OK;
