@@ -12,9 +12,10 @@ if(DVS_WERROR)
   target_compile_options(dvs_flags INTERFACE -Werror)
 endif()
 
+# Line numbers are all that a sanitizer report shows of the debug information.
 # Sanitizers and coverage must cover every object of a program, so they are set for the whole tree.
 if(DVS_SANITIZE)
-  add_compile_options(-fsanitize=${DVS_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer -O1)
+  add_compile_options(-fsanitize=${DVS_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer -O1 -g1)
   add_link_options(-fsanitize=${DVS_SANITIZE})
   if(DVS_SANITIZE MATCHES "undefined" AND CMAKE_CXX_COMPILER_ID STREQUAL "GNU")
     # With any of these three gcc no longer takes the address of a constant for one, and the tables that are checked
