@@ -37,7 +37,7 @@ cmake --build --preset release --target dvs dvsctl dvs-emulator -- --quiet
 dvsctl=$PWD/build/release/bin/dvsctl
 emulator=$PWD/build/release/bin/dvs-emulator
 root=$PWD
-cp examples/site-basic.json "$work/"
+cp examples/site-basic.json examples/site.json "$work/"
 cd "$work"
 
 say "The example site, written as JSON, becomes a state file"
@@ -52,7 +52,19 @@ run show site.db --switch storage
 say "One setting of every switch and port, one line each"
 run show site.db --props '*.alias' --columns switch,port,kind,value
 
-say "Its first bytes, and what they are"
+say "A site with more to it, written in typed fields: trunks, teaming, shaping, mirroring, pools"
+run copy json:site.json campus.db
+run show campus.db --switch campus --port web-1
+
+say "What one of these properties is, and where its bytes are"
+run props com.orbeno.etherswitch.port.vlan
+
+say "Another VLAN for web-1: compared by meaning, then by bytes"
+sed 's/"vlan_id": 100/"vlan_id": 150/' site.json >moved.json
+run diff json:site.json json:moved.json && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
+run diff json:site.json json:moved.json --raw && exit 1 || [ $? -eq 1 ]
+
+say "The first bytes of the smaller site, and what they are"
 run hexdump site.db | head -n 24 || true
 
 say "A colleague edits a copy: larger frames, a port unblocked, a new port"

@@ -91,12 +91,37 @@ TEST_F(Typed, CopiesComeBackByteForByte) {
     }
 }
 
+TEST_F(Typed, TheExampleSiteIsTypedAndComesBack) {
+    const std::string example = "json:" DVS_SOURCE_DIR "/examples/site.json";
+    ASSERT_EQ(Dvsctl({"copy", example, At("example.db")}).status, 0);
+    const std::string out = Dvsctl({"show", At("example.db")}).out;
+    for (const char *part : {"200/201 ISOLATED", "trunk 0-4094", "VLAN 100", "mode ACTIVE", "FAIL_OPEN",
+                             "REMOTE_MIRROR_SOURCE", "collector_address 198.51.100.7", "interval 60"})
+        EXPECT_TRUE(Has(out, part)) << part;
+    EXPECT_FALSE(Has(out, "does not fit"));
+    ASSERT_EQ(Dvsctl({"copy", At("example.db"), "json:" + At("back.json")}).status, 0);
+    ASSERT_EQ(Dvsctl({"copy", "json:" + At("back.json"), At("back.db")}).status, 0);
+    EXPECT_EQ(Get("back.db"), Get("example.db"));
+}
+
 TEST_F(Typed, DiffComparesFieldByField) {
     Edited("\"notify_switches\": true", "\"notify_switches\": false");
     const Result diff = Dvsctl({"diff", At("site.db"), At("edited.db")});
     EXPECT_EQ(diff.status, 1);
     EXPECT_TRUE(Has(diff.out, "~ notify_switches: true -> false")) << diff.out;
     EXPECT_FALSE(Has(diff.out, "reverse_policy")) << diff.out;
+}
+
+TEST_F(Typed, DiffNamesTheRecordsFieldWhereTheMeaningIsTheSame) {
+    for (const auto &[name, reserved] : {std::pair("a.db", "\0\0"s), std::pair("b.db", "\1\0"s)})
+        PutState(name, EncodeList(std::vector<dvs::ctl::NewEntry>{MakeSwitch(
+                           "s", {}, {},
+                           {MakeList("7", {MakeProperty("com.orbeno.etherswitch.port.vlan",
+                                                        Raw("\0\0\x64\0"s + reserved + "\0\0"s), 0x10)})})}));
+    const Result diff = Dvsctl({"diff", At("a.db"), At("b.db")});
+    EXPECT_EQ(diff.status, 1);
+    EXPECT_TRUE(Has(diff.out, "port.vlan: VLAN 100\n")) << diff.out;
+    EXPECT_TRUE(Has(diff.out, "~ reserved of the record: ")) << diff.out;
 }
 
 TEST_F(Typed, DiffSaysBothMeanings) {

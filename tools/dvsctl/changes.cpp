@@ -10,6 +10,8 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
+#include "configstore/layouts/registry.h"
+#include "configstore/layouts/walk.h"
 #include "dvs/configstore.h"
 #include "tools/dvsctl/compare.h"
 #include "tools/dvsctl/json_codec.h"
@@ -155,12 +157,33 @@ std::vector<std::string> FieldChanges(const TypedText &before, const TypedText &
     return lines;
 }
 
+// The fields of the records that differ although they mean the same.
+std::vector<std::string> RecordChanges(const Owner &owner, const Property &before, const Property &after) {
+    constexpr std::uint32_t kLastNarrowVersion = 99;
+    const layout::Record *record =
+        layout::RecordOf(owner.propClass, before.name, owner.version > kLastNarrowVersion);
+    if (!record) return {};
+    std::map<std::string, std::string> left;
+    (void)layout::Walk(*record, before.value,
+                       [&](const layout::Item &item) { left[item.path] = layout::TextOf(item); });
+    std::vector<std::string> lines;
+    (void)layout::Walk(*record, after.value, [&](const layout::Item &item) {
+        const auto was = left.find(item.path);
+        const std::string now = layout::TextOf(item);
+        if (was != left.end() && was->second != now)
+            lines.push_back(Escape(fmt::format("~ {} of the record: {} -> {}", item.path, was->second, now)));
+    });
+    return lines;
+}
+
 Words::Both Words::Sides(const Change &change) {
     if (change.kind == ChangeKind::Reordered) return {"the order differs", {}};
     std::string before = Side(change, change.before), after = Side(change, change.after);
     if (!change.before || !change.after) return {before + after, {}};
     Both both;
     both.fields = FieldChanges(Typed(change, change.before), Typed(change, change.after));
+    if (before == after && both.fields.empty() && !Typed(change, change.before).summary.empty())
+        both.fields = RecordChanges(OwnerOf(change, change.before), *change.before, *change.after);
     if (before == after && both.fields.empty() &&
         AsText(change.before->value) != AsText(change.after->value) &&
         (change.subject == Subject::Property || change.subject == Subject::Entry)) {
