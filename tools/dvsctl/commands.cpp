@@ -54,6 +54,13 @@ constexpr OptionRow kCopyOptions[] = {
 };
 constexpr OptionRow kHexdumpOptions[] = {kSource, kSwitch, kPort};
 
+constexpr OptionRow kGenerateOptions[] = {
+    {"TO", nullptr, &Options::target, "the source to replace"},
+    {"--switches", "N", &Options::switchCount, "how many switches (default 3), of all classes in turn"},
+    {"--ports", "M", &Options::portCount, "how many ports each has (default 16)"},
+    {"--seed", "S", &Options::seed, "what the values are drawn from (default 1)"},
+    kDryRun,
+};
 constexpr OptionRow kPropsOptions[] = {
     {"NAME", nullptr, &Options::name, "a property's name, or a pattern as '*.vlan'"},
 };
@@ -117,6 +124,12 @@ constexpr Command kCommands[] = {
      "  dvsctl props '*.teaming*'\n"
      "  dvsctl props --columns name,quirks\n",
      RunProps},
+    {"generate", "Make a state of any size for trials", kGenerateOptions,
+     "Every switch and port has one of every property that its class knows. The same numbers give the same "
+     "bytes.\n",
+     "  dvsctl generate --switches 2 --ports 100 --seed 7 trial.db\n"
+     "  dvsctl generate --switches 1 --ports 2 json:-\n",
+     RunGenerate},
 };
 
 constexpr OptionRow kCommonOptions[] = {

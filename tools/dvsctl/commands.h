@@ -13,6 +13,7 @@ Exit RunVerify(Context &context);
 Exit RunDiff(Context &context);
 Exit RunCopy(Context &context);
 Exit RunHexdump(Context &context);
+Exit RunGenerate(Context &context);
 Exit RunProps(Context &context);
 
 Exit RunStoreList(Context &context);

@@ -36,6 +36,7 @@ struct Options {
     std::optional<std::string> layer;    ///< "current" or "desired"
     std::optional<std::string> revision; ///< of the store, a number
     std::optional<std::string> name;     ///< an operand that may be absent: a switch, a field, a file
+    std::optional<std::string> switchCount, portCount, seed; ///< of what is generated, numbers
     bool raw = false;                    ///< bytes, not typed fields
     bool full = false;                   ///< long values whole
     bool order = false;                  ///< the order of entries counts as a difference
