@@ -45,6 +45,12 @@ public:
         shutdown(fd_, SHUT_RDWR);
         thread_.join();
         close(fd_);
+        for (const int client : clients_)
+            shutdown(client, SHUT_RDWR);
+        for (std::thread &server : servers_)
+            server.join();
+        for (const int client : clients_)
+            close(client);
     }
     unsigned Requests() const { return requests_; }
 
@@ -53,7 +59,8 @@ private:
         for (;;) {
             const int client = accept(fd_, nullptr, nullptr);
             if (client == -1) return;
-            std::thread([this, client] { Serve(client); }).detach();
+            clients_.push_back(client);
+            servers_.emplace_back([this, client] { Serve(client); });
         }
     }
     void Serve(int client) {
@@ -77,7 +84,7 @@ private:
             if (reply.empty() || send(client, reply.data(), reply.size(), MSG_NOSIGNAL) < 0 || hangsUp_)
                 break;
         }
-        close(client);
+        shutdown(client, SHUT_RDWR);
     }
 
     TempDir directory_;
@@ -86,6 +93,9 @@ private:
     int fd_ = -1;
     std::atomic<unsigned> requests_ = 0;
     std::thread thread_;
+    // Touched by the listening thread alone until it has ended.
+    std::vector<int> clients_;
+    std::vector<std::thread> servers_;
 };
 
 std::string Reply(uint32_t status, int error, uint32_t length, const std::string &payload, uint32_t claimed) {

@@ -66,8 +66,9 @@ private:
     /// unless they are few.
     static void *TakeBlock(std::size_t size) {
         if (size < kLargestChunk) return std::malloc(size);
-        void *const block = std::aligned_alloc(kLargestChunk, size);
-        if (block) (void)madvise(block, size, MADV_HUGEPAGE);
+        void *block = nullptr;
+        if (posix_memalign(&block, kLargestChunk, size) != 0) return nullptr;
+        (void)madvise(block, size, MADV_HUGEPAGE);
         return block;
     }
 
