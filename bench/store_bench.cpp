@@ -210,6 +210,8 @@ void Bench(int ports, int rounds, const std::string &directory) {
     Row("save again (history), SQLite opened each time", save, openStore);
     Row("load, SQLite kept open", load, plainRead);
     Row("load, SQLite opened each time", load, openRead);
+    Row("save again and load, SQLite kept open", save + load, plainStore + plainRead);
+    Row("save again and load, SQLite opened each time", save + load, openStore + openRead);
     for (const State &state : states)
         std::free(state.buffer);
     std::filesystem::remove_all(directory);

@@ -4,14 +4,23 @@
 
 #include "dvs/configstore.h"
 
+#include <algorithm>
+#include <array>
 #include <cstdlib>
 #include <cstring>
+#include <functional>
+#include <new>
+#include <string_view>
+#include <vector>
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/switch_version.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
 #include "configstore/switch_object.h"
+#include "dvsdata/emit.h"
+#include "dvsdata/growing_image.h"
+#include "dvsdata/list_internal.h"
 #include "dvsstate/owned_list.h"
 #include "platform/status_text.h"
 
@@ -21,11 +30,13 @@ using namespace dvs::config;
 using dvs::convert::Instances;
 using dvs::convert::StoreText;
 using dvs::convert::StoreTexts;
+using dvs::data::GrowingImage;
 using dvs::state::NewList;
 using dvs::state::OwnedList;
 
-constexpr uint32_t kStateType = 0x10; // of every entry of a state and of a switch
-constexpr uint32_t kStateVersion = 9; // what a whole state is serialized with
+constexpr uint32_t kStateType = 0x10;        // of every entry of a state and of a switch
+constexpr std::size_t kUsualPortSize = 2304; // in a state; for the block's first size only
+constexpr uint32_t kStateVersion = 9;        // what a whole state is serialized with
 
 // What is read of a switch object before its properties.
 struct SwitchFields {
@@ -61,33 +72,81 @@ int32_t FailedSwitch(const SwitchFields &fields, uint32_t cause) {
     return kFailed;
 }
 
+// What a state, or a switch of it, is built as: one image, written once. Or lists in lists, which know what
+// to do with entries of one name, and report their work.
+struct Target {
+    DVSData *list; // or
+    GrowingImage *image;
+
+    [[nodiscard]] HYP_ReturnStatus Append(const char *name, const void *data, std::size_t size) const {
+        const auto len = static_cast<uint32_t>(size);
+        if (!image) return DVSData_Append(list, name, data, len, kStateType);
+        image->Append(name, {static_cast<const uint8_t *>(data), len}, kStateType);
+        return HYP_OK;
+    }
+    [[nodiscard]] int32_t AppendProps(const char *name, configstore::Object *object, uint32_t propClass,
+                                      uint32_t version, configstore::Object *resources) const {
+        return image ? LoadPropsInto(image, name, object, propClass, version, resources)
+                     : LoadProps(name, object, list, propClass, version, resources);
+    }
+};
+
+// The entries that a switch has beside its ports.
+constexpr const char *kVersionEntry = "switchVersion";
+constexpr const char *kClassEntry = "className";
+constexpr const char *kMaxPortsEntry = "maxPorts";
+constexpr const char *kGlobalEntry = "globalPropList";
+constexpr const char *kHostEntry = "hostPropList";
+constexpr std::array kOwnEntries = {kVersionEntry, kClassEntry, kMaxPortsEntry, kGlobalEntry, kHostEntry};
+
 // The three entries that every switch list begins with.
-HYP_ReturnStatus AppendFields(DVSData *list, const SwitchFields &fields) {
+HYP_ReturnStatus AppendFields(const Target &target, const SwitchFields &fields) {
     const char *className = fields.forwardingClass.get();
-    HYP_ReturnStatus status =
-        DVSData_Append(list, "switchVersion", &fields.version, sizeof fields.version, kStateType);
-    if (status == HYP_OK)
-        status = DVSData_Append(list, "className", className,
-                                static_cast<uint32_t>(std::strlen(className) + 1), kStateType);
-    if (status == HYP_OK)
-        status = DVSData_Append(list, "maxPorts", &fields.maxPorts, sizeof fields.maxPorts, kStateType);
+    HYP_ReturnStatus status = target.Append(kVersionEntry, &fields.version, sizeof fields.version);
+    if (status == HYP_OK) status = target.Append(kClassEntry, className, std::strlen(className) + 1);
+    if (status == HYP_OK) status = target.Append(kMaxPortsEntry, &fields.maxPorts, sizeof fields.maxPorts);
     return status;
 }
 
-int32_t LoadPort(configstore::Object *port, DVSData *list, uint32_t version, const StoreTexts &uplinkKeys,
-                 configstore::Object *resources) {
-    StoreText key;
-    if (const int32_t status = key.Read(port, "key")) return status;
+// Whether all entries of a switch have names of their own, as far as hashes tell; a list would replace an
+// entry by its namesake.
+class EntryNames {
+public:
+    explicit EntryNames(std::size_t ports) noexcept {
+        try {
+            hashes_.reserve(ports + kOwnEntries.size());
+        } catch (const std::bad_alloc &) {
+            isSound_ = false;
+        }
+        for (const char *name : kOwnEntries)
+            Add(name);
+    }
+    void Add(std::string_view name) {
+        isSound_ = isSound_ && name.size() <= dvs::data::kMaxNameLen && hashes_.size() < hashes_.capacity();
+        if (isSound_) hashes_.push_back(std::hash<std::string_view>()(name));
+    }
+    [[nodiscard]] bool AreUnique() {
+        std::sort(hashes_.begin(), hashes_.end());
+        return isSound_ && std::adjacent_find(hashes_.begin(), hashes_.end()) == hashes_.end();
+    }
+
+private:
+    std::vector<std::size_t> hashes_;
+    bool isSound_ = true;
+};
+
+int32_t LoadPort(configstore::Object *port, const char *key, const Target &target, uint32_t version,
+                 const StoreTexts &uplinkKeys, configstore::Object *resources) {
     const auto uplinks = uplinkKeys.items();
     // The function only reads; C's const does not reach through two pointers.
-    const bool isUplink = StringExistInArray(key.get(), const_cast<const char **>(uplinks.data()),
+    const bool isUplink = StringExistInArray(key, const_cast<const char **>(uplinks.data()),
                                              static_cast<uint32_t>(uplinks.size()));
-    return LoadProps(key.get(), port, list, DVS_PROP_CLASS_PORT, version, isUplink ? resources : nullptr);
+    return target.AppendProps(key, port, DVS_PROP_CLASS_PORT, version, isUplink ? resources : nullptr);
 }
 
 // The store's "not found" ends the walk over the ports without failing the switch, wherever it comes from:
 // that of an absent list cannot be told from that of a port that lacks something.
-int32_t LoadPorts(configstore::Object *object, DVSData *list, uint32_t version) {
+int32_t LoadPorts(configstore::Object *object, const Target &target, uint32_t version) {
     Instances ports;
     int32_t status = ports.Read(object, "ports");
     if (status && status != configstore::NOT_FOUND) return status;
@@ -97,20 +156,23 @@ int32_t LoadPorts(configstore::Object *object, DVSData *list, uint32_t version) 
     if (status) resources = nullptr;
     StoreTexts uplinkKeys;
     status = uplinkKeys.Read(object, "uplink_port_keys");
+    EntryNames names(target.image ? ports.items().size() : 0);
+    if (target.image) target.image->Expect(ports.items().size() * kUsualPortSize);
     for (auto *port : ports.items()) {
-        status = LoadPort(port, list, version, uplinkKeys, resources);
+        StoreText key;
+        status = key.Read(port, "key");
+        if (status == 0 && target.image) names.Add(key.get());
+        if (status == 0) status = LoadPort(port, key.get(), target, version, uplinkKeys, resources);
         if (status) break;
     }
+    if (target.image && !names.AreUnique()) target.image->GiveUp();
     return status == configstore::NOT_FOUND ? 0 : status;
 }
 
-int32_t LoadProperties(configstore::Object *object, DVSData *list, uint32_t version) {
-    if (const int32_t status =
-            LoadProps("globalPropList", object, list, DVS_PROP_CLASS_GLOBAL, version, nullptr))
-        return status;
-    if (const int32_t status = LoadProps("hostPropList", object, list, DVS_PROP_CLASS_HOST, version, nullptr))
-        return status;
-    return LoadPorts(object, list, version);
+int32_t LoadProperties(configstore::Object *object, const Target &target, uint32_t version) {
+    int32_t status = target.AppendProps(kGlobalEntry, object, DVS_PROP_CLASS_GLOBAL, version, nullptr);
+    if (!status) status = target.AppendProps(kHostEntry, object, DVS_PROP_CLASS_HOST, version, nullptr);
+    return status ? status : LoadPorts(object, target, version);
 }
 
 // Names the switch being loaded to the converters for as long as it is.
@@ -122,23 +184,35 @@ public:
     LoadedSwitch &operator=(const LoadedSwitch &) = delete;
 };
 
-int32_t LoadSwitch(configstore::Object *object, DVSData *state) {
+int32_t LoadSwitch(configstore::Object *object, const Target &state) {
     SwitchFields fields;
     if (const int32_t status = ReadFields(object, &fields)) return status;
     OwnedList list;
-    if (const HYP_ReturnStatus status = NewList(list)) return FailedSwitch(fields, status);
+    if (state.image) {
+        state.image->BeginEntry(fields.uuid.get(), kStateType);
+        state.image->BeginBuffer();
+    } else if (const HYP_ReturnStatus status = NewList(list)) {
+        return FailedSwitch(fields, status);
+    }
+    const Target target = {list.get(), state.image};
     const LoadedSwitch loaded(object);
     dvsSwitchClass = SwitchClassOf(fields.forwardingClass.get());
     if (const int32_t status = dvs::convert::ReadSwitchVersion(object, &fields.version))
         return FailedSwitch(fields, static_cast<uint32_t>(status));
     dvsWidePortRecords = fields.version > dvs::convert::kLastNarrowPortVersion;
-    if (const HYP_ReturnStatus status = AppendFields(list.get(), fields)) return FailedSwitch(fields, status);
-    if (const int32_t status = LoadProperties(object, list.get(), fields.version)) return status;
+    if (const HYP_ReturnStatus status = AppendFields(target, fields)) return FailedSwitch(fields, status);
+    if (const int32_t status = LoadProperties(object, target, fields.version)) return status;
+    if (state.image) {
+        dvs::data::EmitOldVersion(fields.version);
+        state.image->EndBuffer();
+        state.image->EndEntry();
+        return 0;
+    }
 
     void *buf = nullptr;
     uint32_t len = 0;
     HYP_ReturnStatus status = DVSData_Serialize(list.get(), &buf, &len, fields.version);
-    if (status == HYP_OK) status = DVSData_Append(state, fields.uuid.get(), buf, len, kStateType);
+    if (status == HYP_OK) status = DVSData_Append(state.list, fields.uuid.get(), buf, len, kStateType);
     std::free(buf);
     return status == HYP_OK ? 0 : FailedSwitch(fields, status);
 }
@@ -152,11 +226,21 @@ int32_t EndedBy(configstore::Object *object) {
     return status;
 }
 
-int32_t LoadAll(const RootObjects &objects, void **out, uint32_t *outLen) {
+int32_t LoadAsImage(const RootObjects &objects, GrowingImage *image, void **out, uint32_t *outLen) {
+    image->BeginBuffer();
+    for (auto *object : objects.items()) {
+        if (LoadSwitch(object, {nullptr, image})) return EndedBy(object);
+    }
+    image->EndBuffer();
+    if (!image->GaveUp()) image->HandOver(out, outLen);
+    return 0;
+}
+
+int32_t LoadAsLists(const RootObjects &objects, void **out, uint32_t *outLen) {
     OwnedList state;
     if (NewList(state) != HYP_OK) return kFailed;
     for (auto *object : objects.items()) {
-        if (LoadSwitch(object, state.get())) return EndedBy(object);
+        if (LoadSwitch(object, {state.get(), nullptr})) return EndedBy(object);
     }
     void *buf = nullptr;
     uint32_t len = 0;
@@ -166,6 +250,16 @@ int32_t LoadAll(const RootObjects &objects, void **out, uint32_t *outLen) {
         *outLen = len;
     }
     return static_cast<int32_t>(status);
+}
+
+int32_t LoadAll(const RootObjects &objects, void **out, uint32_t *outLen) {
+    // Whoever follows the work in the log is shown the lists.
+    if (!Tracing() && !dvs::data::Emits(dvs::data::kTrace)) {
+        GrowingImage image;
+        const int32_t status = LoadAsImage(objects, &image, out, outLen);
+        if (status || !image.GaveUp()) return status;
+    }
+    return LoadAsLists(objects, out, outLen);
 }
 
 int32_t CopyPortsetName(configstore::Object *from, configstore::Object *to) {

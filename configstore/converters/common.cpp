@@ -5,6 +5,8 @@
 
 #include <algorithm>
 
+#include "dvsdata/growing_image.h"
+
 namespace dvs::convert {
 
 Text::Text(std::span<const uint8_t> bytes) {
@@ -49,9 +51,13 @@ void CopyBounded(std::span<uint8_t> slot, const char *text) {
     slot[length] = 0;
 }
 
-int32_t Store(const LoadArgs &args, std::span<const uint8_t> value) {
-    return static_cast<int32_t>(DVSData_Update(args.list, args.key, value.data(),
-                                               static_cast<uint32_t>(value.size()), args.propType));
+int32_t StoreAs(const LoadArgs &args, const char *key, std::span<const uint8_t> value, uint32_t propType) {
+    if (args.image) {
+        args.image->Update(key, value, propType);
+        return 0;
+    }
+    return static_cast<int32_t>(
+        DVSData_Update(args.list, key, value.data(), static_cast<uint32_t>(value.size()), propType));
 }
 
 const char *EnumText(std::span<const char *const> table, uint32_t index) {

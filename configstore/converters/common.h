@@ -104,8 +104,13 @@ private:
     std::size_t size_ = 0;
 };
 
-/// DVSData_Update of the row's key and type; the status is the converter's.
-[[nodiscard]] int32_t Store(const LoadArgs &args, std::span<const uint8_t> value);
+/// DVSData_Update of the list under construction, whatever it is built as; the status is the converter's.
+[[nodiscard]] int32_t StoreAs(const LoadArgs &args, const char *key, std::span<const uint8_t> value,
+                              uint32_t propType);
+/// The same with the row's key and type.
+[[nodiscard]] inline int32_t Store(const LoadArgs &args, std::span<const uint8_t> value) {
+    return StoreAs(args, args.key, value, args.propType);
+}
 template <typename T> [[nodiscard]] inline int32_t StoreNumber(const LoadArgs &args, T number) {
     uint8_t bytes[sizeof number];
     std::memcpy(bytes, &number, sizeof number);

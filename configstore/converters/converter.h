@@ -13,6 +13,10 @@
 #include "dvs/data.h"
 #include "platform/configstore.h"
 
+namespace dvs::data {
+class GrowingImage;
+}
+
 namespace dvs::convert {
 
 struct SaveArgs {
@@ -31,17 +35,18 @@ struct LoadArgs {
     configstore::Object *parent; // as above, reached without creating anything
     DVSData *list;               // the property list under construction
     const char *leaf;
-    const char *key;    // the row's key
-    uint32_t propType;  // the row's load property type
-    uint32_t propClass; // DVS_PROP_CLASS_*: whose list is being built
+    const char *key;                          // the row's key
+    uint32_t propType;                        // the row's load property type
+    uint32_t propClass;                       // DVS_PROP_CLASS_*: whose list is being built
+    dvs::data::GrowingImage *image = nullptr; // stands for the list, which is null then
 };
 
 // 0, a store status (at the first store call that fails; what was written stays), or -1 for a value that the
 // store cannot express.
 using SaveFn = int32_t (*)(const SaveArgs &args);
 
-// 0 with at most one DVSData_Update of args.key, 0 with none when the leaf is absent or the row is not for
-// this class of switch, or a status that ends the load. A status from DVSData_Update is passed on as it is.
+// 0 with at most one Store of args.key, 0 with none when the leaf is absent or the row is not for
+// this class of switch, or a status that ends the load. A status from Store is passed on as it is.
 using LoadFn = int32_t (*)(const LoadArgs &args);
 
 struct Converter {

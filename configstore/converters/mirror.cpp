@@ -488,12 +488,16 @@ int32_t SaveMirrorSessions(const SaveArgs &args) {
 
 int32_t LoadMirrorSessions(const LoadArgs &args) {
     if (!IsKeyOfThisClass(args.key)) return 0;
+    Instances vspans;
+    const int32_t found = vspans.Read(args.parent, args.leaf);
+    // A switch that is being loaded has had its version read before any of its ports: most have no sessions,
+    // and those need not ask again.
+    const bool known = args.propClass == DVS_PROP_CLASS_PORT && args.image;
+    if (known && found == configstore::NOT_FOUND) return 0;
     bool wide = false;
     int32_t status = HasWideRecords(args, &wide);
     if (status) return status;
-    Instances vspans;
-    status = vspans.Read(args.parent, args.leaf);
-    if (status) return status == configstore::NOT_FOUND ? 0 : status;
+    if (found) return found == configstore::NOT_FOUND ? 0 : found;
     if (vspans.items().empty()) return 0;
 
     uint64_t ports = 0;

@@ -83,11 +83,6 @@ int32_t SaveHost(const SaveArgs &args, configstore::Object *data) {
 // --- Load. ---
 
 // One entry under the key that the instance names, with a type of its own.
-int32_t StoreAs(const LoadArgs &args, const char *key, std::span<const uint8_t> value, uint32_t propType) {
-    return static_cast<int32_t>(
-        DVSData_Update(args.list, key, value.data(), static_cast<uint32_t>(value.size()), propType));
-}
-
 int32_t LoadInstanceText(const LoadArgs &args, configstore::Object *instance) {
     StoreText key;
     StoreText value;

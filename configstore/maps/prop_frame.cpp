@@ -16,6 +16,8 @@
 #include "configstore/log.h"
 #include "configstore/maps/prop_lookup.h"
 #include "configstore/maps/prop_saver.h"
+#include "dvsdata/growing_image.h"
+#include "dvsdata/list_internal.h"
 #include "dvsstate/owned_list.h"
 
 uint32_t dvsSwitchClass = 0;
@@ -83,7 +85,8 @@ int32_t RunSave(const DVSProp2ConfigEntry &row, const dvs::convert::SaveArgs &ar
 // The list under construction and where it comes from, as every row's converter is given them.
 struct LoadRun {
     configstore::Object *object;
-    DVSData *list;
+    DVSData *list; // or
+    dvs::data::GrowingImage *image;
     uint32_t propClass;
 };
 
@@ -130,7 +133,7 @@ int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row, KnownParents
     if (status) return status;
     const auto *converter = ConverterFor(row.converterType);
     status = converter ? converter->load({run.object, parent, run.list, Leaf(row), row.key, row.loadPropType,
-                                          run.propClass})
+                                          run.propClass, run.image})
                        : kFailed;
     return status ? FailedToLoad(row.key, Leaf(row), row.converterType, status) : 0;
 }
@@ -143,20 +146,26 @@ int32_t LoadRows(const LoadRun &run, configstore::Object *trafficResources) {
     if (run.propClass != DVS_PROP_CLASS_PORT || !trafficResources) return 0;
     return ConverterFor(dvs::convert::kTypeTrafficResources)
         ->load({run.object, trafficResources, run.list, kTrafficResourcesLeaf, kPortResourcePoolsKey,
-                kPropTypeState, run.propClass});
+                kPropTypeState, run.propClass, run.image});
 }
 
 int32_t BuildProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
                    uint32_t serializeFlags, configstore::Object *trafficResources) {
     dvs::state::OwnedList list;
     if (dvs::state::NewList(list) != HYP_OK) return kFailed;
-    if (const int32_t status = LoadRows({object, list.get(), propClass}, trafficResources)) return status;
+    if (const int32_t status = LoadRows({object, list.get(), nullptr, propClass}, trafficResources))
+        return status;
     void *buf = nullptr;
     uint32_t len = 0;
     HYP_ReturnStatus status = DVSData_Serialize(list.get(), &buf, &len, serializeFlags);
     if (status == HYP_OK) status = DVSData_Update(outList, propsName, buf, len, kPropTypeState);
     std::free(buf);
     return static_cast<int32_t>(status);
+}
+
+int32_t Reported(const char *propsName, int32_t status) {
+    if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
+    return status;
 }
 
 } // namespace
@@ -215,10 +224,19 @@ int32_t SaveProp(configstore::Object *object, const char *key, const void *value
 int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
                   uint32_t serializeFlags, configstore::Object *trafficResources) {
     LogTrace("LoadProps: %s\n", propsName);
-    const int32_t status =
-        BuildProps(propsName, object, outList, propClass, serializeFlags, trafficResources);
-    if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
-    return status;
+    return Reported(propsName,
+                    BuildProps(propsName, object, outList, propClass, serializeFlags, trafficResources));
+}
+
+int32_t LoadPropsInto(dvs::data::GrowingImage *image, const char *propsName, configstore::Object *object,
+                      uint32_t propClass, uint32_t serializeFlags, configstore::Object *trafficResources) {
+    image->BeginEntry(propsName, kPropTypeState);
+    image->BeginBuffer();
+    const int32_t status = LoadRows({object, nullptr, image, propClass}, trafficResources);
+    if (status == 0) dvs::data::EmitOldVersion(serializeFlags);
+    image->EndBuffer();
+    image->EndEntry();
+    return Reported(propsName, status);
 }
 
 namespace dvs::config {

@@ -16,6 +16,10 @@
 #include "dvs/data.h"
 #include "platform/configstore.h"
 
+namespace dvs::data {
+class GrowingImage;
+}
+
 /// The class of the switch at hand: 1 for "vswitch", 2 for "cswitch", 0 for every other class name.
 extern uint32_t dvsSwitchClass;
 
@@ -60,5 +64,11 @@ int64_t dvsConfigStoreNowMs();
 [[nodiscard]] int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList,
                                 uint32_t propClass, uint32_t serializeFlags,
                                 configstore::Object *trafficResources);
+
+/// LoadProps as an entry of the image's innermost buffer. On a failure, and when the image has given up, the
+/// image is of no use any more.
+[[nodiscard]] int32_t LoadPropsInto(dvs::data::GrowingImage *image, const char *propsName,
+                                    configstore::Object *object, uint32_t propClass, uint32_t serializeFlags,
+                                    configstore::Object *trafficResources);
 
 #endif

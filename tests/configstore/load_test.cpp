@@ -74,6 +74,68 @@ TEST_F(LoadTest, BringsBackWhatWasSaved) {
     EXPECT_TRUE(Said("Loading switch:a\n"));
 }
 
+// A load whose work nobody follows writes its buffer at once; one that is followed builds lists.
+TEST_F(LoadTest, GivesTheSameBytesWhetherOrNotItIsFollowed) {
+    const auto bytes = [](int level) {
+        dvsconfigstore_debug = level;
+        void *buf = nullptr;
+        uint32_t len = 0;
+        EXPECT_EQ(0, DVSState_LoadFromConfigStoreAsBuf(&buf, &len, false));
+        EXPECT_TRUE(buf);
+        std::string copy(static_cast<const char *>(buf), len);
+        std::free(buf);
+        return copy;
+    };
+    EXPECT_EQ(bytes(1), bytes(-1)) << "nothing stored";
+
+    Switch sw;
+    sw.id = "a";
+    sw.version = 9;
+    sw.global = {Alias("blue"), Version()};
+    sw.host = {{"com.orbeno.common.host.portset", Text("ps")}};
+    sw.ports = {{"p2", {{"com.orbeno.common.port.alias", Text("two")}}},
+                {"p1", {}},
+                {"p3",
+                 {{"com.orbeno.common.port.block", Text("true")},
+                  {"com.orbeno.etherswitch.port.txUplink", Text("always")}}}};
+    Switch other = sw;
+    other.id = "b";
+    other.className = "vswitch";
+    other.ports.clear();
+    ASSERT_EQ(0, Save({other, sw}));
+    EXPECT_EQ(bytes(1), bytes(-1)) << "two switches";
+
+    // What only lists can do: ports of one name, and of names that the switch has for entries of its own.
+    for (const std::string &key :
+         {std::string("p1"), std::string("className"), std::string("hostPropList"), std::string(200, 'x')}) {
+        configstore::Object *object = New("c");
+        const char *const ids[] = {"p1", "p2", "p3"};
+        for (const char *id : ids)
+            EXPECT_EQ(0, configstore::SetValueStr(Sub(object, "ports", id), "name", id));
+        EXPECT_EQ(0, configstore::SetValueStr(Sub(object, "ports", "p3"), "key", key.c_str()));
+        Put(object);
+        EXPECT_EQ(bytes(1), bytes(-1)) << key;
+    }
+
+    // Vendors' properties of one port: some that meet in one name, then more than the image takes.
+    for (const int others : {0, 100}) {
+        configstore::Object *object = New("c");
+        configstore::Object *data = Sub(Sub(object, "ports", "p"), "data");
+        for (const char *value : {"same", "also", "of another length", "back"}) {
+            configstore::Object *instance = Sub(data, "vendor_specific_data", value);
+            EXPECT_EQ(0, configstore::SetValueStr(instance, "key", "one.name"));
+            EXPECT_EQ(0, configstore::SetValueStr(instance, "value", value));
+        }
+        for (int i = 0; i < others; i++) {
+            const std::string id = "vendor." + std::to_string(i);
+            EXPECT_EQ(0,
+                      configstore::SetValueStr(Sub(data, "vendor_specific_data", id.c_str()), "value", "v"));
+        }
+        Put(object);
+        EXPECT_EQ(bytes(1), bytes(-1)) << others;
+    }
+}
+
 TEST_F(LoadTest, LaysASwitchOutInItsOrder) {
     configstore::Object *object = New("a");
     Sub(object, "ports", "p1");

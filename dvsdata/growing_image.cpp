@@ -1,0 +1,167 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Nested buffers of sizes that are not known beforehand (growing_image.h). Sizes are filled in when a buffer
+// ends, before the one around it sums them.
+
+#include "dvsdata/growing_image.h"
+
+#include <algorithm>
+#include <cassert>
+#include <cstdlib>
+#include <cstring>
+#include <utility>
+
+#include <sys/mman.h>
+
+#include "dvsdata/list_internal.h"
+
+namespace dvs::data {
+
+GrowingImage::~GrowingImage() {
+    std::free(begin_);
+}
+
+bool GrowingImage::Grow(std::size_t size) {
+    constexpr std::size_t kFirst = std::size_t{1} << 16;
+    constexpr std::size_t kHugePage = std::size_t{2} << 20;
+    const std::size_t capacity = std::max(kFirst, (capacity_ + size) * 2);
+    auto *const block =
+        capacity <= kMaxSize ? static_cast<std::uint8_t *>(std::realloc(begin_, capacity)) : nullptr;
+    if (!block) {
+        gaveUp_ = true;
+        return false;
+    }
+    begin_ = block;
+    capacity_ = capacity;
+    if (capacity >= 2 * kHugePage) {
+        // The page faults of a large fresh block cost more than filling it. Whole huge pages only: what lies
+        // around the block is the heap's. Merely advice.
+        const auto start = (reinterpret_cast<uintptr_t>(block) + kHugePage - 1) & ~(kHugePage - 1);
+        const auto end = (reinterpret_cast<uintptr_t>(block) + capacity) & ~(kHugePage - 1);
+        (void)madvise(reinterpret_cast<void *>(start), end - start, MADV_HUGEPAGE);
+    }
+    return true;
+}
+
+void GrowingImage::Expect(std::size_t size) {
+    if (!gaveUp_ && size > capacity_ - at_ && size < kMaxSize / 4) (void)Grow(size / 2);
+}
+
+std::uint8_t *GrowingImage::Claim(std::size_t size) {
+    if (gaveUp_ || (size > capacity_ - at_ && !Grow(size))) return nullptr;
+    std::uint8_t *const at = begin_ + at_;
+    at_ += size;
+    return at;
+}
+
+void GrowingImage::BeginBuffer() {
+    assert(depth_ < kMaxDepth);
+    levels_[depth_++] = {at_, at_ + kUnsummedSize, 0, 0, 0};
+    if (std::uint8_t *const header = Claim(kHeaderSize)) std::memset(header, 0, kHeaderSize);
+}
+
+void GrowingImage::EndBuffer() {
+    assert(depth_ > 0);
+    const Level level = levels_[--depth_];
+    std::uint8_t *const marker = Claim(kMarkerSize);
+    if (!marker) return;
+    Store32(marker, 0);
+
+    const Bytes written(begin_, at_);
+    const std::size_t size = at_ - level.start;
+    std::uint32_t checksum = level.sum;
+    if (at_ > level.summedTo) checksum += Sum(written.subspan(level.summedTo));
+    std::uint8_t *const header = begin_ + level.start;
+    Store32(header + kTotalLengthOffset, static_cast<std::uint32_t>(size));
+    Store32(header + kChecksumOffset, checksum);
+    Store16(header + kVersionOffset, kFormatVersion);
+    if (depth_ == 0) return;
+
+    Level &outer = levels_[depth_ - 1];
+    std::uint8_t *const entry = begin_ + outer.entry;
+    Store32(entry + kEntrySizeOffset, EntrySize(static_cast<std::uint32_t>(size)));
+    Store32(entry + kDataLenOffset, static_cast<std::uint32_t>(size));
+    // The buffer around sums this one's first bytes too, and the bytes since its last nested buffer.
+    outer.sum += checksum + Sum(written.subspan(level.start, std::min<std::size_t>(size, kUnsummedSize))) +
+                 Sum(written.subspan(outer.summedTo, level.start - outer.summedTo));
+    outer.summedTo = at_;
+}
+
+void GrowingImage::BeginEntry(std::string_view name, std::uint32_t propType) {
+    assert(depth_ > 0);
+    levels_[depth_ - 1].entry = at_;
+    std::uint8_t *const fixed = Claim(kEntryFixedSize);
+    if (!fixed) return;
+    StoreName(fixed + kNameOffset, name);
+    Store32(fixed + kPropTypeOffset, propType);
+}
+
+void GrowingImage::EndEntry() {
+    assert(depth_ > 0);
+    if (gaveUp_) return;
+    const std::size_t entry = levels_[depth_ - 1].entry;
+    const std::size_t padding = entry + Load32(begin_ + entry + kEntrySizeOffset) - at_;
+    if (std::uint8_t *const to = Claim(padding)) std::memset(to, 0, padding);
+}
+
+void GrowingImage::Append(std::string_view name, Bytes value, std::uint32_t propType) {
+    Put(name, value, propType);
+}
+
+void GrowingImage::Put(std::string_view name, Bytes value, std::uint32_t propType) {
+    if (value.size() > kMaxSize) gaveUp_ = true;
+    const std::size_t size = EntrySize(static_cast<std::uint32_t>(value.size()));
+    std::uint8_t *const entry = Claim(size);
+    if (!entry) return;
+    std::memset(entry + size - 8, 0, 8); // the padding, and fields or value that are written next
+    Store32(entry + kEntrySizeOffset, static_cast<std::uint32_t>(size));
+    StoreName(entry + kNameOffset, name);
+    Store32(entry + kPropTypeOffset, propType);
+    Store32(entry + kDataLenOffset, static_cast<std::uint32_t>(value.size()));
+    if (!value.empty()) std::memcpy(entry + kEntryFixedSize, value.data(), value.size());
+}
+
+std::size_t GrowingImage::Find(std::string_view name) const {
+    std::size_t at = levels_[depth_ - 1].start + kHeaderSize;
+    const std::size_t last = name.empty() ? 0 : std::min<std::size_t>(name.size(), kNameSize) - 1;
+    for (; at < at_; at += Load32(begin_ + at + kEntrySizeOffset)) {
+        const auto *const field = reinterpret_cast<const char *>(begin_ + at + kNameOffset);
+        if (!name.empty() && field[last] != name[last]) continue; // most names begin alike
+        if (NameMatches(field, name)) break;
+    }
+    return at;
+}
+
+void GrowingImage::Update(std::string_view name, Bytes value, std::uint32_t propType) {
+    assert(depth_ > 0);
+    if (gaveUp_) return;
+    Level &level = levels_[depth_ - 1];
+    const std::size_t found = Find(name);
+    std::uint32_t type = propType ? propType : kDefaultPropType;
+    if (found == at_) {
+        if (++level.entries > kMaxUpdates) gaveUp_ = true;
+        Put(name, value, type);
+        return;
+    }
+    std::uint8_t *const entry = begin_ + found;
+    if (Load32(entry + kDataLenOffset) == value.size()) {
+        if (!value.empty()) std::memcpy(entry + kEntryFixedSize, value.data(), value.size());
+        Store32(entry + kPropTypeOffset, type);
+        return;
+    }
+    // Another length: the entry goes and comes back as the last one, with its old type where there is no new.
+    if (!propType) type = Load32(entry + kPropTypeOffset);
+    const std::size_t size = Load32(entry + kEntrySizeOffset);
+    std::memmove(entry, entry + size, at_ - found - size);
+    at_ -= size;
+    Put(name, value, type);
+}
+
+void GrowingImage::HandOver(void **buf, std::uint32_t *len) {
+    assert(depth_ == 0 && !gaveUp_);
+    void *const fitting = std::realloc(begin_, at_);
+    *buf = fitting ? fitting : begin_;
+    *len = static_cast<std::uint32_t>(at_);
+    begin_ = nullptr;
+}
+
+} // namespace dvs::data
