@@ -11,6 +11,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <filesystem>
 #include <memory>
 #include <new>
 #include <string>
@@ -39,7 +40,8 @@ protected:
     ~Fault() override {
         fault_disarm();
         close(fd_);
-        (void)std::system(("rm -rf " + dir_).c_str());
+        std::error_code ignored;
+        std::filesystem::remove_all(dir_, ignored);
     }
     std::string dir_, file_;
     int fd_ = -1;
