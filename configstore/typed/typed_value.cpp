@@ -21,6 +21,7 @@ namespace {
 
 constexpr uint32_t kTypeVersion = 15;
 constexpr uint32_t kTypeHealthCheck = 11;
+constexpr uint32_t kTypeOverlayFlag = 19;
 constexpr uint32_t kTypePortPools = 36;
 constexpr uint32_t kFirstOverlayVersion = 107;
 
@@ -125,7 +126,8 @@ private:
 
     // What the loads of some global properties ask the switch's object for.
     int32_t DescribeSwitch() {
-        if (propClass_ != DVS_PROP_CLASS_GLOBAL) return 0;
+        // The overlay flag is itself what the others ask for.
+        if (propClass_ != DVS_PROP_CLASS_GLOBAL || type_->type == kTypeOverlayFlag) return 0;
         int32_t status =
             configstore::SetValueBool(root_.get(), "ovl_enabled", context_.version >= kFirstOverlayVersion);
         if (status || type_->type == kTypeVersion) return status;

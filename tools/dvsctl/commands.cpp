@@ -56,10 +56,16 @@ constexpr OptionRow kHexdumpOptions[] = {kSource, kSwitch, kPort};
 
 constexpr OptionRow kGenerateOptions[] = {
     {"TO", nullptr, &Options::target, "the source to replace"},
-    {"--switches", "N", &Options::switchCount, "how many switches (default 3), of all classes in turn"},
+    {"--switches", "N", &Options::switchCount,
+     "how many switches, of all classes in turn (default 3, at most 32)"},
     {"--ports", "M", &Options::portCount, "how many ports each has (default 16)"},
     {"--seed", "S", &Options::seed, "what the values are drawn from (default 1)"},
+    {"--class", "NAME", &Options::className, "all of this class instead, as vswitch"},
+    {"--switch-version", "N", &Options::switchVersion, "all of this version: 4 to 12, 100, or 107 to 112"},
     kDryRun,
+    {"--may-exist", nullptr, &Options::mayExist, "replace what TO holds (this is the default)"},
+    {"--no-replace", nullptr, &Options::noReplace, "refuse when TO holds something already"},
+    kFull,
 };
 constexpr OptionRow kPropsOptions[] = {
     {"NAME", nullptr, &Options::name, "a property's name, or a pattern as '*.vlan'"},
@@ -125,10 +131,15 @@ constexpr Command kCommands[] = {
      "  dvsctl props --columns name,quirks\n",
      RunProps},
     {"generate", "Make a state of any size for trials", kGenerateOptions,
-     "Every switch and port has one of every property that its class knows. The same numbers give the same "
-     "bytes.\n",
-     "  dvsctl generate --switches 2 --ports 100 --seed 7 trial.db\n"
-     "  dvsctl generate --switches 1 --ports 2 json:-\n",
+     "Realistic values, by the rules of each switch's class and version: uplinks and guests, ports of every "
+     "kind, some\n"
+     "without names. With 3 switches of 12 ports or more, every property that has a place in the config "
+     "store "
+     "is there.\n"
+     "The same numbers give the same bytes on any machine.\n",
+     "  dvsctl generate --switches 32 --ports 512 --seed 7 trial.db\n"
+     "  dvsctl generate --switches 1 --ports 2 --class vswitch json:-\n"
+     "  dvsctl generate --dry-run --seed 8 trial.db\n",
      RunGenerate},
 };
 

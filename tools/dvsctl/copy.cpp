@@ -2,67 +2,17 @@
 // `dvsctl copy`: a verified state from one source to another. Nothing is written before everything has been
 // read and judged; what then goes wrong leaves the target as it was.
 
-#include <algorithm>
-
-#include <boost/json/array.hpp>
-#include <boost/json/object.hpp>
-#include <boost/json/value.hpp>
 #include <fmt/format.h>
 
 #include "tools/dvsctl/commands.h"
-#include "tools/dvsctl/compare.h"
 #include "tools/dvsctl/encode.h"
-#include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/filter.h"
-#include "tools/dvsctl/show.h"
+#include "tools/dvsctl/put.h"
 #include "tools/dvsctl/source.h"
 
 namespace dvs::ctl {
 
 namespace {
-
-/// What the target holds before the copy, as far as it can be told.
-struct Target {
-    bool exists = false;
-    bool isSound = true;
-    std::string damage;
-    LoadedState loaded;
-};
-
-Target LookAtTarget(Context &context, Source &to) {
-    Target target;
-    if (to.IsStandardOutput()) return target;
-    std::optional<StateBytes> read;
-    try {
-        read = to.Read(context, ReadMode::Tolerant);
-        target.exists = read.has_value();
-    } catch (const Error &error) {
-        if (error.status != Exit::Malformed && !error.isDamage) throw;
-        target.exists = true;
-        target.damage = error.why;
-    }
-    if (read && read->bytes.empty()) target.damage = read->complaint;
-    if (read && !read->bytes.empty()) {
-        const state::StateVerdict verdict = state::VerifyState(read->bytes);
-        if (verdict.first)
-            target.damage = ShowFault(verdict.located);
-        else
-            target.loaded.raw = std::move(*read);
-    }
-    target.isSound = target.damage.empty();
-    target.loaded.state = ParseState(target.loaded.raw.bytes);
-    return target;
-}
-
-// Whether a copy would replace something, as --no-replace means it.
-bool IsTaken(const Source &to, const Target &target, const State &state) {
-    if (!target.exists || !target.isSound) return target.exists;
-    const auto &held = target.loaded.state.switches;
-    if (to.CountsWhenEmpty()) return true;
-    if (!to.ReplacesSingle() || state.switches.size() != 1) return !held.empty();
-    return std::any_of(held.begin(), held.end(),
-                       [&](const Switch &sw) { return sw.name == state.switches.front().name; });
-}
 
 // The state of the one switch that --switch asks for.
 LoadedState OnlySwitch(Context &context, const Source &from, const LoadedState &loaded) {
@@ -76,68 +26,11 @@ LoadedState OnlySwitch(Context &context, const Source &from, const LoadedState &
     return JudgeState(from, {EncodeList(entries), {}});
 }
 
-void RefuseIfTaken(const Options &options, const Source &to, const Target &target, const State &state) {
-    if (!options.noReplace || !IsTaken(to, target, state)) return;
-    throw Error(Exit::Failed, "the target holds something already")
-        .In(to.Name())
-        .Because("--no-replace was given")
-        .Try("name another target, or leave --no-replace out");
-}
-
-struct Outcome {
-    const Source &from, &to;
-    StateCount count;
-    std::size_t bytes;
-    bool isWritten;
-};
-
-void ReportPlan(Context &context, const Outcome &outcome, const Target &target,
-                const std::vector<Change> &changes) {
-    Output &out = context.out;
-    if (!target.exists)
-        out.Write(fmt::format("would create {}\n", ShowName(outcome.to.Name())));
-    else if (!target.isSound)
-        out.Write(fmt::format("would replace {}, which holds no sound state: {}\n",
-                              ShowName(outcome.to.Name()), Escape(target.damage)));
-    else if (changes.empty())
-        out.Write(fmt::format("would change nothing in {}\n", ShowName(outcome.to.Name())));
-    else
-        out.Write(
-            fmt::format("would change {}: {}\n", ShowName(outcome.to.Name()), ShowChangeCount(changes)));
-    WriteChanges(changes, context.options, out);
-    out.Remark("nothing was written (--dry-run)\n");
-}
-
-void Report(Context &context, const Outcome &outcome, const Target &target,
-            const std::vector<Change> &changes) {
-    const Options &options = context.options;
-    if (!options.json) {
-        if (options.dryRun)
-            ReportPlan(context, outcome, target, changes);
-        else if (!outcome.to.IsStandardOutput())
-            context.out.Remark(fmt::format("copied {} from {} to {}\n", ShowCount(outcome.count),
-                                           ShowName(outcome.from.Name()), ShowName(outcome.to.Name())));
-        return;
-    }
-    boost::json::object document = Envelope("copy");
-    document["from"] = ValidUtf8(outcome.from.Name());
-    document["to"] = ValidUtf8(outcome.to.Name());
-    document["is_written"] = outcome.isWritten;
-    document["bytes"] = outcome.bytes;
-    document["summary"] = CountJson(outcome.count);
-    if (options.dryRun) {
-        document["target_exists"] = target.exists;
-        document["target_is_sound"] = target.exists && target.isSound;
-        document["changes"] = ChangesJson(changes, options);
-    }
-    context.out.Json(std::move(document));
-}
-
-Exit NothingToCopy(Context &context, const Source &from, const Source &to) {
+Exit NothingToCopy(Context &context, const PutJob &job, const Source &to) {
     if (!context.options.json)
-        context.out.Remark(fmt::format("nothing to copy: {} is not there\n", ShowName(from.Name())));
+        context.out.Remark(fmt::format("nothing to copy: {} is not there\n", ShowName(job.from->Name())));
     else
-        Report(context, {from, to, {}, 0, false}, {}, {});
+        ReportNothingPut(context, job, to);
     return Exit::Done;
 }
 
@@ -146,36 +39,17 @@ Exit NothingToCopy(Context &context, const Source &from, const Source &to) {
 Exit RunCopy(Context &context) {
     const Options &options = context.options;
     const auto from = OpenSource(options.source), to = OpenSource(options.target);
-    if (options.json && to->IsStandardOutput())
-        throw Error(Exit::Usage, "--json and the target json:- both want standard output")
-            .Try("leave --json out, or name a file as the target");
-    if (options.mayExist && options.noReplace)
-        throw Error(Exit::Usage, "--may-exist and --no-replace exclude each other");
+    const PutJob job{"copy", "copied", from.get()};
+    CheckPutOptions(options, *to);
 
     from->CopiesTo(*to);
     // Here an absent source is not an empty state: copying that would empty the target.
     std::optional<StateBytes> read = from->Read(context, ReadMode::Strict);
-    if (!read && options.ifExists) return NothingToCopy(context, *from, *to);
+    if (!read && options.ifExists) return NothingToCopy(context, job, *to);
     if (!read) throw Error(AbsentError(*from));
     LoadedState loaded = JudgeState(*from, std::move(*read));
     if (options.switchId) loaded = OnlySwitch(context, *from, loaded);
-    const Bytes state = Bytes(loaded.raw.bytes).first(loaded.state.size);
-    Outcome outcome{*from, *to, CountState(loaded.state), state.size(), false};
-
-    Target target;
-    std::vector<Change> changes;
-    if (options.dryRun || options.noReplace) target = LookAtTarget(context, *to);
-    RefuseIfTaken(options, *to, target, loaded.state);
-    LoadedState planned;
-    if (options.dryRun) {
-        planned = JudgeState(*to, {to->Plan(context, state), {}});
-        changes = Compare(target.loaded.state, planned.state, {});
-    } else {
-        to->Write(context, state);
-        outcome.isWritten = true;
-    }
-    Report(context, outcome, target, changes);
-    return Exit::Done;
+    return PutState(context, job, loaded, *to);
 }
 
 } // namespace dvs::ctl

@@ -27,9 +27,9 @@ std::optional<Node> ItemFromJson(const json::value &value, const std::string &pa
     if (value.is_bool()) {
         node.kind = Node::Kind::kBool;
         node.flag = value.get_bool();
-    } else if (value.is_int64()) {
+    } else if (value.is_int64() || (value.is_uint64() && value.get_uint64() <= INT64_MAX)) {
         node.kind = Node::Kind::kNumber;
-        node.number = value.get_int64();
+        node.number = value.to_number<std::int64_t>();
     } else if (value.is_number()) {
         flaw = {path, "it is no whole number from -9223372036854775808 to 9223372036854775807"};
         return std::nullopt;

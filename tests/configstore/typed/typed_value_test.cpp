@@ -335,6 +335,17 @@ TEST_F(Typed, PortRecordsOfSessionsFollowTheVersion) {
                                    .state);
 }
 
+TEST_F(Typed, TheOverlayFlagIsItselfWhateverTheVersion) {
+    for (const uint32_t version : {8u, 100u, 110u}) {
+        for (const bool flag : {true, false}) {
+            const Built built =
+                Build(DVS_PROP_CLASS_GLOBAL, "com.orbeno.common.portset.ovl", Bool(flag), {version});
+            EXPECT_TRUE(built.ok) << built.reason;
+            EXPECT_TRUE(built.differences.empty()) << version << flag;
+        }
+    }
+}
+
 TEST_F(Typed, BuildsListsOfNumbersAndComparesWhatIsNotThere) {
     const Node session = Object({Text("s", "key"), Text("REMOTE_MIRROR_DEST", "session_type"),
                                  Object({List({Number(5), Number(4094)}, "vlans")}, "source_recv_port")});
