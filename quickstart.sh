@@ -25,7 +25,14 @@ say() { printf '\n\033[1m== %s\033[0m\n' "$*"; }
 [ -t 1 ] && [ -z "${NO_COLOR:-}" ] || say() { printf '\n== %s\n' "$*"; }
 # Prints a command as one would type it, then runs it.
 run() {
-    printf '$ dvsctl %s\n' "$*"
+    local word line=
+    for word in "$@"; do
+        case $word in
+        *[!A-Za-z0-9_.,:/=@%+-]*) line+=" '$word'" ;;
+        *) line+=" $word" ;;
+        esac
+    done
+    printf '$ dvsctl%s\n' "$line"
     "$dvsctl" "$@" --no-pager
 }
 
