@@ -1,31 +1,126 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Reading serialized lists: the header's checks, the walk over the entries, and lists read where they lie.
-// Every number in a buffer is distrusted: nothing is read outside the length that the header says, which is
-// checked against the length given first. Leans on format.h; deserialize.cpp and the state's deserialization
-// stand on it.
+// Reading serialized lists: the header's checks, the walk over the entries, lists made from it, and lists
+// read where they lie. Every number in a buffer is distrusted: nothing is read outside the length that the
+// header says, which is checked against the length given first. Leans on format.h and the list's record;
+// deserialize.cpp and the state's deserialization stand on it.
 
-#include <algorithm>
+#include <cstring>
+#include <memory>
 
 #include "dvsdata/emit.h"
 #include "dvsdata/list_internal.h"
+#include "dvsdata/list_record.h"
+#include "dvsdata/name_field.h"
 
 namespace dvs::data {
 namespace {
 
-std::string_view StoredName(const std::uint8_t *field) {
-    const auto *const text = reinterpret_cast<const char *>(field);
-    return {text, ::strnlen(text, kMaxNameLen)};
+/// An entry whose sizes were checked.
+struct Place {
+    const std::uint8_t *at;
+    std::uint32_t size, dataLen;
+};
+
+std::string_view StoredName(const std::uint8_t *at) {
+    const std::uint8_t *const field = at + kNameOffset;
+    return {reinterpret_cast<const char *>(field), LookAtName(field).len};
 }
 
 bool IsAligned(std::size_t value) {
     return value % 4 == 0;
 }
 
+[[gnu::cold]] HYP_ReturnStatus BadLengths(std::uint32_t dataLen, std::uint32_t size) {
+    Emit(kError, "bad data: data block not serialized correctly %u/%u\n", dataLen, size);
+    return HYP_BAD_PARAM;
+}
+
+/// The entry at `offset`, which is not behind the end of the buffer. HYP_NOT_FOUND at the end marker.
+inline HYP_ReturnStatus PlaceAt(Bytes buf, std::uint32_t offset, Place *place) {
+    const std::uint32_t remaining = static_cast<std::uint32_t>(buf.size()) - offset;
+    if (remaining < kMarkerSize) [[unlikely]]
+        return NoMarker();
+    const std::uint8_t *const at = buf.data() + offset;
+    const std::uint32_t size = Load32(at + kEntrySizeOffset);
+    if (size == 0) return HYP_NOT_FOUND;
+    if (size > remaining) [[unlikely]]
+        return BlockTooLarge(size);
+    // The room check refuses every size below 143, hence also an entry without a whole fixed part.
+    const std::uint32_t dataLen = remaining >= kEntryFixedSize ? Load32(at + kDataLenOffset) : 0;
+    if (dataLen > size || size - dataLen < kMinEntryRoom) [[unlikely]]
+        return BadLengths(dataLen, size);
+    *place = {at, size, dataLen};
+    return HYP_OK;
+}
+
+void EmitReading(const Place &place) {
+    const std::string_view name = StoredName(place.at);
+    Emit(kEntry, "deserializing %.*s: %u/%u data/serial bytes %d flag\n", static_cast<int>(name.size()),
+         name.data(), place.dataLen, place.size, Load32(place.at + kPropTypeOffset));
+}
+
+HYP_ReturnStatus CheckVersion(Bytes buf) {
+    const std::uint16_t version = Load16(buf.data() + kVersionOffset);
+    if (version == kFormatVersion) return HYP_OK;
+    Emit(kError, "Bad data: expected header version %d, actual %d\n", kFormatVersion, version);
+    return HYP_BAD_PARAM;
+}
+
+/// True when the sum of the bytes given, `given` of them, is that of the buffer and nothing else.
+bool IsSumOf(Bytes buf, KnownSum known, std::size_t given) {
+    return known.known && buf.size() == given && IsAligned(buf.size()) && buf.size() > kUnsummedSize;
+}
+
+struct FreeList {
+    void operator()(DVSData *list) const { DVSData_Free(list); }
+};
+
+/// A value up to here makes an entry whose size cannot wrap.
+constexpr std::uint32_t kMaxPlainLen = UINT32_MAX / 2;
+
+/// Append() of an entry that lies there as it is to be: one copy, and zeros for what the format leaves open.
+inline HYP_ReturnStatus AppendImage(DVSData *list, const Place &place) {
+    const NameField look = LookAtName(place.at + kNameOffset);
+    const std::string_view name(reinterpret_cast<const char *>(place.at + kNameOffset), look.len);
+    if (place.dataLen > kMaxPlainLen || Emits(kDetail)) [[unlikely]]
+        return Append(list, name, place.at + kEntryFixedSize, place.dataLen,
+                      Load32(place.at + kPropTypeOffset));
+    const std::uint32_t serialSize = EntrySize(place.dataLen);
+    auto *const entry = static_cast<DVSDataEntry *>(list->allocFn(kImageOffset + std::uint64_t{serialSize}));
+    if (!entry) [[unlikely]]
+        return HYP_NO_MEMORY;
+    ClearPadding(entry, serialSize);
+    std::memcpy(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset, place.at,
+                std::size_t{kEntryFixedSize} + place.dataLen);
+    if (!look.plain) [[unlikely]]
+        std::memset(entry->name + look.len, 0, kNameSize - look.len);
+    entry->serialSize = serialSize; // not always what the image says
+    Link(list, entry, serialSize, name);
+    return HYP_OK;
+}
+
+HYP_ReturnStatus AppendAll(DVSData *list, Bytes buf, std::uint32_t typeMask) {
+    Place place{};
+    HYP_ReturnStatus status;
+    // The offset never passes the end: each entry's size was checked against what remains.
+    for (std::uint32_t offset = kHeaderSize; (status = PlaceAt(buf, offset, &place)) == HYP_OK;
+         offset += place.size) {
+        if (Emits(kEntry)) [[unlikely]]
+            EmitReading(place);
+        if ((Load32(place.at + kPropTypeOffset) & typeMask) == 0) continue;
+        status = AppendImage(list, place);
+        if (status != HYP_OK) [[unlikely]]
+            return status;
+    }
+    return status == HYP_NOT_FOUND ? static_cast<HYP_ReturnStatus>(HYP_OK) : status;
+}
+
 } // namespace
 
 HYP_ReturnStatus CheckLengths(Bytes *buf) {
     const auto bufLen = static_cast<std::uint32_t>(buf->size());
-    Emit(kDetail, "Deserialize data, length = %d\n", bufLen);
+    if (Emits(kDetail)) [[unlikely]]
+        Emit(kDetail, "Deserialize data, length = %d\n", bufLen);
     if (bufLen < kMinBufferSize) {
         Emit(kError, "bad data: buffer size %d smaller than minimum header size\n", bufLen);
         return HYP_BAD_PARAM;
@@ -64,14 +159,9 @@ HYP_ReturnStatus BufferReader::Open(Bytes buf, KnownSum known, PartSums parts) {
     *this = {};
     buf_ = buf;
     if (const HYP_ReturnStatus status = CheckLengths(&buf_); status != HYP_OK) return status;
-    const std::uint16_t version = Load16(buf_.data() + kVersionOffset);
-    if (version != kFormatVersion) {
-        Emit(kError, "Bad data: expected header version %d, actual %d\n", kFormatVersion, version);
-        return HYP_BAD_PARAM;
-    }
+    if (const HYP_ReturnStatus status = CheckVersion(buf_); status != HYP_OK) return status;
     offset_ = kHeaderSize;
-    // A known sum is that of all bytes given, so they must be the buffer and nothing else.
-    if (known.known && buf_.size() == buf.size() && IsAligned(buf_.size()) && buf_.size() > kUnsummedSize)
+    if (IsSumOf(buf_, known, buf.size()))
         return CheckChecksum(buf_, known.sum - Sum(buf_.first(kUnsummedSize)));
     return CheckChecksum(buf_, parts == PartSums::Yes ? SumParts() : Checksum(buf_));
 }
@@ -101,33 +191,21 @@ std::uint32_t BufferReader::SumParts() {
 }
 
 HYP_ReturnStatus BufferReader::Next(EntryRef *entry) {
-    // `offset_` never passes the end: each entry's size was checked against what remains.
     offset_ += size_;
     size_ = 0;
-    const std::uint32_t remaining = static_cast<std::uint32_t>(buf_.size()) - offset_;
-    if (remaining < kMarkerSize) return NoMarker();
-    const std::uint8_t *const at = buf_.data() + offset_;
-    const std::uint32_t size = Load32(at + kEntrySizeOffset);
-    if (size == 0) return HYP_NOT_FOUND;
-    if (size > remaining) return BlockTooLarge(size);
-    // The room check refuses every size below 143, hence also an entry without a whole fixed part.
-    const std::uint32_t dataLen = remaining >= kEntryFixedSize ? Load32(at + kDataLenOffset) : 0;
-    if (dataLen > size || size - dataLen < kMinEntryRoom) {
-        Emit(kError, "bad data: data block not serialized correctly %u/%u\n", dataLen, size);
-        return HYP_BAD_PARAM;
-    }
-    size_ = size;
+    Place place{};
+    if (const HYP_ReturnStatus status = PlaceAt(buf_, offset_, &place); status != HYP_OK) return status;
+    size_ = place.size;
     *entry = {offset_,
-              size,
-              StoredName(at + kNameOffset),
-              Load32(at + kPropTypeOffset),
-              Bytes(at + kEntryFixedSize, dataLen),
+              place.size,
+              StoredName(place.at),
+              Load32(place.at + kPropTypeOffset),
+              Bytes(place.at + kEntryFixedSize, place.dataLen),
               {}};
     if (index_ < numParts_) entry->sum = {true, parts_[index_]};
     ++index_;
     if (Emits(kEntry) && !quiet_) [[unlikely]]
-        Emit(kEntry, "deserializing %.*s: %u/%u data/serial bytes %d flag\n",
-             static_cast<int>(entry->name.size()), entry->name.data(), dataLen, size, entry->propType);
+        EmitReading(place);
     return HYP_OK;
 }
 
@@ -161,6 +239,24 @@ bool InPlaceList::Next(EntryRef *entry) {
     while (reader_.Next(entry) == HYP_OK)
         if (entry->propType & typeMask_) return true;
     return false;
+}
+
+HYP_ReturnStatus ReadList(DVSData **list, Bytes buf, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn,
+                          std::uint32_t typeMask, KnownSum known) {
+    const std::size_t given = buf.size();
+    if (const HYP_ReturnStatus status = CheckLengths(&buf); status != HYP_OK) return status;
+    if (const HYP_ReturnStatus status = CheckVersion(buf); status != HYP_OK) return status;
+    const std::uint32_t checksum =
+        IsSumOf(buf, known, given) ? known.sum - Sum(buf.first(kUnsummedSize)) : Checksum(buf);
+    if (const HYP_ReturnStatus status = CheckChecksum(buf, checksum); status != HYP_OK) return status;
+    DVSData *handle = nullptr;
+    if (DVSData_Alloc(&handle, allocFn, freeFn) != HYP_OK) return HYP_NO_MEMORY;
+    std::unique_ptr<DVSData, FreeList> owner(handle);
+    if (const HYP_ReturnStatus status = AppendAll(handle, buf, typeMask); status != HYP_OK) return status;
+    if (Emits(kDetail)) [[unlikely]]
+        Emit(kDetail, "Deserialize data done, serializeSize = %d\n", handle->serialSize);
+    *list = owner.release();
+    return HYP_OK;
 }
 
 } // namespace dvs::data

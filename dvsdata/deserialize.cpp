@@ -1,8 +1,8 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Lists from serialized buffers, and single values without a list. Leans on the readers of list_internal.h.
+// The exported ways to read a buffer: into a list, or a single value without one. Leans on the readers of
+// list_internal.h.
 
 #include <cstring>
-#include <memory>
 
 #include "dvsdata/emit.h"
 #include "dvsdata/list_internal.h"
@@ -10,27 +10,9 @@
 namespace dvs::data {
 namespace {
 
-struct FreeList {
-    void operator()(DVSData *list) const { DVSData_Free(list); }
-};
-using ListOwner = std::unique_ptr<DVSData, FreeList>;
-
 /// Whoever has no buffer has one of no bytes.
 Bytes AsBytes(const void *buf, std::uint32_t bufLen) {
     return {static_cast<const std::uint8_t *>(buf), buf ? bufLen : 0};
-}
-
-HYP_ReturnStatus AppendAll(DVSData *list, BufferReader *reader, std::uint32_t typeMask) {
-    EntryRef entry;
-    HYP_ReturnStatus status;
-    while ((status = reader->Next(&entry)) == HYP_OK) {
-        if ((entry.propType & typeMask) == 0) continue;
-        status = Append(list, entry.name, entry.value.data(), static_cast<std::uint32_t>(entry.value.size()),
-                        entry.propType);
-        if (status != HYP_OK) return status;
-    }
-    if (status == HYP_NOT_FOUND) return HYP_OK;
-    return status;
 }
 
 /// Copies the value of the entry at `at`, which matched, out of a buffer that has `room` bytes behind its
@@ -71,20 +53,6 @@ HYP_ReturnStatus FindValue(Bytes buf, const char *name, void *propVal, std::uint
 }
 
 } // namespace
-
-HYP_ReturnStatus ReadList(DVSData **list, Bytes buf, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn,
-                          std::uint32_t typeMask, KnownSum known) {
-    BufferReader reader;
-    if (const HYP_ReturnStatus status = reader.Open(buf, known); status != HYP_OK) return status;
-    DVSData *handle = nullptr;
-    if (DVSData_Alloc(&handle, allocFn, freeFn) != HYP_OK) return HYP_NO_MEMORY;
-    ListOwner owner(handle);
-    if (const HYP_ReturnStatus status = AppendAll(handle, &reader, typeMask); status != HYP_OK) return status;
-    Emit(kDetail, "Deserialize data done, serializeSize = %d\n", handle->serialSize);
-    *list = owner.release();
-    return HYP_OK;
-}
-
 } // namespace dvs::data
 
 using namespace dvs::data;

@@ -11,24 +11,13 @@
 #include <new>
 
 #include "dvsdata/emit.h"
-#include "dvsdata/name_index.h"
+#include "dvsdata/list_record.h"
 
 namespace dvs::data {
 namespace {
 
 int PrintLen(std::string_view name) {
     return static_cast<int>(std::min<std::size_t>(name.size(), INT32_MAX));
-}
-
-/// A list with what the library keeps for itself behind it, in the same block.
-struct ListRecord {
-    DVSData face;
-    NameIndex names;
-};
-static_assert(offsetof(ListRecord, face) == 0);
-
-NameIndex &Names(DVSData *list) {
-    return reinterpret_cast<ListRecord *>(list)->names;
 }
 
 DVSDataEntry *Find(const DVSData *list, std::string_view name) {
@@ -56,10 +45,7 @@ void Unlink(DVSData *list, DVSDataEntry *previous, DVSDataEntry *entry) {
 /// contents.
 void FillEntry(DVSDataEntry *entry, std::uint32_t serialSize, std::string_view name, std::uint32_t dataLen,
                std::uint32_t propType) {
-    // The padding lies in the last 5 bytes of the block; for an empty value this runs into the fields set
-    // next.
-    std::memset(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset + serialSize - 8, 0, 8);
-    entry->next = nullptr;
+    ClearPadding(entry, serialSize);
     entry->serialSize = serialSize;
     StoreName(entry->name, name);
     entry->propType = propType;
@@ -101,13 +87,6 @@ HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, 
 
 } // namespace
 
-bool NameMatches(const char *field, std::string_view name) {
-    if (name.size() >= kNameSize) return std::memcmp(field, name.data(), kNameSize) == 0;
-    // Most names differ only behind a long common beginning, so the end is compared first.
-    return field[name.size()] == '\0' && (name.empty() || field[name.size() - 1] == name.back()) &&
-           std::memcmp(field, name.data(), name.size()) == 0;
-}
-
 HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
                         std::uint32_t propType) {
     const std::uint32_t serialSize = EntrySize(dataLen);
@@ -128,10 +107,7 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
     if (!entry) return HYP_NO_MEMORY;
     FillEntry(entry, serialSize, name, dataLen, propType);
     if (dataLen) std::memcpy(entry->data, data, dataLen);
-    (list->tail ? list->tail->next : list->head) = entry;
-    list->tail = entry;
-    list->serialSize += serialSize;
-    Names(list).Added(list, entry, name);
+    Link(list, entry, serialSize, name);
 
     if (Emits(kDetail)) [[unlikely]]
         EmitAdded(name, list->serialSize);

@@ -10,6 +10,7 @@
 #include <array>
 #include <cstddef>
 #include <cstdint>
+#include <cstring>
 #include <span>
 #include <string_view>
 
@@ -47,7 +48,13 @@ void EmitWriting(std::string_view name, std::uint32_t dataLen, std::uint32_t ent
 
 /// Name comparison of lookups: equal, or equal in the first 128 characters. `field` is any 128-byte name
 /// field.
-[[nodiscard]] bool NameMatches(const char *field, std::string_view name);
+[[nodiscard]] inline bool NameMatches(const char *field, std::string_view name) {
+    if (name.size() >= kNameSize) [[unlikely]]
+        return std::memcmp(field, name.data(), kNameSize) == 0;
+    // Most names differ only behind a long common beginning, so the end is compared first.
+    return field[name.size()] == '\0' && (name.empty() || field[name.size() - 1] == name.back()) &&
+           std::memcmp(field, name.data(), name.size()) == 0;
+}
 
 // ---- Writing
 // -------------------------------------------------------------------------------------------------------

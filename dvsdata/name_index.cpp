@@ -18,40 +18,28 @@ namespace {
 
 constexpr std::uint32_t kNone = UINT32_MAX;
 
-/// What the list stores of it.
-std::string_view Stored(std::string_view name) {
-    return name.substr(0, kMaxNameLen);
-}
-
 std::string_view NameOf(const DVSDataEntry *entry) {
     return {entry->name, ::strnlen(entry->name, kMaxNameLen)};
 }
 
-/// One byte of a name, drawn from its end, where names differ.
-std::uint8_t Print(std::string_view name) {
-    std::uint32_t word = 0;
-    if (name.size() >= 4)
-        word = Load32(name.data() + name.size() - 4);
-    else
-        std::memcpy(&word, name.data(), name.size());
-    return static_cast<std::uint8_t>(((word + static_cast<std::uint32_t>(name.size())) * 0x9e3779b1u) >> 24);
-}
-
-/// Eight bytes a step; spread by a multiplication, so that every bit of a name reaches the bits that are
-/// used.
+/// Eight bytes a step, the last ones once more where there are fewer; spread by a multiplication, so that
+/// every bit of a name reaches the bits that are used.
 std::uint32_t Hash(std::string_view name) {
     constexpr std::uint64_t kSpread = 0x9e3779b97f4a7c15u;
     std::uint64_t hash = name.size() * kSpread;
-    while (!name.empty()) {
+    const auto mix = [&hash](const char *at, std::size_t size) {
         std::uint64_t word = 0;
-        const std::size_t size = std::min<std::size_t>(name.size(), sizeof word);
-        if (size == sizeof word)
-            std::memcpy(&word, name.data(), sizeof word);
-        else
-            std::memcpy(&word, name.data(), size);
+        std::memcpy(&word, at, size);
         hash = (hash ^ word) * kSpread;
         hash ^= hash >> 29;
-        name.remove_prefix(size);
+    };
+    constexpr std::size_t kStep = sizeof hash;
+    if (name.size() < kStep) {
+        mix(name.data(), name.size());
+    } else {
+        for (std::size_t at = 0; at + kStep < name.size(); at += kStep)
+            mix(name.data() + at, kStep);
+        mix(name.data() + name.size() - kStep, kStep);
     }
     return static_cast<std::uint32_t>(hash >> 32);
 }
@@ -72,19 +60,35 @@ struct alignas(8) NameIndex::Table {
     std::uint32_t size; // a power of two
     std::uint32_t used; // nodes ever handed out
     std::uint32_t free; // first of those given back
+    bool inListOrder;   // nodes stand in the order of the list: none was ever given back
 
     static std::uint64_t BlockSize(std::uint32_t size) {
         return sizeof(Table) + std::uint64_t{size} * (sizeof(Bucket) + sizeof(Node));
     }
     Bucket &BucketOf(std::uint32_t hash) { return Buckets()[hash & (size - 1)]; }
     Node *Nodes() { return reinterpret_cast<Node *>(Buckets() + size); }
+    [[nodiscard]] const Node *Nodes() const { return const_cast<Table *>(this)->Nodes(); }
     [[nodiscard]] bool IsFull() const { return used == size && free == kNone; }
 
     void Clear(std::uint32_t newSize) {
         size = newSize;
         used = 0;
         free = kNone;
+        inListOrder = true;
         std::memset(static_cast<void *>(Buckets()), 0xff, size * sizeof(Bucket)); // kNone everywhere
+    }
+
+    /// A node for each entry. What the smaller table knows need not be worked out again, nor looked at.
+    void Fill(DVSData *list, std::uint32_t newSize, const Table *smaller) {
+        Clear(newSize);
+        const DVSDataEntry *last = nullptr;
+        if (smaller && smaller->inListOrder) {
+            for (std::uint32_t i = 0; i < smaller->used; ++i)
+                Add(smaller->Nodes()[i].entry, smaller->Nodes()[i].hash);
+            if (smaller->used) last = smaller->Nodes()[smaller->used - 1].entry;
+        }
+        for (DVSDataEntry *entry = last ? last->next : list->head; entry; entry = entry->next)
+            Add(entry, Hash(NameOf(entry)));
     }
 
     void Add(DVSDataEntry *entry, std::uint32_t hash) {
@@ -115,6 +119,7 @@ struct alignas(8) NameIndex::Table {
         if (bucket.last == index) bucket.last = previous;
         node.next = free;
         free = index;
+        inListOrder = false;
     }
 
     DVSDataEntry *Find(std::string_view name) {
@@ -170,12 +175,6 @@ std::uint32_t NameIndex::Candidates(std::uint8_t print) const {
     return count_ == kShortMax ? bits : bits & ((1u << count_) - 1);
 }
 
-void NameIndex::AddShort(DVSDataEntry *entry, std::string_view name) {
-    prints_[count_] = Print(name);
-    if (count_ % kStride == 0) anchors_[count_ / kStride] = entry;
-    ++count_;
-}
-
 void NameIndex::RemoveShort(const DVSDataEntry *entry) {
     std::uint32_t left = Candidates(Print(NameOf(entry)));
     while (left && At(static_cast<std::uint32_t>(std::countr_zero(left))) != entry)
@@ -189,12 +188,7 @@ void NameIndex::RemoveShort(const DVSDataEntry *entry) {
         anchors_[i] = anchors_[i]->next;
 }
 
-void NameIndex::Added(DVSData *list, DVSDataEntry *entry, std::string_view name) {
-    name = Stored(name);
-    if (mode_ == Mode::Short && count_ < kShortMax) {
-        AddShort(entry, name);
-        return;
-    }
+void NameIndex::AddedLong(DVSData *list, DVSDataEntry *entry, std::string_view name) {
     ++count_;
     if (mode_ == Mode::Hashed && !table_->IsFull())
         table_->Add(entry, Hash(name));
@@ -216,18 +210,15 @@ void NameIndex::Removing(DVSData *list, DVSDataEntry *entry) {
 }
 
 void NameIndex::BuildTable(DVSData *list) {
-    Drop(list);
-    mode_ = Mode::Walk;
     const std::uint64_t size = std::bit_ceil(std::uint64_t{count_} + 1);
-    if (size > UINT32_MAX) return;
     auto *const table =
-        static_cast<Table *>(list->allocFn(Table::BlockSize(static_cast<std::uint32_t>(size))));
-    if (!table) return;
-    table->Clear(static_cast<std::uint32_t>(size));
-    for (DVSDataEntry *entry = list->head; entry; entry = entry->next)
-        table->Add(entry, Hash(NameOf(entry)));
+        size > UINT32_MAX
+            ? nullptr
+            : static_cast<Table *>(list->allocFn(Table::BlockSize(static_cast<std::uint32_t>(size))));
+    if (table) table->Fill(list, static_cast<std::uint32_t>(size), table_);
+    Drop(list);
     table_ = table;
-    mode_ = Mode::Hashed;
+    mode_ = table ? Mode::Hashed : Mode::Walk;
 }
 
 void NameIndex::BuildShort(DVSData *list) {

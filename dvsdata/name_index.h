@@ -3,7 +3,7 @@
 #define DVSDATA_NAME_INDEX_H
 
 // Finds an entry by name without walking the list. Kept by whatever changes a list and never by a lookup, so
-// that readers without a lock stay readers; list.cpp is its only user.
+// that readers without a lock stay readers; lists hold one in their record (list_record.h).
 //
 // A short list has it in its handle: one byte drawn from each name, compared all at once, and the address of
 // every fourth entry. Nothing is allocated for that. A longer list has a hash table from the list's own
@@ -13,9 +13,11 @@
 
 #include <array>
 #include <cstdint>
+#include <cstring>
 #include <string_view>
 
 #include "dvs/data.h"
+#include "dvsdata/format.h"
 
 namespace dvs::data {
 
@@ -30,7 +32,13 @@ public:
     [[nodiscard]] DVSDataEntry *Find(const DVSData *list, std::string_view name) const;
 
     /// After `entry` was linked at the tail.
-    void Added(DVSData *list, DVSDataEntry *entry, std::string_view name);
+    void Added(DVSData *list, DVSDataEntry *entry, std::string_view name) {
+        name = name.substr(0, kMaxNameLen);
+        if (mode_ == Mode::Short && count_ < kShortMax) [[likely]]
+            AddShort(entry, name);
+        else
+            AddedLong(list, entry, name);
+    }
     /// Before `entry` is unlinked.
     void Removing(DVSData *list, DVSDataEntry *entry);
     /// Gives the table back. The index is of no use afterwards unless the list is empty.
@@ -44,7 +52,22 @@ private:
 
     [[nodiscard]] DVSDataEntry *At(std::uint32_t position) const;
     [[nodiscard]] std::uint32_t Candidates(std::uint8_t print) const;
-    void AddShort(DVSDataEntry *entry, std::string_view name);
+    /// One byte of a name, drawn from its end, where names differ.
+    static std::uint8_t Print(std::string_view name) {
+        std::uint32_t word = 0;
+        if (name.size() >= sizeof word) [[likely]]
+            word = Load32(name.data() + name.size() - sizeof word);
+        else
+            std::memcpy(&word, name.data(), name.size());
+        return static_cast<std::uint8_t>(((word + static_cast<std::uint32_t>(name.size())) * 0x9e3779b1u) >>
+                                         24);
+    }
+    void AddShort(DVSDataEntry *entry, std::string_view name) {
+        prints_[count_] = Print(name);
+        if (count_ % kStride == 0) anchors_[count_ / kStride] = entry;
+        ++count_;
+    }
+    void AddedLong(DVSData *list, DVSDataEntry *entry, std::string_view name);
     void RemoveShort(const DVSDataEntry *entry);
     void BuildTable(DVSData *list);
     void BuildShort(DVSData *list);

@@ -244,6 +244,23 @@ TEST(DataDeserialize, WritesZerosForWhatAForeignBufferLeftOpen) {
     EXPECT_EQ(Serialized(list.get()), SerializedOf(props));
 }
 
+TEST(DataDeserialize, ClearsEachByteBehindANameOfEachLength) {
+    for (std::size_t length = 0; length < 128; ++length) {
+        const Props props{{std::string(length, 'n'), "1234"}};
+        const Buffer written = SerializedOf(props);
+        for (std::size_t behind = length + 1; behind < 128; ++behind) {
+            Buffer buffer = written;
+            buffer[16 + behind] = 1;
+            Mend(&buffer);
+            const auto [status, list] = Read(buffer);
+            ASSERT_EQ(status, HYP_OK);
+            ASSERT_EQ(Serialized(list.get()), written) << length << ' ' << behind;
+            DVSDataEntry *entry = nullptr;
+            ASSERT_EQ(DVSData_Lookup(list.get(), props[0].name.c_str(), &entry), HYP_OK) << length;
+        }
+    }
+}
+
 TEST(DataDeserialize, MissingMemoryIsNoMemoryWithoutALeftover) {
     Props props;
     for (int i = 0; i < 40; ++i)

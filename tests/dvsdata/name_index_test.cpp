@@ -85,6 +85,15 @@ TEST_P(IndexedList, FollowsRemovalsFromTheBackAndTheMiddle) {
     }
 }
 
+TEST_P(IndexedList, GrowsInListOrderBehindRemovals) {
+    const ListPtr list = ListOfSize(GetParam());
+    for (std::uint32_t i = 0; i < GetParam(); i += 4)
+        ASSERT_EQ(DVSData_Remove(list.get(), NameAt(i).c_str()), HYP_OK);
+    for (std::uint32_t i = 0; i < 2 * GetParam(); ++i)
+        Append(list.get(), {NameAt(i), "twin"});
+    ExpectFindsFirstMatches(list.get());
+}
+
 TEST_P(IndexedList, FollowsUpdatesToTheTail) {
     const ListPtr list = ListOfSize(GetParam());
     for (std::uint32_t i = 0; i < GetParam(); i += 2)
