@@ -244,35 +244,37 @@ namespace dvs::config {
 void PropSaver::Begin(configstore::Object *object, uint32_t propClass) {
     object_ = object;
     propClass_ = propClass;
-    lastName_ = nullptr;
+    lastWay_ = RowIndex::kOtherWay;
     index_ = &indexes_[propClass];
-    index_->Refresh(GetConfigMap(static_cast<int>(propClass)), DefaultType(propClass));
+    if (!index_->IsBuilt()) index_->Build(GetConfigMap(static_cast<int>(propClass)), DefaultType(propClass));
     startMs_ = dvsConfigStoreNowMs();
 }
 
 int32_t PropSaver::Save(const char *key, const void *value, uint32_t len, uint32_t propType) {
-    const auto *row = index_->Find(key);
-    if (!row) return UnknownKey(key);
-    if (Tracing()) LogTrace("Compare %s : %s success\n", key, row->key);
+    const RowIndex::Found found = index_->Find(key);
+    if (!found.row) return UnknownKey(key);
+    if (Tracing()) LogTrace("Compare %s : %s success\n", key, found.row->key);
     configstore::Object *parent = object_;
-    if (const int32_t status = ParentOf(*row, &parent)) return FailedToReach(key, status);
-    return RunSave(*row, {object_, parent, Leaf(*row), Bytes(value, len), key, propClass_, propType});
+    if (const int32_t status = ParentOf(found, &parent)) return FailedToReach(key, status);
+    return RunSave(*found.row,
+                   {object_, parent, Leaf(*found.row), Bytes(value, len), key, propClass_, propType});
 }
 
-int32_t PropSaver::ParentOf(const DVSProp2ConfigEntry &row, configstore::Object **parent) {
-    constexpr uint32_t kRememberedDepth = 2;
-    if (Depth(row) != kRememberedDepth) {
+int32_t PropSaver::ParentOf(const RowIndex::Found &found, configstore::Object **parent) {
+    const auto &row = *found.row;
+    if (found.way == RowIndex::kOtherWay) {
         // A row that writes the remembered sub-object itself might make another of it.
-        if (Depth(row) < kRememberedDepth && lastName_ && std::strcmp(lastName_, row.path[0]) == 0)
-            lastName_ = nullptr;
+        if (lastWay_ != RowIndex::kOtherWay && Depth(row) <= 1 && std::strcmp(lastName_, row.path[0]) == 0)
+            lastWay_ = RowIndex::kOtherWay;
         return GetSubObjectByPath(row.path, Depth(row), object_, parent, true);
     }
-    if (lastName_ && std::strcmp(lastName_, row.path[0]) == 0) {
+    if (found.way == lastWay_) {
         *parent = lastParent_;
         return 0;
     }
-    const int32_t status = GetSubObjectByPath(row.path, kRememberedDepth, object_, parent, true);
-    lastName_ = status ? nullptr : row.path[0];
+    const int32_t status = GetSubObjectByPath(row.path, Depth(row), object_, parent, true);
+    lastWay_ = status ? RowIndex::kOtherWay : found.way;
+    lastName_ = row.path[0];
     lastParent_ = *parent;
     return status;
 }

@@ -25,60 +25,68 @@ const DVSProp2ConfigEntry *FindRow(const DVSProp2ConfigEntry *table, const char 
     return nullptr;
 }
 
-void RowIndex::Refresh(const DVSProp2ConfigEntry *table, uint32_t defaultType) {
-    if (table == table_ && defaultType == defaultType_ && IsCurrent()) return;
+void RowIndex::Build(const DVSProp2ConfigEntry *table, uint32_t defaultType) {
     table_ = table;
     defaultType_ = defaultType;
-    Build();
-}
-
-// By content: a key may have been rewritten where it stands.
-bool RowIndex::IsCurrent() const {
-    if (!usable_) return false;
-    for (uint32_t i = 0; i < rowNum_; ++i) {
-        const auto &row = table_[i];
-        if (!row.key || row.converterType != known_[i].type || std::strcmp(row.key, known_[i].key) != 0)
-            return false;
-    }
-    return hasDefault_ || !table_[rowNum_].key;
-}
-
-void RowIndex::Build() {
+    rowNum_ = last_ = 0;
+    hasDefault_ = usable_ = false;
+    behind_ = {};
     slots_ = {};
-    rowNum_ = 0;
-    hasDefault_ = false;
-    usable_ = false;
-    for (const auto *row = table_; row->key && !hasDefault_; ++row) {
-        const std::size_t length = strnlen(row->key, kMaxKeySize);
-        if (rowNum_ == kMaxRows || length == kMaxKeySize) return;
-        std::memcpy(known_[rowNum_].key, row->key, length + 1);
-        known_[rowNum_].type = row->converterType;
+    for (const auto *row = table; row->key && !hasDefault_; ++row) {
+        if (rowNum_ == kMaxRows) return;
         hasDefault_ = row->converterType == defaultType_;
+        ways_[rowNum_] = WayOf(rowNum_);
         if (!hasDefault_) Insert(rowNum_);
         ++rowNum_;
     }
     usable_ = true;
 }
 
+uint8_t RowIndex::WayOf(uint32_t row) const {
+    constexpr uint32_t kDepth = 2;
+    if (table_[row].depth != kDepth) return kOtherWay;
+    for (uint32_t i = 0; i < row; ++i) {
+        if (table_[i].depth == kDepth && std::strcmp(table_[i].path[0], table_[row].path[0]) == 0)
+            return ways_[i];
+    }
+    return static_cast<uint8_t>(row);
+}
+
 // The first row of a key stays the one that is found.
 void RowIndex::Insert(uint32_t row) {
-    const char *key = known_[row].key;
+    const char *key = table_[row].key;
     for (uint32_t slot = HashOf(key, std::strlen(key));; slot = (slot + 1) % kSlotNum) {
         if (slots_[slot] == 0) {
             slots_[slot] = static_cast<uint8_t>(row + 1);
             return;
         }
-        if (std::strcmp(known_[slots_[slot] - 1U].key, key) == 0) return;
+        if (std::strcmp(table_[slots_[slot] - 1U].key, key) == 0) return;
     }
 }
 
-const DVSProp2ConfigEntry *RowIndex::Find(const char *key) const {
-    if (!usable_) return FindRow(table_, key, defaultType_);
+// The row's number, or rowNum_.
+uint32_t RowIndex::Search(const char *key) const {
     for (uint32_t slot = HashOf(key, std::strlen(key)); slots_[slot] != 0; slot = (slot + 1) % kSlotNum) {
         const uint32_t row = slots_[slot] - 1U;
-        if (std::strcmp(known_[row].key, key) == 0) return &table_[row];
+        if (std::strcmp(table_[row].key, key) == 0) return row;
     }
-    return hasDefault_ ? &table_[rowNum_ - 1] : nullptr;
+    return hasDefault_ ? rowNum_ - 1 : rowNum_;
+}
+
+RowIndex::Found RowIndex::Find(const char *key) {
+    if (!usable_) return {FindRow(table_, key, defaultType_), kOtherWay};
+    uint8_t &guess = behind_[last_];
+    // A key that only the DEFAULT row takes may be anything: that row is never guessed.
+    if (guess == 0 || std::strcmp(table_[guess - 1U].key, key) != 0) {
+        const uint32_t row = Search(key);
+        if (row == rowNum_) return {nullptr, kOtherWay};
+        last_ = row;
+        if (hasDefault_ && row == rowNum_ - 1) return {&table_[row], ways_[row]};
+        guess = static_cast<uint8_t>(row + 1);
+        return {&table_[row], ways_[row]};
+    }
+    last_ = guess - 1U;
+    return {&table_[last_], ways_[last_]};
 }
 
 } // namespace dvs::config

@@ -4,7 +4,8 @@
 
 // SaveProp (prop_frame.h) for the many properties of many objects, with the same results: rows come out of an
 // index, a path that the property before had as well is not walked again, and the clock is read once an
-// object. For the save.
+// object. For the save, which makes one for each switch: the mapping tables must stay as they are while a
+// saver lives.
 
 #include <cstdint>
 
@@ -23,7 +24,7 @@ public:
     void End();
 
 private:
-    [[nodiscard]] int32_t ParentOf(const DVSProp2ConfigEntry &row, configstore::Object **parent);
+    [[nodiscard]] int32_t ParentOf(const RowIndex::Found &found, configstore::Object **parent);
 
     static constexpr uint32_t kClassNum = 3;
 
@@ -32,7 +33,8 @@ private:
     configstore::Object *object_ = nullptr;
     uint32_t propClass_ = 0;
     int64_t startMs_ = 0;
-    const char *lastName_ = nullptr; // sub-object of `object_` that was reached last
+    uint8_t lastWay_ = RowIndex::kOtherWay; // to the sub-object of `object_` that was reached last
+    const char *lastName_ = nullptr;
     configstore::Object *lastParent_ = nullptr;
 };
 

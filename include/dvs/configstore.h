@@ -140,7 +140,7 @@ _Static_assert(sizeof(DVSProp2ConfigEntry) == 664, "the rows are exported data")
 
 /*
  * The mapping tables, read from their first row to the end row: a save takes the first row of a key, a load
- * goes through them in order. Ordinary writable data: a changed row counts from the next object on; nothing
+ * goes through them in order. Ordinary writable data: a changed row counts from the next switch on; nothing
  * locks them.
  */
 extern DVSProp2ConfigEntry dvsGlobalProp2Config[], dvsPortProp2Config[], dvsHostProp2Config[];
