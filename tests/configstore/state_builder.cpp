@@ -57,6 +57,11 @@ uint32_t Number(const Bytes &value) {
     return number;
 }
 
+void ReadClassName(const Bytes &field, Switch *sw) {
+    sw->className = reinterpret_cast<const char *>((field + Bytes{0}).data());
+    sw->classField = field;
+}
+
 Switch ParseSwitch(const Prop &entry) {
     Switch sw;
     sw.id = entry.key;
@@ -64,7 +69,7 @@ Switch ParseSwitch(const Prop &entry) {
         if (field.key == "switchVersion")
             sw.version = Number(field.value);
         else if (field.key == "className")
-            sw.className = reinterpret_cast<const char *>(field.value.data());
+            ReadClassName(field.value, &sw);
         else if (field.key == "maxPorts")
             sw.maxPorts = Number(field.value);
         else if (field.key == "globalPropList")

@@ -42,6 +42,7 @@ struct Switch {
     uint32_t maxPorts = 64;
     Props global, host;
     std::vector<Port> ports;
+    Bytes classField = {}; ///< the class name's whole field; filled in by Parse only
 };
 
 /// The version property, without which no saved switch can be loaded.

@@ -5,10 +5,11 @@
 #include <algorithm>
 #include <set>
 
-#include "configstore/converters/round_trip_model.h"
+#include "configstore/converters/converter_fixture.h"
 #include "configstore/converters/table.h"
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/value_generator.h"
+#include "configstore/round_trip/values.h"
 
 using namespace converter_test;
 
@@ -158,7 +159,7 @@ TEST_F(StoreFailures, AreTheResultOrStatedNotToMatter) {
             for (int i = 0; i < 8; ++i) {
                 auto value = generator.Sound(*record);
                 if (row->converterType == 15) value = Bytes().U32(9);
-                if (!HasDistinctKeys(row->converterType, value)) continue;
+                if (!round_trip::HasDistinctKeys(row->converterType, value)) continue;
                 FailEach(*row, true, [&] { return Save(propClass, row->key, value); });
                 Renew(*row);
                 ASSERT_EQ(0, Save(propClass, row->key, value)) << row->key;

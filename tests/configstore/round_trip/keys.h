@@ -1,0 +1,34 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef TESTS_CONFIGSTORE_ROUND_TRIP_KEYS_H
+#define TESTS_CONFIGSTORE_ROUND_TRIP_KEYS_H
+
+// The mapped keys as the model sees them: in the order of a load, with the place in the store that some share
+// and the switches that load them. A table of its own; a test compares its keys with the library's.
+
+#include <cstdint>
+#include <span>
+
+namespace round_trip {
+
+enum class LoadsOn : uint8_t {
+    kAll,
+    kEtherswitch,      // class code 0
+    kVswitches,        // the other two
+    kVswitch,          // class code 1 alone
+    kPrivateVlanOwner, // etherswitches and vswitches below the overlay versions
+    kPrivateVlanOther, // the rest
+    kUplinkPorts,
+};
+
+struct Key {
+    const char *name;
+    uint32_t type;
+    const char *place;
+    LoadsOn loads;
+};
+
+std::span<const Key> KeysOf(uint32_t propClass);
+
+} // namespace round_trip
+
+#endif
