@@ -5,16 +5,14 @@
 
 #include <algorithm>
 #include <cerrno>
-#include <cstring>
 #include <new>
 #include <string_view>
 
 #include <sys/resource.h>
 #include <sys/socket.h>
-#include <sys/stat.h>
-#include <sys/un.h>
 #include <unistd.h>
 
+#include "emulator/listen.h"
 #include "kernel/request.h"
 
 namespace dvs::emulator {
@@ -43,45 +41,6 @@ std::size_t RoomForClients() {
     return static_cast<std::size_t>(std::min<rlim_t>(usable, kMaxClients));
 }
 
-bool Failed(const std::string &what, std::string *why) {
-    *why = what + ": " + std::strerror(errno);
-    return false;
-}
-
-/// True when the path is free for a new socket: there is nothing, or a socket that nobody listens at.
-bool FreePath(const sockaddr_un &address, std::string *why) {
-    struct stat status {};
-    if (lstat(address.sun_path, &status) != 0) return errno == ENOENT || Failed(address.sun_path, why);
-    if (!S_ISSOCK(status.st_mode)) {
-        *why = std::string(address.sun_path) + " is there and is no socket";
-        return false;
-    }
-    const int probe = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
-    if (probe == -1) return Failed("socket", why);
-    const bool answered = connect(probe, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
-    const int error = errno;
-    close(probe);
-    if (answered || error != ECONNREFUSED) {
-        *why = std::string(address.sun_path) + " is in use";
-        return false;
-    }
-    return unlink(address.sun_path) == 0 || errno == ENOENT || Failed(address.sun_path, why);
-}
-
-int ListenAt(const sockaddr_un &address, std::string *why) {
-    const int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
-    if (fd == -1) return Failed("socket", why), -1;
-    // The mask makes the mode 0600 from the first moment.
-    const mode_t mask = umask(0177);
-    const bool bound = bind(fd, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
-    const bool listens = bound && listen(fd, SOMAXCONN) == 0;
-    umask(mask);
-    if (listens) return fd;
-    (void)Failed(address.sun_path, why);
-    close(fd);
-    return -1;
-}
-
 /// Room for a large reply to leave in few pieces. Beyond the system's limit where that is allowed.
 void WidenSendBuffer(int fd) {
     const int size = kSendBuffer;
@@ -107,15 +66,7 @@ Server::~Server() {
 }
 
 bool Server::Listen(const std::string &path, std::string *why) {
-    sockaddr_un address{};
-    address.sun_family = AF_UNIX;
-    if (path.empty() || path.size() >= sizeof address.sun_path) {
-        *why = "a socket's path has 1 to " + std::to_string(sizeof address.sun_path - 1) + " characters";
-        return false;
-    }
-    std::memcpy(address.sun_path, path.c_str(), path.size());
-    if (!FreePath(address, why)) return false;
-    listenFd_ = ListenAt(address, why);
+    listenFd_ = ListenAt(path, why);
     path_ = path;
     return listenFd_ != -1;
 }

@@ -23,7 +23,7 @@ public:
     Server(const Server &) = delete;
     Server &operator=(const Server &) = delete;
 
-    /// Listens at `path`, mode 0600; a socket that nobody listens at any more is replaced. False with `*why`.
+    /// Listens at `path` (listen.h). False with `*why`.
     [[nodiscard]] bool Listen(const std::string &path, std::string *why);
 
     /// Serves until `stopFd` becomes readable, then finishes the requests in hand.

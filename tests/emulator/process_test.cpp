@@ -1,10 +1,14 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // The emulator as a program: its options, its state file, its end, `run`.
 
+#include <algorithm>
+#include <array>
+#include <barrier>
 #include <csignal>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
+#include <thread>
 
 #include <gtest/gtest.h>
 #include <sys/socket.h>
@@ -16,6 +20,7 @@
 #include "dvs/dvs.h"
 #include "emulator/emulator_process.h"
 #include "emulator/hyp_support.h"
+#include "emulator/listen.h"
 
 namespace dvs::test {
 namespace {
@@ -95,6 +100,65 @@ TEST_F(EmulatorSocket, OfADeadEmulatorIsReplacedOfALivingOneNot) {
     first.Stop(SIGKILL);
     ASSERT_TRUE(std::filesystem::exists(socket_));
     EXPECT_TRUE(first.Start(socket_));
+}
+
+// A socket that nobody listens at, as a killed emulator leaves it.
+void LeaveStaleSocket(const std::string &path) {
+    std::string why;
+    const int fd = emulator::ListenAt(path, &why);
+    ASSERT_NE(fd, -1) << why;
+    close(fd);
+}
+
+TEST_F(EmulatorSocket, OfADeadEmulatorIsTakenByOneOfManyAtTheSameInstant) {
+    constexpr std::size_t kStarters = 8;
+    for (unsigned round = CountFromEnvironment("DVS_START_ROUNDS", 100); round > 0; --round) {
+        LeaveStaleSocket(socket_);
+        std::array<int, kStarters> fds{};
+        std::array<std::string, kStarters> why;
+        std::barrier start(static_cast<std::ptrdiff_t>(kStarters));
+        {
+            std::vector<std::jthread> threads;
+            for (std::size_t i = 0; i < kStarters; ++i)
+                threads.emplace_back([&, i] {
+                    start.arrive_and_wait();
+                    fds[i] = emulator::ListenAt(socket_, &why[i]);
+                });
+        }
+        EXPECT_EQ(std::ranges::count(fds, -1), kStarters - 1) << round;
+        for (std::size_t i = 0; i < kStarters; ++i) {
+            if (fds[i] == -1)
+                EXPECT_NE(why[i].find("is in use"), std::string::npos) << why[i];
+            else
+                close(fds[i]);
+        }
+    }
+}
+
+TEST_F(EmulatorSocket, OfADeadEmulatorGoesToOneOfManyThatStartAtOnce) {
+    constexpr int kStarters = 8;
+    for (unsigned round = CountFromEnvironment("DVS_START_ROUNDS", 5); round > 0; --round) {
+        {
+            EmulatorProcess dead;
+            ASSERT_TRUE(dead.Start(socket_));
+            dead.Stop(SIGKILL);
+        }
+        std::array<EmulatorProcess, kStarters> starters;
+        std::array<bool, kStarters> isServing{};
+        {
+            std::vector<std::jthread> threads;
+            for (std::size_t i = 0; i < kStarters; ++i)
+                threads.emplace_back([&, i] { isServing[i] = starters[i].Start(socket_); });
+        }
+        ASSERT_EQ(std::ranges::count(isServing, true), 1) << round;
+        // And it is the one at the path: a second look finds it.
+        EXPECT_NE(Emulator({"--socket", socket_}).err.find("is in use"), std::string::npos);
+        for (EmulatorProcess &starter : starters)
+            if (starter.IsRunning()) {
+                EXPECT_EQ(starter.Stop(SIGTERM), 0);
+            }
+        ASSERT_FALSE(std::filesystem::exists(socket_));
+    }
 }
 
 TEST_F(EmulatorSocket, NeverReplacesAnotherFile) {

@@ -1,0 +1,112 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+// Making the socket (listen.h). Called by Server, which closes and removes it.
+
+#include "emulator/listen.h"
+
+#include <cerrno>
+#include <chrono>
+#include <cstring>
+#include <thread>
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/socket.h>
+#include <sys/stat.h>
+#include <sys/un.h>
+#include <unistd.h>
+
+namespace dvs::emulator {
+
+namespace {
+
+constexpr std::chrono::seconds kTurn{10}; // others need a moment only; who holds it longer is no emulator
+constexpr std::chrono::milliseconds kPause{2};
+
+bool Failed(const std::string &what, std::string *why) {
+    *why = what + ": " + std::strerror(errno);
+    return false;
+}
+
+/// True when the path is free for a new socket: there is nothing, or a socket that nobody listens at.
+bool FreePath(const sockaddr_un &address, std::string *why) {
+    struct stat status {};
+    if (lstat(address.sun_path, &status) != 0) return errno == ENOENT || Failed(address.sun_path, why);
+    if (!S_ISSOCK(status.st_mode)) {
+        *why = std::string(address.sun_path) + " is there and is no socket";
+        return false;
+    }
+    const int probe = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
+    if (probe == -1) return Failed("socket", why);
+    const bool answered = connect(probe, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
+    const int error = errno;
+    close(probe);
+    if (answered || error != ECONNREFUSED) {
+        *why = std::string(address.sun_path) + " is in use";
+        return false;
+    }
+    return unlink(address.sun_path) == 0 || errno == ENOENT || Failed(address.sun_path, why);
+}
+
+int BindAt(const sockaddr_un &address, std::string *why) {
+    const int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
+    if (fd == -1) return Failed("socket", why), -1;
+    // The mask makes the mode 0600 from the first moment.
+    const mode_t mask = umask(0177);
+    const bool bound = bind(fd, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
+    const bool listens = bound && listen(fd, SOMAXCONN) == 0;
+    umask(mask);
+    if (listens) return fd;
+    (void)Failed(address.sun_path, why);
+    close(fd);
+    return -1;
+}
+
+/// The directory of the socket, locked. Between looking at a socket that nobody listens at and putting
+/// another one in its place lies a moment in which somebody else may have done the same: his, too, would be
+/// unlinked. The lock is on the directory so that nothing is left behind in it.
+class DirectoryTurn {
+public:
+    DirectoryTurn() = default;
+    ~DirectoryTurn() {
+        if (fd_ != -1) close(fd_);
+    }
+    DirectoryTurn(const DirectoryTurn &) = delete;
+    DirectoryTurn &operator=(const DirectoryTurn &) = delete;
+
+    [[nodiscard]] bool Take(const std::string &path, std::string *why) {
+        const std::size_t slash = path.rfind('/');
+        const std::string directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
+        fd_ = open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+        if (fd_ == -1) return Failed(directory, why);
+        const auto end = std::chrono::steady_clock::now() + kTurn;
+        while (flock(fd_, LOCK_EX | LOCK_NB) != 0) {
+            if (errno != EWOULDBLOCK && errno != EINTR) return Failed(directory, why);
+            if (std::chrono::steady_clock::now() >= end) {
+                *why = directory + " is locked by another program";
+                return false;
+            }
+            std::this_thread::sleep_for(kPause);
+        }
+        return true;
+    }
+
+private:
+    int fd_ = -1;
+};
+
+} // namespace
+
+int ListenAt(const std::string &path, std::string *why) {
+    sockaddr_un address{};
+    address.sun_family = AF_UNIX;
+    if (path.empty() || path.size() >= sizeof address.sun_path) {
+        *why = "a socket's path has 1 to " + std::to_string(sizeof address.sun_path - 1) + " characters";
+        return -1;
+    }
+    std::memcpy(address.sun_path, path.c_str(), path.size());
+    DirectoryTurn turn;
+    if (!turn.Take(path, why) || !FreePath(address, why)) return -1;
+    return BindAt(address, why);
+}
+
+} // namespace dvs::emulator
