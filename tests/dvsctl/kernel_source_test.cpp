@@ -23,7 +23,11 @@ class KernelSource : public KernelTest {};
 
 TEST_F(KernelSource, ShowsAndVerifiesTheLiveState) {
     EXPECT_EQ(Json(Kernel({"show", "kernel:", "--json"})).at("switches").as_array().size(), 2u);
-    EXPECT_NE(Kernel({"verify", "kernel:"}).out.find("sound"), std::string::npos);
+    EXPECT_EQ(Kernel({"verify", "kernel:"}).out.find("kernel: sound, 2 switches"), 0u);
+    EXPECT_EQ(Kernel({"show", "kernel:"}).out.find("kernel: 2 switches"), 0u);
+    EXPECT_EQ(Kernel({"verify", At("start.db")}).out.find("file:" + At("start.db") + ": sound"), 0u);
+    const Result planned = Kernel({"copy", "--dry-run", At("start.db"), "kernel:"});
+    EXPECT_EQ(planned.out.find("::"), std::string::npos) << planned.out;
     EXPECT_EQ(Kernel({"show", "kernel:", "--switch", "none"}).status, 4);
     EXPECT_EQ(Kernel({"show", "kernel:1"}).status, 2);
 }

@@ -88,8 +88,7 @@ void ReportPlan(Context &context, const Outcome &outcome, const Target &target,
     else if (changes.empty())
         out.Write(fmt::format("would change nothing in {}\n", ShowName(outcome.to.Name())));
     else
-        out.Write(
-            fmt::format("would change {}: {}\n", ShowName(outcome.to.Name()), ShowChangeCount(changes)));
+        out.Write(fmt::format("would change {} {}\n", ShowLead(outcome.to), ShowChangeCount(changes)));
     WriteChanges(changes, context.options, out);
     out.Remark("nothing was written (--dry-run)\n");
 }

@@ -215,7 +215,7 @@ Exit RunShow(Context &context) {
     for (const Switch &sw : loaded.state.switches)
         tree.Add(sw);
     if (!options.noHeadings && !options.columns)
-        context.out.Remark(fmt::format("{}: {}\n", ShowName(source->Name()), ShowCount(count)));
+        context.out.Remark(fmt::format("{} {}\n", ShowLead(*source), ShowCount(count)));
     if (count.switches > 0) tree.Write(context.out);
     return Exit::Done;
 }

@@ -50,6 +50,11 @@ Error AbsentError(const Source &source) {
         .Try("check the name; with --if-exists an absent source is no error");
 }
 
+std::string ShowLead(const Source &source) {
+    const std::string name = ShowName(source.Name());
+    return name.ends_with(':') ? name : name + ":";
+}
+
 StateBytes ReadState(Context &context, Source &source, ReadMode mode) {
     if (auto state = source.Read(context, mode)) return std::move(*state);
     if (context.options.ifExists) return {EncodeList({}), {}};

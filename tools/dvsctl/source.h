@@ -96,6 +96,10 @@ std::unique_ptr<Source> OpenSource(std::string_view text);
 /// The error of a verb that needs a state where there is none.
 Error AbsentError(const Source &source);
 
+/// The source's name at the head of a line about it, for display: "state.db:", and "kernel:", whose colon is
+/// there already.
+std::string ShowLead(const Source &source);
+
 /// Reads; where there is nothing, throws Error(Failed), or with --if-exists gives an empty state.
 StateBytes ReadState(Context &context, Source &source, ReadMode mode = ReadMode::Strict);
 

@@ -40,11 +40,11 @@ void WriteReport(Context &context, const Source &source, const std::optional<Err
     Output &out = context.out;
     const StateCount sound = ToCount(verdict.sound), all = ToCount(verdict.all);
     if (!damage) {
-        out.Remark(fmt::format("{}: {}, {} in {}\n", ShowName(source.Name()), out.Paint(Style::Good, "sound"),
+        out.Remark(fmt::format("{} {}, {} in {}\n", ShowLead(source), out.Paint(Style::Good, "sound"),
                                ShowCount(all), Count(size, "byte")));
         return;
     }
-    out.Write(fmt::format("{}: {}\n", ShowName(source.Name()), out.Paint(Style::Bad, damage->title)));
+    out.Write(fmt::format("{} {}\n", ShowLead(source), out.Paint(Style::Bad, damage->title)));
     std::string where = Escape(damage->path);
     if (damage->offset)
         where += fmt::format("{}byte offset {} (0x{:x})", where.empty() ? "" : ", ", *damage->offset,
