@@ -11,6 +11,7 @@
 #include <unistd.h>
 
 #include "dvs/configstore.h"
+#include "dvs/status.h"
 #include "store_fixture.h"
 
 namespace {
@@ -115,21 +116,58 @@ TEST_F(StoreTrouble, CheckAndVerifyNameADocumentThatBreaksTheSchema) {
     EXPECT_NE(verified.err.find("max_mtu"), std::string::npos) << verified.err;
 }
 
-TEST_F(StoreTrouble, WhatAPlainSaveOfADamagedBufferLostComesBack) {
+// Buffers that the checked save refuses and the plain one takes, emptying the store as it is stated to.
+struct UnsoundRow {
+    const char *what;
+    HYP_ReturnStatus refusal; ///< of the checked save
+    std::string (*make)(const std::string &sound);
+};
+
+std::string StateOf(int switches) {
+    std::vector<dvs::ctl::NewEntry> entries;
+    for (int i = 0; i < switches; ++i)
+        entries.push_back(MakeSwitch("s" + std::to_string(i), {}, {}, {}));
+    return std::string(dvs::ctl::AsText(dvs::ctl::EncodeList(entries)));
+}
+
+const UnsoundRow kUnsound[] = {
+    {"no state at all", HYP_BAD_PARAM, [](const std::string &) { return std::string("no state at all"); }},
+    {"cut in its header", HYP_BAD_PARAM, [](const std::string &sound) { return sound.substr(0, 10); }},
+    {"cut in the middle", HYP_BAD_PARAM, [](const std::string &sound) { return sound.substr(0, 600); }},
+    {"a wrong byte in a name", HYP_BAD_CHECKSUM,
+     [](const std::string &sound) {
+         std::string damaged = sound;
+         damaged[damaged.find("production")] ^= 1;
+         return damaged;
+     }},
+    {"more switches than the table holds", HYP_LIMIT_EXCEEDED,
+     [](const std::string &) { return StateOf(33); }},
+};
+
+TEST_F(StoreTrouble, WhatAPlainSaveOfAnUnsoundBufferLostComesBackAndACheckedOneLosesNothing) {
     Save();
     const std::string alpha = Document("alpha"), beta = Document("beta");
     ASSERT_EQ(setenv("DVS_CONFIGSTORE", store_.c_str(), 1), 0);
-    const std::string damaged = "no state at all";
-    // The plain save takes what does not load for a state without switches.
-    ASSERT_EQ(DVSState_SaveBufToConfigStore(damaged.data(), static_cast<uint32_t>(damaged.size())), 0);
-    EXPECT_EQ(Json(Ctl({"store", "list", "--json"})).at("objects"), boost::json::array());
-    const auto events = Json(Ctl({"store", "history", "--json"})).at("events").as_array();
-    ASSERT_FALSE(events.empty());
-    EXPECT_EQ(events[0].at("event"), "deleted");
-    const auto revision = std::to_string(events[0].at("revision").as_int64() - 1);
-    ASSERT_EQ(Ctl({"store", "restore", "--revision", revision}).status, 0);
-    EXPECT_EQ(Document("alpha"), alpha);
-    EXPECT_EQ(Document("beta"), beta);
+    for (const UnsoundRow &row : kUnsound) {
+        SCOPED_TRACE(row.what);
+        const std::string buffer = row.make(Get("site.db"));
+        const auto size = static_cast<uint32_t>(buffer.size());
+        const std::string before = Get("store.db");
+        EXPECT_EQ(DVSState_SaveBufToConfigStoreChecked(buffer.data(), size, nullptr),
+                  static_cast<int32_t>(row.refusal));
+        EXPECT_EQ(Get("store.db"), before);
+
+        // The plain save takes what does not load for a state without switches.
+        ASSERT_EQ(DVSState_SaveBufToConfigStore(buffer.data(), size), 0);
+        EXPECT_EQ(Json(Ctl({"store", "list", "--json"})).at("objects"), boost::json::array());
+        const auto events = Json(Ctl({"store", "history", "--json"})).at("events").as_array();
+        ASSERT_FALSE(events.empty());
+        EXPECT_EQ(events[0].at("event"), "deleted");
+        const auto revision = std::to_string(events[0].at("revision").as_int64() - 1);
+        ASSERT_EQ(Ctl({"store", "restore", "--revision", revision}).status, 0);
+        EXPECT_EQ(Document("alpha"), alpha);
+        EXPECT_EQ(Document("beta"), beta);
+    }
 }
 
 TEST_F(StoreTrouble, FullDiskLeavesTheOldContent) {
