@@ -97,6 +97,32 @@ TEST_F(KernelVerbs, WhatIsThereAlreadyOrNotThereIsAllowedWhenAskedFor) {
     EXPECT_FALSE(Json(absent).as_object().contains("value"));
 }
 
+TEST_F(KernelVerbs, ASwitchLeftWithoutItsVersionPropertyIsWarnedAboutWithTheCommandThatMendsIt) {
+    Words add = {"switch", "add", "it's", "--class", "portset", "--max-ports", "5", "--switch-version", "8"};
+    const Result added = Verb(add);
+    EXPECT_EQ(added.status, 0);
+    EXPECT_NE(added.err.find("warning: switch it's has no property com.orbeno.common.version"),
+              std::string::npos)
+        << added.err;
+    const Result saved = Kernel({"copy", "kernel:", "store:"});
+    EXPECT_NE(saved.err.find("warning: "), std::string::npos) << saved.err;
+    EXPECT_EQ(Kernel({"show", "store:"}).status, 7);
+
+    // The command it names, as a shell takes it.
+    const std::string mend = "dvsctl kernel prop set 'it'\\''s' com.orbeno.common.version 8 --as number";
+    EXPECT_NE(added.err.find(mend), std::string::npos) << added.err;
+    ASSERT_EQ(Verb({"prop", "set", "it's", "com.orbeno.common.version", "8", "--as", "number"}).status, 0);
+    ASSERT_EQ(Verb({"prop", "set", "alpha", "com.orbeno.common.version", "8", "--as", "number"}).status, 0);
+    const Result again = Kernel({"copy", "kernel:", "store:"});
+    EXPECT_EQ(again.err, "");
+    EXPECT_EQ(Kernel({"show", "store:"}).status, 0);
+
+    const Result cleared = Verb({"prop", "clear", "it's", "com.orbeno.common.version", "--json"});
+    EXPECT_EQ(Json(cleared).at("warnings").as_array().size(), 1u);
+    add.insert(add.end(), {"--may-exist", "--json"}); // left as it is
+    EXPECT_FALSE(Json(Verb(add)).as_object().contains("warnings"));
+}
+
 TEST_F(KernelVerbs, AssociationsAreMadeAndTakenBack) {
     const std::string before = Everything();
     EXPECT_EQ(Verb({"switch", "associate", "alpha", "--dry-run"}).status, 0);

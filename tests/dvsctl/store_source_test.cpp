@@ -146,6 +146,29 @@ TEST_F(StoreSource, DesiredIsReadBesideTheCurrentAndNotWritten) {
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store-desired:", "--dry-run"}).status, 2);
 }
 
+TEST_F(StoreSource, SaveThatMakesTheStoreUnloadableSaysSoAndHowToMendIt) {
+    PutState("bare.db", EncodeList(std::vector<NewEntry>{MakeSwitch("bare one", {}, {}, {})}));
+    for (const char *mode : {"--dry-run", "--may-exist"}) {
+        const Result saved = Ctl({"copy", At("bare.db"), "store:", mode, "--quiet"});
+        EXPECT_EQ(saved.status, 0);
+        EXPECT_NE(saved.err.find("warning: "), std::string::npos) << saved.err;
+        EXPECT_NE(saved.err.find("switch bare one has no property com.orbeno.common.version"),
+                  std::string::npos)
+            << saved.err;
+        EXPECT_NE(saved.err.find("dvsctl kernel prop set 'bare one' com.orbeno.common.version 8 --as number"),
+                  std::string::npos)
+            << saved.err;
+    }
+    EXPECT_EQ(Ctl({"show", "store:"}).status, 7);
+    const auto document = Json(Ctl({"copy", At("bare.db"), "store:", "--json"}));
+    ASSERT_EQ(document.at("warnings").as_array().size(), 1u);
+    EXPECT_EQ(document.at("is_written"), true);
+    EXPECT_FALSE(document.at("warnings").at(0).as_object().contains("status"));
+    Save();
+    EXPECT_EQ(Ctl({"show", "store:"}).status, 0);
+    EXPECT_FALSE(Json(Ctl({"copy", At("site.db"), "store:", "--json"})).as_object().contains("warnings"));
+}
+
 TEST_F(StoreSource, LoadThatGivesNothingIsAFailure) {
     Save();
     std::string document = Document();

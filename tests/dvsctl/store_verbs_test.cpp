@@ -119,6 +119,27 @@ TEST_F(StoreVerbs, RestoreBringsBackOneSwitchOrAllInOneRevision) {
     EXPECT_EQ(Ctl({"store", "restore", "--revision", "x"}).status, 2);
 }
 
+TEST_F(StoreVerbs, TheSwitchIsAnOperandOrAnOption) {
+    Save();
+    SaveChange("db");
+    for (const char *verb : {"history", "restore"}) {
+        const auto run = [&](std::vector<std::string> which) {
+            std::vector<std::string> args = {"store", verb, "--json"};
+            if (std::string_view(verb) == "restore")
+                args.insert(args.end(), {"--dry-run", "--revision", "1"});
+            args.insert(args.end(), which.begin(), which.end());
+            return Ctl(args);
+        };
+        const Result operand = run({"production"});
+        EXPECT_EQ(operand.status, 0);
+        EXPECT_EQ(run({"--switch", "production"}).out, operand.out);
+        EXPECT_EQ(run({"production", "--switch", "production"}).out, operand.out);
+        EXPECT_NE(run({}).out, "");
+        EXPECT_EQ(run({"storage", "--switch", "production"}).status, 2);
+        EXPECT_EQ(run({"--switch", "none"}).status, 4);
+    }
+}
+
 TEST_F(StoreVerbs, BackupIsAWholeStoreOfItsOwnAndReplacesNothingUnasked) {
     Save();
     ASSERT_EQ(Ctl({"store", "backup", At("copy.db"), "--dry-run"}).status, 0);

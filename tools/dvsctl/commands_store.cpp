@@ -14,6 +14,7 @@ constexpr OptionRow kStore = {"--store", "PATH", &Options::store,
 constexpr OptionRow kLayer = {"--layer", "LAYER", &Options::layer, "current (the default) or desired"};
 constexpr OptionRow kOnlyLayer = {"--layer", "LAYER", &Options::layer, "only current or only desired"};
 constexpr OptionRow kSwitch = {"SWITCH", nullptr, &Options::source, "a switch's id or name"};
+constexpr OptionRow kOnlySwitch = {"--switch", "ID", &Options::switchId, "the same as SWITCH"};
 constexpr OptionRow kDryRun = {"--dry-run", nullptr, &Options::dryRun,
                                "show what would change, and change nothing"};
 constexpr OptionRow kFull = {"--full", nullptr, &Options::full, "long values whole"};
@@ -39,11 +40,13 @@ constexpr OptionRow kImportOptions[] = {
 constexpr OptionRow kDeleteOptions[] = {kSwitch, kStore, kLayer, kDryRun};
 constexpr OptionRow kHistoryOptions[] = {
     {"SWITCH", nullptr, &Options::name, "only this switch, by id or name"},
+    kOnlySwitch,
     kStore,
     kOnlyLayer,
 };
 constexpr OptionRow kRestoreOptions[] = {
     {"SWITCH", nullptr, &Options::name, "only this switch, by id or name (default: the whole store)"},
+    kOnlySwitch,
     {"--revision", "N", &Options::revision, "as of this revision; 0 is the empty store"},
     kStore,
     kLayer,

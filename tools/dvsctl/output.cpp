@@ -9,6 +9,9 @@
 #include <cstdlib>
 #include <cstring>
 
+#include <boost/json/array.hpp>
+#include <boost/json/object.hpp>
+#include <boost/json/value.hpp>
 #include <fcntl.h>
 #include <sys/ioctl.h>
 #include <sys/wait.h>
@@ -105,6 +108,8 @@ void ReserveStandardDescriptors() {
                        fd == STDIN_FILENO ? O_WRONLY : O_RDONLY); // lands on fd, the lowest free one
 }
 
+Output::~Output() = default;
+
 Output::Output() : terminal_(isatty(STDOUT_FILENO) == 1), errorTerminal_(isatty(STDERR_FILENO) == 1) {
     const bool colourful = !IsSet("NO_COLOR") && !IsDumb();
     colour_ = terminal_ && colourful;
@@ -125,8 +130,25 @@ void Output::Remark(std::string_view text) {
     if (!quiet_) Write(text);
 }
 
-void Output::Json(const boost::json::value &document) {
-    Write(PrettyJson(document));
+void Output::Warn(Error warning) {
+    warnings_.push_back(std::move(warning));
+}
+
+void Output::Json(boost::json::object document) {
+    for (const Error &warning : warnings_) {
+        boost::json::value &list = document["warnings"];
+        boost::json::object entry = ErrorJson(warning);
+        entry.erase("status");
+        entry.erase("name");
+        (list.is_array() ? list.get_array() : list.emplace_array()).emplace_back(std::move(entry));
+    }
+    warnings_.clear();
+    Write(PrettyJson(std::move(document)));
+}
+
+void Output::Discard() {
+    pending_.clear();
+    warnings_.clear();
 }
 
 void Output::Drain() {
@@ -162,6 +184,11 @@ bool Output::Page() {
 
 void Output::Finish() {
     if (!pending_.empty() && !Page()) Drain();
+    for (Error &warning : warnings_) {
+        warning.title = "warning: " + warning.title;
+        Diagnose(ErrorText(warning, errorColour_));
+    }
+    warnings_.clear();
 }
 
 void Output::Diagnose(std::string_view text) {

@@ -7,11 +7,13 @@
 
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include <boost/json/fwd.hpp>
 
 namespace dvs::ctl {
 
+struct Error;
 struct Options;
 
 enum class Style { Plain, Heading, Name, Dim, Added, Removed, Changed, Bad, Good };
@@ -20,6 +22,7 @@ class Output {
 public:
     /// Looks at the terminal once. Call ReserveStandardDescriptors before anything is opened.
     Output();
+    ~Output();
     Output(const Output &) = delete;
     Output &operator=(const Output &) = delete;
 
@@ -32,15 +35,19 @@ public:
     /// Remarks beside the result ("copied …"): like Write, unless --quiet.
     void Remark(std::string_view text);
 
+    /// What was done all the same, and has a consequence that nobody expects: behind the results on standard
+    /// error, also with --quiet, or as "warnings" of the JSON document. Its status does not count.
+    void Warn(Error warning);
+
     /// One JSON document and a line end.
-    void Json(const boost::json::value &document);
+    void Json(boost::json::object document);
 
     /// Passes on what is gathered, through a pager where it is longer than the terminal. Throws Error(Failed)
     /// when standard output does not take everything. Call once, at the end.
     void Finish();
 
     /// What was written and not yet passed on is dropped, so that an error can be the only document.
-    void Discard() { pending_.clear(); }
+    void Discard();
 
     /// Lines for people on standard error; failures are ignored, there is nobody left to tell.
     void Diagnose(std::string_view text);
@@ -58,6 +65,7 @@ private:
     bool Page();
 
     std::string pending_;
+    std::vector<Error> warnings_;
     bool terminal_ = false, errorTerminal_ = false, colour_ = false, errorColour_ = false;
     bool quiet_ = false, pager_ = true;
 };

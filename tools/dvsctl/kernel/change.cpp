@@ -121,6 +121,7 @@ Exit CarryOut(Context &context, KernelChange change) {
         Report(context, change, Outcome::WasThere, {});
     } else {
         RequireOk(answer, title);
+        if (change.warning) context.out.Warn(*change.warning);
         if (!options.dryRun) {
             Report(context, change, Outcome::Changed, {});
         } else {

@@ -23,6 +23,7 @@ struct KernelChange {
     std::function<HYP_ReturnStatus(const Target &target)> send;
     /// The same on the switch table, which holds the module's state: what --dry-run compares.
     std::function<HYP_ReturnStatus(const Target &target)> plan;
+    std::optional<Error> warning = {}; ///< what somebody who made the change should know
     bool isInState = true; ///< false for what the module keeps beside its state: the plan only checks then
 };
 

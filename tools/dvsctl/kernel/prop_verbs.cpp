@@ -15,6 +15,7 @@
 #include "tools/dvsctl/kernel/change.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
+#include "tools/dvsctl/version_warning.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -92,7 +93,7 @@ HYP_ReturnStatus CheckPort(const Target &at) {
 /// The version that the module gives for a switch; 0 when it gives none.
 std::uint32_t VersionOf(Context &context, const Target &target) {
     const Answer answer = FetchFromDevice(context, [&](void **out, std::uint32_t *size) {
-        return DVSHYP_GlobalPropGet(target.switchId.c_str(), "com.orbeno.common.version", out, size);
+        return DVSHYP_GlobalPropGet(target.switchId.c_str(), kVersionProperty.data(), out, size);
     });
     return answer.status == HYP_OK ? AsNumber(answer.bytes).value_or(0) : 0;
 }
@@ -164,8 +165,12 @@ Exit RunKernelPropSet(Context &context) {
 }
 
 Exit RunKernelPropClear(Context &context) {
-    return CarryOut(
-        context, {"kernel prop clear", TargetOf(context.options), "clear", "cleared", "", Clear, PlanClear});
+    const Target target = TargetOf(context.options);
+    std::optional<Error> warning;
+    if (target.list == DVS_PROP_CLASS_GLOBAL && target.property == kVersionProperty)
+        warning = VersionlessWarning(target.switchId, std::nullopt);
+    return CarryOut(context,
+                    {"kernel prop clear", target, "clear", "cleared", "", Clear, PlanClear, warning});
 }
 
 Exit RunKernelUplinkGet(Context &context) {
@@ -184,14 +189,18 @@ Exit RunKernelUplinkSet(Context &context) {
     const int uplink = UplinkOf(context.options);
     const Target target = TargetOf(context.options);
     const NewValue value = ValueOf(context, target, [] { return 0u; });
-    return CarryOut(context, {"kernel uplink set", target, fmt::format("set uplink {} of", uplink),
+    return CarryOut(context, {"kernel uplink set",
+                              target,
+                              fmt::format("set uplink {} of", uplink),
                               fmt::format("set uplink {} of", uplink),
                               " to " + ShowValue(value.bytes, context.options.full),
                               [&](const Target &at) {
                                   return DVSHYP_UplinkDataSet(at.switchId.c_str(), at.portId.c_str(), uplink,
                                                               value.bytes.data(), SizeOf(value), value.type);
                               },
-                              CheckPort, false});
+                              CheckPort,
+                              {},
+                              false});
 }
 
 } // namespace dvs::ctl

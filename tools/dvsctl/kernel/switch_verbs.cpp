@@ -8,6 +8,7 @@
 #include "tools/dvsctl/kernel/change.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
+#include "tools/dvsctl/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -54,15 +55,17 @@ Exit RunKernelSwitchAdd(Context &context) {
     CheckName("class", className, sizeof(DVSHYPRequest::propName));
     const std::uint32_t ports = NumberOf(Required(options.maxPorts, "--max-ports"), "port limit");
     const std::uint32_t version = NumberOf(Required(options.switchVersion, "--switch-version"), "version");
+    const Target target = TargetOf(options);
     return CarryOut(context,
-                    {"kernel switch add", TargetOf(options), "add", "added",
+                    {"kernel switch add", target, "add", "added",
                      fmt::format(" ({}, version {}, {} ports at most)", className, version, ports),
                      [=](const Target &t) {
                          return DVSHYP_SwitchAdd(t.switchId.c_str(), className.c_str(), ports, version);
                      },
                      [=](const Target &t) {
                          return DVSState_SwitchAdd(t.switchId.c_str(), className.c_str(), ports, version);
-                     }});
+                     },
+                     VersionlessWarning(target.switchId, version)});
 }
 
 Exit RunKernelSwitchRemove(Context &context) {
@@ -72,16 +75,27 @@ Exit RunKernelSwitchRemove(Context &context) {
 }
 
 Exit RunKernelSwitchAssociate(Context &context) {
-    return CarryOut(context, {"kernel switch associate", TargetOf(context.options), "associate", "associated",
-                              "", [](const Target &t) { return DVSHYP_SwitchAssociate(t.switchId.c_str()); },
-                              CheckSwitch, false});
+    return CarryOut(context, {"kernel switch associate",
+                              TargetOf(context.options),
+                              "associate",
+                              "associated",
+                              "",
+                              [](const Target &t) { return DVSHYP_SwitchAssociate(t.switchId.c_str()); },
+                              CheckSwitch,
+                              {},
+                              false});
 }
 
 Exit RunKernelSwitchDissociate(Context &context) {
-    return CarryOut(context,
-                    {"kernel switch dissociate", TargetOf(context.options), "dissociate", "dissociated", "",
-                     [](const Target &t) { return DVSHYP_SwitchDissociate(t.switchId.c_str()); }, CheckSwitch,
-                     false});
+    return CarryOut(context, {"kernel switch dissociate",
+                              TargetOf(context.options),
+                              "dissociate",
+                              "dissociated",
+                              "",
+                              [](const Target &t) { return DVSHYP_SwitchDissociate(t.switchId.c_str()); },
+                              CheckSwitch,
+                              {},
+                              false});
 }
 
 Exit RunKernelSwitchSetVersion(Context &context) {

@@ -18,6 +18,7 @@
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/progress.h"
 #include "tools/dvsctl/store/scratch.h"
+#include "tools/dvsctl/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -64,17 +65,19 @@ public:
 
     void Write(Context &context, Bytes state) override {
         RefuseDesired();
-        AwaitTurn(context);
+        AwaitTurn(context, path_, "cannot save to the config store");
         const Progress progress(context, "saving " + ShowCount(CountState(ParseState(state))));
         PointLibraryAt(path_);
         Save(context, state);
+        (void)LoadSaved(context, state);
     }
 
     std::vector<std::uint8_t> Plan(Context &context, Bytes state) override {
         RefuseDesired();
         const ScratchStore scratch(context, path_);
         Save(context, state);
-        return LoadHere(context);
+        if (auto loaded = LoadSaved(context, state)) return *std::move(loaded);
+        return {state.begin(), state.end()}; // what it would hold, although nobody could read it
     }
 
     void CheckPlace(Context &context) override {
@@ -121,6 +124,17 @@ private:
         return LoadHere(context);
     }
 
+    // The state that has just been saved, as the store gives it back. A save takes states that no load does:
+    // then nothing, and a warning.
+    std::optional<std::vector<std::uint8_t>> LoadSaved(Context &context, Bytes state) {
+        try {
+            return LoadHere(context);
+        } catch (const Error &error) {
+            if (error.status != Exit::Busy) context.out.Warn(UnloadableWarning(ParseState(state), error));
+            return std::nullopt;
+        }
+    }
+
     std::vector<std::uint8_t> LoadHere(Context &context) {
         (void)context.log.Take(); // what was said before has been told
         const configstore::MessageCollector messages;
@@ -138,16 +152,6 @@ private:
             error.status = Exit::Store; // what is wrong here lies in the store
         error.next = "dvsctl store check looks for damage; dvsctl store export shows a switch's document";
         throw Error(error);
-    }
-
-    // Waits as long as --timeout allows: the library's own wait is fixed.
-    void AwaitTurn(Context &context) const {
-        const OpenStore store(context, path_, false);
-        std::int64_t revision = 0;
-        std::int32_t status = configstore::BeginTransaction(store.get());
-        if (status == configstore::OK) status = admin::LatestRevision(store.get(), &revision);
-        (void)configstore::CancelTransaction(store.get()); // nothing has been written
-        store.Require(status, "cannot save to the config store");
     }
 
     void Save(Context &context, Bytes state) const {

@@ -113,6 +113,15 @@ void OpenStore::Require(std::int32_t status, const char *title) const {
     if (status != configstore::OK) throw Error(StoreError(status, title, path_, messages_.Text()));
 }
 
+void AwaitTurn(Context &context, const std::string &path, const char *title) {
+    const OpenStore store(context, path, false);
+    std::int64_t revision = 0;
+    std::int32_t status = configstore::BeginTransaction(store.get());
+    if (status == configstore::OK) status = admin::LatestRevision(store.get(), &revision);
+    (void)configstore::CancelTransaction(store.get()); // nothing has been written
+    store.Require(status, title);
+}
+
 std::vector<admin::Entry> OpenStore::List() const {
     std::vector<admin::Entry> entries;
     Require(admin::List(store_, &entries), "cannot list the config store");
@@ -179,6 +188,14 @@ admin::Address FindObject(const OpenStore &store, admin::Layer layer, const std:
                     text)
                 return past.entry.address;
     throw Error(NoSwitchError(store.Path(), text, layer));
+}
+
+std::optional<std::string> OnlySwitchOf(const Options &options) {
+    if (options.name && options.switchId && *options.name != *options.switchId)
+        throw Error(Exit::Usage, "SWITCH and --switch name two switches")
+            .Because("both mean the only switch to look at")
+            .Try("leave one of them out");
+    return options.name ? options.name : options.switchId;
 }
 
 std::string NameInDocument(std::string_view document) {

@@ -74,6 +74,10 @@ private:
     std::string path_;
 };
 
+/// Makes sure that the store can be written, and waits for other writers as long as --timeout allows: the
+/// library's own wait is fixed, and others may come in between, so that callers repeat a call that is BUSY.
+void AwaitTurn(Context &context, const std::string &path, const char *title);
+
 /// The layer that --layer names, the current one by default. Throws Error(Usage).
 admin::Layer LayerOf(const Options &options);
 
@@ -84,6 +88,10 @@ admin::Address SwitchAddress(admin::Layer layer, std::string id);
 /// gone.
 /// Throws Error(NotThere).
 admin::Address FindObject(const OpenStore &store, admin::Layer layer, const std::string &text, bool withPast);
+
+/// The switch that verbs for one switch or all are given, as an operand or with --switch; nothing for all.
+/// Throws Error(Usage) when both are given and differ.
+std::optional<std::string> OnlySwitchOf(const Options &options);
 
 /// The member "name" of a document; empty where there is none.
 std::string NameInDocument(std::string_view document);

@@ -148,12 +148,13 @@ Exit RunStoreList(Context &context) {
 Exit RunStoreHistory(Context &context) {
     const Options &options = context.options;
     Table table(kHistoryColumns, options);
+    const std::optional<std::string> wanted = OnlySwitchOf(options);
     const std::string path = StorePathOf(options.store.value_or(""));
     if (options.ifExists && !IsStoreThere(path))
         return ReportNothing(context, "store history", path, "events");
     const OpenStore store(context, path, true);
     std::optional<admin::Address> only;
-    if (options.name) only = FindObject(store, LayerOf(options), *options.name, true);
+    if (wanted) only = FindObject(store, LayerOf(options), *wanted, true);
     json::array events;
     for (const Event &event : EventsOf(store)) {
         if (only ? !IsSame(*only, event.address) : !IsWanted(options, event.address)) continue;

@@ -29,6 +29,8 @@ namespace {
 
 namespace json = boost::json;
 
+constexpr const char *kUpgradeTitle = "cannot carry the state file over";
+
 // The backup's name is durable once its directory is.
 void SyncDirectoryOf(const std::string &path) {
     const std::size_t slash = path.rfind('/');
@@ -61,8 +63,7 @@ std::vector<ObjectChange> PlanUpgrade(Context &context, const std::string &path,
         plan.push_back({object.address, ReadDocument(object.document), std::nullopt});
     const configstore::MessageCollector messages;
     const std::int32_t status = RetrieveUpgradeInfoFrom(file.c_str());
-    if (status != 0)
-        throw Error(StoreError(status, "cannot carry the state file over", path, messages.Text()));
+    if (status != 0) throw Error(StoreError(status, kUpgradeTitle, path, messages.Text()));
     for (const ScratchStore::Object &object : scratch.Objects()) {
         ObjectChange *known = nullptr;
         for (ObjectChange &change : plan)
@@ -157,17 +158,15 @@ Exit RunStoreUpgrade(Context &context) {
     const LoadedState loaded = LoadState(context, *file);
     std::vector<ObjectChange> plan = PlanUpgrade(context, path, options.source);
     if (!options.dryRun) {
-        const OpenStore store(context, path, false); // for what is wrong with it, and the wait for others
-        std::int32_t status = configstore::BeginTransaction(store.get());
-        std::int64_t revision = 0;
-        if (status == configstore::OK) status = admin::LatestRevision(store.get(), &revision);
-        (void)configstore::CancelTransaction(store.get()); // nothing has been written
-        store.Require(status, "cannot carry the state file over");
-        const configstore::MessageCollector messages;
+        AwaitTurn(context, path, kUpgradeTitle);
         PointLibraryAt(path);
-        status = RetrieveUpgradeInfoFrom(options.source.c_str());
-        if (status != 0)
-            throw Error(StoreError(status, "cannot carry the state file over", path, messages.Text()));
+        for (;;) {
+            const configstore::MessageCollector messages;
+            const std::int32_t status = RetrieveUpgradeInfoFrom(options.source.c_str());
+            if (status == configstore::OK) break;
+            if (status != configstore::BUSY || context.deadline.IsOver())
+                throw Error(StoreError(status, kUpgradeTitle, path, messages.Text()));
+        }
     }
     WriteReport(context, {"store upgrade", path,
                           fmt::format("carried the identity of the switches in {} over to {}",

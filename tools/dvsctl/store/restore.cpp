@@ -78,12 +78,13 @@ Exit RunStoreRestore(Context &context) {
         throw Error(Exit::Usage, "store restore needs --revision N")
             .Try("dvsctl store history lists the revisions");
     const std::string path = StorePathOf(options.store.value_or(""));
+    const std::optional<std::string> wanted = OnlySwitchOf(options);
     std::optional<admin::Address> only;
     std::vector<ObjectChange> plan;
     {
         const OpenStore store(context, path, true);
         CheckRevision(store, *revision);
-        if (options.name) only = FindObject(store, LayerOf(options), *options.name, true);
+        if (wanted) only = FindObject(store, LayerOf(options), *wanted, true);
         plan = Plan(store, only, *revision);
     }
     if (!options.dryRun) {
