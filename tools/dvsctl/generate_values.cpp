@@ -381,8 +381,8 @@ SwitchPlan PlanSwitch(Random &random, std::uint32_t number, SwitchSort sort, std
     for (std::uint32_t i = 0, count = random.Between(1, 4); i < count; ++i)
         plan.privateVlans.push_back(200 + 10 * i + 1000 * random.Below(3));
     std::ranges::sort(plan.privateVlans);
-    const auto repeated = std::ranges::unique(plan.privateVlans);
-    plan.privateVlans.erase(repeated.begin(), repeated.end());
+    plan.privateVlans.erase(std::unique(plan.privateVlans.begin(), plan.privateVlans.end()),
+                            plan.privateVlans.end());
     return plan;
 }
 
