@@ -1,9 +1,9 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Saving one switch to the config store and loading it back, beside SQLite alone storing and reading one ready
 // document of the same size: all of it in one run, on the same disk, with the same durability. Prints milliseconds
-// (the median of the rounds) and ratios, and the peak memory. See README.md.
+// (the median of the rounds), ratios, nanoseconds a property and the peak memory. See README.md.
 //
-//   store_bench [--ports N[,N…]] [--rounds N] [--dir DIRECTORY]
+//   store_bench [--ports N[,N…]] [--kind usual|structured] [--rounds N] [--dir DIRECTORY]
 
 #include <algorithm>
 #include <chrono>
@@ -18,11 +18,17 @@
 #include <unistd.h>
 #include <vector>
 
+#include "bench/port_settings.h"
 #include "dvs/configstore.h"
 #include "dvs/log.h"
 #include "dvs/state.h"
 
 namespace {
+
+using store_bench::kPortKinds;
+using store_bench::kSettingsOfAPort;
+using store_bench::PortKind;
+using store_bench::Setting;
 
 [[noreturn]] void Fail(const char *what) {
     std::fprintf(stderr, "store_bench: %s failed\n", what);
@@ -33,50 +39,15 @@ void Check(bool good, const char *what) {
     if (!good) Fail(what);
 }
 
-struct Setting {
-    const char *key;
-    std::string value;
-};
-
-template <typename Number> std::string Bytes(Number value) {
-    return std::string(reinterpret_cast<const char *>(&value), sizeof value);
-}
-
-std::string Text(const std::string &text) { return text + '\0'; }
-
-/// Twelve settings of a port: texts, numbers, flags and records, as a host has them.
-std::vector<Setting> SettingsOf(int port, int version) {
-    const std::string number = std::to_string(port);
-    std::string vlan(8, '\0');
-    vlan[2] = static_cast<char>(port % 100 + 1);
-    std::string shaping;
-    for (const uint64_t value : {1000000ULL, 2000000ULL, 100000ULL})
-        shaping += Bytes(value);
-    return {
-        {"com.orbeno.common.port.alias", Text("port number " + number)},
-        {"com.orbeno.common.port.connectid", Bytes(static_cast<uint32_t>(1000 + port + version))},
-        {"com.orbeno.common.port.block", Text("false")},
-        {"com.orbeno.common.port.ptAllowed", Bytes(uint32_t{2})},
-        {"com.orbeno.etherswitch.port.txUplink", Text("normal")},
-        {"com.orbeno.common.port.portgroupid", Text("portgroup-" + std::to_string(port % 16))},
-        {"com.orbeno.etherswitch.port.vlan", vlan},
-        {"com.orbeno.etherswitch.port.ipfix", Text("enabled")},
-        {"com.orbeno.common.port.shaper.input", shaping},
-        {"com.orbeno.etherswitch.port.security", Bytes(uint32_t{5})},
-        {"com.orbeno.common.port.backingType", Text("regular")},
-        {"com.orbeno.port.extraConfig.note", Text("set by the site's tools, change " + number)},
-    };
-}
-
 struct State {
     void *buffer = nullptr;
     uint32_t len = 0;
 };
 
-State BuildState(int ports, int version) {
+State BuildState(const PortKind &kind, int ports, int version) {
     constexpr const char *kSwitch = "50 2d 6b 7c 1a 2b 3c 4d-5e 6f 70 81 92 a3 b4 c5";
     Check(DVSState_SwitchAdd(kSwitch, "etherswitch", static_cast<uint32_t>(ports), 9) == HYP_OK, "the switch");
-    const std::string name = Text("bench");
+    const std::string name("bench", 6);
     Check(DVSState_GlobalPropSet(kSwitch, "com.orbeno.common.alias", name.data(), static_cast<uint32_t>(name.size()), 0x20) ==
               HYP_OK,
           "the alias");
@@ -86,9 +57,9 @@ State BuildState(int ports, int version) {
         DVSData *data = nullptr;
         Check(DVSData_Alloc(&data, [](uint64_t size) { return std::malloc(size); }, [](void *block) { std::free(block); }) == HYP_OK,
               "a port's list");
-        for (const Setting &setting : SettingsOf(port, version))
+        for (const Setting &setting : kind.settings(port, version))
             Check(DVSData_Append(data, setting.key, setting.value.data(), static_cast<uint32_t>(setting.value.size()),
-                                 std::strstr(setting.key, "extraConfig") ? 0x00 : 0x20) == HYP_OK,
+                                 setting.type) == HYP_OK,
                   "a setting");
         Check(DVSState_PortAdd(kSwitch, std::to_string(port).c_str(), data) == HYP_OK, "a port");
     }
@@ -162,16 +133,12 @@ std::string StoredDocument(const std::string &path) {
     return text;
 }
 
-void Row(const char *work, double ours, double plain) {
-    std::printf("%-44s %9.2f %9.2f %7.2f\n", work, ours, plain, ours / plain);
-}
-
-void Bench(int ports, int rounds, const std::string &directory) {
+void Bench(const PortKind &kind, int ports, int rounds, const std::string &directory) {
     const std::string path = directory + "/store.db";
     setenv("DVS_CONFIGSTORE", path.c_str(), 1);
     std::filesystem::remove_all(directory);
     std::filesystem::create_directories(directory);
-    const State states[2] = {BuildState(ports, 0), BuildState(ports, 1)};
+    const State states[2] = {BuildState(kind, ports, 0), BuildState(kind, ports, 1)};
     // Two documents in turn, so that each save changes something. The first save of all is measured alone.
     const double first = MedianMs(1, [&](int) {
         Check(DVSState_SaveBufToConfigStore(states[1].buffer, states[1].len) == 0, "the first save");
@@ -202,16 +169,20 @@ void Bench(int ports, int rounds, const std::string &directory) {
     };
     const double openStore = around([&] { plain.Store(document); });
     const double openRead = around([&] { (void)plain.Read(); });
-    std::printf("%d ports x 12 settings: a document of %zu bytes, a state of %u; peak memory %ld MB\n", ports, document.size(),
-                states[0].len, usage.ru_maxrss / 1024);
-    std::printf("%-44s %9s %9s %7s\n", "milliseconds", "ours", "SQLite", "ratio");
-    Row("first save, into a new store", first, plainStore);
-    Row("save again (history), SQLite kept open", save, plainStore);
-    Row("save again (history), SQLite opened each time", save, openStore);
-    Row("load, SQLite kept open", load, plainRead);
-    Row("load, SQLite opened each time", load, openRead);
-    Row("save again and load, SQLite kept open", save + load, plainStore + plainRead);
-    Row("save again and load, SQLite opened each time", save + load, openStore + openRead);
+    const double properties = static_cast<double>(ports) * kSettingsOfAPort;
+    const auto row = [&](const char *work, double ours, double sqlite) {
+        std::printf("%-46s %9.2f %9.2f %7.2f %9.0f\n", work, ours, sqlite, ours / sqlite, ours * 1e6 / properties);
+    };
+    std::printf("%d ports x %zu %s settings: a document of %zu bytes, a state of %u; peak memory %ld MB\n", ports,
+                kSettingsOfAPort, kind.name, document.size(), states[0].len, usage.ru_maxrss / 1024);
+    std::printf("%-46s %9s %9s %7s %9s\n", "milliseconds", "ours", "SQLite", "ratio", "ns/prop");
+    row("first save, into a new store", first, plainStore);
+    row("save again (history), SQLite kept open", save, plainStore);
+    row("save again (history), SQLite opened each time", save, openStore);
+    row("load, SQLite kept open", load, plainRead);
+    row("load, SQLite opened each time", load, openRead);
+    row("save again and load, SQLite kept open", save + load, plainStore + plainRead);
+    row("save again and load, SQLite opened each time", save + load, openStore + openRead);
     for (const State &state : states)
         std::free(state.buffer);
     std::filesystem::remove_all(directory);
@@ -222,16 +193,21 @@ void Bench(int ports, int rounds, const std::string &directory) {
 int main(int argc, char **argv) {
     std::string ports = "4096,16384";
     std::string directory = std::filesystem::temp_directory_path() / ("store_bench." + std::to_string(getpid()));
+    std::string kinds;
     int rounds = 15;
     for (int i = 1; i + 1 < argc; i += 2) {
         if (std::strcmp(argv[i], "--ports") == 0) ports = argv[i + 1];
+        if (std::strcmp(argv[i], "--kind") == 0) kinds = argv[i + 1];
         if (std::strcmp(argv[i], "--rounds") == 0) rounds = std::max(1, std::atoi(argv[i + 1]));
         if (std::strcmp(argv[i], "--dir") == 0) directory = std::string(argv[i + 1]) + "/store_bench";
     }
     dvsconfigstore_debug = dvs_debug = dvsdata_debug = -1;
     setenv("DVS_MAX_PORTS", "131072", 0);
     for (char *at = ports.data(); *at; at += *at == ',') {
-        Bench(static_cast<int>(std::strtol(at, &at, 10)), rounds, directory);
+        const int count = static_cast<int>(std::strtol(at, &at, 10));
+        for (const PortKind &kind : kPortKinds) {
+            if (kinds.empty() || kinds == kind.name) Bench(kind, count, rounds, directory);
+        }
     }
     return 0;
 }
