@@ -3,20 +3,29 @@
 # file, verification, display, a change, the difference, and back. Works in a directory of its own and leaves nothing
 # behind but build/release.
 set -euo pipefail
+from=$PWD
 cd "$(dirname "$0")"
 
-case ${1:-} in
-'') ;;
---help | -h)
-    echo "Usage: ./quickstart.sh"
-    echo "Installs missing packages (apt, as root or through sudo), builds build/release, shows dvsctl at work."
-    exit 0
-    ;;
-*)
-    echo "Usage: ./quickstart.sh" >&2
-    exit 2
-    ;;
-esac
+usage() {
+    cat <<'EOF'
+Usage: ./quickstart.sh [--built DIR]
+
+Installs missing packages (apt, as root or through sudo), builds build/release, shows dvsctl at work.
+
+  --built DIR    take the programs of this build directory, and install and build nothing
+  --help         this text
+EOF
+}
+
+build=
+while [ $# -gt 0 ]; do
+    case $1 in
+    --built) build=$(cd "$from" && realpath "${2:?--built wants a directory}") && shift ;;
+    --help | -h) usage && exit 0 ;;
+    *) usage >&2 && exit 2 ;;
+    esac
+    shift
+done
 
 work=$(mktemp -d)
 trap 'rm -rf "$work"' EXIT
@@ -36,13 +45,15 @@ run() {
     "$dvsctl" "$@" --no-pager
 }
 
-cmake/install-packages.sh
-
-say "Building build/release (the first time takes a few minutes)"
-cmake --preset release >"$work/configure.log" 2>&1 || { cat "$work/configure.log" >&2; exit 1; }
-cmake --build --preset release --target dvs dvsctl dvs-emulator -- --quiet
-dvsctl=$PWD/build/release/bin/dvsctl
-emulator=$PWD/build/release/bin/dvs-emulator
+if [ -z "$build" ]; then
+    build=$PWD/build/release
+    cmake/install-packages.sh
+    say "Building build/release (the first time takes a few minutes)"
+    cmake --preset release >"$work/configure.log" 2>&1 || { cat "$work/configure.log" >&2; exit 1; }
+    cmake --build --preset release --target dvs dvsctl dvs-emulator -- --quiet
+fi
+dvsctl=$build/bin/dvsctl
+emulator=$build/bin/dvs-emulator
 root=$PWD
 cp examples/site-basic.json examples/site.json "$work/"
 cd "$work"

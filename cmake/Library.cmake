@@ -27,5 +27,17 @@ target_link_libraries(dvs_static INTERFACE dvs_platform Threads::Threads)
 install(TARGETS dvs dvs_static dvs_platform dvs_platform_shared
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR})
 install(DIRECTORY include/dvs DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
+
+# How others find the installed copy, wherever it has been moved: find_package(dvs) gives the target dvs::dvs, which
+# is the shared library; pkg-config knows it as libdvs.
+include(CMakePackageConfigHelpers)
+set(DVS_PACKAGE_DIR ${CMAKE_INSTALL_LIBDIR}/cmake/dvs)
+configure_package_config_file(cmake/dvsConfig.cmake.in ${CMAKE_BINARY_DIR}/dvsConfig.cmake
+  INSTALL_DESTINATION ${DVS_PACKAGE_DIR} PATH_VARS CMAKE_INSTALL_INCLUDEDIR CMAKE_INSTALL_LIBDIR
+  NO_CHECK_REQUIRED_COMPONENTS_MACRO)
+write_basic_package_version_file(${CMAKE_BINARY_DIR}/dvsConfigVersion.cmake COMPATIBILITY SameMajorVersion)
+install(FILES ${CMAKE_BINARY_DIR}/dvsConfig.cmake ${CMAKE_BINARY_DIR}/dvsConfigVersion.cmake
+  DESTINATION ${DVS_PACKAGE_DIR})
+file(RELATIVE_PATH DVS_PREFIX_FROM_PKGCONFIG /${CMAKE_INSTALL_LIBDIR}/pkgconfig /)
 configure_file(cmake/libdvs.pc.in ${CMAKE_BINARY_DIR}/libdvs.pc @ONLY)
 install(FILES ${CMAKE_BINARY_DIR}/libdvs.pc DESTINATION ${CMAKE_INSTALL_LIBDIR}/pkgconfig)
