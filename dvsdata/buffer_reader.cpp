@@ -86,7 +86,7 @@ inline HYP_ReturnStatus AppendImage(DVSData *list, const Place &place) {
         return Append(list, name, place.at + kEntryFixedSize, place.dataLen,
                       Load32(place.at + kPropTypeOffset));
     const std::uint32_t serialSize = EntrySize(place.dataLen);
-    auto *const entry = static_cast<DVSDataEntry *>(list->allocFn(kImageOffset + std::uint64_t{serialSize}));
+    DVSDataEntry *const entry = NewPlace(list, serialSize);
     if (!entry) [[unlikely]]
         return HYP_NO_MEMORY;
     ClearPadding(entry, serialSize);
@@ -97,6 +97,23 @@ inline HYP_ReturnStatus AppendImage(DVSData *list, const Place &place) {
     entry->serialSize = serialSize; // not always what the image says
     Link(list, entry, serialSize, name);
     return HYP_OK;
+}
+
+/// What the entries of a sound buffer take in a list's own block. 0, which has each be a block of its own,
+/// for every other buffer, so that what is wrong with it comes out as it always does; and where an entry more
+/// or less is a matter of messages.
+std::uint64_t RoomFor(Bytes buf, std::uint32_t typeMask) {
+    if (Emits(kDetail)) return 0;
+    std::uint64_t room = 0;
+    for (std::size_t offset = kHeaderSize, size = 0; buf.size() - offset >= kEntryFixedSize; offset += size) {
+        const std::uint8_t *const at = buf.data() + offset;
+        size = Load32(at + kEntrySizeOffset);
+        const std::uint32_t dataLen = Load32(at + kDataLenOffset);
+        if (size == 0) return room;
+        if (size > buf.size() - offset || dataLen > size || size - dataLen < kMinEntryRoom) return 0;
+        if (Load32(at + kPropTypeOffset) & typeMask) room += PlaceSize(EntrySize(dataLen));
+    }
+    return room;
 }
 
 HYP_ReturnStatus AppendAll(DVSData *list, Bytes buf, std::uint32_t typeMask) {
@@ -242,7 +259,7 @@ bool InPlaceList::Next(EntryRef *entry) {
 }
 
 HYP_ReturnStatus ReadList(DVSData **list, Bytes buf, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn,
-                          std::uint32_t typeMask, KnownSum known) {
+                          std::uint32_t typeMask, KnownSum known, EntryBlocks blocks) {
     const std::size_t given = buf.size();
     if (const HYP_ReturnStatus status = CheckLengths(&buf); status != HYP_OK) return status;
     if (const HYP_ReturnStatus status = CheckVersion(buf); status != HYP_OK) return status;
@@ -250,7 +267,8 @@ HYP_ReturnStatus ReadList(DVSData **list, Bytes buf, DVSDataAllocFn allocFn, DVS
         IsSumOf(buf, known, given) ? known.sum - Sum(buf.first(kUnsummedSize)) : Checksum(buf);
     if (const HYP_ReturnStatus status = CheckChecksum(buf, checksum); status != HYP_OK) return status;
     DVSData *handle = nullptr;
-    if (DVSData_Alloc(&handle, allocFn, freeFn) != HYP_OK) return HYP_NO_MEMORY;
+    const std::uint64_t room = blocks == EntryBlocks::Shared ? RoomFor(buf, typeMask) : 0;
+    if (NewList(&handle, allocFn, freeFn, room) != HYP_OK) return HYP_NO_MEMORY;
     std::unique_ptr<DVSData, FreeList> owner(handle);
     if (const HYP_ReturnStatus status = AppendAll(handle, buf, typeMask); status != HYP_OK) return status;
     if (Emits(kDetail)) [[unlikely]]

@@ -33,7 +33,7 @@ DVSDataEntry *Previous(const DVSData *list, const DVSDataEntry *entry) {
 
 /// Takes the entry out of the chain and out of the list's size, and says so. The caller frees it.
 void Unlink(DVSData *list, DVSDataEntry *previous, DVSDataEntry *entry) {
-    Names(list).Removing(list, entry);
+    RecordOf(list).names.Removing(list, entry);
     (previous ? previous->next : list->head) = entry->next;
     if (list->tail == entry) list->tail = previous;
     list->serialSize -= entry->serialSize;
@@ -65,9 +65,9 @@ HYP_ReturnStatus Replace(DVSData *list, DVSDataEntry *old, std::string_view name
     // Name and value may be the old entry's own: then it has to outlive the append.
     const bool ownBytes = Overlaps(data, dataLen, old) || Overlaps(name.data(), name.size() + 1, old);
     Unlink(list, Previous(list, old), old);
-    if (!ownBytes) list->freeFn(old);
+    if (!ownBytes) FreeEntry(list, old);
     const HYP_ReturnStatus status = Append(list, name, data, dataLen, newType);
-    if (ownBytes) list->freeFn(old);
+    if (ownBytes) FreeEntry(list, old);
     return status;
 }
 
@@ -103,7 +103,7 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
     if (Emits(kDetail)) [[unlikely]]
         EmitAdding(name, dataLen, list->serialSize);
 
-    auto *const entry = static_cast<DVSDataEntry *>(list->allocFn(kImageOffset + std::uint64_t{serialSize}));
+    DVSDataEntry *const entry = NewEntry(list, serialSize);
     if (!entry) return HYP_NO_MEMORY;
     FillEntry(entry, serialSize, name, dataLen, propType);
     if (dataLen) std::memcpy(entry->data, data, dataLen);
@@ -117,7 +117,21 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
 void RemoveAfter(DVSData *list, DVSDataEntry *previous) {
     DVSDataEntry *const entry = previous ? previous->next : list->head;
     Unlink(list, previous, entry);
-    list->freeFn(entry);
+    FreeEntry(list, entry);
+}
+
+HYP_ReturnStatus NewList(DVSData **list, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn, std::uint64_t room) {
+    EmitAllocating();
+    void *const block = allocFn(sizeof(ListRecord) + room);
+    if (!block) return HYP_NO_MEMORY;
+    auto *const places = static_cast<std::uint8_t *>(block) + sizeof(ListRecord);
+    auto *const record = new (block)
+        ListRecord{{kMinBufferSize, nullptr, nullptr, allocFn, freeFn}, {}, places, places + room, 0};
+    Forbid(places, room);
+    DVSData *const handle = &record->face;
+    *list = handle;
+    EmitAllocated(handle->serialSize);
+    return HYP_OK;
 }
 
 } // namespace dvs::data
@@ -125,23 +139,27 @@ void RemoveAfter(DVSData *list, DVSDataEntry *previous) {
 using namespace dvs::data;
 
 HYP_ReturnStatus DVSData_Alloc(DVSData **list, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn) {
-    EmitAllocating();
-    void *const block = allocFn(sizeof(ListRecord));
-    if (!block) return HYP_NO_MEMORY;
-    auto *const record = new (block) ListRecord{{kMinBufferSize, nullptr, nullptr, allocFn, freeFn}, {}};
-    DVSData *const handle = &record->face;
-    *list = handle;
-    EmitAllocated(handle->serialSize);
-    return HYP_OK;
+    return NewList(list, allocFn, freeFn, 0);
 }
 
 void DVSData_Free(DVSData *list) {
     if (!list) return;
-    while (DVSDataEntry *const entry = list->head) {
-        list->head = entry->next;
-        list->freeFn(entry);
+    ListRecord &record = RecordOf(list);
+    std::uint8_t *const places = PlacesOf(list);
+    const auto placesSize = static_cast<std::size_t>(record.roomEnd - places);
+    if (placesSize == 0) {
+        while (DVSDataEntry *const entry = list->head) {
+            list->head = entry->next;
+            list->freeFn(entry);
+        }
     }
-    Names(list).Drop(list);
+    // What has no block of its own goes with the handle, and need not even be looked at.
+    for (DVSDataEntry *entry; record.separateNum && (entry = list->head);) {
+        list->head = entry->next;
+        FreeEntry(list, entry);
+    }
+    record.names.Drop(list);
+    Allow(places, placesSize);
     list->freeFn(list);
 }
 

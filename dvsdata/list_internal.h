@@ -226,10 +226,15 @@ private:
     std::uint32_t typeMask_ = 0;
 };
 
+/// Where the entries of a list that is read lie: each in a block of its own, which is what lists with a
+/// caller's allocator promise, or in one block with the handle. The latter is for lists on the process heap,
+/// where nobody can tell.
+enum class EntryBlocks : bool { Own, Shared };
+
 /// DVSData_DeserializeWithPropType for a value whose sum may be known.
 [[nodiscard]] HYP_ReturnStatus ReadList(DVSData **list, Bytes buf, DVSDataAllocFn allocFn,
                                         DVSDataFreeFn freeFn, std::uint32_t typeMask = kDeserializeTypeMask,
-                                        KnownSum known = {});
+                                        KnownSum known = {}, EntryBlocks blocks = EntryBlocks::Own);
 
 } // namespace dvs::data
 

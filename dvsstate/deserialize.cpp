@@ -36,22 +36,29 @@ Source SourceOf(const data::EntryRef &entry) {
     return {entry.value, entry.sum};
 }
 
-/// An entry's name, ended by NUL.
+/// An entry's name, ended by NUL: where it lies, or a copy when its field has no room for one.
 class NameText {
 public:
-    explicit NameText(std::string_view name) {
-        std::ranges::copy(name.substr(0, data::kMaxNameLen), text_.begin());
+    explicit NameText(std::string_view name) : text_(name.data()) {
+        if (name.size() < data::kMaxNameLen || name.data()[name.size()] == '\0') return;
+        std::ranges::copy(name, copy_.begin());
+        copy_[name.size()] = '\0';
+        text_ = copy_.data();
     }
-    operator const char *() const { return text_.data(); }
+    NameText(const NameText &) = delete;
+    NameText &operator=(const NameText &) = delete;
+    operator const char *() const { return text_; }
 
 private:
-    std::array<char, data::kNameSize> text_{};
+    const char *text_;
+    std::array<char, data::kNameSize> copy_;
 };
 
 HYP_ReturnStatus ReadOwned(OwnedList &list, const Source &source) {
     DVSData *made = nullptr;
     const HYP_ReturnStatus status =
-        data::ReadList(&made, source.bytes, std::malloc, std::free, data::kDeserializeTypeMask, source.sum);
+        data::ReadList(&made, source.bytes, std::malloc, std::free, data::kDeserializeTypeMask, source.sum,
+                       data::EntryBlocks::Shared);
     if (status == HYP_OK) list.reset(made);
     return status;
 }
@@ -68,7 +75,7 @@ HYP_ReturnStatus ReadU32(data::Bytes value, uint32_t *number) {
 HYP_ReturnStatus AddAs(DVSwitch *sw, const char *portId, DVSData *list, DVSDataEntry *kindEntry) {
     if (!kindEntry) {
         const HYP_ReturnStatus status = DVSStatePortAdd(sw, portId, list, DVS_PORT_ACTIVE, nullptr);
-        Message(kError, "Add active DV port %s, return %s\n", portId, Text(status));
+        if (Prints(kError)) Message(kError, "Add active DV port %s, return %s\n", portId, Text(status));
         return status;
     }
     uint32_t kind = 0;
@@ -83,7 +90,7 @@ HYP_ReturnStatus AddAs(DVSwitch *sw, const char *portId, DVSData *list, DVSDataE
 
 HYP_ReturnStatus AddPort(DVSwitch *sw, const char *portId, const Source &source) {
     if (!sw) return HYP_NOT_FOUND;
-    Message(kDetail, "Deserialize %s, %s\n", sw->switchId, portId);
+    if (Prints(kDetail)) Message(kDetail, "Deserialize %s, %s\n", sw->switchId, portId);
     OwnedList list;
     HYP_ReturnStatus status = ReadOwned(list, source);
     if (status != HYP_OK) return status;
@@ -105,8 +112,9 @@ public:
         return slot.present ? &slot.entry : nullptr;
     }
     [[nodiscard]] bool Holds(const data::EntryRef &entry) const {
-        const std::size_t index = IndexOf(entry.name);
-        return index < slots_.size() && slots_[index].entry.offset == entry.offset;
+        // No entry begins at 0, where the slots of missing ones point.
+        return std::ranges::any_of(slots_,
+                                   [&](const Slot &slot) { return slot.entry.offset == entry.offset; });
     }
 
 private:

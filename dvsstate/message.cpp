@@ -14,10 +14,6 @@ int32_t dvs_debug = -1;
 
 namespace dvs::state {
 
-bool Prints(int level) {
-    return dvs_debug >= level;
-}
-
 void Message(int level, const char *format, ...) {
     if (!Prints(level)) return;
     va_list args;

@@ -4,7 +4,7 @@
 
 // The emitter of the switch state: every message of this folder goes out here, guarded by dvs_debug.
 
-#include "dvs/status.h"
+#include "dvs/state.h"
 
 namespace dvs::state {
 
@@ -14,7 +14,9 @@ inline constexpr int kTrace = 1;
 inline constexpr int kDetail = 2;
 
 /// True when messages of this level print: worth asking before work that only a message needs.
-[[nodiscard]] bool Prints(int level);
+[[nodiscard]] inline bool Prints(int level) {
+    return dvs_debug >= level;
+}
 
 /// Prints to standard output (or the sink) when dvs_debug is at `level` or above.
 void Message(int level, const char *format, ...) __attribute__((format(printf, 2, 3)));

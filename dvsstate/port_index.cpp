@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <cstring>
 
+#include "dvsdata/format.h"
 #include "dvsstate/switch_record.h"
 
 namespace dvs::state {
@@ -14,19 +15,28 @@ namespace {
 
 constexpr uint32_t kFirstBucketNum = 2 * kWalkedSlots;
 
+/// Up to seven bytes, those in the middle possibly twice: what tells them apart is all there.
+uint64_t ShortWord(const char *text, std::size_t size) {
+    const auto byte = [text](std::size_t at) { return uint64_t{static_cast<unsigned char>(text[at])}; };
+    if (size >= 4) return dvs::data::Load32(text) | uint64_t{dvs::data::Load32(text + size - 4)} << 32;
+    return size == 0 ? 0 : byte(0) | byte(size / 2) << 8 | byte(size - 1) << 16;
+}
+
 uint32_t HashOf(std::string_view id) {
     // Eight bytes a step; an odd multiplier and a shift spread them. Ids made to collide cost what a walk
     // costs.
     constexpr uint64_t kMultiplier = 0x9e3779b97f4a7c15;
     uint64_t hash = id.size();
-    while (!id.empty()) {
-        uint64_t word = 0;
-        const std::size_t size = std::min(id.size(), sizeof word);
-        std::memcpy(&word, id.data(), size);
+    const auto mix = [&hash](uint64_t word) {
         hash = (hash ^ word) * kMultiplier;
         hash ^= hash >> 32;
-        id.remove_prefix(size);
+    };
+    for (; id.size() >= sizeof hash; id.remove_prefix(sizeof hash)) {
+        uint64_t word = 0;
+        std::memcpy(&word, id.data(), sizeof word);
+        mix(word);
     }
+    mix(ShortWord(id.data(), id.size()));
     return static_cast<uint32_t>(hash);
 }
 
@@ -78,23 +88,20 @@ void Rebuild(DVSwitch *sw, uint32_t bucketNum) {
 
 } // namespace
 
-bool HasIndex(DVSwitch *sw) {
-    return FrontOf(sw).bucketNum != 0;
-}
+PortKey::PortKey(std::string_view portId) : id(portId), hash(HashOf(portId)) {}
 
-DVSPort *IndexFind(DVSwitch *sw, std::string_view portId, uint32_t kind) {
-    const uint32_t hash = HashOf(portId);
-    DVSPort *port = BucketFor(sw, hash);
-    while (port && !(FrontOf(port).hash == hash && port->portType == kind && portId == port->portId))
+DVSPort *IndexFind(DVSwitch *sw, const PortKey &key, uint32_t kind) {
+    DVSPort *port = BucketFor(sw, key.hash);
+    while (port && !(FrontOf(port).hash == key.hash && port->portType == kind && key.id == port->portId))
         port = FrontOf(port).next;
     return port;
 }
 
-void IndexAdd(DVSwitch *sw, DVSPort *port, uint32_t slot) {
+void IndexAdd(DVSwitch *sw, DVSPort *port, const PortKey &key, uint32_t slot) {
     SwitchFront &front = FrontOf(sw);
     PortFront &portFront = FrontOf(port);
     portFront.slot = slot;
-    portFront.hash = HashOf(port->portId);
+    portFront.hash = key.hash;
     if (!HasIndex(sw)) {
         if (front.usedSlots > kWalkedSlots) Rebuild(sw, kFirstBucketNum);
         return;

@@ -14,18 +14,29 @@
 #include <string_view>
 
 #include "dvs/state.h"
+#include "dvsstate/switch_record.h"
 
 namespace dvs::state {
 
 /// True when the switch has an index; the functions below need one, but for IndexAdd.
-[[nodiscard]] bool HasIndex(DVSwitch *sw);
+[[nodiscard]] inline bool HasIndex(DVSwitch *sw) {
+    return FrontOf(sw).bucketNum != 0;
+}
+
+/// A port's id and what the index makes of it, worked out once for all that is done with the port.
+struct PortKey {
+    explicit PortKey(std::string_view portId);
+
+    std::string_view id;
+    uint32_t hash;
+};
 
 /// The first port in slot order of this id and kind; none when there is none.
-[[nodiscard]] DVSPort *IndexFind(DVSwitch *sw, std::string_view portId, uint32_t kind);
+[[nodiscard]] DVSPort *IndexFind(DVSwitch *sw, const PortKey &key, uint32_t kind);
 
-/// Takes note of a port that was put into a slot, and builds the index when the switch has become large
-/// enough.
-void IndexAdd(DVSwitch *sw, DVSPort *port, uint32_t slot);
+/// Takes note of the port of this key, which was put into a slot, and builds the index when the switch has
+/// become large enough.
+void IndexAdd(DVSwitch *sw, DVSPort *port, const PortKey &key, uint32_t slot);
 
 /// Forgets a port that is about to leave its slot.
 void IndexRemove(DVSwitch *sw, DVSPort *port);

@@ -21,8 +21,8 @@ uint32_t numPortsInUseHostWide = 0;
 
 namespace {
 
-HYP_ReturnStatus CheckLimits(const DVSwitch *sw, const char *portId) {
-    if (std::strlen(portId) >= PortIdSize(sw->version)) {
+HYP_ReturnStatus CheckLimits(const DVSwitch *sw, const char *portId, std::size_t portIdLen) {
+    if (portIdLen >= PortIdSize(sw->version)) {
         Message(kError, "DVSStatePortAdd %s, id length too long\n", portId);
         return HYP_BAD_PARAM;
     }
@@ -75,10 +75,10 @@ ScanResult ScanSlots(DVSwitch *sw, std::string_view portId, uint32_t kind, uint3
 
 /// The same from the index. A port behind `end` is in nobody's way, and is the first of its kind only when
 /// none stands before it.
-ScanResult ScanIndex(DVSwitch *sw, std::string_view portId, uint32_t kind, uint32_t end) {
+ScanResult ScanIndex(DVSwitch *sw, const PortKey &key, uint32_t kind, uint32_t end) {
     ScanResult result{nullptr, kNoSlot, kNoSlot};
     if (kind != DVS_PORT_ZOMBIE) {
-        DVSPort *port = IndexFind(sw, portId, kind);
+        DVSPort *port = IndexFind(sw, key, kind);
         if (port && FrontOf(port).slot < end) {
             result.existing = port;
             result.existingSlot = FrontOf(port).slot;
@@ -97,15 +97,15 @@ ScanResult ScanIndex(DVSwitch *sw, std::string_view portId, uint32_t kind, uint3
 }
 
 /// The part of the record that an add may use. The limits can say more than the record has slots.
-ScanResult Scan(DVSwitch *sw, const char *portId, uint32_t kind) {
+ScanResult Scan(DVSwitch *sw, const PortKey &key, uint32_t kind) {
     const uint32_t end = std::min(sw->maxPorts, FrontOf(sw).slotNum);
-    return HasIndex(sw) ? ScanIndex(sw, portId, kind, end) : ScanSlots(sw, portId, kind, end);
+    return HasIndex(sw) ? ScanIndex(sw, key, kind, end) : ScanSlots(sw, key.id, kind, end);
 }
 
-DVSPort *PlacePort(DVSwitch *sw, const char *portId, DVSData *data, uint32_t kind, uint32_t slot) {
+DVSPort *PlacePort(DVSwitch *sw, const PortKey &key, DVSData *data, uint32_t kind, uint32_t slot) {
     DVSPort *port = NewPort();
     if (!port) return nullptr;
-    std::memcpy(port->portId, portId, std::min(std::strlen(portId), kPortIdSize - 1));
+    std::memcpy(port->portId, key.id.data(), key.id.size()); // its length was checked
     port->owner = sw;
     port->portType = kind;
     port->portData = data;
@@ -116,7 +116,7 @@ DVSPort *PlacePort(DVSwitch *sw, const char *portId, DVSData *data, uint32_t kin
     SwitchFront &front = FrontOf(sw);
     front.usedSlots = std::max(front.usedSlots, slot + 1);
     if (front.firstFree == slot) front.firstFree++;
-    IndexAdd(sw, port, slot);
+    IndexAdd(sw, port, key, slot);
     return port;
 }
 
@@ -139,10 +139,11 @@ HYP_ReturnStatus DVSStatePortAdd(DVSwitch *sw, const char *portId, DVSData *data
         Message(kError, "Error: sw is NULL.\n");
         return HYP_NOT_FOUND;
     }
-    Message(kTrace, "DVSStatePortAdd %s, %s\n", sw->switchId, portId);
-    const HYP_ReturnStatus status = CheckLimits(sw, portId);
+    if (Prints(kTrace)) Message(kTrace, "DVSStatePortAdd %s, %s\n", sw->switchId, portId);
+    const PortKey key(portId);
+    const HYP_ReturnStatus status = CheckLimits(sw, portId, key.id.size());
     if (status != HYP_OK) return status;
-    const ScanResult scan = Scan(sw, portId, kind);
+    const ScanResult scan = Scan(sw, key, kind);
     if (scan.existing) {
         // The slot stands where the words want the kind, and the other way round: kept on purpose.
         Message(kError, "DVSStatePortAdd port %s type %d[%d] exists.\n", portId,
@@ -158,7 +159,7 @@ HYP_ReturnStatus DVSStatePortAdd(DVSwitch *sw, const char *portId, DVSData *data
         Message(kError, "DVSStatePortAdd data is NULL when adding port %s \n", portId);
         return HYP_BAD_PARAM;
     }
-    DVSPort *port = PlacePort(sw, portId, data, kind, scan.freeSlot);
+    DVSPort *port = PlacePort(sw, key, data, kind, scan.freeSlot);
     if (!port) {
         Message(kError, "DVSStatePortAdd: failed to allocate port %s\n", portId);
         return HYP_NO_MEMORY;
@@ -179,8 +180,17 @@ HYP_ReturnStatus DVSStatePortRemove(DVSwitch *sw, const char *portId, uint32_t k
     return HYP_OK;
 }
 
+void RemoveAllPorts(DVSwitch *sw) {
+    FrontOf(sw).bucketNum = 0; // no index, which would follow each step to nobody's use
+    WalkSlots(sw, [sw](DVSPort *port, uint32_t slot) {
+        if (Prints(kTrace)) Message(kTrace, "DVSState_PortRemove %s, %s\n", sw->switchId, port->portId);
+        TakeOut(sw, port, slot);
+        return false;
+    });
+}
+
 DVSPort *FindPort(DVSwitch *sw, std::string_view portId, uint32_t kind) {
-    if (HasIndex(sw)) return IndexFind(sw, portId, kind);
+    if (HasIndex(sw)) return IndexFind(sw, PortKey(portId), kind);
     DVSPort *found = nullptr;
     WalkPorts(sw, [&](DVSPort *port) {
         if (Is(port, portId, kind)) found = port;

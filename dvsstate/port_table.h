@@ -32,22 +32,31 @@ extern uint32_t numPortsInUseHostWide;
 /// Removes the first port of this id and kind and frees its data. HYP_NOT_FOUND when there is none.
 [[nodiscard]] HYP_ReturnStatus DVSStatePortRemove(DVSwitch *sw, const char *portId, uint32_t kind);
 
+/// Removes the ports of a switch in slot order, up to a slot that is marked and holds none. By id and kind
+/// each would be found where it stands, as nothing of its kind is left before it, so none can fail to go.
+void RemoveAllPorts(DVSwitch *sw);
+
 /// The first port in slot order of this id and kind; none when there is none.
 [[nodiscard]] DVSPort *FindPort(DVSwitch *sw, std::string_view portId, uint32_t kind);
 
 /// The port in a slot; none when the slot is empty or outside the record.
 [[nodiscard]] DVSPort *PortAt(DVSwitch *sw, uint32_t slot);
 
-/// Calls visit(port) for the port of each set bit in slot order, until it returns true (the result then) or a
-/// set bit has no port behind it, which ends every walk over a switch's ports. A visit may remove the port it
-/// got.
-template <typename Visit> bool WalkPorts(DVSwitch *sw, Visit visit) {
+/// Calls visit(port, slot) for the port of each set bit in slot order, until it returns true (the result
+/// then) or a set bit has no port behind it, which ends every walk over a switch's ports. A visit may remove
+/// the port it got.
+template <typename Visit> bool WalkSlots(DVSwitch *sw, Visit visit) {
     for (uint32_t slot = 0; BitVector_NextBit(sw->portBitmap, slot, true, &slot); slot++) {
         DVSPort *port = PortAt(sw, slot);
         if (!port) return false;
-        if (visit(port)) return true;
+        if (visit(port, slot)) return true;
     }
     return false;
+}
+
+/// The same with visit(port).
+template <typename Visit> bool WalkPorts(DVSwitch *sw, Visit visit) {
+    return WalkSlots(sw, [&](DVSPort *port, uint32_t) { return visit(port); });
 }
 
 } // namespace dvs::state

@@ -17,14 +17,6 @@ static_assert(sizeof(SwitchFront) % alignof(DVSwitch) == 0);
 static_assert(sizeof(PortFront) % alignof(DVSPort) == 0);
 static_assert(alignof(DVSPort *) == alignof(DVSwitch));
 
-SwitchFront &FrontOf(DVSwitch *sw) {
-    return *(reinterpret_cast<SwitchFront *>(sw) - 1);
-}
-
-PortFront &FrontOf(DVSPort *port) {
-    return *(reinterpret_cast<PortFront *>(port) - 1);
-}
-
 DVSPort **BucketsOf(DVSwitch *sw) {
     SwitchFront &front = FrontOf(sw);
     return reinterpret_cast<DVSPort **>(&front) - front.bucketCapacity;
@@ -77,8 +69,10 @@ void FreeSwitch(DVSwitch *sw) {
 }
 
 DVSPort *NewPort() {
-    void *block = std::calloc(1, sizeof(PortFront) + sizeof(DVSPort));
-    return block ? reinterpret_cast<DVSPort *>(static_cast<PortFront *>(block) + 1) : nullptr;
+    void *block = std::malloc(sizeof(PortFront) + sizeof(DVSPort));
+    if (!block) return nullptr;
+    auto *front = new (block) PortFront{};
+    return new (front + 1) DVSPort{};
 }
 
 void FreePort(DVSPort *port) {

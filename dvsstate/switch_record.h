@@ -37,8 +37,12 @@ struct PortFront {
 // A switch with few slots in use is walked; an index would cost it more than it saves.
 inline constexpr uint32_t kWalkedSlots = 64;
 
-[[nodiscard]] SwitchFront &FrontOf(DVSwitch *sw);
-[[nodiscard]] PortFront &FrontOf(DVSPort *port);
+[[nodiscard]] inline SwitchFront &FrontOf(DVSwitch *sw) {
+    return *(reinterpret_cast<SwitchFront *>(sw) - 1);
+}
+[[nodiscard]] inline PortFront &FrontOf(DVSPort *port) {
+    return *(reinterpret_cast<PortFront *>(port) - 1);
+}
 [[nodiscard]] DVSPort **BucketsOf(DVSwitch *sw);
 
 /// A record with `slotNum` empty slots, its bit vector and both property lists empty. HYP_NO_MEMORY when any

@@ -142,15 +142,8 @@ HYP_ReturnStatus DVSStateSwitchRemove(const char *switchId) {
         Message(kError, "DVSState_SwitchRemove DVSID %s, statue %s\n", switchId, Text(HYP_NOT_FOUND));
         return HYP_NOT_FOUND;
     }
-    DVSwitch *sw = *slot;
-    for (uint32_t bit = 0; BitVector_NextBit(sw->portBitmap, bit, true, &bit); bit++) {
-        DVSPort *port = PortAt(sw, bit);
-        if (!port) break;
-        // Kept on purpose: a port that cannot be removed leaves the switch in place, and that counts as
-        // success.
-        if (DVSStatePortRemove(sw, port->portId, port->portType) != HYP_OK) return HYP_OK;
-    }
-    FreeSwitch(sw);
+    RemoveAllPorts(*slot);
+    FreeSwitch(*slot);
     *slot = nullptr;
     return HYP_OK;
 }

@@ -130,6 +130,17 @@ TEST_P(BadBuffers, AreRefusedWithoutALeftover) {
     EXPECT_EQ(Heap().Live(), 0u);
 }
 
+TEST_P(BadBuffers, AreRefusedAlikeByListsInOneBlock) {
+    const Buffer buffer = Damaged();
+    ResetHeap();
+    const Messages messages(0);
+    const auto [status, list] = ReadShared(buffer);
+    EXPECT_EQ(status, GetParam().status);
+    EXPECT_EQ(list, nullptr);
+    EXPECT_EQ(messages.All(), Texts{GetParam().message});
+    EXPECT_EQ(Heap().Live(), 0u);
+}
+
 TEST_P(BadBuffers, GiveSingleValuesAsFarAsTheyCan) {
     const ExactBlock block(Damaged());
     const Messages messages(0);
@@ -281,6 +292,66 @@ TEST(DataDeserialize, MissingMemoryIsNoMemoryWithoutALeftover) {
         ++refused;
     }
     EXPECT_EQ(refused, 41u);
+}
+
+// ---- Lists in one block ----
+
+TEST(ListInOneBlock, HoldsTheSameInOneAllocation) {
+    const Props props{{"a", "", 0x10}, {"dropped", "1", 1}, {"b", "12345"}, {"c", std::string(300, 'v')}};
+    const Buffer buffer = SerializedOf(props);
+    ResetHeap();
+    const auto [status, list] = ReadShared(buffer);
+    ASSERT_EQ(status, HYP_OK);
+    EXPECT_EQ(Heap().allocs, 1u);
+    ExpectSound(list.get());
+    EXPECT_EQ(ContentOf(list), (Props{props[0], props[2], props[3]}));
+    EXPECT_EQ(Serialized(list.get()), Serialized(Read(buffer).second.get()));
+}
+
+TEST(ListInOneBlock, GivesBlocksToWhatIsAddedAndTakesThemBack) {
+    const Props props{{"a", "1"}, {"b", "2"}, {"c", "3"}};
+    const Buffer buffer = SerializedOf(props);
+    ResetHeap();
+    auto [status, list] = ReadShared(buffer);
+    ASSERT_EQ(status, HYP_OK);
+    Append(list.get(), {"d", "4"});
+    ASSERT_EQ(DVSData_Update(list.get(), "a", "longer", 6, 0), HYP_OK);
+    EXPECT_EQ(Heap().allocs, 3u);
+    ASSERT_EQ(DVSData_Remove(list.get(), "b"), HYP_OK);
+    EXPECT_EQ(Heap().frees, 0u); // it had no block
+    ASSERT_EQ(DVSData_Remove(list.get(), "d"), HYP_OK);
+    EXPECT_EQ(Heap().frees, 1u);
+    EXPECT_EQ(ContentOf(list), (Props{{"c", "3"}, {"a", "longer"}}));
+    list.reset();
+    EXPECT_EQ(Heap().Live(), 0u);
+}
+
+TEST(ListInOneBlock, SaysWhatOtherListsSay) {
+    const Buffer buffer = SerializedOf(kTwo);
+    for (const int level : {1, 2, 3}) {
+        Messages messages(level);
+        (void)Read(buffer);
+        const Texts expected = messages.Take();
+        (void)ReadShared(buffer);
+        EXPECT_EQ(messages.Take(), expected) << level;
+    }
+}
+
+TEST(ListInOneBlock, WithoutMemoryIsNoMemory) {
+    const Buffer buffer = SerializedOf(kTwo);
+    const FailingHeap failing(1);
+    const auto [status, list] = ReadShared(buffer);
+    EXPECT_EQ(status, HYP_NO_MEMORY);
+    EXPECT_EQ(list, nullptr);
+}
+
+TEST(ListInOneBlock, AnUpdateMayTakeItsValueFromTheEntryItReplaces) {
+    const auto [status, list] = ReadShared(SerializedOf({{"a", "0123456789"}}));
+    ASSERT_EQ(status, HYP_OK);
+    DVSDataEntry *entry = nullptr;
+    ASSERT_EQ(DVSData_Lookup(list.get(), "a", &entry), HYP_OK);
+    ASSERT_EQ(DVSData_Update(list.get(), entry->name, entry->data + 4, 6, 0), HYP_OK);
+    EXPECT_EQ(ContentOf(list), (Props{{"a", "456789"}}));
 }
 
 // ---- Single values ----

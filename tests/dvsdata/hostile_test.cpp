@@ -39,6 +39,12 @@ void Probe(const Buffer &buffer, const std::string &what) {
     EXPECT_EQ(fault.Status(), status) << what << ": " << fault.Text();
     EXPECT_LE(fault.offset, buffer.size()) << what;
 
+    const auto [sharedStatus, shared] = ReadShared(buffer, 0xffffffff);
+    EXPECT_EQ(sharedStatus, status) << what;
+    if (status == HYP_OK) {
+        EXPECT_EQ(ContentOf(shared), ContentOf(list)) << what;
+    }
+
     data::InPlaceList inPlace;
     ASSERT_EQ(inPlace.Open(block.bytes(), 0xffffffff, {}, data::PartSums::Yes), status) << what;
     if (status == HYP_OK) {

@@ -96,16 +96,20 @@ void ExpectAlike(DVSData *list, const Model &model) {
     RC_ASSERT(ContentOf(Read(Serialized(list)).second) == kept);
 }
 
-void Check(const char *what, int steps, std::uint32_t names, std::uint32_t preload) {
+enum class Start { Appended, ReadShared };
+
+void Check(const char *what, int steps, std::uint32_t names, std::uint32_t preload,
+           Start start = Start::Appended) {
     const bool ok = rc::check(what, [=] {
         ResetHeap();
         {
-            const ListPtr list = NewList();
+            ListPtr list = NewList();
             Model model;
             for (std::uint32_t i = 0; i < preload; ++i) {
                 model.props.push_back({"com.orbeno.common." + std::to_string(i % names), "v", 0x20});
                 Append(list.get(), model.props.back());
             }
+            if (start == Start::ReadShared) list = ReadShared(Serialized(list.get())).second;
             for (int i = 0; i < steps; ++i)
                 Step(list.get(), &model, names);
             ExpectAlike(list.get(), model);
@@ -123,6 +127,10 @@ TEST(ListModel, ListsThatGrowAndShrinkAcrossTheIndex) {
 }
 TEST(ListModel, LongLists) {
     Check("a long list acts like a vector", 60, 200, 300);
+}
+TEST(ListModel, ListsReadIntoOneBlock) {
+    Check("a list that shares one block acts like a vector", 40, 12, 12, Start::ReadShared);
+    Check("a long list that shares one block acts like a vector", 60, 60, 45, Start::ReadShared);
 }
 
 // ---- Allocation failures ----

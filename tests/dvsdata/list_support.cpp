@@ -9,6 +9,7 @@
 #include <ostream>
 
 #include "dvs/log.h"
+#include "dvsdata/list_internal.h"
 
 namespace dvs::test {
 namespace {
@@ -150,6 +151,14 @@ std::pair<HYP_ReturnStatus, ListPtr> Read(std::span<const std::uint8_t> bytes, s
     DVSData *list = nullptr;
     const HYP_ReturnStatus status = DVSData_DeserializeWithPropType(&list, block.data(), block.size(),
                                                                     CountingAlloc, CountingFree, typeMask);
+    return {status, ListPtr(list)};
+}
+
+std::pair<HYP_ReturnStatus, ListPtr> ReadShared(std::span<const std::uint8_t> bytes, std::uint32_t typeMask) {
+    const ExactBlock block(bytes);
+    DVSData *list = nullptr;
+    const HYP_ReturnStatus status = data::ReadList(&list, block.bytes(), CountingAlloc, CountingFree,
+                                                   typeMask, {}, data::EntryBlocks::Shared);
     return {status, ListPtr(list)};
 }
 

@@ -105,6 +105,9 @@ void Mend(Buffer *buffer);
 /// Deserializes from an exact block; the list is null when refused.
 std::pair<HYP_ReturnStatus, ListPtr> Read(std::span<const std::uint8_t> bytes,
                                           std::uint32_t typeMask = 0x800000fc);
+/// The same into one block with the handle.
+std::pair<HYP_ReturnStatus, ListPtr> ReadShared(std::span<const std::uint8_t> bytes,
+                                                std::uint32_t typeMask = 0x800000fc);
 std::string U32Value(std::uint32_t value);
 
 // ---- Messages ----

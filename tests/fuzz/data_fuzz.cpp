@@ -67,6 +67,11 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
         DVSData_DeserializeWithPropType(&list, bytes.data(), length, Allocate, std::free, UINT32_MAX);
     Demand((list != nullptr) == (status == HYP_OK));
     Demand(dvs::data::VerifyBuffer(bytes).Status() == status);
+    DVSData *shared = nullptr;
+    Demand(dvs::data::ReadList(&shared, bytes, Allocate, std::free, UINT32_MAX, {},
+                               dvs::data::EntryBlocks::Shared) == status);
+    if (shared) RoundTrip(shared);
+    DVSData_Free(shared);
     dvs::data::InPlaceList inPlace;
     Demand(inPlace.Open(bytes, UINT32_MAX, {}, dvs::data::PartSums::Yes) == status);
     WalkNested(bytes, 0, 3);
