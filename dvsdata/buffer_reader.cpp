@@ -53,7 +53,7 @@ inline HYP_ReturnStatus PlaceAt(Bytes buf, std::uint32_t offset, Place *place) {
     return HYP_OK;
 }
 
-void EmitReading(const Place &place) {
+void EmitReading(Place place) {
     const std::string_view name = StoredName(place.at);
     Emit(kEntry, "deserializing %.*s: %u/%u data/serial bytes %d flag\n", static_cast<int>(name.size()),
          name.data(), place.dataLen, place.size, Load32(place.at + kPropTypeOffset));
@@ -79,7 +79,7 @@ struct FreeList {
 constexpr std::uint32_t kMaxPlainLen = UINT32_MAX / 2;
 
 /// Append() of an entry that lies there as it is to be: one copy, and zeros for what the format leaves open.
-inline HYP_ReturnStatus AppendImage(DVSData *list, const Place &place) {
+inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
     const NameField look = LookAtName(place.at + kNameOffset);
     const std::string_view name(reinterpret_cast<const char *>(place.at + kNameOffset), look.len);
     if (place.dataLen > kMaxPlainLen || Emits(kDetail)) [[unlikely]]
