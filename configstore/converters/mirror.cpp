@@ -38,7 +38,11 @@ using layout::AreaOf;
 using layout::At;
 using layout::kMirrorTableNarrow;
 using layout::Slot;
+using layout::mirror::kEncapsulatedSource;
+using layout::mirror::kMixedDest;
 using layout::mirror::kNarrowPort;
+using layout::mirror::kRemoteDest;
+using layout::mirror::kRemoteSource;
 using layout::mirror::kSession;
 using layout::mirror::kWidePort;
 
@@ -67,9 +71,9 @@ constexpr auto kPortKind = At<uint32_t>(kNarrowPort, "kind");
 constexpr auto kPortName = AreaOf(kWidePort, "name");
 static_assert(AreaOf(kNarrowPort, "name").offset == kPortName.offset);
 // The same bytes, where the session's type makes them a VLAN id or an address.
-constexpr Slot<uint16_t> kPortVlanId = {kPortName.offset};
-constexpr Slot<uint8_t> kPortIsIpv6 = {kPortName.offset};
-constexpr uint32_t kPortAddress = kPortName.offset + 4;
+constexpr auto kPortVlanId = At<uint16_t>(layout::mirror::kNarrowVlan, "vlan_id");
+constexpr Slot<uint8_t> kPortIsIpv6 = {AreaOf(layout::mirror::kNarrowAddress, "address").offset};
+constexpr uint32_t kPortAddress = kPortIsIpv6.offset + 4;
 
 constexpr std::size_t kHeadSize = layout::mirror::kHeadSize;
 constexpr uint32_t kMagicValue = 0xFACEBEEF;
@@ -83,7 +87,6 @@ constexpr uint32_t kHasEncapVlan = 0x08;
 constexpr uint32_t kLegacyMode = 0x10;
 constexpr uint32_t kDisabled = 0x20;
 
-enum SessionType : uint32_t { kMixedDest = 0, kRemoteSource = 2, kRemoteDest = 3, kEncapsulatedSource = 4 };
 enum PortKind : uint32_t { kPortKey = 0, kUplinkName = 1 };
 
 struct ConnecteeType {

@@ -68,17 +68,59 @@ static_assert(IsSound(kSession));
 inline constexpr Field kNarrowPortFields[] = {
     // name  offset width kind         domain       meaning
     {"kind",      0,    4, Kind::kEnum, &kPortKinds, "what the name is"},
-    {"name",      4,   32, Kind::kText, nullptr,     "port key or uplink name; by session type a VLAN id (2 bytes) or an "
-                                                     "address (1 byte not 0 for IPv6, 3 unused, 4 or 16 bytes)"},
+    {"name",      4,   32, Kind::kText, nullptr,     "port key or uplink name"},
 };
 inline constexpr Field kWidePortFields[] = {
     // name  offset width kind         domain       meaning
     {"kind",      0,    4, Kind::kEnum, &kPortKinds, "as in the narrow record"},
     {"name",      4,   48, Kind::kText, nullptr,     "as in the narrow record"},
 };
+inline constexpr Field kNarrowVlanFields[] = {
+    // name     offset width kind             domain       meaning
+    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "0"},
+    {"vlan_id",      4,    2, Kind::kUnsigned, nullptr,     "VLAN whose frames are mirrored"},
+    {"unused",       6,   30, Kind::kReserved, nullptr,     "0"},
+};
+inline constexpr Field kWideVlanFields[] = {
+    // name     offset width kind             domain       meaning
+    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "as in the narrow record"},
+    {"vlan_id",      4,    2, Kind::kUnsigned, nullptr,     "as in the narrow record"},
+    {"unused",       6,   46, Kind::kReserved, nullptr,     "0"},
+};
+inline constexpr Field kNarrowAddressFields[] = {
+    // name     offset width kind             domain       meaning
+    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "0"},
+    {"address",      4,   20, Kind::kTagged,   nullptr,     "where mirrored frames are sent: 1 byte not 0 for IPv6, 3 unused, then 4 "
+                                                            "or 16 bytes of address"},
+    {"unused",      24,   12, Kind::kReserved, nullptr,     "0"},
+};
+inline constexpr Field kWideAddressFields[] = {
+    // name     offset width kind             domain       meaning
+    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "as in the narrow record"},
+    {"address",      4,   20, Kind::kTagged,   nullptr,     "as in the narrow record"},
+    {"unused",      24,   28, Kind::kReserved, nullptr,     "0"},
+};
 inline constexpr Record kNarrowPort = {"narrow port record", 36, kNarrowPortFields, {}};
+inline constexpr Record kNarrowVlan = {"narrow VLAN record", 36, kNarrowVlanFields, {}};
+inline constexpr Record kNarrowAddress = {"narrow address record", 36, kNarrowAddressFields, {}};
 inline constexpr Record kWidePort = {"wide port record", 52, kWidePortFields, {}};
-static_assert(IsSound(kNarrowPort) && IsSound(kWidePort));
+inline constexpr Record kWideVlan = {"wide VLAN record", 52, kWideVlanFields, {}};
+inline constexpr Record kWideAddress = {"wide address record", 52, kWideAddressFields, {}};
+static_assert(IsSound(kNarrowPort) && IsSound(kNarrowVlan) && IsSound(kNarrowAddress));
+static_assert(IsSound(kWidePort) && IsSound(kWideVlan) && IsSound(kWideAddress));
+
+enum SessionType : uint32_t { kMixedDest = 0, kDvport = 1, kRemoteSource = 2, kRemoteDest = 3, kEncapsulatedSource = 4 };
+
+inline constexpr Variant kNarrowVariants[] = {
+    {"receive_count",     "session_type", kRemoteDest,         &kNarrowVlan},
+    {"transmit_count",    "session_type", kRemoteDest,         &kNarrowVlan},
+    {"destination_count", "session_type", kEncapsulatedSource, &kNarrowAddress},
+};
+inline constexpr Variant kWideVariants[] = {
+    {"receive_count",     "session_type", kRemoteDest,         &kWideVlan},
+    {"transmit_count",    "session_type", kRemoteDest,         &kWideVlan},
+    {"destination_count", "session_type", kEncapsulatedSource, &kWideAddress},
+};
 
 inline constexpr Field kHeadFields[] = {
     // name         offset width kind             domain   meaning
@@ -90,11 +132,11 @@ inline constexpr Field kHeadFields[] = {
 };
 inline constexpr Part kNarrowParts[] = {
     {"sessions", &kSession,    CountBy::kField, 0, "session_count", nullptr, 0, "the sessions"},
-    {"ports",    &kNarrowPort, CountBy::kShare, 0, nullptr,         nullptr, 0, "the sessions' ports"},
+    {"ports",    &kNarrowPort, CountBy::kShare, 0, nullptr,         nullptr, 0, "the sessions' ports", kNarrowVariants},
 };
 inline constexpr Part kWideParts[] = {
     {"sessions", &kSession,  CountBy::kField, 0, "session_count", nullptr, 0, "the sessions"},
-    {"ports",    &kWidePort, CountBy::kShare, 0, nullptr,         nullptr, 0, "the sessions' ports"},
+    {"ports",    &kWidePort, CountBy::kShare, 0, nullptr,         nullptr, 0, "the sessions' ports", kWideVariants},
 };
 // clang-format on
 

@@ -26,6 +26,10 @@ std::string DomainText(const Field &field);
 /// How many elements a part has: "`count` of them".
 std::string CountText(const Part &part);
 
+/// Which elements of a part are another record: "those of `receive_count` are …". The record's name stands in
+/// *.
+std::string VariantText(const Variant &variant);
+
 /// The whole document. It depends on nothing but the tables, so the same tables give the same bytes.
 std::string PropertiesDocument();
 

@@ -29,6 +29,7 @@ enum class Kind : uint8_t {
     kLiteral,  // a text that takes one of a few stated values; no terminator is needed to tell them apart
     kIpv4,     // four bytes, network order
     kAddress,  // IPv4 in the first four bytes or IPv6 in all sixteen
+    kTagged,   // an address behind a word whose first byte tells its kind, 0 for IPv4: 20 bytes
     kOpaque,   // bytes this library does not look into, up to the value's end
     kReserved, // carried as zero
 };
@@ -66,6 +67,15 @@ enum class CountBy : uint8_t {
 
 struct Record;
 
+// What some of the elements of a kShare part are instead: those that the field `share` counted, of an element
+// whose field `field` has `value`. As large as the part's own element.
+struct Variant {
+    const char *share;
+    const char *field;
+    uint32_t value;
+    const Record *element;
+};
+
 // Elements that follow a record's fields. `gate` (a mask of the field `gateField`) being clear means that
 // there are none, whatever the count says.
 struct Part {
@@ -77,6 +87,7 @@ struct Part {
     const char *gateField;
     uint32_t gate;
     const char *meaning;
+    std::span<const Variant> variants = {};
 };
 
 struct Record {

@@ -36,9 +36,9 @@ constexpr uint32_t kPortKeyMax = 47;
 constexpr StoreField kFailureCriteria[] = {
     {"check_beacon",  Form::kBool,   "",  0, nullptr, nullptr, {}, "beacon probing decides about a link"},
     {"lc_link_state", Form::kBool,   "",  0, nullptr, nullptr, {}, "the link state alone decides"},
-    {"full_duplex",   Form::kBool,   "",  0, nullptr, nullptr, {}, "an uplink that is not full duplex counts as failed; not read back"},
-    {"percentage",    Form::kUint16, "%", 0, nullptr, nullptr, {}, "error percentage of a failed uplink; not read back"},
-    {"speed",         Form::kUint16, "",  0, nullptr, nullptr, {}, "least speed of a sound uplink; not read back"},
+    {"full_duplex",   Form::kBool,   "",  0, nullptr, nullptr, {}, "an uplink that is not full duplex counts as failed; not loaded from a store"},
+    {"percentage",    Form::kUint16, "%", 0, nullptr, nullptr, {}, "error percentage of a failed uplink; not loaded from a store"},
+    {"speed",         Form::kUint16, "",  0, nullptr, nullptr, {}, "least speed of a sound uplink; not loaded from a store"},
 };
 constexpr StoreField kUplinkOrder[] = {
     {"active_uplink_ports",  Form::kTexts, "", kUplinkNameMax, nullptr, nullptr, {}, "active uplinks, in order"},
@@ -55,12 +55,12 @@ constexpr StoreField kTeaming[] = {
     {"uplink_port_order", Form::kObject, "", 0, nullptr, nullptr, kUplinkOrder, "which uplinks are used first"},
 };
 constexpr StoreField kRange[] = {
-    {"start", Form::kUint16, "", 0, nullptr, nullptr, {}, "first VLAN id"},
-    {"end",   Form::kUint16, "", 0, nullptr, nullptr, {}, "last VLAN id"},
+    {"start", Form::kUint16, "", 0, nullptr, nullptr, {}, "first VLAN id", Rule::kVlan},
+    {"end",   Form::kUint16, "", 0, nullptr, nullptr, {}, "last VLAN id", Rule::kVlan},
 };
 constexpr StoreField kVlan[] = {
-    {"vlan_id",        Form::kUint16,    "", 0, nullptr, nullptr, {}, "VLAN id of an access port"},
-    {"pvlan_id",       Form::kUint16,    "", 0, nullptr, nullptr, {}, "private VLAN id"},
+    {"vlan_id",        Form::kUint16,    "", 0, nullptr, nullptr, {}, "VLAN id of an access port", Rule::kVlan},
+    {"pvlan_id",       Form::kUint16,    "", 0, nullptr, nullptr, {}, "private VLAN id", Rule::kVlan},
     {"trunk_vlan_ids", Form::kInstances, "", 0, nullptr, nullptr, kRange, "ranges of a trunk"},
 };
 constexpr StoreField kShaping[] = {
@@ -75,7 +75,7 @@ constexpr StoreField kSecurity[] = {
     {"allow_forged_transmit", Form::kBool, "", 0, nullptr, nullptr, {}, "frames with another source address are accepted"},
 };
 constexpr StoreField kFilter[] = {
-    {"slot_number", Form::kText,  "", 0,   nullptr,     nullptr, {}, "place in the chain of filters, as decimal text"},
+    {"slot_number", Form::kText,  "", 0,   nullptr,     nullptr, {}, "place in the chain of filters, as decimal text", Rule::kSlot},
     {"agent_name",  Form::kText,  "", 39,  nullptr,     nullptr, {}, "agent that filters"},
     {"on_failure",  Form::kText,  "", 0,   &kOnFailure, nullptr, {}, "what becomes of traffic without the agent"},
     {"parameters",  Form::kTexts, "", 255, nullptr,     nullptr, {}, "what the agent is given"},
@@ -88,19 +88,19 @@ constexpr StoreField kPortLacpMembers[] = {
     {"mode",    Form::kText, "", 0, &kLacpModeTexts, nullptr, {}, "whether it speaks first, answers only, or neither"},
 };
 constexpr StoreField kPvlan[] = {
-    {"primary_id",   Form::kUint16, "", 0, nullptr,      nullptr, {}, "primary VLAN id"},
-    {"secondary_id", Form::kUint16, "", 0, nullptr,      nullptr, {}, "secondary VLAN id"},
+    {"primary_id",   Form::kUint16, "", 0, nullptr,      nullptr, {}, "primary VLAN id", Rule::kVlan},
+    {"secondary_id", Form::kUint16, "", 0, nullptr,      nullptr, {}, "secondary VLAN id", Rule::kVlan},
     {"type",         Form::kText,   "", 0, &kPvlanTypes, nullptr, {}, "whom ports of the secondary VLAN can reach"},
 };
 constexpr StoreField kSourcePort[] = {
     {"wildcard_port_connectee_types", Form::kTexts, "", 0,           &kConnectees, nullptr, {}, "ports that are sources by their kind"},
-    {"port_keys",                     Form::kTexts, "", kPortKeyMax, nullptr,      nullptr, {}, "keys of source ports"},
-    {"vlans",                         Form::kInts,  "", 0,           nullptr,      nullptr, {}, "source VLANs of a remote destination; not read back"},
+    {"port_keys",                     Form::kTexts, "", kPortKeyMax, nullptr,      nullptr, {}, "keys of source ports, of all but a REMOTE_MIRROR_DEST"},
+    {"vlans",                         Form::kInts,  "", 0,           nullptr,      nullptr, {}, "source VLANs of a REMOTE_MIRROR_DEST; not loaded from a store", Rule::kVlan},
 };
 constexpr StoreField kDestinationPort[] = {
-    {"port_keys",         Form::kTexts, "", kPortKeyMax, nullptr, nullptr, {}, "keys of destination ports"},
-    {"uplink_port_names", Form::kTexts, "", kPortKeyMax, nullptr, nullptr, {}, "names of destination uplinks"},
-    {"addresses",         Form::kTexts, "", 0,           nullptr, nullptr, {}, "address an encapsulated source sends to; not read back"},
+    {"port_keys",         Form::kTexts, "", kPortKeyMax, nullptr, nullptr, {}, "keys of destination ports, of a MIXED_DEST_MIRROR, DVPORT_MIRROR or REMOTE_MIRROR_DEST"},
+    {"uplink_port_names", Form::kTexts, "", kPortKeyMax, nullptr, nullptr, {}, "names of destination uplinks, of a REMOTE_MIRROR_SOURCE or MIXED_DEST_MIRROR"},
+    {"addresses",         Form::kTexts, "", 0,           nullptr, nullptr, {}, "addresses that an ENCAPSULATED_REMOTE_MIRROR_SOURCE sends to; a store keeps the last one, and loads none", Rule::kAddress},
 };
 constexpr StoreField kVspan[] = {
     {"key",                    Form::kText,   "",      31, nullptr, nullptr, {}, "session key"},
@@ -109,9 +109,9 @@ constexpr StoreField kVspan[] = {
     {"enabled",                Form::kBool,   "",      0, nullptr, nullptr, {}, "the session is switched on"},
     {"strip_original_vlan",    Form::kBool,   "",      0, nullptr, nullptr, {}, "the original VLAN tag is stripped"},
     {"normal_traffic_allowed", Form::kBool,   "",      0, nullptr, nullptr, {}, "the destination carries other traffic too"},
-    {"legacy_mode",            Form::kBool,   "",      0, nullptr, nullptr, {}, "legacy mode; read back inverted"},
-    {"mirrored_packet_length", Form::kUint32, "bytes", 0, nullptr, nullptr, {}, "4294967295: not set; no other length is written"},
-    {"encapsulation_vlan_id",  Form::kUint32, "",      0, nullptr, nullptr, {}, "VLAN of the mirrored frames"},
+    {"legacy_mode",            Form::kBool,   "",      0, nullptr, nullptr, {}, "legacy mode; a store loads it inverted"},
+    {"mirrored_packet_length", Form::kUint32, "bytes", 0, nullptr, nullptr, {}, "bytes mirrored of a frame; 4294967295 or left out: not set; a store keeps no other length", Rule::kUnset},
+    {"encapsulation_vlan_id",  Form::kUint32, "",      0, nullptr, nullptr, {}, "VLAN of the mirrored frames", Rule::kVlan},
     {"sampling_rate",          Form::kUint32, "",      0, nullptr, nullptr, {}, "one frame in so many is mirrored"},
     {"encap_type",             Form::kText,   "",      0, &mirror::kEncapTypes, nullptr, {}, "how mirrored frames are wrapped"},
     {"erspan_id",              Form::kUint16, "",      0, nullptr, nullptr, {}, "ERSPAN session id"},
@@ -135,7 +135,7 @@ constexpr StoreField kLinkDiscoveryMembers[] = {
 constexpr StoreField kIpfixMembers[] = {
     {"idle_flow_timeout",     Form::kUint32, "seconds", 0, nullptr, nullptr, {}, "until a flow without traffic is reported"},
     {"active_flow_timeout",   Form::kUint32, "seconds", 0, nullptr, nullptr, {}, "until a flow with traffic is reported"},
-    {"collector_address",     Form::kText,   "",        0, nullptr, nullptr, {}, "whom flows are reported to, IPv4 or IPv6"},
+    {"collector_address",     Form::kText,   "",        0, nullptr, nullptr, {}, "whom flows are reported to, IPv4 or IPv6", Rule::kAddress},
     {"collector_port",        Form::kUint16, "",        0, nullptr, nullptr, {}, "UDP port of the collector"},
     {"sampling_rate",         Form::kUint32, "",        0, nullptr, nullptr, {}, "one frame in so many is looked at; 0: all"},
     {"internal_flows_only",   Form::kBool,   "",        0, nullptr, nullptr, {}, "only flows between ports of this host"},
@@ -167,7 +167,7 @@ constexpr StoreField kFormUint32         = {nullptr, Form::kUint32,    "", 0, nu
 constexpr StoreField kFormText           = {nullptr, Form::kText,      "", 0, nullptr, nullptr, {}, "the text"};
 constexpr StoreField kFormBeacon         = {nullptr, Form::kInt,       "", 0, nullptr, nullptr, {}, "the number"};
 constexpr StoreField kFormBool           = {nullptr, Form::kBool,      "", 0, nullptr, nullptr, {}, "the flag"};
-constexpr StoreField kFormAddress        = {nullptr, Form::kText,      "", 0, nullptr, nullptr, {}, "dotted IPv4 address"};
+constexpr StoreField kFormAddress        = {nullptr, Form::kText,      "", 0, nullptr, nullptr, {}, "dotted IPv4 address", Rule::kIpv4};
 constexpr StoreField kFormPvlans         = {nullptr, Form::kInstances, "", 0, nullptr, nullptr, kPvlan, "one instance a pair of VLANs"};
 constexpr StoreField kFormLinkDiscovery  = {nullptr, Form::kObject,    "", 0, nullptr, nullptr, kLinkDiscoveryMembers, "protocol and operation"};
 constexpr StoreField kFormVspans         = {nullptr, Form::kInstances, "", 0, nullptr, "key", kVspan, "one instance a session"};

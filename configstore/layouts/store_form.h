@@ -27,6 +27,16 @@ enum class Form : uint8_t {
     kInstances, // list of instances with members
 };
 
+// What a text or number has to be beyond its form, for people who write it; the store does not ask.
+enum class Rule : uint8_t {
+    kNone,
+    kIpv4,    // an IPv4 address
+    kAddress, // an IPv4 or IPv6 address
+    kVlan,    // a VLAN id, 0 to 4095
+    kSlot,    // a uint32 as decimal text
+    kUnset,   // any uint32, the largest of which says the same as leaving it out
+};
+
 struct StoreField {
     const char *name; // of a member; of a leaf the row's last path name stands in its place, and this is null
     Form form;
@@ -36,6 +46,7 @@ struct StoreField {
     const char *id;       // of instances: the member that is the instance id; null: ids mean nothing
     std::span<const StoreField> members; // of objects and of instances
     const char *meaning;
+    Rule rule = Rule::kNone; // of a list: of its elements
 };
 
 } // namespace dvs::layout

@@ -5,6 +5,7 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <vector>
 
 #include <arpa/inet.h>
 
@@ -17,7 +18,15 @@ uint64_t NumberOf(std::span<const uint8_t> bytes) {
     return number;
 }
 
-// One walk: what is left of the value, and what the kShare fields have added up to.
+// A field that says how many elements of a later part belong to its record.
+struct Share {
+    uint64_t count;
+    const Field *field;
+    const layout::Record *record;
+    std::span<const uint8_t> fields; // of the record
+};
+
+// One walk: what is left of the value, and the kShare fields so far.
 class Walker {
 public:
     Walker(std::span<const uint8_t> value, const std::function<void(const Item &)> &visit)
@@ -28,7 +37,11 @@ public:
         for (const Field &field : record.fields) {
             if (!One(field, prefix)) return false;
         }
-        const auto fields = value_.subspan(start, record.size);
+        const auto fields = value_.subspan(start, at_ - start);
+        for (const Field &field : record.fields) {
+            if (field.kind == Kind::kShare)
+                shares_.push_back({FieldOf(record, fields, field.name), &field, &record, fields});
+        }
         return std::all_of(record.parts.begin(), record.parts.end(),
                            [&](const Part &part) { return Elements(record, part, fields, prefix); });
     }
@@ -47,7 +60,6 @@ private:
         const std::size_t width = field.width ? field.width : Rest().size();
         if (Rest().size() < width) return Fail("ends inside " + prefix + field.name);
         const auto bytes = value_.subspan(at_, width);
-        if (field.kind == Kind::kShare) shares_ += NumberOf(bytes);
         visit_({prefix + field.name, static_cast<uint32_t>(at_), bytes, &field});
         at_ += width;
         return true;
@@ -65,8 +77,12 @@ private:
             return part.count;
         case CountBy::kField:
             return FieldOf(record, fields, part.field);
-        case CountBy::kShare:
-            return shares_;
+        case CountBy::kShare: {
+            uint64_t count = 0;
+            for (const Share &share : shares_)
+                count += share.count;
+            return count;
+        }
         case CountBy::kRest:
             break;
         }
@@ -80,16 +96,34 @@ private:
             return Fail(prefix + part.name + " is said to have " + std::to_string(count) + " elements, " +
                         std::to_string(Rest().size()) + " bytes are left for them");
         }
+        std::size_t share = 0;
+        uint64_t left = share < shares_.size() ? shares_[share].count : 0;
         for (uint64_t i = 0; i < count; ++i) {
-            if (!Record(*part.element, prefix + part.name + "[" + std::to_string(i) + "].")) return false;
+            const layout::Record *element = part.element;
+            if (!part.variants.empty()) {
+                while (left == 0)
+                    left = shares_[++share].count;
+                --left;
+                element = &ElementOf(part, shares_[share]);
+            }
+            if (!Record(*element, prefix + part.name + "[" + std::to_string(i) + "].")) return false;
         }
         return true;
+    }
+
+    static const layout::Record &ElementOf(const Part &part, const Share &share) {
+        for (const Variant &variant : part.variants) {
+            if (std::string_view(variant.share) == share.field->name &&
+                FieldOf(*share.record, share.fields, variant.field) == variant.value)
+                return *variant.element;
+        }
+        return *part.element;
     }
 
     std::span<const uint8_t> value_;
     const std::function<void(const Item &)> &visit_;
     std::size_t at_ = 0;
-    uint64_t shares_ = 0;
+    std::vector<Share> shares_;
 };
 
 std::string Hex(std::span<const uint8_t> bytes) {
@@ -146,6 +180,10 @@ std::string TextOfAddress(std::span<const uint8_t> bytes) {
     return isIpv4 ? AddressText(AF_INET, bytes) : AddressText(AF_INET6, bytes);
 }
 
+std::string TextOfTagged(std::span<const uint8_t> bytes) {
+    return AddressText(bytes[0] ? AF_INET6 : AF_INET, bytes.subspan(4));
+}
+
 } // namespace
 
 Fault Walk(const Record &record, std::span<const uint8_t> value,
@@ -192,6 +230,8 @@ std::string TextOf(const Item &item) {
         return AddressText(AF_INET, item.bytes);
     case Kind::kAddress:
         return TextOfAddress(item.bytes);
+    case Kind::kTagged:
+        return TextOfTagged(item.bytes);
     case Kind::kOpaque:
     case Kind::kReserved:
         return Hex(item.bytes);

@@ -2,6 +2,7 @@
 // Trees as one line for people (tree.h). Types that read better in words of their own have a function in the
 // table at the end; all others list their fields.
 
+#include <algorithm>
 #include <array>
 #include <iterator>
 
@@ -95,14 +96,46 @@ std::string SummarizePrivateVlans(const Node &tree) {
     return pairs.empty() ? "none" : Join(pairs);
 }
 
+// "to the analyser: ports 10, 11 to uplink2".
+std::string SummarizeSessions(const Node &tree) {
+    std::string line;
+    for (const Node &session : tree.items) {
+        const Node *title = session.Find("name");
+        if (!title || title->text.empty()) title = session.Find("key");
+        std::vector<std::string> sources, destinations;
+        const auto collect = [&session](const char *object, std::initializer_list<const char *> lists,
+                                        std::vector<std::string> *out) {
+            const Node *ports = session.Find(object);
+            for (const char *list : lists) {
+                const Node *items = ports ? ports->Find(list) : nullptr;
+                if (!items) continue;
+                const bool areVlans = std::string_view(list) == "vlans";
+                for (const Node &item : items->items) {
+                    const std::string name = areVlans ? "VLAN " + std::to_string(item.number) : item.text;
+                    if (std::find(out->begin(), out->end(), name) == out->end()) out->push_back(name);
+                }
+            }
+        };
+        for (const char *source : {"source_recv_port", "source_transmit_port"})
+            collect(source, {"wildcard_port_connectee_types", "port_keys", "vlans"}, &sources);
+        collect("destination_port", {"port_keys", "uplink_port_names", "addresses"}, &destinations);
+        const Node *enabled = session.Find("enabled");
+        line += (line.empty() ? "" : "; ") + (title ? title->text : std::string("session")) + ": " +
+                (sources.empty() ? "nothing" : Join(sources)) + " to " +
+                (destinations.empty() ? "nowhere" : Join(destinations)) +
+                (enabled && !enabled->flag ? " (disabled)" : "");
+    }
+    return line.empty() ? "none" : line;
+}
+
 struct Row {
     uint32_t type;
     std::string (*summarize)(const Node &tree);
 };
 constexpr Row kRows[] = {
-    {6, SummarizePrivateVlans}, {7, SummarizePrivateVlans}, {17, SummarizeTeaming},
-    {18, SummarizeTeaming},     {24, SummarizeVlan},        {25, SummarizeVlan},
-    {26, SummarizeShaping},     {27, SummarizeSecurity},    {28, SummarizeSecurity},
+    {6, SummarizePrivateVlans}, {7, SummarizePrivateVlans}, {9, SummarizeSessions}, {17, SummarizeTeaming},
+    {18, SummarizeTeaming},     {24, SummarizeVlan},        {25, SummarizeVlan},    {26, SummarizeShaping},
+    {27, SummarizeSecurity},    {28, SummarizeSecurity},
 };
 
 } // namespace

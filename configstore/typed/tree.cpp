@@ -4,8 +4,11 @@
 #include "configstore/typed/tree.h"
 
 #include <algorithm>
+#include <charconv>
 #include <limits>
+#include <optional>
 
+#include "configstore/converters/address.h"
 #include "configstore/converters/common.h"
 
 namespace dvs::typed {
@@ -16,6 +19,11 @@ using convert::StoreText;
 using convert::StoreTexts;
 using layout::Form;
 using layout::StoreField;
+
+const StoreField *FindField(const StoreField &form, std::string_view member) {
+    const auto field = std::ranges::find(form.members, member, &StoreField::name);
+    return field == form.members.end() ? nullptr : &*field;
+}
 
 Node Make(const StoreField &form, Node::Kind kind) {
     Node node;
@@ -144,6 +152,49 @@ Flaw Expect(const Node &node, Node::Kind kind, const std::string &path) {
     return {path, std::string("is ") + NameOf(node.kind) + ", expected " + NameOf(kind)};
 }
 
+constexpr int64_t kLastVlan = 4095;
+
+// The address in the form that reads back; nothing for a text that names none.
+std::optional<std::string> CanonicalAddress(const std::string &text) {
+    uint8_t bytes[16] = {};
+    bool isIpv6 = false;
+    if (text.find('\0') != std::string::npos || !convert::ParseAddress(text.c_str(), bytes, &isIpv6))
+        return std::nullopt;
+    return convert::FormatAddress(bytes, isIpv6).text;
+}
+
+bool IsDecimal(const std::string &text) {
+    uint32_t number = 0;
+    const char *end = text.data() + text.size();
+    const auto [stop, error] = std::from_chars(text.data(), end, number);
+    return error == std::errc() && stop == end;
+}
+
+// Whether a text or a number is what people may write there.
+Flaw CheckRule(const StoreField &form, const Node &node, const std::string &path) {
+    const std::string quoted = "\"" + node.text + "\"";
+    switch (form.rule) {
+    case layout::Rule::kVlan:
+        if (node.number >= 0 && node.number <= kLastVlan) return {};
+        return {path, std::to_string(node.number) + " is no VLAN id, expected 0 to 4095"};
+    case layout::Rule::kIpv4: {
+        const auto address = CanonicalAddress(node.text);
+        if (address && address->find(':') == std::string::npos) return {};
+        return {path, quoted + " is no IPv4 address, expected one as 192.0.2.1"};
+    }
+    case layout::Rule::kAddress:
+        if (CanonicalAddress(node.text)) return {};
+        return {path, quoted + " is no IP address, expected one as 192.0.2.1 or 2001:db8::1"};
+    case layout::Rule::kSlot:
+        if (IsDecimal(node.text)) return {};
+        return {path, quoted + " is no number, expected 0 to 4294967295 in digits"};
+    case layout::Rule::kUnset:
+    case layout::Rule::kNone:
+        break;
+    }
+    return {};
+}
+
 Flaw CheckText(const StoreField &form, const Node &node, const std::string &path) {
     if (Flaw flaw = Expect(node, Node::Kind::kText, path)) return flaw;
     if (node.text.find('\0') != std::string::npos) return {path, "contains a NUL"};
@@ -151,7 +202,7 @@ Flaw CheckText(const StoreField &form, const Node &node, const std::string &path
         return {path, "is " + std::to_string(node.text.size()) + " bytes long, at most " +
                           std::to_string(form.maxText) + " fit"};
     }
-    if (!form.domain) return {};
+    if (!form.domain) return CheckRule(form, node, path);
     std::string known;
     for (uint32_t i = 0; i < form.domain->textCount; ++i) {
         const char *text = form.domain->texts[i];
@@ -162,16 +213,20 @@ Flaw CheckText(const StoreField &form, const Node &node, const std::string &path
     return {path, "\"" + node.text + "\" is not known; expected one of " + known};
 }
 
-Flaw CheckNumber(const Node &node, int64_t least, int64_t most, const std::string &path) {
+Flaw CheckNumber(const StoreField &form, const Node &node, int64_t least, int64_t most,
+                 const std::string &path) {
     if (Flaw flaw = Expect(node, Node::Kind::kNumber, path)) return flaw;
+    if (form.rule == layout::Rule::kVlan) return CheckRule(form, node, path);
     if (node.number >= least && node.number <= most) return {};
     return {path, std::to_string(node.number) + " is out of range, expected " + std::to_string(least) +
                       " to " + std::to_string(most)};
 }
 
 template <typename T, typename Set>
-Flaw WriteNumber(const Place &place, const Node &node, const std::string &path, Set set) {
-    if (Flaw flaw = CheckNumber(node, std::numeric_limits<T>::min(), std::numeric_limits<T>::max(), path))
+Flaw WriteNumber(const StoreField &form, const Place &place, const Node &node, const std::string &path,
+                 Set set) {
+    if (Flaw flaw =
+            CheckNumber(form, node, std::numeric_limits<T>::min(), std::numeric_limits<T>::max(), path))
         return flaw;
     const int32_t status = set(place.parent, place.name, static_cast<T>(node.number));
     return status ? Refused(path, status) : Flaw{};
@@ -185,7 +240,8 @@ Flaw WriteList(const StoreField &form, const Place &place, const Node &node, con
         const Node &item = node.items[i];
         const std::string itemPath = path + "[" + std::to_string(i) + "]";
         const bool isText = form.form == Form::kTexts;
-        if (Flaw flaw = isText ? CheckText(form, item, itemPath) : CheckNumber(item, 0, UINT16_MAX, itemPath))
+        if (Flaw flaw =
+                isText ? CheckText(form, item, itemPath) : CheckNumber(form, item, 0, UINT16_MAX, itemPath))
             return flaw;
         status =
             isText ? configstore::AppendValueString(place.parent, place.name, item.text.c_str())
@@ -201,9 +257,8 @@ Flaw WriteMembers(const StoreField &form, configstore::Object *object, const Nod
                   const std::string &path) {
     const std::string prefix = path.empty() ? "" : path + ".";
     for (const Node &item : node.items) {
-        const auto member = std::find_if(form.members.begin(), form.members.end(),
-                                         [&](const StoreField &field) { return item.name == field.name; });
-        if (member == form.members.end()) {
+        const StoreField *member = FindField(form, item.name);
+        if (!member) {
             std::string known;
             for (const StoreField &field : form.members)
                 known += (known.empty() ? "" : ", ") + std::string(field.name);
@@ -249,13 +304,13 @@ Flaw WriteMember(const StoreField &form, const Place &place, const Node &node, c
         return status ? Refused(path, status) : Flaw{};
     }
     case Form::kUint16:
-        return WriteNumber<uint16_t>(place, node, path, configstore::SetValueUint16);
+        return WriteNumber<uint16_t>(form, place, node, path, configstore::SetValueUint16);
     case Form::kUint32:
-        return WriteNumber<uint32_t>(place, node, path, configstore::SetValueUint32);
+        return WriteNumber<uint32_t>(form, place, node, path, configstore::SetValueUint32);
     case Form::kInt:
-        return WriteNumber<int32_t>(place, node, path, configstore::SetValueInt);
+        return WriteNumber<int32_t>(form, place, node, path, configstore::SetValueInt);
     case Form::kLong:
-        return WriteNumber<int64_t>(place, node, path, configstore::SetValueLong);
+        return WriteNumber<int64_t>(form, place, node, path, configstore::SetValueLong);
     case Form::kText: {
         if (Flaw flaw = CheckText(form, node, path)) return flaw;
         const int32_t status = configstore::SetValueStr(place.parent, place.name, node.text.c_str());
@@ -278,23 +333,37 @@ Flaw WriteMember(const StoreField &form, const Place &place, const Node &node, c
     return {path, "has no typed form"};
 }
 
-Flaw FindLongTextAt(const StoreField &form, const Node &node, const std::string &path) {
-    if (node.kind == Node::Kind::kText && form.maxText && node.text.size() > form.maxText) {
-        return {path, "has no end inside its field"};
-    }
+using Check = Flaw (*)(const StoreField &form, const Node &leaf, const std::string &path);
+
+// The first flaw of a leaf, elements of lists included.
+Flaw FindFlaw(const StoreField &form, const Node &node, const std::string &path, Check check) {
+    const bool isList = node.kind == Node::Kind::kList;
+    if (!isList && node.kind != Node::Kind::kObject) return check(form, node, path);
     for (std::size_t i = 0; i < node.items.size(); ++i) {
         const Node &item = node.items[i];
-        if (node.kind == Node::Kind::kList) {
-            if (Flaw flaw = FindLongTextAt(form, item, path + "[" + std::to_string(i) + "]")) return flaw;
+        if (isList) {
+            if (Flaw flaw = FindFlaw(form, item, path + "[" + std::to_string(i) + "]", check)) return flaw;
             continue;
         }
-        for (const StoreField &member : form.members) {
-            if (item.name != member.name) continue;
-            if (Flaw flaw = FindLongTextAt(member, item, path.empty() ? item.name : path + "." + item.name))
-                return flaw;
-        }
+        const StoreField *member = FindField(form, item.name);
+        if (!member) continue;
+        if (Flaw flaw = FindFlaw(*member, item, path.empty() ? item.name : path + "." + item.name, check))
+            return flaw;
     }
     return {};
+}
+
+Flaw CheckLength(const StoreField &form, const Node &leaf, const std::string &path) {
+    if (leaf.kind == Node::Kind::kText && form.maxText && leaf.text.size() > form.maxText)
+        return {path, "has no end inside its field"};
+    return {};
+}
+
+void NormalizeMembers(const StoreField &form, Node *object) {
+    DropUnset(form, object);
+    for (Node &member : object->items) {
+        if (const StoreField *field = FindField(form, member.name)) member = Normalized(*field, member);
+    }
 }
 
 void CompareAt(const Node &given, const Node *found, const std::string &path, std::vector<std::string> *out) {
@@ -313,6 +382,7 @@ void CompareAt(const Node &given, const Node *found, const std::string &path, st
     if (given.kind == Node::Kind::kNumber && found && found->kind == given.kind &&
         found->number == given.number)
         return;
+    if (given.kind == Node::Kind::kList && given.items.empty() && !found) return; // none either way
     const std::string before = ToLine(given);
     const std::string after = found ? ToLine(*found) : "absent";
     if (before == after) return;
@@ -333,8 +403,17 @@ Node ReadTree(const layout::StoreField &form, const Place &place) {
     return node.kind == Node::Kind::kNull && isList ? Make(form, Node::Kind::kList) : node;
 }
 
+void DropUnset(const layout::StoreField &form, Node *object) {
+    std::erase_if(object->items, [&](const Node &member) {
+        const auto *field = FindField(form, member.name);
+        return field && field->rule == layout::Rule::kUnset && member.number == UINT32_MAX;
+    });
+}
+
 Node Normalized(const layout::StoreField &form, const Node &node) {
     Node result = node;
+    if (form.rule == layout::Rule::kAddress && node.kind == Node::Kind::kText)
+        result.text = CanonicalAddress(node.text).value_or(node.text);
     if (form.form == Form::kInstances && node.kind == Node::Kind::kObject) {
         result.kind = Node::Kind::kList;
         for (Node &item : result.items) {
@@ -348,17 +427,12 @@ Node Normalized(const layout::StoreField &form, const Node &node) {
     }
     for (Node &item : result.items) {
         if (result.kind == Node::Kind::kList && form.form == Form::kInstances) {
-            for (Node &member : item.items) {
-                for (const StoreField &field : form.members) {
-                    if (member.name == field.name) member = Normalized(field, member);
-                }
-            }
+            NormalizeMembers(form, &item);
             continue;
         }
-        for (const StoreField &field : form.members) {
-            if (item.name == field.name) item = Normalized(field, item);
-        }
+        if (result.kind == Node::Kind::kList && form.form == Form::kTexts) item = Normalized(form, item);
     }
+    if (result.kind == Node::Kind::kObject) NormalizeMembers(form, &result);
     return result;
 }
 
@@ -367,7 +441,11 @@ Flaw WriteTree(const layout::StoreField &form, const Place &place, const Node &n
 }
 
 Flaw FindLongText(const layout::StoreField &form, const Node &node) {
-    return FindLongTextAt(form, node, "");
+    return FindFlaw(form, node, "", CheckLength);
+}
+
+Flaw FindBrokenRule(const layout::StoreField &form, const Node &node) {
+    return FindFlaw(form, node, "", CheckRule);
 }
 
 std::vector<std::string> Compare(const Node &given, const Node &found) {

@@ -30,7 +30,11 @@ struct Flaw {
 /// at the root.
 Node ReadTree(const layout::StoreField &form, const Place &place);
 
-/// Brings instances that are given as an object (id: members) into the form of a list.
+/// Takes out the numbers of an object that mean the same as none.
+void DropUnset(const layout::StoreField &form, Node *object);
+
+/// Brings instances that are given as an object (id: members) into the form of a list, and addresses into the
+/// one in which they read back.
 Node Normalized(const layout::StoreField &form, const Node &node);
 
 /// Writes a normalized tree to a place. At the first flaw it stops.
@@ -38,6 +42,9 @@ Flaw WriteTree(const layout::StoreField &form, const Place &place, const Node &n
 
 /// The first text that is longer than its field, which no sound value has: its NUL is missing.
 Flaw FindLongText(const layout::StoreField &form, const Node &node);
+
+/// The first text or number that a tree's field may not be given, although bytes can hold it.
+Flaw FindBrokenRule(const layout::StoreField &form, const Node &node);
 
 /// What `given` has that `found` has not, or has otherwise: one line a value.
 std::vector<std::string> Compare(const Node &given, const Node &found);

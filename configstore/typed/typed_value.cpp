@@ -13,6 +13,7 @@
 #include "configstore/converters/table.h"
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/walk.h"
+#include "configstore/typed/own_form.h"
 #include "configstore/typed/tree.h"
 #include "dvsstate/owned_list.h"
 
@@ -64,6 +65,7 @@ public:
         // A port's pools have no form of their own: they are the switch's.
         type_ = layout::FindType(isPortPools ? convert::kTypeTrafficResources : row_->converterType);
         converter_ = type_ ? convert::ConverterFor(type_->type) : nullptr;
+        own_ = type_ ? OwnFormOf(type_->type) : nullptr;
         configstore::Object *object = nullptr;
         if (!converter_ ||
             configstore::CreateObject("switches", "network_vds", "qel", "typed", "{}", &object))
@@ -91,7 +93,23 @@ public:
         return status;
     }
 
-    // The loaded bytes; `found` tells an absent property from an empty one.
+    /// The tree of a value that has been saved.
+    [[nodiscard]] Node Read(std::span<const uint8_t> value) const {
+        Node tree = ReadTree(*type_->form, place());
+        if (own_ && own_->complete) own_->complete(record(), value, *type_->form, &tree);
+        return tree;
+    }
+
+    /// The bytes of a tree that the object holds. `found` tells an absent property from an empty one.
+    int32_t Build(const Node &tree, std::vector<uint8_t> *bytes, bool *found, Flaw *flaw) {
+        const int32_t status = Load(bytes, found);
+        if (status || !own_) return status;
+        *flaw = own_->encode(record(), tree, bytes);
+        *found = !bytes->empty();
+        return 0;
+    }
+
+private:
     int32_t Load(std::vector<uint8_t> *bytes, bool *found) {
         if (const int32_t status = DescribeSwitch()) return status;
         state::OwnedList list;
@@ -104,7 +122,6 @@ public:
         return status;
     }
 
-private:
     // Two saves write names that the load would not understand as they were meant. A tree has what a load
     // reads.
     void CorrectNames(std::span<const uint8_t> value) {
@@ -150,6 +167,7 @@ private:
     const DVSProp2ConfigEntry *row_;
     const layout::TypeInfo *type_ = nullptr;
     const convert::Converter *converter_ = nullptr;
+    const OwnForm *own_ = nullptr;
     std::unique_ptr<configstore::Object, ObjectDeleter> root_;
     configstore::Object *parent_ = nullptr;
     const char *leaf_ = nullptr;
@@ -185,8 +203,12 @@ std::vector<std::string> DifferencesOf(const layout::Record &record, std::span<c
 void JudgeExactness(Bench *bench, std::span<const uint8_t> value, View *view) {
     std::vector<uint8_t> again;
     bool found = false;
-    const int32_t status = bench->Load(&again, &found);
-    if (status) {
+    Flaw flaw;
+    const int32_t status = bench->Build(view->tree, &again, &found, &flaw);
+    if (!flaw) flaw = FindBrokenRule(*bench->type().form, view->tree);
+    if (flaw) {
+        view->differences.push_back(flaw.field + " " + flaw.reason);
+    } else if (status) {
         view->differences.push_back("does not load again (status " + std::to_string(status) + ")");
     } else if (!found) {
         view->differences.emplace_back("loads as no property");
@@ -219,7 +241,7 @@ View Describe(uint32_t propClass, std::string_view key, std::span<const uint8_t>
         view.reason = ReasonOf(bench.record(), value, status);
         return view;
     }
-    Node tree = ReadTree(*bench.type().form, bench.place());
+    Node tree = bench.Read(value);
     // Must not get to a load: of filters, such texts end the process there.
     if (const Flaw flaw = FindLongText(*bench.type().form, tree)) {
         view.reason = flaw.field + " " + flaw.reason;
@@ -241,14 +263,16 @@ Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Co
             return built;
         }
         const layout::StoreField &form = *bench.type().form;
-        const Flaw flaw = WriteTree(form, bench.place(), Normalized(form, tree));
+        const Node normalized = Normalized(form, tree);
+        Flaw flaw = WriteTree(form, bench.place(), normalized);
+        bool found = false;
+        const int32_t status = flaw ? 0 : bench.Build(normalized, &built.bytes, &found, &flaw);
         if (flaw) {
             built.field = flaw.field;
             built.reason = flaw.reason;
             return built;
         }
-        bool found = false;
-        if (const int32_t status = bench.Load(&built.bytes, &found)) {
+        if (status) {
             built.reason =
                 "does not convert (status " + std::to_string(status) + "); expected: " + form.meaning;
             return built;

@@ -102,21 +102,77 @@ json::value LinkDiscovery(const Draw &d) {
                         {"operation", d.r.OneOf({"NONE", "LISTEN", "ADVERTISE", "BOTH"})}};
 }
 
-json::value MirrorSessions(const Draw &d) {
-    return json::array{json::object{{"key", "session-1"},
-                                    {"name", "to the analyser"},
-                                    {"session_type", "DVPORT_MIRROR"},
-                                    {"enabled", Truth(d)},
-                                    {"sampling_rate", d.r.Between(1, 100)},
-                                    {"encapsulation_vlan_id", d.r.Between(1, 4000)}}};
-}
-
 std::string Ipv6(Random &r) {
     return fmt::format("2001:0db8:0000:0000:0000:0000:0000:{:04x}", r.Between(1, 65535));
 }
 
+std::string Ipv4(Random &r) {
+    return fmt::format("198.51.100.{}", r.Between(1, 254));
+}
+
+// Some ports of the switch, by their keys.
+json::array SomePorts(const Draw &d, std::uint32_t most) {
+    json::array keys;
+    const auto ports = static_cast<std::uint32_t>(d.sw.ports.size());
+    if (ports == 0) return keys;
+    const std::uint32_t first = d.r.Below(ports);
+    for (std::uint32_t i = 0, count = std::min(ports, d.r.Between(1, most)); i < count; ++i)
+        keys.emplace_back(d.sw.ports[(first + i) % ports]);
+    return keys;
+}
+
+json::value Source(const Draw &d, const std::string &type) {
+    if (type == "REMOTE_MIRROR_DEST") return json::object{{"vlans", json::array{d.r.Between(1, 4094)}}};
+    json::object source{{"port_keys", SomePorts(d, 3)}};
+    if (d.r.Percent(20))
+        source["wildcard_port_connectee_types"] =
+            json::array{d.r.OneOf({"VM_VNIC", "PNIC", "HOST_HYP_VNIC"})};
+    return source;
+}
+
+json::value Destination(const Draw &d, const std::string &type) {
+    const json::array uplink{d.r.Percent(50) ? json::string(d.sw.uplinkNames.front())
+                                             : json::string(d.sw.uplinkNames.back())};
+    if (type == "REMOTE_MIRROR_SOURCE") return json::object{{"uplink_port_names", uplink}};
+    if (type == "ENCAPSULATED_REMOTE_MIRROR_SOURCE") {
+        const std::string address = d.r.Percent(30) ? Ipv6(d.r) : Ipv4(d.r);
+        return json::object{{"addresses", json::array{json::string(address)}}};
+    }
+    json::object destination{{"port_keys", SomePorts(d, 2)}};
+    if (type == "MIXED_DEST_MIRROR") destination["uplink_port_names"] = uplink;
+    return destination;
+}
+
+json::value MirrorSessions(const Draw &d) {
+    json::array sessions;
+    for (std::uint32_t i = 0, count = d.r.Between(1, 3); i < count; ++i) {
+        const std::string type = d.r.OneOf({"MIXED_DEST_MIRROR", "DVPORT_MIRROR", "REMOTE_MIRROR_SOURCE",
+                                            "REMOTE_MIRROR_DEST", "ENCAPSULATED_REMOTE_MIRROR_SOURCE"});
+        json::object session{
+            {"key", fmt::format("session-{}", i + 1)},
+            {"name", d.r.OneOf({"to the analyser", "to the recorder", "intrusion detection"})},
+            {"session_type", type},
+            {"enabled", d.r.Percent(80)},
+            {"strip_original_vlan", Truth(d)},
+            {"normal_traffic_allowed", Truth(d)},
+            {"encapsulation_vlan_id", d.r.Percent(50) ? 0 : d.r.Between(1, 4094)},
+            {"sampling_rate", d.r.Between(1, 100)}};
+        if (type == "ENCAPSULATED_REMOTE_MIRROR_SOURCE") {
+            session["encap_type"] = d.r.OneOf({"GRE", "ERSPAN2", "ERSPAN3"});
+            session["erspan_id"] = d.r.Below(1024);
+            session["erspan_COS"] = d.r.Below(8);
+        }
+        if (d.r.Percent(20)) session["mirrored_packet_length"] = d.r.Between(1, 24) * 64;
+        session["destination_port"] = Destination(d, type);
+        if (d.r.Percent(80)) session["source_recv_port"] = Source(d, type);
+        if (d.r.Percent(50)) session["source_transmit_port"] = Source(d, type);
+        sessions.push_back(std::move(session));
+    }
+    return sessions;
+}
+
 json::value Ipfix(const Draw &d) {
-    std::string collector = d.r.Percent(25) ? Ipv6(d.r) : fmt::format("198.51.100.{}", d.r.Between(1, 254));
+    const std::string collector = d.r.Percent(25) ? Ipv6(d.r) : Ipv4(d.r);
     return json::object{{"idle_flow_timeout", d.r.Between(1, 8) * 15},
                         {"active_flow_timeout", d.r.Between(1, 10) * 60},
                         {"collector_address", collector},
@@ -150,7 +206,11 @@ json::value Teaming(const Draw &d) {
         {"notify_switches", Truth(d)},
         {"best_effort", d.r.Percent(10)},
         {"shotgun", d.r.Percent(5)},
-        {"failure_criteria", json::object{{"check_beacon", Truth(d)}, {"lc_link_state", Truth(d)}}},
+        {"failure_criteria", json::object{{"check_beacon", Truth(d)},
+                                          {"lc_link_state", Truth(d)},
+                                          {"full_duplex", d.r.Percent(10)},
+                                          {"percentage", d.r.Percent(10) ? d.r.Between(1, 50) : 0},
+                                          {"speed", d.r.Percent(10) ? d.r.Between(1, 200) : 0}}},
         {"uplink_port_order",
          json::object{{"active_uplink_ports", Texts({at(0), at(active)})},
                       {"standby_uplink_ports", Texts({at(active), at(active + standby)})}}}};
@@ -206,15 +266,13 @@ json::value Security(const Draw &d) {
         {"allow_promiscuous", Truth(d)}, {"allow_mac_change", Truth(d)}, {"allow_forged_transmit", Truth(d)}};
 }
 
-// Only the last filter has parameters: a load of several places each over those of the one before.
 json::value Filters(const Draw &d) {
     json::array filters;
     std::uint32_t slot = d.r.Below(4);
     for (std::uint32_t i = 0, count = d.r.Between(1, 3); i < count; ++i, slot += d.r.Between(1, 3)) {
         json::array parameters;
-        if (i + 1 == count)
-            for (std::uint32_t p = 0, most = d.r.Below(3); p < most; ++p)
-                parameters.emplace_back(fmt::format("rule-{}=watch", d.r.Below(100)));
+        for (std::uint32_t p = 0, most = d.r.Below(3); p < most; ++p)
+            parameters.emplace_back(fmt::format("rule-{}=watch", d.r.Below(100)));
         filters.push_back(json::object{{"slot_number", std::to_string(slot)},
                                        {"agent_name", d.r.OneOf({"inspector", "firewall", "meter"})},
                                        {"on_failure", d.r.OneOf({"FAIL_OPEN", "FAIL_CLOSED"})},

@@ -63,7 +63,7 @@ std::vector<Known> AllKnown() {
 
 // The document's words without its marks.
 std::string Plain(std::string text) {
-    std::erase(text, '`');
+    std::erase_if(text, [](char c) { return c == '`' || c == '*'; });
     return text;
 }
 
@@ -75,8 +75,11 @@ std::string Extent(const Field &field) {
 void CollectRecords(const Record &record, std::vector<const Record *> &records) {
     if (std::ranges::find(records, &record) != records.end()) return;
     records.push_back(&record);
-    for (const Part &part : record.parts)
+    for (const Part &part : record.parts) {
         CollectRecords(*part.element, records);
+        for (const layout::Variant &variant : part.variants)
+            CollectRecords(*variant.element, records);
+    }
 }
 
 std::vector<const Record *> RecordsOf(const layout::TypeInfo &type) {
@@ -97,11 +100,20 @@ json::object RecordJson(const Record &record) {
             object["values"] = domain.substr(domain.find_first_not_of(": "));
         fields.emplace_back(std::move(object));
     }
-    for (const Part &part : record.parts)
-        parts.emplace_back(json::object{{"name", part.name},
-                                        {"record", part.element->name},
-                                        {"count", Plain(layout::CountText(part))},
-                                        {"meaning", part.meaning}});
+    for (const Part &part : record.parts) {
+        json::object object{{"name", part.name},
+                            {"record", part.element->name},
+                            {"count", Plain(layout::CountText(part))},
+                            {"meaning", part.meaning}};
+        json::array variants;
+        for (const layout::Variant &variant : part.variants)
+            variants.emplace_back(json::object{{"record", variant.element->name},
+                                               {"counted_by", variant.share},
+                                               {"field", variant.field},
+                                               {"value", variant.value}});
+        if (!variants.empty()) object["variants"] = std::move(variants);
+        parts.emplace_back(std::move(object));
+    }
     return {{"name", record.name},
             {"size", record.size},
             {"fields", std::move(fields)},
@@ -190,6 +202,9 @@ void WriteRecord(const Record &record, Context &context) {
         title += fmt::format("; then {}: {}, each a {}, {}", part.name, part.meaning, part.element->name,
                              Plain(layout::CountText(part)));
     out.Write("\n  " + title + "\n");
+    for (const Part &part : record.parts)
+        for (const layout::Variant &variant : part.variants)
+            out.Write("    " + Plain(layout::VariantText(variant)) + "\n");
     if (record.fields.empty()) return;
     Table table(kLayoutColumns, context.options);
     for (const Field &field : record.fields)

@@ -86,7 +86,8 @@ void Generator::Fields(const dvs::layout::Record &record, std::vector<uint8_t> *
                                          : Text(field.width ? field.width - 1 : 100);
             out->insert(out->end(), text.begin(), text.end());
             out->resize(at + (field.width ? field.width : text.size() + 1));
-        } else if (field.kind == Kind::kOpaque || field.kind == Kind::kAddress || field.kind == Kind::kIpv4) {
+        } else if (field.kind == Kind::kOpaque || field.kind == Kind::kAddress ||
+                   field.kind == Kind::kTagged || field.kind == Kind::kIpv4) {
             const auto bytes = Noise(field.width ? field.width : Below(40));
             out->insert(out->end(), bytes.begin(), bytes.end());
         } else {
@@ -96,16 +97,20 @@ void Generator::Fields(const dvs::layout::Record &record, std::vector<uint8_t> *
     }
 }
 
-void Generator::Record(const dvs::layout::Record &record, std::vector<uint8_t> *out, uint64_t *shares) {
+void Generator::Record(const dvs::layout::Record &record, std::vector<uint8_t> *out,
+                       std::vector<Share> *shares) {
     const std::size_t start = out->size();
     Fields(record, out);
     for (const Field &field : record.fields) {
-        if (field.kind == Kind::kShare) *shares += GetNumber(*out, start + field.offset, field.width);
+        if (field.kind == Kind::kShare)
+            shares->push_back({GetNumber(*out, start + field.offset, field.width), &field, &record, start});
     }
     for (const Part &part : record.parts) {
-        uint64_t count = part.countBy == CountBy::kFixed   ? part.count
-                         : part.countBy == CountBy::kShare ? *shares
-                                                           : Below(kMostElements);
+        if (part.countBy == CountBy::kShare) {
+            Shared(part, *shares, out);
+            continue;
+        }
+        uint64_t count = part.countBy == CountBy::kFixed ? part.count : Below(kMostElements);
         if (part.gate) {
             const Field *gate = Find(record, part.gateField);
             if (!(GetNumber(*out, start + gate->offset, gate->width) & part.gate)) count = 0;
@@ -119,9 +124,23 @@ void Generator::Record(const dvs::layout::Record &record, std::vector<uint8_t> *
     }
 }
 
+void Generator::Shared(const Part &part, const std::vector<Share> &shares, std::vector<uint8_t> *out) {
+    for (const Share &share : shares) {
+        const dvs::layout::Record *element = part.element;
+        for (const auto &variant : part.variants) {
+            const Field *field = Find(*share.record, variant.field);
+            if (std::string_view(variant.share) == share.field->name &&
+                GetNumber(*out, share.start + field->offset, field->width) == variant.value)
+                element = variant.element;
+        }
+        for (uint64_t i = 0; i < share.count; ++i)
+            Fields(*element, out);
+    }
+}
+
 std::vector<uint8_t> Generator::Sound(const dvs::layout::Record &record) {
     std::vector<uint8_t> value;
-    uint64_t shares = 0;
+    std::vector<Share> shares;
     Record(record, &value, &shares);
     return value;
 }

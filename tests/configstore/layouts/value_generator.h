@@ -35,7 +35,15 @@ public:
 
 private:
     void Fields(const dvs::layout::Record &record, std::vector<uint8_t> *out);
-    void Record(const dvs::layout::Record &record, std::vector<uint8_t> *out, uint64_t *shares);
+    // A field that says how many elements of a later part belong to its record, which starts at `start`.
+    struct Share {
+        uint64_t count;
+        const dvs::layout::Field *field;
+        const dvs::layout::Record *record;
+        std::size_t start;
+    };
+    void Record(const dvs::layout::Record &record, std::vector<uint8_t> *out, std::vector<Share> *shares);
+    void Shared(const dvs::layout::Part &part, const std::vector<Share> &shares, std::vector<uint8_t> *out);
     uint64_t Number(const dvs::layout::Field &field);
     void Lie(const dvs::layout::Record &record, std::vector<uint8_t> *value);
 
