@@ -71,9 +71,12 @@ struct Outline {
 /// Fills an empty tree. What the schema does not allow is marked in the tree and is no failure. False, with
 /// the reason and the place, for what is not JSON, not an object, too deep, has a name twice or a NUL in a
 /// name or text; the tree then holds what had been read.
-/// `outline`, which may be null, is filled for a document that the store might have written.
-[[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why,
-                                Outline *outline = nullptr);
+[[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why);
+
+/// Fills an empty tree from a document as the store writes them in which all is allowed, and finds its
+/// outline. The root's lists of instances are looked through and stay text. False, with the tree in an
+/// unknown state, for any other document: ReadDocument has more to say about it.
+[[nodiscard]] bool ReadOutline(std::shared_ptr<const std::string> text, Tree *tree, Outline *outline);
 
 /// Fills an empty tree from a document that was read before, all but the list of the outline, which stays
 /// text for now. False, with the tree in an unknown state, when it was not for an object of this kind.

@@ -15,6 +15,7 @@
 #include <vector>
 
 #include "platform/embedded/configstore/document.h"
+#include "platform/embedded/configstore/document_skim.h"
 #include "platform/embedded/configstore/text_code.h"
 
 namespace configstore {
@@ -25,25 +26,17 @@ constexpr std::size_t kMaxPlainDepth = 16; // below the general reader's limit, 
 static_assert(kMaxPlainDepth < kMaxDepth);
 
 constexpr std::size_t kWord = sizeof(uint64_t);
-
-/// Marks the bytes that end a run of plain characters: control characters, quotes, backslashes and all beyond
-/// ASCII. Exact up to the first mark, which is all that is asked for.
-uint64_t SpecialBytes(uint64_t word) {
-    constexpr uint64_t kOnes = 0x0101010101010101U;
-    constexpr uint64_t kHighs = 0x8080808080808080U;
-    const uint64_t quote = word ^ kOnes * '"';
-    const uint64_t backslash = word ^ kOnes * '\\';
-    return (((word - kOnes * 0x20) & ~word) | ((quote - kOnes) & ~quote) |
-            ((backslash - kOnes) & ~backslash) | word) &
-           kHighs;
-}
+constexpr std::size_t kEmptyList = 2; // bytes: {}
 
 class PlainReader {
 public:
-    /// The text is not empty. `known` is the outline to go by, if there is one.
-    PlainReader(std::string_view text, Tree *tree, const Outline *known = nullptr)
+    enum class Lists { Built, Skimmed };
+
+    /// The text is not empty. `known` is the outline to go by, if there is one; `lists` says what becomes of
+    /// the root's lists of instances.
+    PlainReader(std::string_view text, Tree *tree, const Outline *known = nullptr, Lists lists = Lists::Built)
         : tree_(tree), start_(text.data()), at_(text.data()), last_(text.data() + text.size() - 1),
-          known_(known) {}
+          known_(known), lists_(lists) {}
 
     bool Read() {
         return *last_ == '}' && Take('{') && Members(&tree_->root, tree_->shape, 1) && at_ == last_ + 1;
@@ -144,16 +137,26 @@ private:
     bool RootInstances(Object *node, const Field *field) {
         const auto begin = static_cast<std::size_t>(at_ - 1 - start_);
         if (known_ && known_->field == field && known_->begin == begin) {
-            // Nobody writes to it.
-            node->span = {const_cast<char *>(at_ - 1), known_->end - begin};
-            node->kind = Kind::Later;
-            at_ = start_ + known_->end;
+            LeaveText(node, start_ + known_->end);
             return true;
         }
-        if (!NewInstances(node, field, 1)) return false;
+        if (lists_ == Lists::Skimmed && *at_ != '}') {
+            const char *const end = SkimInstances(at_ - 1, last_, field->shape);
+            if (!end) return false;
+            LeaveText(node, end);
+        } else if (!NewInstances(node, field, 1)) {
+            return false;
+        }
         const auto end = static_cast<std::size_t>(at_ - start_);
-        if (node->table->count > 0 && end - begin > found_.end - found_.begin) found_ = {field, begin, end};
+        if (end - begin > kEmptyList && end - begin > found_.end - found_.begin) found_ = {field, begin, end};
         return true;
+    }
+
+    void LeaveText(Object *node, const char *end) {
+        node->span = {const_cast<char *>(at_ - 1),
+                      static_cast<std::size_t>(end - at_ + 1)}; // nobody writes to it
+        node->kind = Kind::Later;
+        at_ = end;
     }
 
     /// Behind the opening brace, through the closing one.
@@ -327,6 +330,7 @@ private:
     const char *at_;
     const char *const last_;
     const Outline *const known_;
+    const Lists lists_;
     Outline found_;
     std::array<Guess, 128> guesses_{};
     std::string unescaped_;
@@ -335,20 +339,22 @@ private:
 
 } // namespace
 
-bool ReadPlainDocument(std::string_view text, Tree *tree, Outline *outline) {
+bool ReadPlainDocument(std::string_view text, Tree *tree) {
     tree->arena.Expect(text.size() / 4);
-    if (!text.empty()) {
-        PlainReader reader(text, tree);
-        if (reader.Read()) {
-            // What has to be refused when it is written must be there to be found.
-            if (outline && !tree->suspect) *outline = reader.Found();
-            return true;
-        }
-    }
+    if (!text.empty() && PlainReader(text, tree).Read()) return true;
     MakeObject(&tree->root);
     tree->tables = nullptr; // no list has an index yet
     tree->suspect = false;
     return false;
+}
+
+bool ReadOutline(std::shared_ptr<const std::string> text, Tree *tree, Outline *outline) {
+    if (text->empty()) return false;
+    tree->text = std::move(text);
+    PlainReader reader(*tree->text, tree, nullptr, PlainReader::Lists::Skimmed);
+    if (!reader.Read() || tree->suspect) return false; // what has to be refused must be there to be found
+    *outline = reader.Found();
+    return true;
 }
 
 bool ReadAgain(std::shared_ptr<const std::string> text, const Outline &outline, Tree *tree) {

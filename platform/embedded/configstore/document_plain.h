@@ -14,8 +14,7 @@ namespace configstore {
 
 /// Fills an empty tree, exactly as the general reader would in its tolerant way. False for a document that
 /// this reader leaves to the general one, sound or not: the tree is empty again then.
-/// `outline` may be null.
-[[nodiscard]] bool ReadPlainDocument(std::string_view text, Tree *tree, Outline *outline);
+[[nodiscard]] bool ReadPlainDocument(std::string_view text, Tree *tree);
 
 /// Reads the instances of a Later node.
 void ReadLater(Tree *tree, Object *node);

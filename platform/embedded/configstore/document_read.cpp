@@ -425,8 +425,8 @@ bool Parse(std::string_view text, Tree *tree, Object *root, bool open, Reading r
 
 } // namespace
 
-bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why, Outline *outline) {
-    if (reading == Reading::Tolerant && ReadPlainDocument(text, tree, outline)) return true;
+bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why) {
+    if (reading == Reading::Tolerant && ReadPlainDocument(text, tree)) return true;
     return Parse(text, tree, &tree->root, false, reading, why);
 }
 

@@ -119,10 +119,10 @@ int32_t DeleteRow(Store *store, const char *layer, const FilterSpec &address) {
 }
 
 int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view text,
-                 std::unique_ptr<Tree> *tree, Outline *outline) {
+                 std::unique_ptr<Tree> *tree) {
     auto loaded = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
     std::string why;
-    if (!ReadDocument(text, Reading::Tolerant, loaded.get(), &why, outline)) {
+    if (!ReadDocument(text, Reading::Tolerant, loaded.get(), &why)) {
         Log("config store %s: the document of %s/%s/%s[%s] is damaged: %s", store->path.c_str(),
             address.key.c_str(), address.group.c_str(), address.component.c_str(), address.instance.c_str(),
             why.c_str());

@@ -30,6 +30,18 @@ int32_t HandOut(Trees *trees, Object ***objects, int32_t *count) {
     return OK;
 }
 
+/// An object of a listing by one who means to write: mostly to replace its content, hence as little of it as
+/// will do, and its text for when it is fetched. Null for a document that is read in the ordinary way.
+std::unique_ptr<Tree> ReadForRewrite(Store *store, const FilterSpec &address, int64_t document,
+                                     std::string_view text) {
+    auto tree = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
+    const auto kept = std::make_shared<const std::string>(text);
+    Outline outline;
+    if (!ReadOutline(kept, tree.get(), &outline)) return nullptr;
+    if (outline.field) store->readBefore[document] = {kept, outline};
+    return tree;
+}
+
 int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***objects, int32_t *count) {
     // The primary key has this order already.
     Statement statement(
@@ -39,14 +51,14 @@ int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***
     statement.Bind(layer).Bind(spec.key).Bind(spec.group).Bind(spec.component).Bind(spec.instance);
     Trees trees;
     while (statement.Step()) {
-        std::unique_ptr<Tree> tree;
         const FilterSpec address{spec.key, spec.group, spec.component, std::string(statement.Text(0))};
-        Outline outline;
-        const int32_t status = LoadTree(store, address, statement.Text(1), &tree, &outline);
-        if (status != OK) return status;
-        if (store->inTransaction && outline.field)
-            store->readBefore[statement.Integer(2)] = {std::make_shared<const std::string>(statement.Text(1)),
-                                                       outline};
+        std::unique_ptr<Tree> tree =
+            store->inTransaction ? ReadForRewrite(store, address, statement.Integer(2), statement.Text(1))
+                                 : nullptr;
+        if (!tree) {
+            const int32_t status = LoadTree(store, address, statement.Text(1), &tree);
+            if (status != OK) return status;
+        }
         trees.push_back(std::move(tree));
     }
     return statement.Status() == OK ? HandOut(&trees, objects, count) : statement.Status();

@@ -49,7 +49,7 @@ private:
 [[nodiscard]] int32_t DeleteRow(Store *store, const char *layer, const FilterSpec &address);
 /// A tree from a document's text; CORRUPT, with a message, when it is not one.
 [[nodiscard]] int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view text,
-                               std::unique_ptr<Tree> *tree, Outline *outline = nullptr);
+                               std::unique_ptr<Tree> *tree);
 /// Writes the tree's document as the object's. SCHEMA_VIOLATION, with the field's path, when it is not
 /// allowed.
 [[nodiscard]] int32_t SaveTree(Store *store, const char *layer, Tree *tree);

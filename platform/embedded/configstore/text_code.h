@@ -16,6 +16,18 @@
 
 namespace configstore {
 
+/// Marks the bytes that end a run of plain characters: control characters, quotes, backslashes and all beyond
+/// ASCII. Exact up to the first mark, which is all that is asked for.
+[[nodiscard]] inline uint64_t SpecialBytes(uint64_t word) {
+    constexpr uint64_t kOnes = 0x0101010101010101U;
+    constexpr uint64_t kHighs = 0x8080808080808080U;
+    const uint64_t quote = word ^ kOnes * '"';
+    const uint64_t backslash = word ^ kOnes * '\\';
+    return (((word - kOnes * 0x20) & ~word) | ((quote - kOnes) & ~quote) |
+            ((backslash - kOnes) & ~backslash) | word) &
+           kHighs;
+}
+
 /// Length of the UTF-8 sequence at `at`, 0 when there is none or when it is one of the private characters.
 [[nodiscard]] std::size_t PlainSequence(const char *at, const char *end);
 

@@ -2,8 +2,11 @@
 // The quick reader for documents as the store writes them, held against the general reader: white space in
 // front of a document is what sends it to the latter.
 
+#include <optional>
+
 #include "platform/configstore/support.h"
 
+#include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/log.h"
 
 using namespace configstore;
@@ -61,9 +64,84 @@ constexpr const char *kDocuments[] = {
     "",
 };
 
+/// What the look at a document for a rewrite finds: nothing, or the document with its lists read after all.
+std::optional<std::string> ReadOutlined(const std::string &json) {
+    Tree tree(kKey, kGroup, kComponent, "sw1");
+    Outline outline;
+    if (!ReadOutline(std::make_shared<const std::string>(json), &tree, &outline)) return std::nullopt;
+    for (Object *member = tree.root.members.first; member; member = member->next) {
+        if (member->kind == Kind::Later && !Expand(&tree, member)) return "a list that is none";
+    }
+    return FindViolation(&tree) ? "a violation" : Json(&tree.root);
+}
+
+/// Looking through a document may leave it to the reader, but never overlooks anything.
+void ExpectOverlooksNothing(const std::string &json) {
+    const std::optional<std::string> outlined = ReadOutlined(json);
+    if (outlined) {
+        EXPECT_EQ((Outcome{OK, *outlined}), Read(json)) << json;
+    }
+}
+
+// All that ports are mostly made of, so that it need not be read: escapes, characters beyond ASCII, lists.
+constexpr const char *kPorts =
+    R"({"name":"a","ports":{"1":{"name":"q\"\\\/\n\r\t\b\f grün 中","connection_cookie":4294967295,"settings":)"
+    R"({"blocked":false,"vlan":{"trunk_vlan_ids":{},"vlan_id":5},"in_shaping_policy":{"enabled":true,"peak_bandwidth":-8}}},)"
+    R"("2":{},"3":{"settings":{"vlan":{"trunk_vlan_ids":{"0":{"start":1,"end":5}}},"filter_policy":{"network_filters":{"0":{"parameters":["u","v"]}}}},"vspans":{"s":{"source_recv_port":{"vlans":[1,-2],"addresses":[]}}},"data":{"opaque_data":{"k":{"opaque_data":"QUJD"}}}}},)"
+    R"("uuid":"u","health_checks":{"h":{"interval":7}}})";
+
 TEST(PlainDocument, ReadsAsTheGeneralReaderDoes) {
     for (const char *json : kDocuments)
         ExpectBothAgree(json);
+}
+
+TEST(PlainDocument, OutlineOfASoundDocumentLeavesItsLongestListText) {
+    const std::string json = kPorts;
+    ASSERT_EQ(Read(json).status, OK);
+    EXPECT_EQ(ReadOutlined(json), Read(json).document);
+    Tree tree(kKey, kGroup, kComponent, "sw1");
+    Outline outline;
+    ASSERT_TRUE(ReadOutline(std::make_shared<const std::string>(json), &tree, &outline));
+    EXPECT_EQ(json.substr(outline.begin, outline.end - outline.begin).substr(0, 8), R"({"1":{"n)");
+    EXPECT_EQ(json.substr(outline.end, 7), R"(,"uuid")");
+    EXPECT_EQ(FindMember(&tree.root, "ports")->kind, Kind::Later);
+    EXPECT_EQ(FindMember(&tree.root, "health_checks")->kind, Kind::Later);
+}
+
+TEST(PlainDocument, OutlineIsNotForWhatHasToBeReported) {
+    const auto parameter = [](const std::string &text) {
+        return R"({"1":{"settings":{"filter_policy":{"network_filters":{"0":{"parameters":[")" + text +
+               R"("]}}}}}})";
+    };
+    EXPECT_NE(ReadOutlined(R"({"ports":)" + parameter(std::string(254, 'x') + "\\n") + '}'), std::nullopt);
+    for (const std::string &ports :
+         {std::string(R"({"1":{},"1":{}})"), std::string(R"({"1":{"name":"a","name":"b"}})"),
+          std::string(R"({"1":{"name":5}})"), std::string(R"({"1":{"connection_cookie":4294967296}})"),
+          std::string(R"({"1":{"settings":{"blocked":"true"}}})"), std::string(R"({"1":{"unheard_of":1}})"),
+          std::string(R"({"1":{"name":null}})"),
+          std::string(R"({"1":{"data":{"opaque_data":{"k":{"opaque_data":"?"}}}}})"),
+          parameter(std::string(256, 'x')), std::string(R"({"1":7})"),
+          std::string("{\"1\":{\"name\":\"\xc3\"}}"), std::string("{\"1\":{\"name\":\"\xf4\x8f\xbb\xbf\"}}")})
+        EXPECT_EQ(ReadOutlined(R"({"ports":)" + ports + R"(,"name":"a"})"), std::nullopt) << ports;
+    EXPECT_EQ(ReadOutlined(R"({"max_ports":"many","ports":{"1":{}}})"), std::nullopt);
+}
+
+TEST(PlainDocument, OutlineOverlooksNothing) {
+    std::vector<std::string> documents(std::begin(kDocuments), std::end(kDocuments));
+    documents.emplace_back(kPorts);
+    for (const std::string &json : documents) {
+        ExpectOverlooksNothing(json);
+        for (std::size_t at = 0; at < json.size(); at++) {
+            ExpectOverlooksNothing(json.substr(0, at));
+            ExpectOverlooksNothing(json.substr(0, at) + '}');
+            for (const char byte :
+                 {'"', '\\', '{', '}', '[', ']', ',', ':', '0', '-', 'n', ' ', '\x01', '\xe4', '\0'}) {
+                std::string changed = json;
+                changed[at] = byte;
+                ExpectOverlooksNothing(changed);
+            }
+        }
+    }
 }
 
 TEST(PlainDocument, CutAnywhereIsJudgedAlike) {
