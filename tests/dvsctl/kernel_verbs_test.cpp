@@ -109,7 +109,7 @@ TEST_F(KernelVerbs, ASwitchLeftWithoutItsVersionPropertyIsWarnedAboutWithTheComm
     EXPECT_EQ(Kernel({"show", "store:"}).status, 7);
 
     // The command it names, as a shell takes it.
-    const std::string mend = "dvsctl kernel prop set 'it'\\''s' com.orbeno.common.version 8 --as number";
+    const std::string mend = "dvsctl kernel prop set 'it'\"'\"'s' com.orbeno.common.version 8 --as number";
     EXPECT_NE(added.err.find(mend), std::string::npos) << added.err;
     for (const char *id : {"it's", "alpha", "beta"})
         ASSERT_EQ(Verb({"prop", "set", id, "com.orbeno.common.version", "8", "--as", "number"}).status, 0);

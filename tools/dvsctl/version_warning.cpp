@@ -13,11 +13,11 @@ const std::string_view kVersionProperty = "com.orbeno.common.version";
 
 namespace {
 
-// A word of a shell's command line.
+// A word of a shell's command line. Without a backslash, which would be doubled when it is shown.
 std::string ShellWord(std::string_view text) {
     std::string word = "'";
     for (const char c : text)
-        word += c == '\'' ? std::string("'\\''") : std::string(1, c);
+        word += c == '\'' ? std::string("'\"'\"'") : std::string(1, c);
     return word + "'";
 }
 
