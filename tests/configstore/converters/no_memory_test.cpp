@@ -52,6 +52,10 @@ TEST_F(NoMemory, FailsOrSkipsWithTheMessageOfItsFamily) {
          "DVSPropResPoolsCfg", -1},
         {kGlobal, "com.orbeno.common.respools.list", "etherswitch", Bytes().U32(1).Text("k", 200),
          "DVSPropResPoolsList", 0},
+        {kHost, "com.orbeno.common.host.uplinkPorts", "etherswitch", Bytes().U32(1).Text("k", 48),
+         "DVSUplinkPortIds", -1},
+        {kGlobal, "com.orbeno.common.uplinkPorts", "etherswitch", Bytes().U32(1).Text("k", 81),
+         "DVSUplinkPorts", -1},
     };
     for (const auto &row : rows) {
         configstore::DestroyObject(object);
