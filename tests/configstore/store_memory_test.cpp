@@ -73,7 +73,7 @@ struct StoreMemory : testing::Test {
 };
 
 TEST_F(StoreMemory, AFailingCheckedSaveChangesNothing) {
-    const Bytes state = State({Full("a"), Full("b")});
+    const Bytes state = State({Full("a"), Full("b"), Full("c"), Full("d")});
     const auto save = [&] {
         return DVSState_SaveBufToConfigStoreChecked(state.data(), static_cast<uint32_t>(state.size()),
                                                     nullptr);
@@ -116,7 +116,7 @@ TEST_F(StoreMemory, AFailingUpgradeChangesNothing) {
     char directory[] = "/tmp/dvs-memory-XXXXXX";
     ASSERT_NE(nullptr, mkdtemp(directory));
     const std::string path = std::string(directory) + "/state";
-    const Bytes state = State({Full("a"), Full("b")});
+    const Bytes state = State({Full("a"), Full("b"), Full("c")});
     ASSERT_EQ(HYP_OK, DVSFile_Write(path.c_str(), state.data(), static_cast<uint32_t>(state.size())));
     const auto upgrade = [&] { return RetrieveUpgradeInfoFrom(path.c_str()); };
     const uint64_t rounds = fault::Sweep(
