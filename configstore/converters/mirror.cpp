@@ -1,13 +1,14 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Mirror sessions: one table (mirror_record.h) <-> the instances of "vspans", keyed by the session key.
-// Called through the converter table for the rows of switches and of ports.
+// Mirror sessions: one table (mirror_record.h) <-> the instances of "vspans", keyed by the session key. The
+// port records at the table's end are mirror_ports.cpp's. Called through the converter table for the rows of
+// switches and of ports.
 
 #include "configstore/converters/mirror.h"
 
 #include <algorithm>
 
-#include "configstore/converters/address.h"
 #include "configstore/converters/common.h"
+#include "configstore/converters/mirror_ports.h"
 #include "configstore/converters/mirror_record.h"
 #include "configstore/converters/switch_version.h"
 
@@ -38,13 +39,7 @@ using layout::AreaOf;
 using layout::At;
 using layout::kMirrorTableNarrow;
 using layout::Slot;
-using layout::mirror::kEncapsulatedSource;
-using layout::mirror::kMixedDest;
-using layout::mirror::kNarrowPort;
-using layout::mirror::kRemoteDest;
-using layout::mirror::kRemoteSource;
 using layout::mirror::kSession;
-using layout::mirror::kWidePort;
 
 constexpr auto kMagic = At<uint32_t>(kMirrorTableNarrow, "magic");
 constexpr auto kVersion = At<uint32_t>(kMirrorTableNarrow, "version");
@@ -63,18 +58,6 @@ constexpr auto kEncapType = At<uint32_t>(kSession, "encap_type");
 constexpr auto kErspanId = At<uint16_t>(kSession, "erspan_id");
 constexpr auto kErspanCos = At<uint8_t>(kSession, "erspan_COS");
 constexpr auto kErspanNanosec = At<uint8_t>(kSession, "erspan_gra_nanosec");
-constexpr auto kDestinationCount = At<uint32_t>(kSession, "destination_count");
-constexpr auto kReceiveCount = At<uint32_t>(kSession, "receive_count");
-constexpr auto kTransmitCount = At<uint32_t>(kSession, "transmit_count");
-constexpr auto kFirstRecord = At<uint32_t>(kSession, "first_record");
-constexpr auto kPortKind = At<uint32_t>(kNarrowPort, "kind");
-constexpr auto kPortName = AreaOf(kWidePort, "name");
-static_assert(AreaOf(kNarrowPort, "name").offset == kPortName.offset);
-// The same bytes, where the session's type makes them a VLAN id or an address.
-constexpr auto kPortVlanId = At<uint16_t>(layout::mirror::kNarrowVlan, "vlan_id");
-constexpr Slot<uint8_t> kPortIsIpv6 = {AreaOf(layout::mirror::kNarrowAddress, "address").offset};
-constexpr uint32_t kPortAddress = kPortIsIpv6.offset + 4;
-
 constexpr std::size_t kHeadSize = layout::mirror::kHeadSize;
 constexpr uint32_t kMagicValue = 0xFACEBEEF;
 constexpr uint32_t kFormatVersion = 1;
@@ -87,8 +70,6 @@ constexpr uint32_t kHasEncapVlan = 0x08;
 constexpr uint32_t kLegacyMode = 0x10;
 constexpr uint32_t kDisabled = 0x20;
 
-enum PortKind : uint32_t { kPortKey = 0, kUplinkName = 1 };
-
 struct ConnecteeType {
     uint16_t bit;
     const char *text;
@@ -98,68 +79,6 @@ constexpr uint16_t kAnyConnecteeType = 0x4;
 constexpr const char *kConnecteeList = "wildcard_port_connectee_types";
 
 // --- Save ---
-
-// Port records from the group's first one to the value's end: a text that lacks its NUL ends there.
-struct PortGroup {
-    std::span<const uint8_t> bytes;
-    uint32_t count;
-    std::size_t recordSize;
-    std::span<const uint8_t> operator[](std::size_t i) const { return bytes.subspan(i * recordSize); }
-};
-
-int32_t AppendNames(configstore::Object *ports, const char *list, const PortGroup &group) {
-    int32_t status = 0;
-    for (std::size_t i = 0; i < group.count && !status; ++i) {
-        status = AppendText(ports, list, group[i].subspan(kPortName.offset));
-    }
-    return status;
-}
-
-int32_t SaveUplinks(configstore::Object *ports, const PortGroup &group) {
-    const int32_t status = configstore::SetValueEmptyList(ports, "uplink_port_names");
-    return status ? status : AppendNames(ports, "uplink_port_names", group);
-}
-
-int32_t SaveVlans(configstore::Object *ports, const PortGroup &group) {
-    int32_t status = configstore::SetValueEmptyList(ports, "vlans");
-    for (std::size_t i = 0; i < group.count && !status; ++i) {
-        status = configstore::AppendValueInt(ports, "vlans", Get(group[i], kPortVlanId));
-    }
-    return status;
-}
-
-int32_t SaveAddresses(configstore::Object *ports, const PortGroup &group) {
-    int32_t status = 0;
-    for (std::size_t i = 0; i < group.count && !status; ++i) {
-        const auto address = group[i].subspan(kPortAddress).first<16>();
-        const AddressText text = FormatAddress(address, Get(group[i], kPortIsIpv6) != 0);
-        // Emptied each time: of several destinations the last one stays, which is what there always was.
-        status = configstore::SetValueEmptyList(ports, "addresses");
-        if (!status) status = configstore::AppendValueString(ports, "addresses", text.text);
-    }
-    return status;
-}
-
-int32_t SaveMixed(configstore::Object *ports, const PortGroup &group) {
-    int32_t status = configstore::SetValueEmptyList(ports, "uplink_port_names");
-    if (!status) status = configstore::SetValueEmptyList(ports, "port_keys");
-    for (std::size_t i = 0; i < group.count && !status; ++i) {
-        const auto name = group[i].subspan(kPortName.offset);
-        const uint32_t kind = Get(group[i], kPortKind);
-        if (kind == kUplinkName) status = AppendText(ports, "uplink_port_names", name);
-        if (kind == kPortKey) status = AppendText(ports, "port_keys", name);
-    }
-    return status;
-}
-
-int32_t SaveGroup(configstore::Object *ports, const PortGroup &group, uint32_t sessionType,
-                  bool isDestination) {
-    if (isDestination && sessionType == kRemoteSource) return SaveUplinks(ports, group);
-    if (!isDestination && sessionType == kRemoteDest) return SaveVlans(ports, group);
-    if (isDestination && sessionType == kEncapsulatedSource) return SaveAddresses(ports, group);
-    if (isDestination && sessionType == kMixedDest) return SaveMixed(ports, group);
-    return AppendNames(ports, "port_keys", group);
-}
 
 int32_t SaveConnecteeTypes(configstore::Object *ports, uint16_t bits) {
     int32_t status = configstore::SetValueEmptyList(ports, kConnecteeList);
@@ -212,7 +131,7 @@ int32_t SaveEncapsulation(configstore::Object *vspan, std::span<const uint8_t> s
 
 // `session` runs from the session to the value's end. `ports` starts at its first port record and is moved
 // behind its last one.
-int32_t SaveSession(const SaveArgs &args, std::span<const uint8_t> session, PortGroup *ports) {
+int32_t SaveSession(const SaveArgs &args, std::span<const uint8_t> session, PortRecords *ports) {
     const Text key(session.subspan(kKey.offset));
     if (!key.get()) return kFailed;
     configstore::Object *vspan = nullptr;
@@ -238,20 +157,7 @@ int32_t SaveSession(const SaveArgs &args, std::span<const uint8_t> session, Port
 
     configstore::Object *destination = nullptr;
     status = GetOrCreateSubObject(true, vspan, "destination_port", nullptr, &destination);
-    const struct {
-        configstore::Object *object;
-        Slot<uint32_t> count;
-        bool isDestination;
-    } groups[] = {{destination, kDestinationCount, true},
-                  {receive, kReceiveCount, false},
-                  {transmit, kTransmitCount, false}};
-    for (const auto &group : groups) {
-        if (status) return status;
-        ports->count = Get(session, group.count);
-        status = SaveGroup(group.object, *ports, Get(session, kSessionType), group.isDestination);
-        ports->bytes = ports->bytes.subspan(ports->count * ports->recordSize);
-    }
-    return status;
+    return status ? status : SaveSessionPorts({destination, receive, transmit}, session, ports);
 }
 
 // Whether the value holds all sessions it announces and all port records that those announce.
@@ -260,59 +166,12 @@ bool IsWhole(std::span<const uint8_t> value, uint32_t sessions, std::size_t reco
     uint64_t ports = 0;
     for (std::size_t i = 0; i < sessions; ++i) {
         const auto session = value.subspan(kHeadSize + i * kSession.size, kSession.size);
-        ports += uint64_t{Get(session, kDestinationCount)} + Get(session, kReceiveCount) +
-                 Get(session, kTransmitCount);
+        ports += AnnouncedPorts(session);
     }
     return HoldsRecords(value, kHeadSize + std::size_t{sessions} * kSession.size, ports, recordSize);
 }
 
 // --- Load ---
-
-// Number of instances, or elements of lists, of that name in or below the object.
-std::size_t CountOf(configstore::Object *object, const char *name) {
-    Instances found;
-    (void)found.Read(object, name); // none is none
-    return found.items().size();
-}
-
-// What the port area is sized by. Each of the three port objects counts the port keys of the whole session,
-// so that the sum is larger than what is written; it stands in the head and decides about the value's length.
-uint64_t CountPorts(configstore::Object *session) {
-    uint64_t count = 0;
-    for (const char *name : {"source_transmit_port", "source_recv_port", "destination_port"}) {
-        configstore::Object *ports = nullptr;
-        (void)configstore::GetSubObject(session, name, nullptr, &ports);
-        count += CountOf(session, "port_keys");
-    }
-    return count + CountOf(session, "uplink_port_names");
-}
-
-// A session's three objects; null where it lacks one.
-struct SessionPorts {
-    configstore::Object *destination = nullptr, *receive = nullptr, *transmit = nullptr;
-    explicit SessionPorts(configstore::Object *session) {
-        (void)configstore::GetSubObject(session, "destination_port", nullptr, &destination);
-        (void)configstore::GetSubObject(session, "source_recv_port", nullptr, &receive);
-        (void)configstore::GetSubObject(session, "source_transmit_port", nullptr, &transmit);
-    }
-};
-
-// The names of one port object in the order of their records.
-struct PortNames {
-    StoreTexts keys, uplinks;
-    PortNames(configstore::Object *ports, bool isDestination) {
-        if (!ports) return;
-        (void)keys.Read(ports, "port_keys"); // a list that cannot be read is no list
-        if (isDestination) (void)uplinks.Read(ports, "uplink_port_names");
-    }
-    [[nodiscard]] std::size_t count() const { return keys.items().size() + uplinks.items().size(); }
-};
-
-uint64_t CountRecords(configstore::Object *session) {
-    const SessionPorts ports(session);
-    return PortNames(ports.destination, true).count() + PortNames(ports.receive, false).count() +
-           PortNames(ports.transmit, false).count();
-}
 
 struct LoadedFlag {
     const char *name;
@@ -381,7 +240,7 @@ int32_t LoadSession(configstore::Object *vspan, std::span<uint8_t> session, bool
     }
     const int32_t status = LoadFlags(vspan, session, previous);
     if (status) return status;
-    const SessionPorts ports(vspan);
+    const SessionPorts ports = SessionPorts::Of(vspan);
     Put(session, kReceiveTypes, LoadConnecteeTypes(ports.receive));
     Put(session, kTransmitTypes, LoadConnecteeTypes(ports.transmit));
     LoadEnum(vspan, "session_type", SESSION_TYPE_LOCAL_ENUM_2_SCHEMA, "Unknown vspan session type in schema",
@@ -399,35 +258,6 @@ int32_t LoadSession(configstore::Object *vspan, std::span<uint8_t> session, bool
     return 0;
 }
 
-// The port area of the value, and the index of the next record in it.
-struct PortArea {
-    std::span<uint8_t> bytes;
-    std::size_t recordSize;
-    std::size_t next = 0;
-
-    void Write(std::size_t index, PortKind kind, const char *name) const {
-        const std::size_t at = index * recordSize;
-        if (bytes.size() < at + recordSize) return; // a list that could not be read when it was counted
-        Put(bytes.subspan(at), kPortKind, kind);
-        CopyUnbounded(bytes, at + kPortName.offset, name);
-    }
-};
-
-// Writes a group's records and its count. The count goes into the destinations' field whatever the group is,
-// and the next group starts behind what the group's own field says: the transmit sources take the receive
-// sources' place.
-void LoadGroup(configstore::Object *ports, std::span<uint8_t> session, Slot<uint32_t> ownCount,
-               PortArea *area) {
-    const PortNames names(ports, ownCount.offset == kDestinationCount.offset);
-    std::size_t index = area->next;
-    for (const char *key : names.keys.items())
-        area->Write(index++, kPortKey, key);
-    for (const char *uplink : names.uplinks.items())
-        area->Write(index++, kUplinkName, uplink);
-    Put(session, kDestinationCount, static_cast<uint32_t>(names.count()));
-    area->next += Get(session, ownCount);
-}
-
 int32_t LoadTable(std::span<configstore::Object *const> vspans, std::span<uint8_t> value,
                   std::size_t recordSize) {
     PortArea area{value.subspan(kHeadSize + vspans.size() * kSession.size), recordSize};
@@ -437,11 +267,7 @@ int32_t LoadTable(std::span<configstore::Object *const> vspans, std::span<uint8_
         const auto session = value.subspan(at, kSession.size);
         const int32_t status = LoadSession(vspan, session, &previous);
         if (status) return status;
-        Put(session, kFirstRecord, static_cast<uint32_t>(area.next));
-        const SessionPorts ports(vspan);
-        LoadGroup(ports.destination, session, kDestinationCount, &area);
-        LoadGroup(ports.receive, session, kReceiveCount, &area);
-        LoadGroup(ports.transmit, session, kTransmitCount, &area);
+        LoadSessionPorts(SessionPorts::Of(vspan), session, &area);
         at += kSession.size;
     }
     return 0;
@@ -469,19 +295,15 @@ bool IsKeyOfThisClass(const char *key) {
     return dvsSwitchClass ? isVswitchKey : isEtherswitchKey;
 }
 
-std::size_t RecordSize(bool wide) {
-    return wide ? kWidePort.size : kNarrowPort.size;
-}
-
 } // namespace
 
 int32_t SaveMirrorSessions(const SaveArgs &args) {
     if (args.value.size() < kSessionCount.End()) return kFailed;
     const uint32_t count = Get(args.value, kSessionCount);
     if (count == 0) return 0;
-    const std::size_t recordSize = RecordSize(dvsWidePortRecords);
+    const std::size_t recordSize = PortRecordSize(dvsWidePortRecords);
     if (!IsWhole(args.value, count, recordSize)) return kFailed;
-    PortGroup ports{args.value.subspan(kHeadSize + std::size_t{count} * kSession.size), 0, recordSize};
+    PortRecords ports{args.value.subspan(kHeadSize + std::size_t{count} * kSession.size), recordSize};
     int32_t status = 0;
     for (std::size_t i = 0; i < count && !status; ++i) {
         status = SaveSession(args, args.value.subspan(kHeadSize + i * kSession.size), &ports);
@@ -506,10 +328,10 @@ int32_t LoadMirrorSessions(const LoadArgs &args) {
     uint64_t ports = 0;
     uint64_t records = 0;
     for (configstore::Object *vspan : vspans.items()) {
-        ports += CountPorts(vspan);
-        records += CountRecords(vspan);
+        ports += CountedPorts(vspan);
+        records += PortsToLoad(vspan);
     }
-    const std::size_t recordSize = RecordSize(wide);
+    const std::size_t recordSize = PortRecordSize(wide);
     Block block;
     if (!block.Allocate(kHeadSize + vspans.items().size() * kSession.size +
                         std::max(ports, records) * recordSize)) {

@@ -4,7 +4,7 @@
 
 // The binary record of mirror sessions: a head, the sessions, and the port records of all sessions one behind
 // the other. For each session in order come its destinations, its receive sources and its transmit sources.
-// Switches of a version above 99 have wide port records. Only mirror.cpp includes this.
+// Switches of a version above 99 have wide port records. For mirror sessions' own files only.
 
 #include <iterator>
 
