@@ -12,8 +12,9 @@ if(DVS_WERROR)
   target_compile_options(dvs_flags INTERFACE -Werror)
 endif()
 
-# Line numbers are all that a sanitizer report shows of the debug information.
-# Sanitizers and coverage must cover every object of a program, so they are set for the whole tree.
+# Sanitizers and coverage must cover every object of a program, so they are set for the whole tree. -g1 follows the -g
+# of the build type and takes its place: a report shows functions and lines, and the names of variables, which a
+# debugger would want and a debug build has, are most of what there is to write and to link.
 if(DVS_SANITIZE)
   add_compile_options(-fsanitize=${DVS_SANITIZE} -fno-sanitize-recover=all -fno-omit-frame-pointer -O1 -g1)
   add_link_options(-fsanitize=${DVS_SANITIZE})
