@@ -190,7 +190,13 @@ void RemoveAllPorts(DVSwitch *sw) {
 }
 
 DVSPort *FindPort(DVSwitch *sw, std::string_view portId, uint32_t kind) {
-    if (HasIndex(sw)) return IndexFind(sw, PortKey(portId), kind);
+    if (HasIndex(sw)) {
+        DVSPort *port = IndexFind(sw, PortKey(portId), kind);
+        // The slots are the callers' to see and to change: a port that is no longer in its own is for the
+        // walk to judge. (One emptied before it would end the walk, and here goes unnoticed: looking for it
+        // would be the walk.)
+        if (!port || PortAt(sw, FrontOf(port).slot) == port) return port;
+    }
     DVSPort *found = nullptr;
     WalkPorts(sw, [&](DVSPort *port) {
         if (Is(port, portId, kind)) found = port;

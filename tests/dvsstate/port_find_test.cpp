@@ -80,6 +80,25 @@ TEST_F(PortFind, NamesAPortByItsAliasOrUnknown) {
     EXPECT_STREQ(DVS_PortAlias(AddPort(sw, "b", DVS_PORT_ACTIVE, Alias("web"))), "web");
 }
 
+// Slots are visible to callers. A set bit without a port ends every walk, and an index does not know better.
+TEST_F(PortFind, APortWhoseSlotACallerEmptiedIsNotFound) {
+    for (const int ports : {4, 200}) {
+        const std::string id = "dvs" + std::to_string(ports);
+        DVSwitch *sw = AddSwitch(id);
+        for (int i = 0; i < ports; ++i)
+            AddPort(sw, "p" + std::to_string(i));
+        for (const int emptied : {0, ports / 2, ports - 1}) {
+            const std::string portId = "p" + std::to_string(emptied);
+            DVSPort *port = std::exchange(sw->ports[emptied], nullptr);
+            ASSERT_NE(port, nullptr);
+            EXPECT_EQ(DVSState_PortFind(id.c_str(), portId.c_str()), nullptr) << ports;
+            EXPECT_EQ(DVSState_PortRemove(id.c_str(), portId.c_str()), HYP_NOT_FOUND) << ports;
+            sw->ports[emptied] = port;
+            EXPECT_EQ(DVSState_PortFind(id.c_str(), portId.c_str()), port) << ports;
+        }
+    }
+}
+
 TEST_F(PortFind, WalksUntilTheCallbackStopsAndMayRemove) {
     DVSwitch *sw = AddSwitch("dvs");
     for (const char *id : {"a", "b", "c"})
