@@ -6,6 +6,7 @@
 #include "dvsstate/switch_table.h"
 
 #include <algorithm>
+#include <atomic>
 #include <cstring>
 #include <iterator>
 
@@ -31,7 +32,8 @@ constexpr uint32_t kLockRank = 0xfeffffff;
 constexpr char kKitSignature[] = "dvsstate";
 constexpr uint32_t kKitVersion = 21;
 
-MXUserRecLock *g_lock = nullptr; // created on first use by the host's runtime, which makes that safe to race
+/// Set once, on first use, by the host's runtime, which makes the creation safe to race.
+constinit MXUserRecLock *g_lock = nullptr;
 
 struct SwitchClass {
     std::string_view name;
@@ -158,7 +160,8 @@ std::array<DVSwitch *, kSwitchNum>::iterator FindSlot(std::string_view switchId)
 using namespace dvs::state;
 
 MXUserRecLock *DVSwitchHandleLock(void) {
-    MXUserRecLock *lock = MXUser_CreateSingletonRecLockInt(&g_lock, kLockName, kLockRank);
+    MXUserRecLock *lock = std::atomic_ref(g_lock).load(std::memory_order_acquire);
+    if (!lock) lock = MXUser_CreateSingletonRecLockInt(&g_lock, kLockName, kLockRank);
     if (lock) MXUser_AcquireRecLock(lock);
     return lock;
 }

@@ -151,6 +151,14 @@ TEST_F(StateSerialize, FailsWithExistsWhateverASwitchFailsWith) {
                                       "DVSState_SwitchDeserialize dvs dvs return Limit exceeded\n",
                                       "DVSStateConfigSerializeCB DVS dvs failed Limit exceeded\n"}));
     sw->hostPropList->serialSize -= 4;
+    sw->globalPropList->serialSize += 4;
+    EXPECT_EQ(DVSState_SwitchSerialize(sw, &buf, &len), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(messages.Take(),
+              (Lines{"DVSState_SwitchSerialize dvs\n",
+                     "Failed to add switch dvs global property list, return Limit exceeded\n",
+                     "Add DVS(dvs) property list succesfully\n",
+                     "DVSState_SwitchDeserialize dvs dvs return Limit exceeded\n"}));
+    sw->globalPropList->serialSize -= 4;
 }
 
 TEST_F(StateSerialize, WritesIntoTheCallersBufferWhenItIsLargeEnough) {

@@ -311,7 +311,7 @@ const std::vector<Row> kRows = {
 };
 // clang-format on
 
-class OutOfMemory : public testing::TestWithParam<std::size_t> {
+class StateFileDir : public testing::Test {
 protected:
     void SetUp() override {
         char name[] = "/tmp/dvs-memory-XXXXXX";
@@ -321,6 +321,8 @@ protected:
     void TearDown() override { std::filesystem::remove_all(dir_); }
     std::string dir_;
 };
+
+class OutOfMemory : public StateFileDir, public testing::WithParamInterface<std::size_t> {};
 
 TEST_P(OutOfMemory, LeavesNothingBehind) {
     const Row &row = kRows[GetParam()];
@@ -355,6 +357,41 @@ TEST_P(OutOfMemory, LeavesNothingBehind) {
 
 INSTANTIATE_TEST_SUITE_P(Of, OutOfMemory, testing::Range(std::size_t{0}, kRows.size()),
                          [](const auto &row) { return std::string(kRows[row.param].name); });
+
+/// What an operation says about its missing memory, at the level of errors; the same for each allocation.
+void ExpectSaid(HYP_ReturnStatus (*run)(Child &), const std::string &text) {
+    fault::Options options;
+    options.prepare = Prepare;
+    options.conclude = Conclude;
+    options.warmUp = true;
+    const uint64_t rounds = fault::Sweep(
+        "alloc:%",
+        [run](Child &child) {
+            dvs_debug = 0;
+            DVSLog_SetSink(Child::NoteMessage, &child);
+            g_world.status = run(child);
+            DVSLog_SetSink(nullptr, nullptr);
+            dvs_debug = -1;
+            return g_world.status;
+        },
+        [&text](uint64_t, const fault::Report &report) {
+            EXPECT_EQ(report.notes, report.hits == 0 ? "" : text);
+        },
+        options);
+    EXPECT_GT(rounds, 1u);
+}
+
+class OutOfMemoryMessages : public StateFileDir {};
+
+TEST_F(OutOfMemoryMessages, NameThePortThatCouldNotBeAdded) {
+    ExpectSaid([](Child &c) { return AddPort(c, DVSState_PortAdd); },
+               "DVSStatePortAdd: failed to allocate port new\n");
+}
+
+TEST_F(OutOfMemoryMessages, NameTheSwitchThatCouldNotBeAdded) {
+    ExpectSaid(DO(DVSState_SwitchAdd("new", "vswitch", 0, kVersion)),
+               "DVSState_SwitchAdd failed DVS:new Error: Out of memory\n");
+}
 
 TEST(OutOfMemoryTable, HasEveryExportedOperationOfTheseFamilies) {
     std::set<std::string> rows;

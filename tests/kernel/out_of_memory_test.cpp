@@ -130,6 +130,34 @@ TEST(KernelWithoutMemory, EveryOperationFailsCleanly) {
     }
 }
 
+/// The only line of its own that a command prints, and the only one without a line end.
+TEST(KernelWithoutMemory, CmdExecSaysThatItsBufferIsMissing) {
+    Serve();
+    g_size = 77;
+    fault::Options options;
+    options.warmUp = true;
+    uint64_t refused = 0;
+    fault::Sweep(
+        "alloc:%",
+        [](fault::Child &child) {
+            DVSLog_SetSink(fault::Child::NoteMessage, &child);
+            void *out = &child;
+            const HYP_ReturnStatus status = DVSHYP_CmdExec("s", "x", nullptr, 0, &out, &g_size);
+            DVSLog_SetSink(nullptr, nullptr);
+            if (status != HYP_OK) child.Note(out == nullptr && g_size == 32768 ? "|null" : "|left");
+            if (status == HYP_OK) DVSHYP_DataFree(out);
+            return status;
+        },
+        [&](uint64_t, const fault::Report &report) {
+            if (report.hits == 0) return;
+            refused++;
+            EXPECT_EQ(report.status, HYP_NO_MEMORY);
+            EXPECT_EQ(report.notes, "failed to alloc buffer memory|null");
+        },
+        options);
+    EXPECT_EQ(refused, 1U);
+}
+
 /// Stated behaviour: where the state file's contents do not load, they stay allocated.
 TEST(KernelLeaks, TheContentsOfAStateFileThatDoesNotLoadStayAllocated) {
     Serve();

@@ -86,18 +86,25 @@ TEST_F(Queries, VendorListsAskTheModuleForTheVersion) {
     EXPECT_STREQ(device.calls[1].record.data() + 112, "com.orbeno.common.version");
 }
 
-TEST_F(Queries, AtVersion106TeamingStaysAt107ItGoes) {
-    // Only the names of the later strips: what is below "com.orbeno.vswitch." goes anyway unless something
-    // keeps it.
+TEST_F(Queries, NamesThatGoAboveVersion106StayAt106) {
+    // Of the two names that go above 106 teaming never gets that far: it is below "com.orbeno.vswitch.", of
+    // which only the exact name of the exception survives.
     StateBuilder state;
     state.Switch("s");
-    for (const char *name : {"x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"})
-        state.Global("s", name, "v", 32);
+    for (const char *name :
+         {"com.orbeno.vswitch.teaming", "x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"})
+        state.Global("s", name, "v", 32).Host("s", name, "v", 32);
     device.replies[3] = state.Serialize();
-    device.replies[8] = Word(106);
-    EXPECT_EQ(VendorGlobal(), (Strings{"x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"}));
-    device.replies[8] = Word(107);
-    EXPECT_EQ(VendorGlobal(), Strings{"com.vendor.own"});
+    for (const uint32_t version : {0u, 106u}) {
+        device.replies[8] = Word(version);
+        EXPECT_EQ(VendorGlobal(), (Strings{"x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"}));
+        EXPECT_EQ(VendorHost(), (Strings{"x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"}));
+    }
+    for (const uint32_t version : {107u, 0xffffffffu}) {
+        device.replies[8] = Word(version);
+        EXPECT_EQ(VendorGlobal(), Strings{"com.vendor.own"});
+        EXPECT_EQ(VendorHost(), Strings{"com.vendor.own"});
+    }
 }
 
 TEST_F(Queries, AVersionReplyShorterThanAWordIsAFailedQuery) {
@@ -238,6 +245,7 @@ TEST_F(PortLists, ASwitchWithoutPortsYieldsCountZero) {
     const PortList list = Ports(1);
     EXPECT_EQ(list->numEntries, 0U);
     EXPECT_EQ(list->portType, 1U);
+    EXPECT_EQ(std::memcmp(list.get(), "\0\0\0\0\1\0\0\0", 8), 0);
 }
 
 TEST_F(PortLists, PortsOfTheTypeInSlotOrderWithTheirConnectionIds) {

@@ -7,7 +7,9 @@
 #include <gtest/gtest.h>
 
 #include <cstring>
+#include <string>
 
+#include "dvs/log.h"
 #include "dvs/state.h"
 
 namespace {
@@ -34,8 +36,18 @@ namespace {
 
 class OwnKit : public testing::Test {
 protected:
-    void SetUp() override { g_signatureStatus = g_getStatus = HYP_OK; }
-    void TearDown() override { (void)DVSState_ConfigReset(); }
+    void SetUp() override {
+        g_signatureStatus = g_getStatus = HYP_OK;
+        dvs_debug = 0;
+        DVSLog_SetSink(
+            [](int, const char *message, void *arg) { *static_cast<std::string *>(arg) += message; }, &said_);
+    }
+    void TearDown() override {
+        DVSLog_SetSink(nullptr, nullptr);
+        (void)DVSState_ConfigReset();
+    }
+
+    std::string said_;
 };
 
 // The limit is read once in a process, and each of these is a process of its own under ctest; run together,
@@ -45,11 +57,19 @@ TEST_F(OwnKit, AFailedSignatureCheckFailsTheFirstAdd) {
     g_signatureStatus = HYP_NOT_SUPPORTED;
     EXPECT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_NOT_SUPPORTED);
     EXPECT_EQ(g_version, 21u);
+    EXPECT_EQ(said_, "DVSState_SwitchAdd s, KIT signature check failed. Error: Not supported\n");
+    EXPECT_EQ(uwMaxNumActivePortsSystemWide, 0u);
 }
 
 TEST_F(OwnKit, AFailedReadFailsTheFirstAdd) {
     g_getStatus = HYP_FAILURE;
     EXPECT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_FAILURE);
+    EXPECT_EQ(said_, "DVSState_SwitchAdd s, failed to get max ports systemwide. Error: Failure\n");
+}
+
+TEST_F(OwnKit, IsAskedBeforeTheIdIsLookedAt) {
+    g_getStatus = HYP_FAILURE;
+    EXPECT_EQ(DVSState_SwitchAdd(std::string(64, 'i').c_str(), "vswitch", 8, 4), HYP_FAILURE);
 }
 
 TEST_F(OwnKit, GivesThePortLimit) {

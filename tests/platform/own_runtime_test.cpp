@@ -9,11 +9,13 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <memory>
 #include <mutex>
 #include <string>
 #include <vector>
 
 #include "dvs/file.h"
+#include "dvs/hyp.h"
 #include "dvs/state.h"
 
 struct MXUserRecLock {
@@ -30,6 +32,7 @@ namespace {
 std::string g_logged;
 uint32_t g_logLevel;
 int g_held;
+int g_created;
 uint32_t g_bitsAsked;
 
 } // namespace
@@ -38,6 +41,7 @@ extern "C" {
 
 MXUserRecLock *MXUser_CreateSingletonRecLockInt(MXUserRecLock **storage, const char *name, uint32_t rank) {
     static std::vector<std::unique_ptr<MXUserRecLock>> all;
+    g_created++;
     if (*storage) return *storage;
     all.push_back(std::make_unique<MXUserRecLock>());
     all.back()->name = name;
@@ -120,6 +124,29 @@ TEST(OwnRuntime, GivesTheLocks) {
     EXPECT_EQ(g_held, 1);
     DVSwitchHandleUnlock(lock);
     EXPECT_EQ(g_held, 0);
+}
+
+TEST(OwnRuntime, GivesTheKernelInterfacesLock) {
+    MXUserRecLock *lock = DVSwitchHYPLock();
+    ASSERT_NE(lock, nullptr);
+    EXPECT_EQ(lock->name, "dvshyp");
+    EXPECT_EQ(lock->rank, 0xfefffffeu);
+    EXPECT_EQ(g_held, 1);
+    DVSwitchHYPUnlock(lock);
+    DVSwitchHYPUnlock(nullptr);
+    EXPECT_EQ(g_held, 0);
+}
+
+TEST(OwnRuntime, IsAskedForEachLockOnItsFirstUseOnly) {
+    DVSwitchHandleUnlock(DVSwitchHandleLock());
+    DVSwitchHYPUnlock(DVSwitchHYPLock());
+    g_created = 0;
+    for (int i = 0; i < 3; i++) {
+        DVSwitchHandleUnlock(DVSwitchHandleLock());
+        DVSwitchHYPUnlock(DVSwitchHYPLock());
+        EXPECT_EQ(DVSState_SwitchFind("absent"), nullptr);
+    }
+    EXPECT_EQ(g_created, 0);
 }
 
 TEST(OwnRuntime, GivesTheBitVectors) {
