@@ -1,0 +1,56 @@
+#!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
+"""Checks the build for a host that has the real services (-DDVS_PLATFORM=host).
+
+Usage: host_check.py CMAKE NM SOURCE_DIR LIBRARY_ARCHIVE C_COMPILER CXX_COMPILER [LINK_FLAG...]
+
+Configures it and builds what is its own, the device. The library's objects do not depend on the platform, so those of
+this build stand in for the rest: linked with that device, what stays undefined must be functions of the other contract
+headers, and no more. A library that reached for something of the embedded platform would show here.
+"""
+
+import pathlib
+import subprocess
+import sys
+import tempfile
+
+import seam_check
+
+DEVICE = "device.h"
+
+
+def undefined(nm, library):
+    """The plain names of what no system library has: those have a version behind an @."""
+    out = subprocess.run([nm, "-D", "-C", "--undefined-only", library], check=True, capture_output=True, text=True).stdout
+    names = {line.split(None, 1)[1] for line in out.splitlines() if "@" not in line and line.split()[0] == "U"}
+    names = {name.split("(")[0] for name in names}
+    # Sanitizers and coverage bring names of the compiler's own.
+    return {name for name in names if not name.startswith("__")}
+
+
+def main():
+    cmake, nm, source, archive, c_compiler, cxx_compiler, *flags = sys.argv[1:]
+    headers = sorted(pathlib.Path(source, "platform/include/platform").glob("*.h"))
+    contracts = {header.name: seam_check.declared(header) for header in headers}
+    with tempfile.TemporaryDirectory() as work:
+        subprocess.run([cmake, "-G", "Ninja", "-S", source, "-B", work, "-DDVS_PLATFORM=host", "-DDVS_WERROR=ON",
+                        f"-DCMAKE_C_COMPILER={c_compiler}", f"-DCMAKE_CXX_COMPILER={cxx_compiler}"],
+                       check=True, stdout=subprocess.DEVNULL)
+        subprocess.run([cmake, "--build", work, "--target", "dvs_platform"], check=True, stdout=subprocess.DEVNULL)
+        library = f"{work}/libhost.so"
+        subprocess.run([cxx_compiler, *flags, "-shared", "-o", library, "-Wl,--whole-archive", archive,
+                        f"{work}/lib/libdvsplatform.a", "-Wl,--no-whole-archive"], check=True)
+        left = undefined(nm, library)
+    expected = set()
+    for header, names in contracts.items():
+        if header != DEVICE:
+            expected |= {f"configstore::{name}" if header == "configstore.h" else name for name in names}
+    faults = [f"{name} is wanted, and no contract header has it" for name in sorted(left - expected)]
+    if not left & expected:
+        faults.append("nothing of the contracts is wanted: the check looks at the wrong thing")
+    print("\n".join(faults) if faults else f"{len(left)} functions are left to the host: sound")
+    return 1 if faults else 0
+
+
+if __name__ == "__main__":
+    sys.exit(main())
