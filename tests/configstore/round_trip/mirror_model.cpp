@@ -83,7 +83,7 @@ struct Area {
             Place(index++, 0, name);
         for (const auto &name : stored.uplinks)
             Place(index++, 1, name);
-        for (const std::size_t group : {1, 2}) {
+        for (std::size_t group = 1; group < 3; ++group) {
             for (std::size_t i = 0; i < stored.keys[group].size(); ++i)
                 Place(index + i, 0, stored.keys[group][i]);
         }
