@@ -63,7 +63,7 @@ pid_t StartEmulator(const Options &options, int *exitStatus) {
         prctl(PR_SET_PDEATHSIG, SIGTERM);
         if (getppid() != parent) _exit(kExitFailed);
         const auto tell = [&] { (void)!write(ready[1], "", 1); };
-        _exit(Serve(options, tell));
+        std::exit(Serve(options, tell)); // in order: whoever watches it reports at the end
     }
     close(ready[1]);
     char byte = 0;

@@ -201,6 +201,17 @@ TEST_F(EmulatorCommands, ValuesOfSixteenMebibytesAreTheLargest) {
     EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "n").text.size(), 16U << 20);
 }
 
+TEST_F(EmulatorCommands, UplinkDataCountsForTheBoundOfTheState) {
+    const std::string value(16 << 20, 'v');
+    ASSERT_EQ(DVSHYP_UplinkDataSet("s1", "p1", 1, value.data(), 16 << 20, 16), HYP_OK);
+    HYP_ReturnStatus status = HYP_OK;
+    int set = 0;
+    for (; status == HYP_OK && set < 20; set++)
+        status = DVSHYP_HostPropSet("s1", ("n" + std::to_string(set)).c_str(), value.data(), 16 << 20, 16);
+    EXPECT_EQ(status, HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(set, 15); // one less than without it
+}
+
 TEST_F(EmulatorCommands, TheWholeStateIsBounded) {
     const std::string value(16 << 20, 'v');
     HYP_ReturnStatus status = HYP_OK;

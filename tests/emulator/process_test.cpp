@@ -161,6 +161,13 @@ TEST_F(EmulatorSocket, OfADeadEmulatorGoesToOneOfManyThatStartAtOnce) {
     }
 }
 
+TEST_F(EmulatorSocket, InADirectoryThatIsNotThereIsStatusOne) {
+    const std::string absent = directory_ / "absent/";
+    const Finished finished = Emulator({"--socket", absent + "socket"});
+    EXPECT_EQ(finished.status, 1);
+    EXPECT_NE(finished.err.find(absent), std::string::npos) << finished.err;
+}
+
 TEST_F(EmulatorSocket, NeverReplacesAnotherFile) {
     std::ofstream(socket_) << "precious";
     EXPECT_EQ(Emulator({"--socket", socket_}).status, 1);
@@ -257,6 +264,14 @@ TEST_F(EmulatorState, AFileThatCannotBeReadIsNotTakenForANewOne) {
     EXPECT_TRUE(std::filesystem::is_directory(state_));
 }
 
+TEST_F(EmulatorState, AFileThatCannotBeLookedAtIsNotTakenForANewOne) {
+    const std::string below = state_ + "/below";
+    std::ofstream(state_) << "a file, no directory";
+    const Finished finished = Emulator({"--socket", socket_, "--state", below});
+    EXPECT_NE(finished.status, 0);
+    EXPECT_NE(finished.err.find(below + ": Not a directory"), std::string::npos) << finished.err;
+}
+
 TEST_F(EmulatorState, AFileThatCannotBeSavedIsStatusOne) {
     ASSERT_TRUE(process_.Start(socket_, {"--state", directory_ / "absent/state"}));
     EXPECT_EQ(Exec("save").status, HYP_IO_ERROR);
@@ -329,6 +344,23 @@ TEST_F(EmulatorRun, AnEmulatorThatDoesNotStartIsItsOwnStatus) {
     const Finished finished = Run({"--state", directory / "state"}, "echo started");
     EXPECT_EQ(finished.status, 6);
     EXPECT_EQ(finished.out, "");
+}
+
+TEST_F(EmulatorRun, PassesSignalsOnToTheCommand) {
+    const Finished finished = Run(
+        {},
+        "trap 'exit 7' TERM; kill -TERM $PPID; i=0; while [ $i -lt 500 ]; do sleep 0.01; i=$((i+1)); done");
+    EXPECT_EQ(finished.status, 7) << finished.err;
+}
+
+TEST_F(EmulatorRun, WithoutAPlaceForItsFilesStartsNothing) {
+    TempDir directory;
+    setenv("TMPDIR", (directory / "absent").c_str(), 1);
+    const Finished finished = Run({}, "echo started");
+    unsetenv("TMPDIR");
+    EXPECT_EQ(finished.status, 1);
+    EXPECT_EQ(finished.out, "");
+    EXPECT_NE(finished.err.find("no temporary directory: No such file"), std::string::npos) << finished.err;
 }
 
 TEST_F(EmulatorRun, SavesTheStateOfTheCommand) {
