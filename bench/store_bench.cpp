@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Saving one switch to the config store and loading it back, beside SQLite alone storing and reading one ready
 // document of the same size: all of it in one run, on the same disk, with the same durability. Prints milliseconds
-// (the median of the rounds), ratios, nanoseconds a property and the peak memory. See README.md.
+// (of the fastest round), ratios, nanoseconds a property and the peak memory. See README.md.
 //
 //   store_bench [--ports N[,N…]] [--kind usual|structured] [--rounds N] [--dir DIRECTORY]
 
@@ -15,7 +15,9 @@
 #include <sqlite3.h>
 #include <string>
 #include <sys/resource.h>
+#include <sys/wait.h>
 #include <unistd.h>
+#include <utility>
 #include <vector>
 
 #include "bench/port_settings.h"
@@ -69,15 +71,28 @@ State BuildState(const PortKind &kind, int ports, int version) {
     return state;
 }
 
-double MedianMs(int rounds, const std::function<void(int)> &work) {
-    std::vector<double> times;
+/// Of the fastest round, like the other programs' figures. `prepare` comes before each and is not timed.
+double FastestMs(int rounds, const std::function<void(int)> &work, const std::function<void()> &prepare = {}) {
+    double fastest = 0;
     for (int round = 0; round < rounds; round++) {
+        if (prepare) prepare();
         const auto start = std::chrono::steady_clock::now();
         work(round);
-        times.push_back(std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - start).count());
+        const double took = std::chrono::duration<double, std::milli>(std::chrono::steady_clock::now() - start).count();
+        if (round == 0 || took < fastest) fastest = took;
     }
-    std::nth_element(times.begin(), times.begin() + rounds / 2, times.end());
-    return times[static_cast<std::size_t>(rounds / 2)];
+    return fastest;
+}
+
+long PeakMegabytes() {
+    rusage usage{};
+    getrusage(RUSAGE_SELF, &usage);
+    return usage.ru_maxrss / 1024;
+}
+
+void RemoveDatabase(const std::string &path) {
+    for (const char *suffix : {"", "-wal", "-shm"})
+        std::filesystem::remove(path + suffix);
 }
 
 /// SQLite with the store's durability and nothing else: a table of documents.
@@ -139,44 +154,55 @@ void Bench(const PortKind &kind, int ports, int rounds, const std::string &direc
     std::filesystem::remove_all(directory);
     std::filesystem::create_directories(directory);
     const State states[2] = {BuildState(kind, ports, 0), BuildState(kind, ports, 1)};
-    // Two documents in turn, so that each save changes something. The first save of all is measured alone.
-    const double first = MedianMs(1, [&](int) {
-        Check(DVSState_SaveBufToConfigStore(states[1].buffer, states[1].len) == 0, "the first save");
-    });
-    const double save = MedianMs(rounds, [&](int round) {
-        Check(DVSState_SaveBufToConfigStore(states[round % 2].buffer, states[round % 2].len) == 0, "the save");
-    });
-    const double load = MedianMs(rounds, [&](int) {
+    const long before = PeakMegabytes();
+    // Two documents in turn, so that each save changes something.
+    const auto saveOne = [&](int round) {
+        const State &state = states[round % 2];
+        Check(DVSState_SaveBufToConfigStore(state.buffer, state.len) == 0, "the save");
+    };
+    const double first = FastestMs(rounds, saveOne, [&] { RemoveDatabase(path); });
+    const double save = FastestMs(rounds, [&](int round) { saveOne(rounds + round); });
+    const long peak = PeakMegabytes();
+    const double load = FastestMs(rounds, [&](int) {
         void *out = nullptr;
         uint32_t len = 0;
         Check(DVSState_LoadFromConfigStoreAsBuf(&out, &len, false) == 0 && out, "the load");
         std::free(out);
     });
-    rusage usage{};
-    getrusage(RUSAGE_SELF, &usage);
     const std::string document = StoredDocument(path);
-    Plain plain(directory + "/plain.db");
+    const std::string plainPath = directory + "/plain.db";
+    Plain plain(plainPath);
     plain.Store(document);
-    const double plainStore = MedianMs(rounds, [&](int) { plain.Store(document); });
-    const double plainRead = MedianMs(rounds, [&](int) { Check(plain.Read().size() == document.size(), "the read"); });
+    // Kept open, SQLite moves its log into the database once in a few commits only: each takes its share.
+    constexpr int kInARow = 6;
+    const auto storeInARow = [&](int) {
+        for (int i = 0; i < kInARow; i++)
+            plain.Store(document);
+    };
+    const double plainStore = FastestMs(rounds, storeInARow) / kInARow;
+    const double plainRead = FastestMs(rounds, [&](int) { Check(plain.Read().size() == document.size(), "the read"); });
     plain.Close();
-    const auto around = [&](const std::function<void()> &work) {
-        return MedianMs(rounds, [&](int) {
+    const auto around = [&](const std::function<void()> &work, const std::function<void()> &prepare = {}) {
+        const auto opened = [&](int) {
             plain.Open();
             work();
             plain.Close();
-        });
+        };
+        return FastestMs(rounds, opened, prepare);
     };
     const double openStore = around([&] { plain.Store(document); });
     const double openRead = around([&] { (void)plain.Read(); });
+    const double makeStore = around([&] { plain.Store(document); }, [&] { RemoveDatabase(plainPath); });
     const double properties = static_cast<double>(ports) * kSettingsOfAPort;
     const auto row = [&](const char *work, double ours, double sqlite) {
         std::printf("%-46s %9.2f %9.2f %7.2f %9.0f\n", work, ours, sqlite, ours / sqlite, ours * 1e6 / properties);
     };
-    std::printf("%d ports x %zu %s settings: a document of %zu bytes, a state of %u; peak memory %ld MB\n", ports,
-                kSettingsOfAPort, kind.name, document.size(), states[0].len, usage.ru_maxrss / 1024);
+    std::printf("%d ports x %zu %s settings: a document of %zu bytes, a state of %u\n", ports, kSettingsOfAPort, kind.name,
+                document.size(), states[0].len);
+    std::printf("peak memory of saving: %ld MB, with the two states; before the first save: %ld MB\n", peak, before);
     std::printf("%-46s %9s %9s %7s %9s\n", "milliseconds", "ours", "SQLite", "ratio", "ns/prop");
-    row("first save, into a new store", first, plainStore);
+    row("first save, SQLite kept open", first, plainStore);
+    row("first save, SQLite makes a database too", first, makeStore);
     row("save again (history), SQLite kept open", save, plainStore);
     row("save again (history), SQLite opened each time", save, openStore);
     row("load, SQLite kept open", load, plainRead);
@@ -186,6 +212,20 @@ void Bench(const PortKind &kind, int ports, int rounds, const std::string &direc
     for (const State &state : states)
         std::free(state.buffer);
     std::filesystem::remove_all(directory);
+}
+
+/// In a process of its own, unless it is the only run: none finds memory that another has used. Profilers see
+/// one run best where there is one process.
+void RunApart(bool apart, const std::function<void()> &run) {
+    if (!apart) return run();
+    const pid_t child = fork();
+    Check(child >= 0, "the fork");
+    if (child == 0) {
+        run();
+        std::exit(0);
+    }
+    int status = 0;
+    Check(waitpid(child, &status, 0) == child && status == 0, "one of the runs");
 }
 
 } // namespace
@@ -203,11 +243,14 @@ int main(int argc, char **argv) {
     }
     dvsconfigstore_debug = dvs_debug = dvsdata_debug = -1;
     setenv("DVS_MAX_PORTS", "131072", 0);
+    std::vector<std::pair<const PortKind *, int>> runs;
     for (char *at = ports.data(); *at; at += *at == ',') {
         const int count = static_cast<int>(std::strtol(at, &at, 10));
         for (const PortKind &kind : kPortKinds) {
-            if (kinds.empty() || kinds == kind.name) Bench(kind, count, rounds, directory);
+            if (kinds.empty() || kinds == kind.name) runs.emplace_back(&kind, count);
         }
     }
+    for (const auto &[kind, count] : runs)
+        RunApart(runs.size() > 1, [&] { Bench(*kind, count, rounds, directory); });
     return 0;
 }
