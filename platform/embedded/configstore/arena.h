@@ -23,7 +23,7 @@ public:
     ~Arena() {
         while (chunks_) {
             Chunk *next = chunks_->next;
-            std::free(chunks_);
+            GiveBlock(chunks_);
             chunks_ = next;
         }
     }
@@ -57,30 +57,62 @@ public:
 private:
     struct Chunk {
         Chunk *next;
-        std::size_t size;
+        std::size_t size; // with this
     };
     static constexpr std::size_t kFirstChunk = 2048;
     static constexpr std::size_t kLargestChunk = std::size_t{1} << 21; // a huge page
 
     /// A tree of thousands of ports takes megabytes, used once: its page faults cost more than all the rest,
-    /// unless they are few.
-    static void *TakeBlock(std::size_t size) {
-        if (size < kLargestChunk) return std::malloc(size);
-        void *block = nullptr;
-        if (posix_memalign(&block, kLargestChunk, size) != 0) return nullptr;
-        (void)madvise(block, size, MADV_HUGEPAGE);
+    /// unless they are few. Large chunks are whole huge pages from the system and go back to it: in the heap
+    /// they would leave holes, more with every save.
+    static void *TakeBlock(std::size_t *size) {
+        if (*size < kLargestChunk) return std::malloc(*size);
+        if (*size > SIZE_MAX - 2 * kLargestChunk) return nullptr;
+        *size = (*size + kLargestChunk - 1) / kLargestChunk * kLargestChunk;
+        char *block = Map(*size);
+        if (block && PastHugePage(block) != 0) {
+            (void)munmap(block, *size);
+            block = MapAligned(*size);
+        }
+        if (block) (void)madvise(block, *size, MADV_HUGEPAGE);
         return block;
+    }
+
+    static void GiveBlock(Chunk *chunk) {
+        if (chunk->size < kLargestChunk)
+            std::free(chunk);
+        else
+            (void)munmap(chunk, chunk->size);
+    }
+
+    static char *Map(std::size_t size) {
+        void *const block = mmap(nullptr, size, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
+        return block == MAP_FAILED ? nullptr : static_cast<char *>(block);
+    }
+
+    /// Only the first chunk of a tree needs this, where the system puts mappings side by side.
+    static char *MapAligned(std::size_t size) {
+        char *const block = Map(size + kLargestChunk);
+        if (!block) return nullptr;
+        const std::size_t before = (kLargestChunk - PastHugePage(block)) % kLargestChunk;
+        if (before > 0) (void)munmap(block, before);
+        (void)munmap(block + before + size, kLargestChunk - before);
+        return block + before;
+    }
+
+    static std::size_t PastHugePage(const char *block) {
+        return reinterpret_cast<uintptr_t>(block) % kLargestChunk;
     }
 
     void *AllocateSlow(std::size_t size) {
         // A large piece gets a chunk of its own behind the current one, so that the current one's rest stays
         // in use.
         const bool alone = size > nextChunk_ / 4;
-        const std::size_t room = alone ? size : nextChunk_ - sizeof(Chunk);
-        if (room > SIZE_MAX - sizeof(Chunk)) throw std::bad_alloc();
-        auto *const chunk = static_cast<Chunk *>(TakeBlock(sizeof(Chunk) + room));
+        std::size_t whole = nextChunk_;
+        if (alone && __builtin_add_overflow(size, sizeof(Chunk), &whole)) throw std::bad_alloc();
+        auto *const chunk = static_cast<Chunk *>(TakeBlock(&whole));
         if (!chunk) throw std::bad_alloc();
-        chunk->size = room;
+        chunk->size = whole;
         char *const start = reinterpret_cast<char *>(chunk + 1);
         if (alone && chunks_) {
             chunk->next = chunks_->next;
@@ -90,7 +122,7 @@ private:
         chunk->next = chunks_;
         chunks_ = chunk;
         cursor_ = start + size;
-        left_ = room - size;
+        left_ = whole - sizeof(Chunk) - size;
         if (nextChunk_ < kLargestChunk) nextChunk_ *= 2;
         return start;
     }
