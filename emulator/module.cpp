@@ -242,8 +242,11 @@ HYP_ReturnStatus Module::Dispatch(const Call &call, Answer *answer) {
     return status;
 }
 
+HYP_ReturnStatus Module::CheckValue(uint64_t size) {
+    return size > kMaxValueSize ? static_cast<HYP_ReturnStatus>(HYP_LIMIT_EXCEEDED) : CheckRoom(size);
+}
+
 HYP_ReturnStatus Module::CheckRoom(uint64_t size) {
-    if (size > kMaxValueSize) return HYP_LIMIT_EXCEEDED;
     if (sizeBound_ + EntrySize(size) > kMaxStateSize) {
         sizeBound_ = 0;
         DVSState_SwitchForEach(AddSwitchSize, &sizeBound_);

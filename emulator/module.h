@@ -88,8 +88,10 @@ private:
     HYP_ReturnStatus LinkUp(DVSPort *port);
     HYP_ReturnStatus LinkDown(DVSPort *port);
 
-    /// HYP_LIMIT_EXCEEDED when a value of `size` bytes is too large or leaves the state no room.
+    /// HYP_LIMIT_EXCEEDED when `size` bytes more leave the state no room.
     HYP_ReturnStatus CheckRoom(uint64_t size);
+    /// The same for a property's value, which has a limit of its own.
+    HYP_ReturnStatus CheckValue(uint64_t size);
     PortExtras &ExtrasOf(DVSPort *port);
     void Forget(const char *switchName, const char *portId);
 

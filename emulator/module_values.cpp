@@ -52,7 +52,7 @@ HYP_ReturnStatus Module::GlobalPropGet(const Call &call, Answer *answer) {
 }
 
 HYP_ReturnStatus Module::GlobalPropSet(const Call &call, Answer *) {
-    const HYP_ReturnStatus status = CheckRoom(call.value.size());
+    const HYP_ReturnStatus status = CheckValue(call.value.size());
     if (status != HYP_OK) return status;
     return DVSState_GlobalPropSet(call.record.switchName, call.record.propName, call.value.data(),
                                   SizeOf(call), call.record.propType);
@@ -67,7 +67,7 @@ HYP_ReturnStatus Module::HostPropGet(const Call &call, Answer *answer) {
 }
 
 HYP_ReturnStatus Module::HostPropSet(const Call &call, Answer *) {
-    const HYP_ReturnStatus status = CheckRoom(call.value.size());
+    const HYP_ReturnStatus status = CheckValue(call.value.size());
     if (status != HYP_OK) return status;
     return DVSState_HostPropSet(call.record.switchName, call.record.propName, call.value.data(), SizeOf(call),
                                 call.record.propType);
@@ -80,6 +80,7 @@ HYP_ReturnStatus Module::HostPropClear(const Call &call, Answer *) {
 // Ports
 
 HYP_ReturnStatus Module::PortAdd(const Call &call, Answer *) {
+    // A whole list, not one value: what a port's state was fetched as can be added again.
     const HYP_ReturnStatus status = CheckRoom(call.value.size());
     if (status != HYP_OK) return status;
     return DVSState_PortDeserialize(call.record.switchName, call.record.portId, call.value.data(),
@@ -121,7 +122,7 @@ HYP_ReturnStatus Module::PortDataGet(const Call &call, Answer *answer) {
 HYP_ReturnStatus Module::PortDataSet(const Call &call, Answer *) {
     DVSPort *port = ::FindPort(call);
     if (!port) return HYP_NOT_FOUND;
-    const HYP_ReturnStatus status = CheckRoom(call.value.size());
+    const HYP_ReturnStatus status = CheckValue(call.value.size());
     if (status != HYP_OK) return status;
     return DVSState_PortDataSet(port, call.record.propName, call.value.data(), SizeOf(call),
                                 call.record.propType);
@@ -142,7 +143,7 @@ HYP_ReturnStatus Module::UplinkDataSet(const Call &call, Answer *) {
     if (!port) return HYP_NOT_FOUND;
     // As a property, it is not set to nothing.
     if (call.value.empty()) return HYP_FAILURE;
-    const HYP_ReturnStatus status = CheckRoom(call.value.size());
+    const HYP_ReturnStatus status = CheckValue(call.value.size());
     if (status != HYP_OK) return status;
     ExtrasOf(port).uplinks[uplink].assign(call.value.begin(), call.value.end());
     return HYP_OK;

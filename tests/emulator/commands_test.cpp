@@ -212,6 +212,16 @@ TEST_F(EmulatorCommands, UplinkDataCountsForTheBoundOfTheState) {
     EXPECT_EQ(set, 15); // one less than without it
 }
 
+TEST_F(EmulatorCommands, APortWithTheLargestValuesIsFetchedAndAddedAgain) {
+    const std::string value(16 << 20, 'v');
+    const std::string data = PortData({{"a", value}, {"b", value}});
+    ASSERT_EQ(DVSHYP_PortAdd("s1", "large", data.data(), static_cast<uint32_t>(data.size())), HYP_OK);
+    const Bytes fetched = Fetch(DVSHYP_PortStateGet, "s1", "large");
+    EXPECT_TRUE(fetched.text == data);
+    EXPECT_EQ(DVSHYP_PortAdd("s1", "again", fetched.text.data(), fetched.Size()), HYP_OK);
+    EXPECT_EQ(Fetch(DVSHYP_PortDataGet, "s1", "again", "b").text.size(), value.size());
+}
+
 TEST_F(EmulatorCommands, TheWholeStateIsBounded) {
     const std::string value(16 << 20, 'v');
     HYP_ReturnStatus status = HYP_OK;
