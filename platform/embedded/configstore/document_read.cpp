@@ -319,6 +319,7 @@ private:
             }
         }
         node->kind = Kind::Text;
+        node->maybeBinary = !node->described;
         char *const copy = tree_->arena.Copy(text);
         std::size_t size = text.size();
         if (HasEncodedBytes(text)) {

@@ -82,6 +82,7 @@ Tree::Tree(std::string_view newKey, std::string_view newGroup, std::string_view 
     root.described = false;
     root.bad = false;
     root.isRoot = true;
+    root.maybeBinary = false;
     MakeObject(&root);
 }
 

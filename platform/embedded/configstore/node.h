@@ -92,8 +92,9 @@ struct Object {
     };
     Kind kind;
     bool described;
-    bool bad;    // not what the schema allows here
-    bool isRoot; // the node is the first member of a Tree
+    bool bad;         // not what the schema allows here
+    bool isRoot;      // the node is the first member of a Tree
+    bool maybeBinary; // a Text of an unknown name in a document, where binary values are texts too
 };
 
 struct Tree {
@@ -150,6 +151,7 @@ inline Object *NewNode(Arena &arena, Object *parent) {
     node->described = false;
     node->bad = false;
     node->isRoot = false;
+    node->maybeBinary = false;
     return node;
 }
 inline void LinkMember(Object *object, Object *member) {

@@ -33,6 +33,7 @@ template <typename Fill> int32_t Put(Object *object, const char *name, Fill &&fi
         if (!member) member = AddMember(tree, object, name);
         member->kind = content.kind;
         member->span = content.span;
+        member->maybeBinary = false; // it is known now what it is
         Judge(tree, member);
         return OK;
     });
@@ -257,7 +258,7 @@ int32_t GetValueBinary(Object *object, const char *name, void **data, uint32_t *
         const int32_t status = Lookup(object, name, data, &value);
         if (status != OK) return status;
         if (!len) return BAD_PARAMETER;
-        if (value->kind == Kind::Text && !value->described) return DecodeOut(value->span, data, len);
+        if (value->kind == Kind::Text && value->maybeBinary) return DecodeOut(value->span, data, len);
         if (value->kind != Kind::Binary || value->span.size > UINT32_MAX) return SCHEMA_VIOLATION;
         *data = CopyOut(value->span.data, value->span.size);
         *len = static_cast<uint32_t>(value->span.size);

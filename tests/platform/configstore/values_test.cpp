@@ -159,6 +159,25 @@ TEST(StoreValues, ValueOfAnotherTypeIsASchemaViolationForEveryGetter) {
     EXPECT_EQ(GetValueIntArray(o, "text", &numbers, &number), SCHEMA_VIOLATION);
 }
 
+TEST(StoreValues, ATextThatMightBeBase64IsNoBinaryValueWhereItWasSetAsAText) {
+    const ObjectPtr object = NewSwitch(R"({"read":"text"})");
+    Object *const o = object.get();
+    void *data = nullptr;
+    uint32_t len = 7;
+    ASSERT_EQ(SetValueStr(o, "set", "text"), OK);
+    EXPECT_EQ(GetValueBinary(o, "set", &data, &len), SCHEMA_VIOLATION);
+    EXPECT_EQ(data, nullptr);
+    EXPECT_EQ(len, 7U);
+    // A document does not tell the two apart where the schema knows nothing.
+    EXPECT_EQ(Text(o, "read"), "text");
+    ASSERT_EQ(GetValueBinary(o, "read", &data, &len), OK);
+    EXPECT_EQ(len, 3U);
+    FreeBinary(data);
+    data = nullptr;
+    ASSERT_EQ(SetValueStr(o, "read", "text"), OK);
+    EXPECT_EQ(GetValueBinary(o, "read", &data, &len), SCHEMA_VIOLATION);
+}
+
 TEST(StoreValues, AbsentValueIsNotFoundForEveryGetter) {
     const ObjectPtr object = NewSwitch();
     Object *const o = object.get();
