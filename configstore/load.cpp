@@ -303,7 +303,7 @@ int32_t DVSState_LoadFromConfigStoreAsBuf(void **out, uint32_t *outLen, bool des
 bool StringExistInArray(const char *s, const char **array, uint32_t n) {
     if (!s || !array) return false;
     for (uint32_t i = 0; i < n; ++i) {
-        if (std::strcmp(s, array[i]) == 0) return true;
+        if (array[i] && std::strcmp(s, array[i]) == 0) return true;
     }
     return false;
 }

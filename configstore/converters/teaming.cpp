@@ -92,7 +92,7 @@ static_assert(IsSound(kTeamingPolicy) && kHeadSize + kNameSlots * kName.size == 
 } // namespace dvs::layout
 
 int32_t TeamingPolicyFromSchema(const char *text, int32_t *value) {
-    const auto slot = dvs::convert::EnumIndex(TEAMING_POLICY_SCHEMA, text);
+    const auto slot = text ? dvs::convert::EnumIndex(TEAMING_POLICY_SCHEMA, text) : std::nullopt;
     *value = slot && *slot < std::size(TEAMING_POLICY_ENUM) ? TEAMING_POLICY_ENUM[*slot] : 0;
     return 0;
 }

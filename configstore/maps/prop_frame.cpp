@@ -47,7 +47,7 @@ const char *Leaf(const DVSProp2ConfigEntry &row) {
 }
 
 std::span<const uint8_t> Bytes(const void *value, uint32_t len) {
-    return {static_cast<const uint8_t *>(value), len};
+    return {static_cast<const uint8_t *>(value), value ? len : 0};
 }
 
 uint32_t KnownClass(uint32_t propClass) {
@@ -140,7 +140,7 @@ int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row, KnownParents
 
 int32_t LoadRows(const LoadRun &run, configstore::Object *trafficResources) {
     KnownParents parents;
-    for (const auto *row = GetConfigMap(static_cast<int>(run.propClass)); row->key; ++row) {
+    for (const auto *row = GetConfigMap(static_cast<int>(KnownClass(run.propClass))); row->key; ++row) {
         if (const int32_t status = LoadRow(run, *row, &parents)) return status;
     }
     if (run.propClass != DVS_PROP_CLASS_PORT || !trafficResources) return 0;

@@ -60,7 +60,8 @@ int64_t dvsConfigStoreNowMs();
 
 /// Rebuilds every mapped property of `object` into a fresh list and stores that list, serialized, in
 /// `outList` as one property `propsName` of type 16. `trafficResources`, used for class 2 only and possibly
-/// null, is the switch's "resource_management" object. On any failure `outList` is as it was.
+/// null, is the switch's "resource_management" object; a class of neither host nor port counts as global. On
+/// any failure `outList` is as it was.
 [[nodiscard]] int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList,
                                 uint32_t propClass, uint32_t serializeFlags,
                                 configstore::Object *trafficResources);

@@ -373,6 +373,9 @@ TEST(StringExistInArray, ComparesWithTheFirstOfAnArray) {
     EXPECT_FALSE(StringExistInArray("a", array, 0));
     EXPECT_FALSE(StringExistInArray(nullptr, array, 3));
     EXPECT_FALSE(StringExistInArray("a", nullptr, 3));
+    const char *holed[] = {nullptr, "b"};
+    EXPECT_TRUE(StringExistInArray("b", holed, 2)) << "an empty slot equals nothing";
+    EXPECT_FALSE(StringExistInArray("", holed, 1));
 }
 
 } // namespace

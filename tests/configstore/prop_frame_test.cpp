@@ -58,6 +58,20 @@ TEST_F(PropFrame, TakesOtherClassesForGlobal) {
     EXPECT_EQ(" {}\n/name = \"n\"\n", Content());
 }
 
+TEST_F(PropFrame, LoadsOtherClassesFromTheGlobalTable) {
+    ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
+    for (const uint32_t propClass : {3u, 7u, 0xffffffffu}) {
+        EXPECT_EQ(Props({{"com.orbeno.common.alias", Text("n"), 0x10}}), Load(propClass)) << propClass;
+        EXPECT_EQ(0, status);
+    }
+}
+
+TEST_F(PropFrame, TakesANullValueForAnEmptyOneWhateverItsLength) {
+    EXPECT_EQ(0, SaveProp(object, "com.orbeno.common.alias", nullptr, 5, DVS_PROP_CLASS_GLOBAL, 0x10));
+    EXPECT_EQ(" {}\n/name = \"\"\n", Content());
+    EXPECT_EQ(-1, SaveProp(object, "com.orbeno.common.portset.mtu", nullptr, 4, DVS_PROP_CLASS_GLOBAL, 0x10));
+}
+
 TEST_F(PropFrame, KeepsKeysOfOtherClassesApart) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n"), DVS_PROP_CLASS_HOST));
     EXPECT_NE(std::string::npos, Content().find("/data/vendor_specific_host_member_config"));

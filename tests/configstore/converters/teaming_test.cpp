@@ -131,6 +131,9 @@ TEST_F(Teaming, PolicyTextsHaveTheKernelsValues) {
             EXPECT_STREQ(text, NIC_TEAMING_POLICY_MODE_2_CHARS[value]);
         }
     }
+    int32_t value = -7;
+    EXPECT_EQ(0, TeamingPolicyFromSchema(nullptr, &value));
+    EXPECT_EQ(0, value);
 }
 
 TEST_F(Teaming, SpeedKeepsItsLowByteAndIsReadBesideTheCriteria) {
