@@ -335,20 +335,21 @@ Flaw WriteMember(const StoreField &form, const Place &place, const Node &node, c
 
 using Check = Flaw (*)(const StoreField &form, const Node &leaf, const std::string &path);
 
-// The first flaw of a leaf, elements of lists included.
-Flaw FindFlaw(const StoreField &form, const Node &node, const std::string &path, Check check) {
+// The first flaw of a leaf, elements of lists included. Its path is put together on the way back: hardly ever
+// is there one.
+Flaw FindFlaw(const StoreField &form, const Node &node, Check check) {
     const bool isList = node.kind == Node::Kind::kList;
-    if (!isList && node.kind != Node::Kind::kObject) return check(form, node, path);
+    if (!isList && node.kind != Node::Kind::kObject) return check(form, node, "");
     for (std::size_t i = 0; i < node.items.size(); ++i) {
         const Node &item = node.items[i];
-        if (isList) {
-            if (Flaw flaw = FindFlaw(form, item, path + "[" + std::to_string(i) + "]", check)) return flaw;
-            continue;
-        }
-        const StoreField *member = FindField(form, item.name);
-        if (!member) continue;
-        if (Flaw flaw = FindFlaw(*member, item, path.empty() ? item.name : path + "." + item.name, check))
+        const StoreField *field = isList ? &form : FindField(form, item.name);
+        if (!field) continue;
+        if (Flaw flaw = FindFlaw(*field, item, check)) {
+            const bool isMember = !flaw.field.empty() && flaw.field.front() != '[';
+            const std::string step = isList ? "[" + std::to_string(i) + "]" : item.name;
+            flaw.field = step + (isMember ? "." : "") + flaw.field;
             return flaw;
+        }
     }
     return {};
 }
@@ -441,11 +442,11 @@ Flaw WriteTree(const layout::StoreField &form, const Place &place, const Node &n
 }
 
 Flaw FindLongText(const layout::StoreField &form, const Node &node) {
-    return FindFlaw(form, node, "", CheckLength);
+    return FindFlaw(form, node, CheckLength);
 }
 
 Flaw FindBrokenRule(const layout::StoreField &form, const Node &node) {
-    return FindFlaw(form, node, "", CheckRule);
+    return FindFlaw(form, node, CheckRule);
 }
 
 std::vector<std::string> Compare(const Node &given, const Node &found) {

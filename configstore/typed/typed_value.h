@@ -45,34 +45,43 @@ enum class State : uint8_t {
     kDamaged,  // a known property whose value does not fit it: show the bytes, and the reason
 };
 
+/// How much is wanted of a call; looking again at what has been made takes longer than making it.
+enum class Ask : uint8_t {
+    kResult,  // what the value says, or the bytes
+    kChecked, // and whether the way back gives the same
+};
+
 struct View {
     State state = State::kUnmapped;
     std::string reason;  // of kDamaged, with the offset where it is known
     Node tree;           // of kTyped; its root has no name
     std::string summary; // of kTyped: one line for people
-    // Whether Build of this tree gives the same bytes again. Where it does not, `differences` names the
-    // fields of the record that change, and the bytes must be kept beside the tree for it to be lossless.
+    // Where asked for, whether Build of this tree gives the same bytes again. Where it does not,
+    // `differences` names the fields of the record that change, and the bytes must be kept beside the tree
+    // for it to be lossless.
     bool exact = false;
     std::vector<std::string> differences;
 };
 
 /// Describes the bytes of a property. propClass is a DVS_PROP_CLASS_*.
 View Describe(uint32_t propClass, std::string_view key, std::span<const uint8_t> value,
-              const Context &context = {});
+              const Context &context = {}, Ask ask = Ask::kChecked);
 
 struct Built {
     bool ok = false;
     std::vector<uint8_t> bytes; // of ok
     std::string field;  // of a failure: the field at fault ("trunk_vlan_ids[1].start"); empty for the whole
     std::string reason; // of a failure: what is wrong and what would be right
-    // Of ok: fields that read back otherwise than they were given (Describe of the bytes against the tree).
+    // Of ok, where asked for: fields that read back otherwise than they were given (Describe of the bytes
+    // against the tree).
     std::vector<std::string> differences;
 };
 
 /// Makes a property's bytes out of a tree. Absent members are as absent as in a document. Unknown members,
 /// other types, numbers and texts that do not fit, and texts that an enumeration lacks are refused by field.
 /// The property's type word is 16, as for everything that comes out of the store.
-Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Context &context = {});
+Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Context &context = {},
+            Ask ask = Ask::kChecked);
 
 } // namespace dvs::typed
 

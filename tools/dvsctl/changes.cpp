@@ -326,10 +326,9 @@ json::value SideJson(const Change &change, const Property &side) {
 void AddTyped(json::object &object, const Change &change, const Property *side, const char *name,
               TypedViews &views) {
     if (!side) return;
-    const TypedViews::Found &found = views.Of(OwnerOf(change, side), *side);
-    if (found.view.state == typed::State::kTyped) object[fmt::format("typed_{}", name)] = found.tree;
-    if (found.view.state == typed::State::kDamaged)
-        object[fmt::format("damage_{}", name)] = ValidUtf8(found.view.reason);
+    const typed::View &view = views.Of(OwnerOf(change, side), *side);
+    if (view.state == typed::State::kTyped) object[fmt::format("typed_{}", name)] = NodeToJson(view.tree);
+    if (view.state == typed::State::kDamaged) object[fmt::format("damage_{}", name)] = ValidUtf8(view.reason);
 }
 
 json::object ChangeJson(const Change &change, TypedViews *views) {

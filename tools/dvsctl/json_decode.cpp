@@ -240,7 +240,8 @@ Buffer TypedAt(const Place &place, const json::value &value, const Owner &owner,
 // Beside "value", "typed" only says what the bytes mean. A document in which they disagree was edited in one
 // of the two places, and which one was meant cannot be known.
 void CheckTyped(const Place &place, const json::value &value, const Owner &owner, const NewEntry &entry) {
-    const typed::View view = typed::Describe(owner.propClass, entry.name, entry.value, {owner.version});
+    const typed::View view =
+        typed::Describe(owner.propClass, entry.name, entry.value, {owner.version}, typed::Ask::kResult);
     if (view.state == typed::State::kTyped && NodeToJson(view.tree) == value) return;
     place.Refuse("\"value\" says something else; leave out the one that is not meant");
 }

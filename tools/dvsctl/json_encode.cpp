@@ -53,15 +53,18 @@ struct Notation {
     TypedViews views = {};
 };
 
-void AddTyped(json::object &object, const TypedViews::Found &found, TypedForm form) {
-    const bool isTyped = found.view.state == typed::State::kTyped;
-    if (form == TypedForm::Beside) {
-        if (found.view.state == typed::State::kDamaged) object["damage"] = ValidUtf8(found.view.reason);
-        if (isTyped) object["typed"] = found.tree;
-        if (isTyped && !found.view.summary.empty()) object["summary"] = ValidUtf8(found.view.summary);
-    } else if (isTyped && found.isExact && found.tree != object.at("value")) {
+void AddTyped(Notation &notation, const Owner &owner, const Property &property, json::object &object) {
+    const typed::View &view = notation.views.Of(owner, property);
+    if (view.state == typed::State::kDamaged && notation.form == TypedForm::Beside)
+        object["damage"] = ValidUtf8(view.reason);
+    if (view.state != typed::State::kTyped) return;
+    json::value tree = NodeToJson(view.tree);
+    if (notation.form == TypedForm::Beside) {
+        object["typed"] = std::move(tree);
+        if (!view.summary.empty()) object["summary"] = ValidUtf8(view.summary);
+    } else if (tree != object.at("value") && notation.views.IsExact(owner, property)) {
         object.erase("value");
-        object["typed"] = found.tree;
+        object["typed"] = std::move(tree);
     }
 }
 
@@ -70,8 +73,7 @@ json::array PropertiesToJson(Notation &notation, const Owner &owner, std::span<c
     properties.reserve(list.size());
     for (const Property &property : list) {
         json::object object = PropertyToJson(property);
-        if (notation.form != TypedForm::None)
-            AddTyped(object, notation.views.Of(owner, property), notation.form);
+        if (notation.form != TypedForm::None) AddTyped(notation, owner, property, object);
         properties.emplace_back(std::move(object));
     }
     return properties;

@@ -51,6 +51,7 @@ public:
         // With a column that says where a line belongs there is no need for the lines between.
         flat_ =
             table_.Shows("switch") || table_.Shows("port") || table_.Shows("list") || table_.Shows("kind");
+        offsets_ = table_.Shows("offset");
     }
 
     void Add(const Switch &sw) {
@@ -64,7 +65,7 @@ public:
             AddEntry(entry);
     }
 
-    void Write(Output &out) const { table_.Write(out); }
+    void Write(Output &out) { table_.Write(out); }
 
 private:
     void AddEntry(const Entry &entry) {
@@ -133,15 +134,16 @@ private:
                            : isPort                           ? "port"
                            : entry_->role == Role::GlobalList ? "global"
                                                               : "host";
-        table_.Add({{ShowName(switch_->name)},
-                    {isPort ? ShowName(entry_->name) : ""},
-                    {isPort ? ShowKind(entry_->kind) : ""},
-                    {list},
+        // What no column shows is not made.
+        table_.Add({{flat_ ? ShowName(switch_->name) : ""},
+                    {flat_ && isPort ? ShowName(entry_->name) : ""},
+                    {flat_ && isPort ? ShowKind(entry_->kind) : ""},
+                    {flat_ ? list : ""},
                     {flat_ ? name : Indented(depth, name)},
                     {fmt::format("0x{:02x}", property.type), Style::Dim},
                     {std::to_string(property.value.size()), Style::Dim},
                     {std::move(value)},
-                    {std::to_string(property.offset)}});
+                    {offsets_ ? std::to_string(property.offset) : ""}});
     }
 
     static std::string Indented(std::size_t depth, const std::string &name) {
@@ -152,7 +154,7 @@ private:
     bool typed_;
     TypedViews views_;
     Table table_;
-    bool flat_ = false;
+    bool flat_ = false, offsets_ = false;
     const Switch *switch_ = nullptr;
     const Entry *entry_ = nullptr;
 };

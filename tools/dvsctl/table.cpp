@@ -55,45 +55,52 @@ bool Table::Shows(std::string_view name) const {
     return std::any_of(shown_.begin(), shown_.end(), [&](std::size_t i) { return name == columns_[i].name; });
 }
 
-void Table::Add(std::vector<Cell> row) {
-    std::vector<Cell> &kept = rows_.emplace_back();
-    kept.reserve(shown_.size());
-    for (const std::size_t i : shown_)
-        kept.push_back(row[i]); // a column may be shown twice
+void Table::AddRow(std::span<Cell> row) {
+    if (widths_.empty()) {
+        for (const std::size_t i : shown_)
+            widths_.push_back(headings_ ? Width(columns_[i].name) : 0);
+    }
+    for (std::size_t i = 0; i < shown_.size(); ++i) {
+        Cell &cell = row[shown_[i]];
+        const std::size_t width = Width(cell.text);
+        widths_[i] = std::max(widths_[i], width);
+        // A column may be shown twice.
+        const bool isLast = std::find(shown_.begin() + static_cast<std::ptrdiff_t>(i) + 1, shown_.end(),
+                                      shown_[i]) == shown_.end();
+        cells_.push_back(
+            {isLast ? std::move(cell.text) : cell.text, static_cast<std::uint32_t>(width), cell.style});
+    }
 }
 
-void Table::Write(Output &out) const {
-    std::vector<std::size_t> widths;
-    for (const std::size_t i : shown_)
-        widths.push_back(headings_ ? Width(columns_[i].name) : 0);
-    for (const auto &row : rows_)
-        for (std::size_t i = 0; i < row.size(); ++i)
-            widths[i] = std::max(widths[i], Width(row[i].text));
-
-    const auto writeRow = [&](const std::vector<Cell> &row) {
-        std::string line;
-        std::size_t gap = 0; // spaces owed before the next text: none are written at the end of a line
-        for (std::size_t i = 0; i < row.size(); ++i) {
-            const std::size_t fill = widths[i] - Width(row[i].text);
-            const bool right = columns_[shown_[i]].right;
-            if (!row[i].text.empty()) {
-                line.append(gap + (right ? fill : 0), ' ');
-                line += out.Paint(row[i].style, row[i].text);
-                gap = (right ? 0 : fill) + 2;
-            } else {
-                gap += widths[i] + 2;
-            }
+void Table::WriteRow(std::span<const Kept> row, Output &out) const {
+    std::string line;
+    std::size_t gap = 0; // spaces owed before the next text: none are written at the end of a line
+    for (std::size_t i = 0; i < row.size(); ++i) {
+        if (row[i].text.empty()) {
+            gap += widths_[i] + 2;
+            continue;
         }
-        out.Write(line + '\n');
-    };
+        const std::size_t fill = widths_[i] - row[i].width;
+        const bool right = columns_[shown_[i]].right;
+        line.append(gap + (right ? fill : 0), ' ');
+        line += out.Paint(row[i].style, row[i].text);
+        gap = (right ? 0 : fill) + 2;
+    }
+    out.Write(line + '\n');
+}
+
+void Table::Write(Output &out) {
     if (headings_) {
         std::vector<Cell> heading;
-        for (const std::size_t i : shown_)
-            heading.push_back({Heading(columns_[i].name), Style::Dim});
-        writeRow(heading);
+        for (const Column &column : columns_)
+            heading.push_back({Heading(column.name), Style::Dim});
+        const std::size_t rows = cells_.size();
+        AddRow(heading);
+        WriteRow(std::span(cells_).subspan(rows), out);
+        cells_.resize(rows);
     }
-    for (const auto &row : rows_)
-        writeRow(row);
+    for (std::size_t at = 0; at < cells_.size(); at += shown_.size())
+        WriteRow(std::span(cells_).subspan(at, shown_.size()), out);
 }
 
 } // namespace dvs::ctl

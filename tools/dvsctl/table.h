@@ -4,6 +4,7 @@
 
 // Aligned columns. --columns chooses and orders them, --no-headings leaves the first line out.
 
+#include <cstdint>
 #include <span>
 #include <string>
 #include <vector>
@@ -31,15 +32,25 @@ public:
     /// True when the column of that name is shown.
     bool Shows(std::string_view name) const;
 
-    /// One cell per column, in the order of the columns, shown or not.
-    void Add(std::vector<Cell> row);
+    /// One cell per column, in the order of the columns, shown or not. Moves them.
+    template <std::size_t N> void Add(Cell (&&row)[N]) { AddRow(row); }
 
-    void Write(Output &out) const;
+    void Write(Output &out);
 
 private:
+    struct Kept {
+        std::string text;
+        std::uint32_t width;
+        Style style;
+    };
+
+    void AddRow(std::span<Cell> row);
+    void WriteRow(std::span<const Kept> row, Output &out) const;
+
     std::span<const Column> columns_;
     std::vector<std::size_t> shown_;
-    std::vector<std::vector<Cell>> rows_; // shown cells only
+    std::vector<std::size_t> widths_; // of the shown columns
+    std::vector<Kept> cells_;         // shown ones only, row by row
     bool headings_;
 };
 

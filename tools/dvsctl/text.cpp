@@ -43,10 +43,24 @@ bool IsIn(std::span<const Range> ranges, char32_t c) {
     return behind != ranges.begin() && c <= std::prev(behind)->last;
 }
 
+// How many characters the text starts with that are plain ASCII: one byte and one column each, shown as they
+// are. Nearly all text is, and whole states are made of texts.
+std::size_t PlainAscii(std::string_view text) {
+    std::size_t length = 0;
+    while (length < text.size() && text[length] >= 0x20 && text[length] < 0x7f)
+        ++length;
+    return length;
+}
+
 std::string EscapeWith(std::string_view text, bool quotes) {
     std::string out;
     out.reserve(text.size());
     for (std::size_t at = 0; at < text.size();) {
+        std::size_t plain = PlainAscii(text.substr(at));
+        plain = std::min(plain, text.substr(at, plain).find_first_of(quotes ? "\\\"" : "\\"));
+        out += text.substr(at, plain);
+        at += plain;
+        if (at == text.size()) break;
         const std::size_t start = at;
         const auto c = DecodeUtf8(text, &at);
         if (!c) {
@@ -137,7 +151,7 @@ std::optional<char32_t> DecodeUtf8(std::string_view text, std::size_t *at) {
 }
 
 bool IsUtf8(std::string_view text) {
-    for (std::size_t at = 0; at < text.size();)
+    for (std::size_t at = PlainAscii(text); at < text.size();)
         if (!DecodeUtf8(text, &at)) return false;
     return true;
 }
@@ -147,7 +161,7 @@ bool IsPrintable(char32_t character) {
 }
 
 bool IsPlainText(std::string_view text) {
-    for (std::size_t at = 0; at < text.size();) {
+    for (std::size_t at = PlainAscii(text); at < text.size();) {
         const auto c = DecodeUtf8(text, &at);
         if (!c || !(IsPrintable(*c) || *c == '\t' || *c == '\n' || *c == '\r')) return false;
     }
@@ -183,8 +197,8 @@ std::string ValidUtf8(std::string_view text) {
 }
 
 std::size_t Width(std::string_view text) {
-    std::size_t width = 0;
-    for (std::size_t at = 0; at < text.size();) {
+    std::size_t width = PlainAscii(text);
+    for (std::size_t at = width; at < text.size();) {
         const auto c = DecodeUtf8(text, &at);
         if (!c) ++at;
         if (c && IsIn(kCombining, *c)) continue;

@@ -8,7 +8,7 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
-#include "tools/dvsctl/json_codec.h"
+#include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
 
@@ -63,12 +63,14 @@ void AddLines(const Node &node, std::size_t depth, std::vector<FieldLine> &lines
 } // namespace
 
 TypedText DescribeProperty(TypedViews &views, const Owner &owner, const Property &property) {
-    const TypedViews::Found &found = views.Of(owner, property);
-    const typed::View &view = found.view;
+    const typed::View &view = views.Of(owner, property);
     TypedText text;
     if (view.state == typed::State::kDamaged) text.damage = Escape(view.reason);
     if (view.state != typed::State::kTyped) return text;
-    if (view.tree.kind == Node::Kind::kText && found.tree == ValueToJson(property.value)) return text;
+    const std::string_view bytes = AsText(property.value);
+    if (view.tree.kind == Node::Kind::kText && bytes.size() == view.tree.text.size() + 1 &&
+        bytes.starts_with(view.tree.text) && LookAt(property.value).form == ValueForm::Text)
+        return text;
     text.summary = FitsOneLine(view.tree) ? ShowLine(view.tree)
                    : view.summary.empty() ? Count(view.tree.items.size(), "field")
                                           : Escape(view.summary);

@@ -19,8 +19,8 @@ namespace {
 namespace json = boost::json;
 using typed::Node;
 
-// Keeps the memory of a state with many different values within bounds.
-constexpr std::size_t kMostRemembered = 4096;
+// Keeps the memory of a state with many different values within bounds: two generations of so many.
+constexpr std::size_t kMostRemembered = 8192;
 
 std::optional<Node> ItemFromJson(const json::value &value, const std::string &path, NodeFlaw &flaw) {
     Node node;
@@ -60,8 +60,9 @@ bool BuildsAgain(const Owner &owner, const Property &property, const json::value
     NodeFlaw flaw;
     const auto node = NodeFromJson(tree, flaw);
     if (!node) return false;
-    const typed::Built built = typed::Build(owner.propClass, property.name, *node, {owner.version});
-    return built.ok && built.differences.empty() && std::ranges::equal(built.bytes, property.value);
+    const typed::Built built =
+        typed::Build(owner.propClass, property.name, *node, {owner.version}, typed::Ask::kResult);
+    return built.ok && std::ranges::equal(built.bytes, property.value);
 }
 
 } // namespace
@@ -103,18 +104,33 @@ std::optional<Node> NodeFromJson(const json::value &value, NodeFlaw &flaw) {
     return ItemFromJson(value, "", flaw);
 }
 
-const TypedViews::Found &TypedViews::Of(const Owner &owner, const Property &property) {
-    std::string key = fmt::format("{} {} ", owner.propClass, owner.version);
-    key.append(property.name).push_back('\0');
-    key.append(AsText(property.value));
-    if (const auto known = found_.find(key); known != found_.end()) return known->second;
-    if (found_.size() >= kMostRemembered) found_.clear();
-    Found &found = found_[std::move(key)];
-    found.view = typed::Describe(owner.propClass, property.name, property.value, {owner.version});
-    if (found.view.state != typed::State::kTyped) return found;
-    found.tree = NodeToJson(found.view.tree);
-    found.isExact = found.view.exact && BuildsAgain(owner, property, found.tree);
+TypedViews::Found &TypedViews::Find(const Owner &owner, const Property &property) {
+    // Numbers first, as bytes: they have one length.
+    key_.assign(reinterpret_cast<const char *>(&owner.propClass), sizeof owner.propClass);
+    key_.append(reinterpret_cast<const char *>(&owner.version), sizeof owner.version);
+    key_.append(property.name).push_back('\0');
+    key_.append(AsText(property.value));
+    if (const auto known = younger_.find(key_); known != younger_.end()) return known->second;
+    if (younger_.size() >= kMostRemembered) {
+        older_ = std::move(younger_);
+        younger_.clear();
+    }
+    Found &found = younger_[key_];
+    if (auto known = older_.extract(key_)) {
+        found = std::move(known.mapped());
+        return found;
+    }
+    found.view =
+        typed::Describe(owner.propClass, property.name, property.value, {owner.version}, typed::Ask::kResult);
     return found;
+}
+
+bool TypedViews::IsExact(const Owner &owner, const Property &property) {
+    Found &found = Find(owner, property);
+    if (!found.isExact)
+        found.isExact = found.view.state == typed::State::kTyped &&
+                        BuildsAgain(owner, property, NodeToJson(found.view.tree));
+    return *found.isExact;
 }
 
 } // namespace dvs::ctl

@@ -35,19 +35,28 @@ struct NodeFlaw {
 /// Empty, with the flaw told, where the value is no tree.
 std::optional<typed::Node> NodeFromJson(const boost::json::value &value, NodeFlaw &flaw);
 
-/// Descriptions of properties. Ports are much alike, so each value is looked into only once.
+/// Descriptions of properties. Ports are much alike, so each value is looked into only once, as long as it is
+/// among the last some ten thousand.
 class TypedViews {
 public:
-    struct Found {
-        typed::View view;
-        boost::json::value tree; ///< of a typed one
-        bool isExact = false;    ///< the tree, read as JSON again, builds these very bytes
-    };
     /// Valid until the next call.
-    const Found &Of(const Owner &owner, const Property &property);
+    const typed::View &Of(const Owner &owner, const Property &property) { return Find(owner, property).view; }
+
+    /// Whether its tree, read as JSON again, builds these very bytes.
+    bool IsExact(const Owner &owner, const Property &property);
 
 private:
-    std::unordered_map<std::string, Found> found_;
+    struct Found {
+        typed::View view;
+        std::optional<bool> isExact; // once asked for
+    };
+    using Generation = std::unordered_map<std::string, Found>;
+
+    Found &Find(const Owner &owner, const Property &property);
+
+    // When the younger is full it becomes the older, whose values are forgotten unless they are met again.
+    Generation younger_, older_;
+    std::string key_;
 };
 
 } // namespace dvs::ctl
