@@ -81,9 +81,19 @@ TEST_F(Filters, NoFiltersAreAnEmptyListAndACountOfZero) {
     EXPECT_EQ("/settings {}\n/settings/filter_policy {}\n/settings/filter_policy/network_filters = []\n",
               Dump());
     EXPECT_EQ(Bytes().U32(0), LoadOne(kPort, kKey));
-    fake_store::FailFunction("GetSubObjectInstances", configstore::IO_ERROR);
-    (void)Load(kPort);
-    fake_store::FailFunction(nullptr);
+}
+
+TEST_F(Filters, AListingThatFailsIsACountOfZero) {
+    ASSERT_EQ(0, Save(kPort, kKey, Bytes().U32(1).Add(Filter(3, "agent", 1, {"a"}))));
+    const int before = fake_store::Calls();
+    ASSERT_TRUE(LoadOne(kPort, kKey));
+    int listing = 1;
+    while (fake_store::CallName(before + listing) != "GetSubObjectInstances")
+        ++listing;
+    fake_store::FailCall(listing, configstore::IO_ERROR);
+    EXPECT_EQ(Bytes().U32(0), LoadOne(kPort, kKey));
+    EXPECT_TRUE(fake_store::Failed());
+    EXPECT_EQ(0, loadStatus);
 }
 
 TEST_F(Filters, SlotTextsAreReadAsUnsignedDecimal) {
