@@ -93,6 +93,16 @@ void RemoveInstance(Object *parent, Object *list, Object *instance) {
     if (list->table->count == 0) RemoveChild(parent, list); // as if it had never been there
 }
 
+/// Whether a search for `key` goes on in the child: in singletons. What is kept as text of an object that the
+/// schema does not know counts as one, and is read only where it has that name in it.
+bool LeadsOn(Tree *tree, Object *child, std::string_view key) {
+    if (child->kind != Kind::Raw || child->described) return child->kind == Kind::Object;
+    Buffer name;
+    WriteText(key, false, &name);
+    const std::string_view text(child->span.data, child->span.size);
+    return text.front() == '{' && text.find(name.View()) != std::string_view::npos && AsObject(tree, child);
+}
+
 /// What a filter spec selects on one object that has a member of its key.
 int32_t SelectMember(Tree *tree, Object *member, const FilterSpec &spec, std::vector<Object *> *found) {
     if (member->kind == Kind::Raw && !Expand(tree, member)) return OK;
@@ -118,7 +128,7 @@ int32_t SelectMember(Tree *tree, Object *member, const FilterSpec &spec, std::ve
 int32_t Select(Tree *tree, Object *object, const FilterSpec &spec, std::vector<Object *> *found) {
     if (Object *const member = FindMember(object, spec.key)) return SelectMember(tree, member, spec, found);
     for (Object *child = object->members.first; child; child = child->next) {
-        if (child->kind != Kind::Object) continue;
+        if (!LeadsOn(tree, child, spec.key)) continue;
         if (const int32_t status = Select(tree, child, spec, found); status != OK) return status;
     }
     return OK;
@@ -149,7 +159,7 @@ bool DeleteSelected(Tree *tree, Object *object, const FilterSpec &spec) {
     Object *next = nullptr;
     for (Object *child = object->members.first; child; child = next) {
         next = child->next;
-        if (child->kind == Kind::Object) any |= DeleteSelected(tree, child, spec);
+        if (LeadsOn(tree, child, spec.key)) any |= DeleteSelected(tree, child, spec);
     }
     return any;
 }

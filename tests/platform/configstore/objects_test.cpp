@@ -144,6 +144,24 @@ TEST(StoreFilter, DescendsIntoSingletonsWhereTheMemberIsAbsentDepthFirst) {
     EXPECT_EQ(Ids(object.get(), "things", &status), (std::vector<std::string>{"deep", "later", "last"}));
 }
 
+// What was made by calls comes back from the store as text that the schema does not describe.
+TEST(StoreFilter, DescendsIntoUnknownSingletonsOfADocumentToo) {
+    const std::string document =
+        R"({"own":{"things":{"a":{}},"number":1},"other":{"below":{"things":{"b":{},"c":{"x":1}}}},)"
+        R"("not":{"thing":{"d":{}}},"text":"things","list":["things"],"one":{"b\"y\u0001":{"e":{}}}})";
+    const ObjectPtr object = NewSwitch(document);
+    int32_t status = 0;
+    EXPECT_EQ(Ids(object.get(), "things", &status), (std::vector<std::string>{"a", "b", "c"}));
+    EXPECT_EQ(Ids(object.get(), "b\"y\x01", &status), std::vector<std::string>{"e"});
+    EXPECT_EQ(Json(object.get()), document) << "looking changes nothing";
+
+    const ObjectPtr again = NewSwitch(document);
+    const SpecPtr spec = NewSpec("things");
+    EXPECT_EQ(DeleteSubObjectInstances(again.get(), spec.get()), OK);
+    EXPECT_EQ(Json(again.get()), R"({"own":{"number":1},"other":{"below":{}},"not":{"thing":{"d":{}}},)"
+                                 R"("text":"things","list":["things"],"one":{"b\"y\u0001":{"e":{}}}})");
+}
+
 TEST(StoreFilter, CountsTheTextsOfAllSingletons) {
     const ObjectPtr object = NewSwitch(
         R"({"settings":{"vspans":{"s":{"source_recv_port":{"port_keys":["a"]},"destination_port":{"port_keys":["b","c"]}}}}})");
