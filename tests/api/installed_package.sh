@@ -9,6 +9,8 @@ trap 'rm -rf "$work"' EXIT
 "$cmake" --install "$build" --prefix "$work/first" >/dev/null
 mv "$work/first" "$work/prefix"
 
+grep -q _dvsctl "$work/prefix/share/bash-completion/completions/dvsctl"
+
 mkdir "$work/consumer"
 cat >"$work/consumer/CMakeLists.txt" <<EOF
 cmake_minimum_required(VERSION 3.25)

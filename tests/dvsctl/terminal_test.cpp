@@ -57,6 +57,14 @@ TEST_F(Terminal, APagerLeftEarlyIsNoFailure) {
     EXPECT_EQ(RunInTerminal({"hexdump", At("a.db")}, {"PAGER=head -n 1"}, 10).status, 0);
 }
 
+TEST_F(Terminal, InterruptsAreThePagersWhileItLives) {
+    // The shell that runs the pager is a child of the program, as with a Ctrl-C at the terminal.
+    const Result result =
+        RunInTerminal({"show", At("a.db")}, {"PAGER=kill -INT $PPID; sed s/^/paged:/", "NO_COLOR=1"}, 10);
+    EXPECT_EQ(result.status, 0);
+    EXPECT_NE(result.out.find("paged:switch beta"), std::string::npos) << result.out;
+}
+
 TEST_F(Terminal, APagerKeepsTheStatus) {
     Put("b.json", "{\"switches\": []}");
     EXPECT_EQ(RunInTerminal({"diff", At("a.db"), "json:" + At("b.json"), "--columns", "name"},

@@ -14,6 +14,7 @@
 #include <CLI/CLI.hpp>
 
 #include "tools/dvsctl/command.h"
+#include "tools/dvsctl/completion.h"
 #include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/help.h"
 
@@ -23,7 +24,10 @@ namespace {
 
 struct Parsed {
     const Command *command = nullptr;
-    bool help = false, version = false;
+    bool help = false, version = false, completion = false;
+
+    /// Something about the program is asked for, not of it.
+    bool IsAbout() const { return help || version || completion; }
 };
 
 void AddRow(CLI::App &app, const OptionRow &row, Options &options) {
@@ -86,6 +90,7 @@ void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
     root.set_help_flag();
     root.add_flag("-h,--help", parsed.help);
     root.add_flag("--version", parsed.version);
+    root.add_flag("--bash-completion", parsed.completion);
     for (const OptionRow &row : CommonOptions())
         AddRow(root, row, options);
     std::vector<std::pair<CLI::App *, const Command *>> verbs;
@@ -105,7 +110,7 @@ void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
         find();
     } catch (const CLI::ParseError &failure) {
         find();
-        if (parsed.help || parsed.version) return;
+        if (parsed.IsAbout()) return;
         Error error(Exit::Usage, failure.what());
         if (!parsed.command) ExplainUnknownVerb(error, argc, argv);
         error.next =
@@ -113,7 +118,7 @@ void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
         error.next += " shows what there is";
         throw Error(error);
     }
-    if (parsed.help || parsed.version) return;
+    if (parsed.IsAbout()) return;
     if (!parsed.command) {
         Error error(Exit::Usage, "no verb was given");
         ExplainUnknownVerb(error, argc, argv);
@@ -124,15 +129,16 @@ void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
 }
 
 Exit ShowAbout(const Parsed &parsed, const Options &options, Output &out) {
-    const std::string text = parsed.version   ? "dvsctl " DVSCTL_VERSION "\n"
-                             : parsed.command ? CommandHelp(*parsed.command)
-                                              : OverviewHelp();
+    const std::string text = parsed.version      ? "dvsctl " DVSCTL_VERSION "\n"
+                             : parsed.completion ? BashCompletion()
+                             : parsed.command    ? CommandHelp(*parsed.command)
+                                                 : OverviewHelp();
     if (options.json) {
         boost::json::object document = Envelope(parsed.command ? parsed.command->name : "");
         if (parsed.version)
             document["version"] = DVSCTL_VERSION;
         else
-            document["help"] = text;
+            document[parsed.completion ? "script" : "help"] = text;
         out.Json(std::move(document));
     } else {
         out.Write(text);
@@ -187,7 +193,7 @@ int RunCommandLine(int argc, char **argv) {
     Parsed parsed;
     const auto run = [&]() -> Exit {
         Parse(argc, argv, options, parsed);
-        if (parsed.help || parsed.version) return ShowAbout(parsed, options, out);
+        if (parsed.IsAbout()) return ShowAbout(parsed, options, out);
         out.Configure(options);
         log.SetVerbose(options.verbose);
         Context context{options, out, log, Deadline(options.timeout)};

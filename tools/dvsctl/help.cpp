@@ -108,7 +108,8 @@ std::string OverviewHelp() {
            Section("Verbs", verbs) + SourceSection() +
            Section("Options of every verb", RowLines(CommonOptions(), false)) + std::string(kStatuses) +
            "\n" + std::string(kEnvironment) +
-           "\n`dvsctl VERB --help` explains a verb, with examples. `dvsctl --version` prints the version.\n";
+           "\n`dvsctl VERB --help` explains a verb, with examples. `dvsctl --version` prints the version.\n"
+           "`. <(dvsctl --bash-completion)` makes bash complete its words.\n";
 }
 
 std::string CommandHelp(const Command &command) {

@@ -81,8 +81,27 @@ const char *Code(Style style) {
     return "";
 }
 
+// While it lives, the terminal's interrupts are the pager's: it shares the terminal, and would be left on it
+// alone.
+class InterruptsIgnored {
+public:
+    InterruptsIgnored() : interrupt_(std::signal(SIGINT, SIG_IGN)), quit_(std::signal(SIGQUIT, SIG_IGN)) {}
+    ~InterruptsIgnored() { Restore(); }
+    InterruptsIgnored(const InterruptsIgnored &) = delete;
+    InterruptsIgnored &operator=(const InterruptsIgnored &) = delete;
+
+    void Restore() const {
+        std::signal(SIGINT, interrupt_);
+        std::signal(SIGQUIT, quit_);
+    }
+
+private:
+    void (*interrupt_)(int);
+    void (*quit_)(int);
+};
+
 // The reader's end of a pipe to the pager; -1 when it could not be started.
-int StartPager(const char *command, pid_t *child) {
+int StartPager(const char *command, const InterruptsIgnored &ours, pid_t *child) {
     int ends[2];
     if (pipe2(ends, O_CLOEXEC) != 0) return -1;
     *child = fork();
@@ -90,6 +109,7 @@ int StartPager(const char *command, pid_t *child) {
         dup2(ends[0], STDIN_FILENO);
         setenv("LESS", "FRX", 0);
         std::signal(SIGPIPE, SIG_DFL);
+        ours.Restore();
         execl("/bin/sh", "sh", "-c", command, static_cast<char *>(nullptr));
         _exit(127);
     }
@@ -167,7 +187,8 @@ bool Output::Page() {
     if (std::count(pending_.begin(), pending_.end(), '\n') < size.ws_row) return false;
 
     pid_t child = -1;
-    const int to = StartPager(command, &child);
+    const InterruptsIgnored interrupts;
+    const int to = StartPager(command, interrupts, &child);
     if (to < 0) return false;
     const int error = WriteAll(to, pending_);
     close(to);
