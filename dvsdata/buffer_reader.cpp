@@ -23,7 +23,7 @@ struct Place {
 
 std::string_view StoredName(const std::uint8_t *at) {
     const std::uint8_t *const field = at + kNameOffset;
-    return {reinterpret_cast<const char *>(field), LookAtName(field).len};
+    return {reinterpret_cast<const char *>(field), NameField(field).Len()};
 }
 
 bool IsAligned(std::size_t value) {
@@ -80,8 +80,8 @@ constexpr std::uint32_t kMaxPlainLen = UINT32_MAX / 2;
 
 /// Append() of an entry that lies there as it is to be: one copy, and zeros for what the format leaves open.
 inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
-    const NameField look = LookAtName(place.at + kNameOffset);
-    const std::string_view name(reinterpret_cast<const char *>(place.at + kNameOffset), look.len);
+    const NameField field(place.at + kNameOffset);
+    const std::string_view name(reinterpret_cast<const char *>(place.at + kNameOffset), field.Len());
     if (place.dataLen > kMaxPlainLen || Emits(kDetail)) [[unlikely]]
         return Append(list, name, place.at + kEntryFixedSize, place.dataLen,
                       Load32(place.at + kPropTypeOffset));
@@ -92,8 +92,8 @@ inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
     ClearPadding(entry, serialSize);
     std::memcpy(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset, place.at,
                 std::size_t{kEntryFixedSize} + place.dataLen);
-    if (!look.plain) [[unlikely]]
-        std::memset(entry->name + look.len, 0, kNameSize - look.len);
+    if (!field.IsPlain()) [[unlikely]]
+        std::memset(entry->name + name.size(), 0, kNameSize - name.size());
     entry->serialSize = serialSize; // not always what the image says
     Link(list, entry, serialSize, name);
     return HYP_OK;

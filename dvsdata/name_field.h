@@ -18,11 +18,6 @@
 
 namespace dvs::data {
 
-struct NameField {
-    std::uint32_t len; // up to the NUL, at most 127 characters: what a list stores
-    bool plain;        // it ends in a NUL, and nothing but zeros follow
-};
-
 /// A bit for each zero among 64 bytes.
 inline std::uint64_t ZerosIn(const std::uint8_t *bytes) {
 #if defined(__SSE2__)
@@ -40,14 +35,25 @@ inline std::uint64_t ZerosIn(const std::uint8_t *bytes) {
 #endif
 }
 
-inline NameField LookAtName(const std::uint8_t *field) {
-    // Nothing but ones from the lowest one on: adding that one carries all of them away.
-    const auto onesToTheEnd = [](std::uint64_t bits) { return bits + (bits & -bits) == 0; };
-    const std::uint64_t low = ZerosIn(field), high = ZerosIn(field + 64);
-    if (low) return {static_cast<std::uint32_t>(std::countr_zero(low)), onesToTheEnd(low) && ~high == 0};
-    if (high) return {64 + static_cast<std::uint32_t>(std::countr_zero(high)), onesToTheEnd(high)};
-    return {kMaxNameLen, false};
-}
+/// Bits for the zeros of a name field.
+struct NameField {
+    explicit NameField(const std::uint8_t *field) : low(ZerosIn(field)), high(ZerosIn(field + 64)) {}
+
+    /// Characters up to the NUL, at most 127: what a list stores.
+    [[nodiscard]] std::uint32_t Len() const {
+        if (low) return static_cast<std::uint32_t>(std::countr_zero(low));
+        return high ? 64 + static_cast<std::uint32_t>(std::countr_zero(high)) : kMaxNameLen;
+    }
+
+    /// It ends in a NUL, and nothing but zeros follow.
+    [[nodiscard]] bool IsPlain() const {
+        // Nothing but ones from the lowest one on: adding that one carries all of them away.
+        const auto onesToTheEnd = [](std::uint64_t bits) { return bits + (bits & -bits) == 0; };
+        return low ? onesToTheEnd(low) && ~high == 0 : high && onesToTheEnd(high);
+    }
+
+    std::uint64_t low, high;
+};
 
 } // namespace dvs::data
 
