@@ -1,6 +1,8 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Loading ports, switches and states: what is taken, merged and refused, and every message.
 
+#include <algorithm>
+
 #include "dvsstate/state_support.h"
 
 using namespace dvs::test;
@@ -49,6 +51,23 @@ TEST_F(StateDeserialize, BringsAShadowPortBackWithoutItsKindProperty) {
     EXPECT_EQ(LoadState(bytes), HYP_OK);
     EXPECT_EQ(PortsOf(DVSState_SwitchFind("dvs")), (Lines{"p/1", "p/2"}));
     EXPECT_EQ(ContentOf(DVSState_PortFindShadow("dvs", "p")->portData), (Props{{"a", "1"}}));
+}
+
+TEST_F(StateDeserialize, NamesWithoutAnEndAreCutAndRefusedAsIds) {
+    const std::string name(127, 'n');
+    const auto without = [&](Buffer buffer) {
+        const auto field = std::search(buffer.begin(), buffer.end(), name.begin(), name.end());
+        field[127] = 'n';
+        Mend(&buffer);
+        return ExactBlock(buffer);
+    };
+    const ExactBlock sw = without(SerializedOf(With(SwitchProps(), {Nested(name, {})})));
+    StateMessages messages(0);
+    EXPECT_EQ(DVSState_SwitchDeserialize("dvs", sw.data(), sw.size()), HYP_BAD_PARAM);
+    EXPECT_TRUE(std::ranges::count(messages.Take(), "DVSStatePortAdd " + name + ", id length too long\n"));
+    const ExactBlock state = without(SerializedOf({Nested(name, SwitchProps())}));
+    EXPECT_EQ(DVSState_ConfigDeserialize(state.data(), state.size()), HYP_BAD_PARAM);
+    EXPECT_TRUE(std::ranges::count(messages.Take(), "DVSState_SwitchAdd " + name + ", id length too long\n"));
 }
 
 TEST_F(StateDeserialize, TakesPortsOfAnyKindAndTellsEach) {
