@@ -146,6 +146,7 @@ TEST_F(SwitchTable, FindsByIdAliasAndUuid) {
     EXPECT_EQ(DVSState_SwitchFind("First"), nullptr);
     EXPECT_EQ(DVSState_SwitchFindByAlias("alias"), first);
     EXPECT_EQ(DVSState_SwitchFindByAlias("alia"), nullptr);
+    EXPECT_EQ(DVSState_SwitchFindByAlias("alias2"), nullptr);
     EXPECT_EQ(DVSState_SwitchRemove("first"), HYP_OK);
     EXPECT_EQ(DVSState_SwitchFindByAlias("alias"), second);
     std::uint8_t uuid[16];

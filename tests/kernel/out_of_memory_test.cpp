@@ -158,6 +158,31 @@ TEST(KernelWithoutMemory, CmdExecSaysThatItsBufferIsMissing) {
     EXPECT_EQ(refused, 1U);
 }
 
+/// A fetch says nothing, and tells the size that it could not get.
+TEST(KernelWithoutMemory, AFetchTellsTheSizeOfItsMissingBuffer) {
+    Serve();
+    fault::Options options;
+    options.warmUp = true;
+    fault::Sweep(
+        "alloc:%",
+        [](fault::Child &child) {
+            DVSLog_SetSink(fault::Child::NoteMessage, &child);
+            void *out = &child;
+            uint32_t outLen = 77;
+            const HYP_ReturnStatus status = DVSHYP_StateGet(&out, &outLen);
+            DVSLog_SetSink(nullptr, nullptr);
+            if (status != HYP_OK) child.Note(out == nullptr && outLen == 32768 ? "null" : "left");
+            if (status == HYP_OK) DVSHYP_DataFree(out);
+            return status;
+        },
+        [&](uint64_t, const fault::Report &report) {
+            if (report.hits == 0) return;
+            EXPECT_EQ(report.status, HYP_NO_MEMORY);
+            EXPECT_EQ(report.notes, "null");
+        },
+        options);
+}
+
 /// Stated behaviour: where the state file's contents do not load, they stay allocated.
 TEST(KernelLeaks, TheContentsOfAStateFileThatDoesNotLoadStayAllocated) {
     Serve();

@@ -59,7 +59,8 @@ protected:
     }
 
     static constexpr const char *kVendorNames[] = {
-        "com.orbeno.common.alias",        "com.orbeno.etherswitch.mtu",
+        "com.orbeno.common.alias",        "x.com.orbeno.common.y",
+        "com.orbeno.etherswitch.mtu",     "com.orbeno.common",
         "com.orbeno.vswitch.disabled",    "com.orbeno.vswitch.teaming",
         "com.orbeno.vswitch.other",       "dvfilter-generic-1",
         "com.orbeno.ovlData.x",           "com.orbeno.extraconfig.y",
@@ -70,10 +71,11 @@ protected:
 TEST_F(Queries, VendorListsOfASwitchKeepWhatIsNotThePlatforms) {
     ServeVendorNames();
     device.always[8] = {ENOENT, HYP_NOT_FOUND, -1, {}};
-    EXPECT_EQ(VendorGlobal(),
-              (Strings{"com.orbeno.vswitch.disabled", "com.orbeno.ovl.vdr.dvptracking", "com.vendor.own"}));
-    EXPECT_EQ(VendorHost(), (Strings{"com.orbeno.vswitch.disabled", "com.orbeno.extraconfig.y",
-                                     "com.orbeno.ovl.vdr.dvptracking", "com.vendor.own"}));
+    EXPECT_EQ(VendorGlobal(), (Strings{"com.orbeno.common", "com.orbeno.vswitch.disabled",
+                                       "com.orbeno.ovl.vdr.dvptracking", "com.vendor.own"}));
+    EXPECT_EQ(VendorHost(),
+              (Strings{"com.orbeno.common", "com.orbeno.vswitch.disabled", "com.orbeno.extraconfig.y",
+                       "com.orbeno.ovl.vdr.dvptracking", "com.vendor.own"}));
 }
 
 TEST_F(Queries, VendorListsAskTheModuleForTheVersion) {
@@ -111,10 +113,10 @@ TEST_F(Queries, AVersionReplyShorterThanAWordIsAFailedQuery) {
     ServeVendorNames();
     for (const std::string &reply : {std::string("\xff\xff\xff", 3), std::string()}) {
         device.replies[8] = reply;
-        EXPECT_EQ(VendorGlobal().size(), 3U);
+        EXPECT_EQ(VendorGlobal().size(), 4U);
     }
     device.replies[8] = Word(200) + "more";
-    EXPECT_EQ(VendorGlobal().size(), 2U);
+    EXPECT_EQ(VendorGlobal().size(), 3U);
 }
 
 TEST_F(Queries, DisabledSurvivesTheVendorFilterOfItsType) {
