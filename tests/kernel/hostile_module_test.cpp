@@ -7,6 +7,7 @@
 #include <cstring>
 #include <functional>
 #include <random>
+#include <set>
 
 #include <gtest/gtest.h>
 
@@ -64,6 +65,42 @@ std::vector<Receiver> Receivers() {
         {"PortList", 3,
          [](void **out) { return DVSHYP_SwitchPortList("s", reinterpret_cast<DVSHYPPortList **>(out), 1); },
          false},
+    };
+}
+
+/// A call that hands nothing out: the module has a status to give, and all that it writes is refused.
+struct Sender {
+    const char *name;
+    int command;
+    std::function<HYP_ReturnStatus()> call;
+};
+
+// Not constant, and as large as its length says: a module may write to it all the same.
+char g_value[64];
+
+std::vector<Sender> Senders() {
+    const auto *value = g_value;
+    const uint32_t size = sizeof g_value;
+    return {
+        {"StateInit", 0, [=] { return DVSHYP_StateInit(value, size); }},
+        {"StateCleanup", 1, [] { return DVSHYP_StateCleanup(); }},
+        {"StateSanitize", 2, [] { return DVSHYP_StateSanitize(); }},
+        {"SwitchAdd", 4, [] { return DVSHYP_SwitchAdd("s", "c", 8, 9); }},
+        {"SwitchRemove", 5, [] { return DVSHYP_SwitchRemove("s"); }},
+        {"SwitchAssociate", 6, [] { return DVSHYP_SwitchAssociate("s"); }},
+        {"SwitchDissociate", 7, [] { return DVSHYP_SwitchDissociate("s"); }},
+        {"GlobalPropSet", 9, [=] { return DVSHYP_GlobalPropSet("s", "k", value, size, 16); }},
+        {"GlobalPropClear", 10, [] { return DVSHYP_GlobalPropClear("s", "k"); }},
+        {"HostPropSet", 12, [=] { return DVSHYP_HostPropSet("s", "k", value, size, 16); }},
+        {"HostPropClear", 13, [] { return DVSHYP_HostPropClear("s", "k"); }},
+        {"PortAdd", 14, [=] { return DVSHYP_PortAdd("s", "p", value, size); }},
+        {"PortRemove", 15, [] { return DVSHYP_PortRemove("s", "p"); }},
+        {"PortDataSet", 17, [=] { return DVSHYP_PortDataSet("s", "p", "k", value, size, 16); }},
+        {"PortDataClear", 18, [] { return DVSHYP_PortDataClear("s", "p", "k"); }},
+        {"PortFind", 20, [] { return DVSHYP_PortFind("s", "p"); }},
+        {"SwitchSetMaxPorts", 21, [] { return DVSHYP_SwitchSetMaxPorts("s", 8); }},
+        {"SwitchSetVersion", 22, [] { return DVSHYP_SwitchSetVersion("s", 9); }},
+        {"UplinkDataSet", 26, [=] { return DVSHYP_UplinkDataSet("s", "p", 1, value, size, 16); }},
     };
 }
 
@@ -163,6 +200,45 @@ TEST_F(HostileModule, EveryReceiverSurvivesEveryKindOfAnswer) {
             Try(receiver, answer.steps, answer.name);
     }
     EXPECT_LE(device.open.size(), 1U);
+}
+
+TEST_F(HostileModule, EverySenderSurvivesEveryKindOfAnswerAndGivesItsStatus) {
+    for (const Sender &sender : Senders()) {
+        for (const Answer &answer : Answers()) {
+            device.Reset();
+            device.script = answer.steps;
+            const Step &first = answer.steps.front();
+            const uint32_t refusal =
+                first.status == -1 ? uint32_t{HYP_FAILURE} : static_cast<uint32_t>(first.status);
+            EXPECT_EQ(sender.call(), first.error == 0 ? uint32_t{HYP_OK} : refusal)
+                << sender.name << ": " << answer.name;
+            EXPECT_EQ(device.calls.size(), 1U) << sender.name << ": a change is never asked for twice";
+            EXPECT_TRUE(TableIsEmpty()) << sender.name << ": " << answer.name;
+        }
+    }
+    EXPECT_LE(device.open.size(), 1U);
+}
+
+TEST_F(HostileModule, EveryCommandIsAmongTheReceiversOrTheSenders) {
+    std::set<int> expected, asked;
+    for (int command = 0; command <= 31; command++)
+        if (command < 23 || command > 25) expected.insert(command);
+    const auto note = [&](const char *name, int command, const auto &call) {
+        device.Reset();
+        device.always[command] = {EIO, HYP_BAD_PARAM, 0, {}};
+        call();
+        ASSERT_FALSE(device.calls.empty()) << name;
+        EXPECT_EQ(device.calls.front().request, command) << name;
+        asked.insert(command);
+    };
+    for (const Sender &sender : Senders())
+        note(sender.name, sender.command, sender.call);
+    for (const Receiver &receiver : Receivers())
+        note(receiver.name, receiver.command, [&] {
+            void *out = nullptr;
+            EXPECT_NE(receiver.call(&out), uint32_t{HYP_OK}) << receiver.name;
+        });
+    EXPECT_EQ(asked, expected);
 }
 
 TEST_F(HostileModule, PlainCallsReturnWhateverTheModuleSays) {
