@@ -3,17 +3,13 @@
 // module that refuses, hangs, dies or lies.
 
 #include <csignal>
-#include <thread>
 
-#include <sys/socket.h>
-#include <sys/un.h>
 #include <unistd.h>
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
 
 #include "kernel_fixture.h"
-#include "platform/embedded/emulator_wire.h"
 
 namespace {
 
@@ -118,79 +114,6 @@ TEST_F(KernelSource, AModuleThatHangsIsATimeout) {
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.mtu", "--timeout", "0.2"}).status, 3);
     EXPECT_EQ(Verb({"switch", "remove", "alpha", "--timeout", "0.2"}).status, 3);
     kill(emulator_.Pid(), SIGCONT);
-}
-
-// A module that answers each of its connections with the same bytes, whatever it is asked.
-class Liar {
-public:
-    Liar(const std::string &path, std::string reply) : reply_(std::move(reply)) {
-        listener_ = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
-        sockaddr_un address{};
-        address.sun_family = AF_UNIX;
-        path.copy(address.sun_path, sizeof address.sun_path - 1);
-        EXPECT_EQ(bind(listener_, reinterpret_cast<sockaddr *>(&address), sizeof address), 0);
-        EXPECT_EQ(listen(listener_, 8), 0);
-        thread_ = std::thread([this] { Serve(); });
-    }
-    ~Liar() {
-        shutdown(listener_, SHUT_RDWR);
-        thread_.join();
-        close(listener_);
-    }
-    Liar(const Liar &) = delete;
-    Liar &operator=(const Liar &) = delete;
-
-private:
-    void Serve() {
-        for (int peer; (peer = accept4(listener_, nullptr, nullptr, SOCK_CLOEXEC)) >= 0; close(peer)) {
-            char request[4096];
-            if (recv(peer, request, sizeof request, 0) > 0)
-                (void)send(peer, reply_.data(), reply_.size(), MSG_NOSIGNAL);
-        }
-    }
-
-    std::string reply_;
-    int listener_ = -1;
-    std::thread thread_;
-};
-
-std::string Reply(std::uint32_t claimed, const std::string &payload) {
-    dvs::wire::ReplyHeader header{};
-    header.magic = dvs::wire::kMagic;
-    header.version = dvs::wire::kVersion;
-    header.dataLen = claimed;
-    header.cmdOutLen = claimed;
-    header.payloadSize = static_cast<std::uint32_t>(payload.size());
-    return std::string(reinterpret_cast<const char *>(&header), sizeof header) + payload;
-}
-
-TEST_F(KernelSource, RepliesThatLieAreErrorsAndNothingElse) {
-    const std::string rows[] = {
-        {},
-        "x",
-        std::string(4096, '\xff'),
-        Reply(0, ""),
-        Reply(1, "x"),
-        Reply(100, "short"),
-        Reply(0xffffffff, "x"),
-        Reply(64, std::string(64, '\xff')),
-        Reply(16, std::string("\x10\0\0\0\1\2\3\4\1\0\0\0\0\0\0\0", 16)),
-    };
-    for (std::size_t i = 0; i < std::size(rows); ++i) {
-        const std::string path = At("liar" + std::to_string(i));
-        const Liar liar(path, rows[i]);
-        for (const std::vector<std::string> &args : {std::vector<std::string>{"show", "kernel:"},
-                                                     {"verify", "kernel:"},
-                                                     {"show", "kernel:", "--persistent"},
-                                                     {"kernel", "port", "state", "a", "1"},
-                                                     {"kernel", "ports", "a"},
-                                                     {"kernel", "vendor-props", "a", "--port", "1"}}) {
-            const Result result =
-                RunProgram({.args = args, .environment = {"DVS_EMULATOR=" + path, "DVS_MAX_PORTS=100"}});
-            EXPECT_TRUE(result.status == 1 || result.status == 6 || result.status == 4)
-                << i << ' ' << args[1] << ' ' << result.status << result.err;
-        }
-    }
 }
 
 } // namespace
