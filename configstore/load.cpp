@@ -10,6 +10,7 @@
 #include <cstring>
 #include <functional>
 #include <new>
+#include <optional>
 #include <string_view>
 #include <vector>
 
@@ -226,21 +227,30 @@ int32_t EndedBy(configstore::Object *object) {
     return status;
 }
 
-int32_t LoadAsImage(const RootObjects &objects, GrowingImage *image, void **out, uint32_t *outLen) {
-    image->BeginBuffer();
+// The load's result; nothing where the image has given up on switches that can all be rebuilt.
+std::optional<int32_t> LoadAsImage(const RootObjects &objects, void **out, uint32_t *outLen) {
+    GrowingImage image;
+    image.BeginBuffer();
     for (auto *object : objects.items()) {
-        if (LoadSwitch(object, {nullptr, image})) return EndedBy(object);
+        if (LoadSwitch(object, {nullptr, &image})) return EndedBy(object);
     }
-    image->EndBuffer();
-    if (!image->GaveUp()) image->HandOver(out, outLen);
+    image.EndBuffer();
+    if (image.GaveUp()) return std::nullopt;
+    image.HandOver(out, outLen);
     return 0;
 }
 
-int32_t LoadAsLists(const RootObjects &objects, void **out, uint32_t *outLen) {
+enum class Saying { kAll, kSaid }; // whether the same has been gone through before, and reported
+
+int32_t LoadAsLists(const RootObjects &objects, Saying saying, void **out, uint32_t *outLen) {
     OwnedList state;
     if (NewList(state) != HYP_OK) return kFailed;
     for (auto *object : objects.items()) {
-        if (LoadSwitch(object, {state.get(), nullptr})) return EndedBy(object);
+        std::optional<AlreadyReported> quiet;
+        if (saying == Saying::kSaid) quiet.emplace();
+        const int32_t failed = LoadSwitch(object, {state.get(), nullptr});
+        quiet.reset();
+        if (failed) return EndedBy(object);
     }
     void *buf = nullptr;
     uint32_t len = 0;
@@ -254,12 +264,10 @@ int32_t LoadAsLists(const RootObjects &objects, void **out, uint32_t *outLen) {
 
 int32_t LoadAll(const RootObjects &objects, void **out, uint32_t *outLen) {
     // Whoever follows the work in the log is shown the lists.
-    if (!Tracing() && !dvs::data::Emits(dvs::data::kTrace)) {
-        GrowingImage image;
-        const int32_t status = LoadAsImage(objects, &image, out, outLen);
-        if (status || !image.GaveUp()) return status;
-    }
-    return LoadAsLists(objects, out, outLen);
+    if (Tracing() || dvs::data::Emits(dvs::data::kTrace))
+        return LoadAsLists(objects, Saying::kAll, out, outLen);
+    const auto status = LoadAsImage(objects, out, outLen);
+    return status ? *status : LoadAsLists(objects, Saying::kSaid, out, outLen);
 }
 
 int32_t CopyPortsetName(configstore::Object *from, configstore::Object *to) {

@@ -13,9 +13,22 @@
 int32_t dvsconfigstore_debug = 10;
 
 namespace dvs::config {
+namespace {
+
+thread_local bool isReported = false;
+
+} // namespace
+
+AlreadyReported::AlreadyReported() {
+    isReported = true;
+}
+
+AlreadyReported::~AlreadyReported() {
+    isReported = false;
+}
 
 void LogError(const char *format, ...) {
-    if (dvsconfigstore_debug < 0) return;
+    if (dvsconfigstore_debug < 0 || isReported) return;
     va_list args;
     va_start(args, format);
     log::ToStream(stdout, 0, format, args);

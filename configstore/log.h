@@ -13,6 +13,15 @@ namespace dvs::config {
 /// Prints when dvsconfigstore_debug is 0 or above. A line printed without a format ends in "\n" as well.
 void LogError(const char *format, ...) __attribute__((format(printf, 1, 2)));
 
+/// While there is one, LogError prints nothing: for work that is done once more and has been reported.
+class AlreadyReported {
+public:
+    AlreadyReported();
+    ~AlreadyReported();
+    AlreadyReported(const AlreadyReported &) = delete;
+    AlreadyReported &operator=(const AlreadyReported &) = delete;
+};
+
 /// Prints when dvsconfigstore_debug is above 0.
 void LogTrace(const char *format, ...) __attribute__((format(printf, 1, 2)));
 

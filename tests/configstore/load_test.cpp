@@ -136,6 +136,51 @@ TEST_F(LoadTest, GivesTheSameBytesWhetherOrNotItIsFollowed) {
     }
 }
 
+TEST_F(LoadTest, ReportsOnceWhicheverWayItGoes) {
+    configstore::Object *object = New("a");
+    configstore::Object *group = Sub(Sub(object, "settings"), "lacp_groups", "g");
+    ASSERT_EQ(0, configstore::SetValueStr(group, "mode", "odd"));
+    ASSERT_EQ(0, configstore::SetValueUint32(group, "uplink_num", 1));
+    // Two ports of one name, which only lists can tell what to do with.
+    Sub(object, "ports", "p1");
+    ASSERT_EQ(0, configstore::SetValueStr(Sub(object, "ports", "p2"), "key", "p1"));
+    Put(object);
+    for (const int level : {0, 10}) {
+        dvsconfigstore_debug = level;
+        messages.clear();
+        ASSERT_EQ(1u, Load().size());
+        const std::size_t first = messages.find("Unknown lacp mode odd\n");
+        EXPECT_NE(std::string::npos, first) << level;
+        EXPECT_EQ(std::string::npos, messages.find("Unknown lacp mode odd\n", first + 1)) << level;
+    }
+    // And where a switch behind them ends the load.
+    object = New("z");
+    ASSERT_EQ(0, configstore::RemoveValue(object, "max_ports"));
+    Put(object);
+    for (const int level : {0, 10}) {
+        dvsconfigstore_debug = level;
+        messages.clear();
+        EXPECT_TRUE(Load().empty());
+        EXPECT_EQ(0, status);
+        EXPECT_FALSE(gotBuffer);
+        for (const char *text :
+             {"Failed to get max_ports, rc: 6\n", "Failed to load buf of switch: z from configstore\n"}) {
+            const std::size_t first = messages.find(text);
+            EXPECT_NE(std::string::npos, first) << level;
+            EXPECT_EQ(std::string::npos, messages.find(text, first + 1)) << level;
+        }
+    }
+    messages.clear();
+    (void)configstore::Delete(store, "switches", "network_vds", "qel", "a");
+    dvsconfigstore_debug = 0;
+    object = New("b");
+    ASSERT_EQ(0, configstore::RemoveValue(object, "max_ports"));
+    Put(object);
+    (void)Load();
+    EXPECT_TRUE(Said("Failed to get max_ports, rc: 6\n")) << "the next load speaks again";
+    dvsconfigstore_debug = 10;
+}
+
 TEST_F(LoadTest, LaysASwitchOutInItsOrder) {
     configstore::Object *object = New("a");
     Sub(object, "ports", "p1");
