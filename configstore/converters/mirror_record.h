@@ -77,7 +77,7 @@ inline constexpr Field kWidePortFields[] = {
 };
 inline constexpr Field kNarrowVlanFields[] = {
     // name     offset width kind             domain       meaning
-    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "0"},
+    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "not looked at here"},
     {"vlan_id",      4,    2, Kind::kUnsigned, nullptr,     "VLAN whose frames are mirrored"},
     {"unused",       6,   30, Kind::kReserved, nullptr,     "0"},
 };
@@ -89,7 +89,7 @@ inline constexpr Field kWideVlanFields[] = {
 };
 inline constexpr Field kNarrowAddressFields[] = {
     // name     offset width kind             domain       meaning
-    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "0"},
+    {"kind",         0,    4, Kind::kEnum,     &kPortKinds, "not looked at here"},
     {"address",      4,   20, Kind::kTagged,   nullptr,     "where mirrored frames are sent: 1 byte not 0 for IPv6, 3 unused, then 4 "
                                                             "or 16 bytes of address"},
     {"unused",      24,   12, Kind::kReserved, nullptr,     "0"},

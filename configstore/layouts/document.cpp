@@ -57,6 +57,31 @@ bool IsDefault(const DVSProp2ConfigEntry &row) {
     return std::string_view(row.key) == "DEFAULT";
 }
 
+std::string HexText(uint32_t number) {
+    char text[16];
+    std::snprintf(text, sizeof text, "0x%x", number);
+    return text;
+}
+
+const char *RuleText(Rule rule) {
+    switch (rule) {
+    case Rule::kIpv4:
+        return ", an IPv4 address";
+    case Rule::kAddress:
+        return ", an IP address";
+    case Rule::kVlan:
+        return ", 0 to 4095";
+    case Rule::kSlot:
+        return ", a number from 0 to 4294967295";
+    case Rule::kBits:
+        return ", a multiple of 8";
+    case Rule::kUnset:
+    case Rule::kNone:
+        break;
+    }
+    return "";
+}
+
 // The heading's anchor as renderers make it.
 std::string TypeLink(uint32_t type) {
     const std::string number = std::to_string(type);
@@ -85,7 +110,7 @@ std::string RecordText(const Record &record, std::set<const Record *> *described
     std::string text = std::string("\n*") + record.name + "*";
     if (record.size) text += ", " + std::to_string(record.size) + " bytes";
     for (const Part &part : record.parts) {
-        text += std::string("; then `") + part.name + "`: " + part.meaning + ", each a *" +
+        text += std::string("; then `") + part.name + "`: " + part.meaning + ", each a record *" +
                 part.element->name + "*, " + CountText(part);
         for (const Variant &variant : part.variants)
             text += "; " + VariantText(variant);
@@ -106,15 +131,12 @@ std::string RecordText(const Record &record, std::set<const Record *> *described
     return text;
 }
 
-std::string FormText(const StoreField &field, const std::string &path) {
-    std::string text = "| `" + path + "` | " + Word(field.form);
-    if (field.id) text += std::string(" by `") + field.id + "`";
-    if (*field.unit) text += std::string(", ") + field.unit;
-    if (field.maxText) text += ", at most " + std::to_string(field.maxText) + " bytes";
-    text += std::string(" | ") + field.meaning + " |\n";
+std::string FormRows(const StoreField &field, const std::string &path) {
+    std::string text =
+        "| `" + path + "` | " + FormText(field) + " | " + field.meaning + DomainText(field) + " |\n";
     const std::string below = path + (field.form == Form::kInstances ? "[]." : ".");
     for (const StoreField &member : field.members)
-        text += FormText(member, below + member.name);
+        text += FormRows(member, below + member.name);
     return text;
 }
 
@@ -140,7 +162,7 @@ std::string Types() {
             const bool isRepeated = layout.empty() && record == info->record;
             text += isRepeated ? std::string("\nThe value is a *") + record->name + "* as above.\n" : layout;
         }
-        text += "\n| in the store | form | meaning |\n|---|---|---|\n" + FormText(*info->form, LeafOf(type));
+        text += "\n| in the store | form | meaning |\n|---|---|---|\n" + FormRows(*info->form, LeafOf(type));
     }
     return text;
 }
@@ -165,11 +187,28 @@ std::string DomainText(const Field &field) {
             field.kind == Kind::kEnum ? std::to_string(i) + " `" + name + "`" : std::string("`") + name + "`";
     }
     for (const Flag &flag : field.domain->flags) {
-        char bit[16];
-        std::snprintf(bit, sizeof bit, "0x%x", flag.bit);
-        text += std::string(text.empty() ? "" : "; ") + bit + " `" + flag.name + "` " + flag.meaning;
+        text += std::string(text.empty() ? "" : "; ") + HexText(flag.bit) + " `" + flag.name + "` " +
+                flag.meaning;
     }
     return ": " + text;
+}
+
+std::string FormText(const StoreField &field) {
+    std::string text = Word(field.form);
+    if (field.id) text += std::string(" by `") + field.id + "`";
+    if (*field.unit) text += std::string(", ") + field.unit;
+    if (field.maxText) text += ", at most " + std::to_string(field.maxText) + " bytes";
+    text += RuleText(field.rule);
+    return field.isNeeded ? text + ", never left out" : text;
+}
+
+std::string DomainText(const StoreField &field) {
+    std::string text;
+    for (uint32_t i = 0; field.domain && i < field.domain->textCount; ++i) {
+        const char *name = field.domain->texts[i];
+        if (name) text += std::string(text.empty() ? ": `" : ", `") + name + "`";
+    }
+    return text;
 }
 
 std::string CountText(const Part &part) {
@@ -178,7 +217,7 @@ std::string CountText(const Part &part) {
         return std::to_string(part.count) + " of them";
     case CountBy::kField:
         return std::string("`") + part.field + "` of them" +
-               (part.gate ? std::string(" where `") + part.gateField + "` calls for them" : "");
+               (part.gate ? std::string(" where `") + part.gateField + "` has " + HexText(part.gate) : "");
     case CountBy::kShare:
         return "as many as the elements before say together";
     case CountBy::kRest:
@@ -188,7 +227,7 @@ std::string CountText(const Part &part) {
 }
 
 std::string VariantText(const Variant &variant) {
-    return std::string("those of `") + variant.share + "` are each a *" + variant.element->name +
+    return std::string("those of `") + variant.share + "` are each a record *" + variant.element->name +
            "* where `" + variant.field + "` is " + std::to_string(variant.value);
 }
 

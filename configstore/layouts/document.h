@@ -23,6 +23,11 @@ std::string PathOf(const DVSProp2ConfigEntry &row);
 /// What a field may hold, behind a colon: ": 0 `GRE`, 1 `ERSPAN2`"; empty for a field without a domain.
 std::string DomainText(const Field &field);
 
+/// What is taken there: "list of texts, at most 80 bytes".
+std::string FormText(const StoreField &field);
+/// The texts it may be, behind a colon; empty where any will do.
+std::string DomainText(const StoreField &field);
+
 /// How many elements a part has: "`count` of them".
 std::string CountText(const Part &part);
 

@@ -55,8 +55,8 @@ constexpr StoreField kTeaming[] = {
     {"uplink_port_order", Form::kObject, "", 0, nullptr, nullptr, kUplinkOrder, "which uplinks are used first"},
 };
 constexpr StoreField kRange[] = {
-    {"start", Form::kUint16, "", 0, nullptr, nullptr, {}, "first VLAN id", Rule::kVlan},
-    {"end",   Form::kUint16, "", 0, nullptr, nullptr, {}, "last VLAN id", Rule::kVlan},
+    {"start", Form::kUint16, "", 0, nullptr, nullptr, {}, "first VLAN id", Rule::kVlan, true},
+    {"end",   Form::kUint16, "", 0, nullptr, nullptr, {}, "last VLAN id", Rule::kVlan, true},
 };
 constexpr StoreField kVlan[] = {
     {"vlan_id",        Form::kUint16,    "", 0, nullptr, nullptr, {}, "VLAN id of an access port", Rule::kVlan},
@@ -64,10 +64,10 @@ constexpr StoreField kVlan[] = {
     {"trunk_vlan_ids", Form::kInstances, "", 0, nullptr, nullptr, kRange, "ranges of a trunk"},
 };
 constexpr StoreField kShaping[] = {
-    {"enabled",           Form::kBool, "",      0, nullptr, nullptr, {}, "always true"},
-    {"average_bandwidth", Form::kLong, "bit/s", 0, nullptr, nullptr, {}, "8 times the record's number"},
-    {"peak_bandwidth",    Form::kLong, "bit/s", 0, nullptr, nullptr, {}, "8 times the record's number"},
-    {"burst_size",        Form::kLong, "bit",   0, nullptr, nullptr, {}, "8 times the record's number"},
+    {"enabled",           Form::kBool, "",      0, nullptr, nullptr, {}, "always true; may be left out"},
+    {"average_bandwidth", Form::kLong, "bit/s", 0, nullptr, nullptr, {}, "bandwidth on average; 8 times the record's number", Rule::kBits},
+    {"peak_bandwidth",    Form::kLong, "bit/s", 0, nullptr, nullptr, {}, "bandwidth during a burst; 8 times the record's number", Rule::kBits},
+    {"burst_size",        Form::kLong, "bit",   0, nullptr, nullptr, {}, "how much may be sent at peak bandwidth; 8 times the record's number", Rule::kBits},
 };
 constexpr StoreField kSecurity[] = {
     {"allow_promiscuous",     Form::kBool, "", 0, nullptr, nullptr, {}, "promiscuous mode is accepted"},
@@ -84,13 +84,13 @@ constexpr StoreField kFilterPolicy[] = {
     {"network_filters", Form::kInstances, "", 0, nullptr, "slot_number", kFilter, "the filters"},
 };
 constexpr StoreField kPortLacpMembers[] = {
-    {"enabled", Form::kBool, "", 0, nullptr,         nullptr, {}, "whether the port takes part in link aggregation"},
-    {"mode",    Form::kText, "", 0, &kLacpModeTexts, nullptr, {}, "whether it speaks first, answers only, or neither"},
+    {"enabled", Form::kBool, "", 0, nullptr,         nullptr, {}, "whether the port takes part in link aggregation", Rule::kNone, true},
+    {"mode",    Form::kText, "", 0, &kLacpModeTexts, nullptr, {}, "whether it speaks first, answers only, or neither", Rule::kNone, true},
 };
 constexpr StoreField kPvlan[] = {
-    {"primary_id",   Form::kUint16, "", 0, nullptr,      nullptr, {}, "primary VLAN id", Rule::kVlan},
-    {"secondary_id", Form::kUint16, "", 0, nullptr,      nullptr, {}, "secondary VLAN id", Rule::kVlan},
-    {"type",         Form::kText,   "", 0, &kPvlanTypes, nullptr, {}, "whom ports of the secondary VLAN can reach"},
+    {"primary_id",   Form::kUint16, "", 0, nullptr,      nullptr, {}, "primary VLAN id", Rule::kVlan, true},
+    {"secondary_id", Form::kUint16, "", 0, nullptr,      nullptr, {}, "secondary VLAN id", Rule::kVlan, true},
+    {"type",         Form::kText,   "", 0, &kPvlanTypes, nullptr, {}, "whom ports of the secondary VLAN can reach", Rule::kNone, true},
 };
 constexpr StoreField kSourcePort[] = {
     {"wildcard_port_connectee_types", Form::kTexts, "", 0,           &kConnectees, nullptr, {}, "ports that are sources by their kind"},
@@ -142,7 +142,7 @@ constexpr StoreField kIpfixMembers[] = {
     {"observation_domain_id", Form::kUint32, "",        0, nullptr, nullptr, {}, "what the collector knows the switch by"},
 };
 constexpr StoreField kHealthCheckMembers[] = {
-    {"enabled",  Form::kBool,   "", 0, nullptr, nullptr, {}, "whether the check is made, as a load reads it; a save writes \"enable\""},
+    {"enabled",  Form::kBool,   "", 0, nullptr, nullptr, {}, "whether the check is made; a save to a store calls it \"enable\", a load looks for \"enabled\""},
     {"interval", Form::kUint32, "", 0, nullptr, nullptr, {}, "time between two checks"},
 };
 constexpr StoreField kShares[] = {

@@ -34,6 +34,7 @@ enum class Rule : uint8_t {
     kAddress, // an IPv4 or IPv6 address
     kVlan,    // a VLAN id, 0 to 4095
     kSlot,    // a uint32 as decimal text
+    kBits,    // a multiple of 8, not negative: the record has bytes
     kUnset,   // any uint32, the largest of which says the same as leaving it out
 };
 
@@ -47,6 +48,7 @@ struct StoreField {
     std::span<const StoreField> members; // of objects and of instances
     const char *meaning;
     Rule rule = Rule::kNone; // of a list: of its elements
+    bool isNeeded = false;   // where its object is written, this member must be
 };
 
 } // namespace dvs::layout

@@ -24,8 +24,34 @@ Flaw PutNumber(const Field &field, int64_t number, const std::string &path, std:
     return {};
 }
 
+// Only one of them is kept.
+Flaw EncodeVlan(const Record &, const Node &tree, std::vector<uint8_t> *) {
+    const Node *first = nullptr;
+    for (const Node &member : tree.items) {
+        if (first)
+            return {member.name,
+                    "excludes " + first->name + ": a port has one of vlan_id, pvlan_id and trunk_vlan_ids"};
+        first = &member;
+    }
+    return {};
+}
+
+// Only so many names have a slot.
+Flaw CountUplinks(const Record &record, const Node &tree) {
+    const Node *order = tree.Find("uplink_port_order");
+    if (!order) return {};
+    std::size_t count = 0;
+    for (const Node &list : order->items)
+        count += list.items.size();
+    const std::size_t most = record.parts[0].count;
+    if (count <= most) return {};
+    return {"uplink_port_order",
+            "names " + std::to_string(count) + " uplinks, at most " + std::to_string(most) + " fit"};
+}
+
 // The three criteria that a load looks for beside their object.
 Flaw EncodeTeaming(const Record &record, const Node &tree, std::vector<uint8_t> *value) {
+    if (Flaw flaw = CountUplinks(record, tree)) return flaw;
     const Node *criteria = tree.Find("failure_criteria");
     if (!criteria || value->size() < record.size) return {};
     for (const char *name : {"full_duplex", "percentage", "speed"}) {
@@ -81,6 +107,8 @@ constexpr OwnForm kOwnForms[] = {
     {9, CompleteSessions, EncodeSessions},
     {17, nullptr, EncodeTeaming},
     {18, nullptr, EncodeTeaming},
+    {24, nullptr, EncodeVlan},
+    {25, nullptr, EncodeVlan},
     {29, nullptr, EncodeFilters},
 };
 

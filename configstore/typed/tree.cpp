@@ -188,6 +188,11 @@ Flaw CheckRule(const StoreField &form, const Node &node, const std::string &path
     case layout::Rule::kSlot:
         if (IsDecimal(node.text)) return {};
         return {path, quoted + " is no number, expected 0 to 4294967295 in digits"};
+    case layout::Rule::kBits:
+        if (node.number >= 0 && node.number % 8 == 0) return {};
+        return {path, std::to_string(node.number) +
+                          (node.number < 0 ? " is negative"
+                                           : " is no multiple of 8, and only whole bytes are kept")};
     case layout::Rule::kUnset:
     case layout::Rule::kNone:
         break;
@@ -216,7 +221,8 @@ Flaw CheckText(const StoreField &form, const Node &node, const std::string &path
 Flaw CheckNumber(const StoreField &form, const Node &node, int64_t least, int64_t most,
                  const std::string &path) {
     if (Flaw flaw = Expect(node, Node::Kind::kNumber, path)) return flaw;
-    if (form.rule == layout::Rule::kVlan) return CheckRule(form, node, path);
+    const bool hasRange = form.rule == layout::Rule::kVlan || form.rule == layout::Rule::kBits;
+    if (hasRange) return CheckRule(form, node, path);
     if (node.number >= least && node.number <= most) return {};
     return {path, std::to_string(node.number) + " is out of range, expected " + std::to_string(least) +
                       " to " + std::to_string(most)};
@@ -266,6 +272,10 @@ Flaw WriteMembers(const StoreField &form, configstore::Object *object, const Nod
         }
         if (Flaw flaw = WriteMember(*member, {object, member->name, nullptr}, item, prefix + item.name))
             return flaw;
+    }
+    for (const StoreField &field : form.members) {
+        if (field.isNeeded && !node.Find(field.name))
+            return {prefix + field.name, "is missing; the value needs it"};
     }
     return {};
 }

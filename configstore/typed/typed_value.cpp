@@ -259,7 +259,8 @@ Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Co
     {
         Bench bench(propClass, key, context);
         if (!bench.IsReady()) {
-            built.reason = bench.IsMapped() ? "no memory to build it" : "this property has no typed form";
+            built.reason = bench.IsMapped() ? "no memory to build it"
+                                            : "the property has no typed form: its meaning is not known";
             return built;
         }
         const layout::StoreField &form = *bench.type().form;
@@ -273,12 +274,12 @@ Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Co
             return built;
         }
         if (status) {
-            built.reason =
-                "does not convert (status " + std::to_string(status) + "); expected: " + form.meaning;
+            built.reason = std::string("is not complete, or not a value of this property; expected: ") +
+                           form.meaning + " (status " + std::to_string(status) + ")";
             return built;
         }
         if (!found) {
-            built.reason = "loads as no property";
+            built.reason = "is what there is without the property; leave the property out";
             return built;
         }
         built.ok = true;

@@ -9,6 +9,7 @@
 #include <boost/json/object.hpp>
 
 #include "dvs/configstore.h"
+#include "tools/dvsctl/typed_json.h"
 
 namespace {
 
@@ -36,6 +37,30 @@ TEST_F(Props, ExplainsAProperty) {
     EXPECT_TRUE(Has(out, "A load without memory skips the property.")) << out;
     EXPECT_TRUE(Has(out, "port VLAN policy, 8 bytes; then ranges")) << out;
     EXPECT_TRUE(Has(out, "trunk_vlan_ids[].start")) << out;
+}
+
+TEST_F(Props, NamesTypedFieldsAsTheyAreWritten) {
+    const std::string out = Dvsctl({"props", "com.orbeno.etherswitch.port.vlan"}).out;
+    EXPECT_TRUE(Has(out, "\nvlan_id                 uint16, 0 to 4095 ")) << out;
+    EXPECT_TRUE(Has(out, "\ntrunk_vlan_ids[].end    uint16, 0 to 4095, never left out ")) << out;
+    EXPECT_TRUE(Has(Dvsctl({"props", "com.orbeno.etherswitch.cdp"}).out, "protocol spoken: CDP, LLDP"));
+}
+
+TEST_F(Props, EveryExampleIsAValueOfItsProperty) {
+    const auto document = Json(Dvsctl({"props", "*", "--json"}));
+    for (const auto &property : document.at("properties").as_array()) {
+        const std::string name(property.at("name").as_string());
+        const std::string_view list = property.at("list").as_string();
+        const std::uint32_t propClass = list == "global" ? DVS_PROP_CLASS_GLOBAL
+                                        : list == "host" ? DVS_PROP_CLASS_HOST
+                                                         : DVS_PROP_CLASS_PORT;
+        dvs::ctl::NodeFlaw flaw;
+        const auto node = dvs::ctl::NodeFromJson(property.at("example"), flaw);
+        ASSERT_TRUE(node) << name;
+        const auto built = dvs::typed::Build(propClass, name, *node, {8});
+        EXPECT_TRUE(built.ok) << name << " " << built.field << " " << built.reason;
+        EXPECT_TRUE(built.differences.empty()) << name;
+    }
 }
 
 TEST_F(Props, TakesPatterns) {

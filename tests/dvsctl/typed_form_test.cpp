@@ -166,7 +166,7 @@ TEST(TypedForm, RefusesWhatWouldReadBackOtherwise) {
     // The record counts bytes: three bits are none.
     const Error error = Refusal(Named(
         kShaper, R"("typed": {"average_bandwidth": 8003, "peak_bandwidth": 8000, "burst_size": 8000})"));
-    EXPECT_NE(error.why.find("average_bandwidth"), std::string::npos) << error.why;
+    EXPECT_NE(error.path.find("average_bandwidth"), std::string::npos) << error.path;
 }
 
 TEST(TypedForm, MustAgreeWithTheBytesBesideIt) {

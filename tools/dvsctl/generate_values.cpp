@@ -449,6 +449,14 @@ std::vector<TypedProperty> DrawSwitchProperties(Random &random, const SwitchPlan
     return Properties({random, plan}, propClass);
 }
 
+json::value ExampleOf(std::string_view key) {
+    constexpr std::uint32_t kPorts = 12, kGuest = 4;
+    Random random(2);
+    const auto row = std::ranges::find(kRows, key, &Row::key);
+    if (row == std::end(kRows)) return nullptr;
+    return row->make({random, PlanSwitch(random, 0, SortOf(0), kPorts), kGuest});
+}
+
 std::vector<TypedProperty> DrawPortProperties(Random &random, const SwitchPlan &plan, std::uint32_t port) {
     return Properties({random, plan, port}, DVS_PROP_CLASS_PORT);
 }

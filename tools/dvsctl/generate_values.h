@@ -78,6 +78,9 @@ std::vector<TypedProperty> DrawSwitchProperties(Random &random, const SwitchPlan
 /// behind the uplinks every key is there.
 std::vector<TypedProperty> DrawPortProperties(Random &random, const SwitchPlan &plan, std::uint32_t port);
 
+/// What one may write for a mapped key, the same each time. Of a key without a row, null.
+boost::json::value ExampleOf(std::string_view key);
+
 } // namespace dvs::ctl
 
 #endif

@@ -231,9 +231,13 @@ Buffer TypedAt(const Place &place, const json::value &value, const Owner &owner,
     if (!node) place.Refuse(flaw.reason, flaw.field);
     typed::Built built = typed::Build(owner.propClass, name, *node, {owner.version});
     if (!built.ok) place.Refuse(built.reason, built.field);
-    if (!built.differences.empty())
-        place.Refuse("the property cannot hold it as it is given; it would read back otherwise: " +
-                     built.differences.front());
+    if (!built.differences.empty()) {
+        // "vlan_id: 1 reads back as absent"
+        const std::string &first = built.differences.front();
+        const std::size_t end = first.find(": ");
+        const std::string field = first.starts_with("the value") ? "" : first.substr(0, end);
+        place.Refuse("the property cannot hold it as it is given: " + first.substr(end + 2), field);
+    }
     return std::move(built.bytes);
 }
 

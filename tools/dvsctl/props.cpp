@@ -7,6 +7,7 @@
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
+#include <boost/json/serialize.hpp>
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
@@ -14,6 +15,7 @@
 #include "configstore/layouts/registry.h"
 #include "tools/dvsctl/commands.h"
 #include "tools/dvsctl/envelope.h"
+#include "tools/dvsctl/generate_values.h"
 #include "tools/dvsctl/table.h"
 #include "tools/dvsctl/text.h"
 
@@ -125,6 +127,8 @@ json::object FormJson(const StoreField &field, const char *name) {
     if (*field.unit) object["unit"] = field.unit;
     if (field.maxText) object["max_bytes"] = field.maxText;
     if (field.id) object["instance_id"] = field.id;
+    if (field.isNeeded) object["is_needed"] = true;
+    if (field.rule == layout::Rule::kVlan) object["maximum"] = 4095;
     if (field.domain) {
         json::array values;
         for (std::uint32_t i = 0; i < field.domain->textCount; ++i)
@@ -150,6 +154,7 @@ json::object KnownJson(const Known &known) {
     if (*known.type->quirks) object["quirks"] = known.type->quirks;
     object["records"] = std::move(records);
     object["typed"] = FormJson(*known.type->form, known.row->path[known.row->depth - 1]);
+    object["example"] = ExampleOf(known.row->key);
     return object;
 }
 
@@ -199,8 +204,8 @@ void WriteRecord(const Record &record, Context &context) {
     std::string title = record.name;
     if (record.size) title += fmt::format(", {} bytes", record.size);
     for (const Part &part : record.parts)
-        title += fmt::format("; then {}: {}, each a {}, {}", part.name, part.meaning, part.element->name,
-                             Plain(layout::CountText(part)));
+        title += fmt::format("; then {}: {}, each a record \"{}\", {}", part.name, part.meaning,
+                             part.element->name, Plain(layout::CountText(part)));
     out.Write("\n  " + title + "\n");
     for (const Part &part : record.parts)
         for (const layout::Variant &variant : part.variants)
@@ -216,13 +221,13 @@ void WriteRecord(const Record &record, Context &context) {
     table.Write(out);
 }
 
+// Paths as a typed value has them, from its own start.
 void AddForm(const StoreField &field, const std::string &path, Table &table) {
-    std::string form = layout::Word(field.form);
-    if (field.id) form += fmt::format(" by {}", field.id);
-    if (*field.unit) form += fmt::format(", {}", field.unit);
-    if (field.maxText) form += fmt::format(", at most {} bytes", field.maxText);
-    table.Add({{path, Style::Name}, {form}, {field.meaning, Style::Dim}});
-    const std::string below = path + (field.form == Form::kInstances ? "[]." : ".");
+    table.Add({{path.empty() ? "(the value)" : path, Style::Name},
+               {Plain(layout::FormText(field))},
+               {field.meaning + Plain(layout::DomainText(field)), Style::Dim}});
+    std::string below = path + (field.form == Form::kInstances ? "[]" : "");
+    if (!below.empty()) below += ".";
     for (const StoreField &member : field.members)
         AddForm(member, below + member.name, table);
 }
@@ -238,8 +243,9 @@ void Explain(const Known &known, Context &context) {
         WriteRecord(*record, context);
     out.Write("\n");
     Table table(kFormColumns, context.options);
-    AddForm(*known.type->form, known.row->path[known.row->depth - 1], table);
+    AddForm(*known.type->form, "", table);
     table.Write(out);
+    out.Write(fmt::format("\n  for example: \"typed\": {}\n", json::serialize(ExampleOf(known.row->key))));
 }
 
 std::vector<Known> Wanted(const Options &options) {

@@ -31,7 +31,7 @@ std::optional<Node> ItemFromJson(const json::value &value, const std::string &pa
         node.kind = Node::Kind::kNumber;
         node.number = value.to_number<std::int64_t>();
     } else if (value.is_number()) {
-        flaw = {path, "it is no whole number from -9223372036854775808 to 9223372036854775807"};
+        flaw = {path, value.is_double() ? "it is no whole number" : "it is too large a number"};
         return std::nullopt;
     } else if (value.is_string()) {
         node.kind = Node::Kind::kText;

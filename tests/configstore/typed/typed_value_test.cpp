@@ -194,7 +194,7 @@ TEST_F(Typed, LeavesUnmappedPropertiesAlone) {
         EXPECT_EQ(State::kUnmapped, Describe(kPort, key, Bytes().U8(1)).state) << key;
         const Built built = Build(kPort, key, Text("x"));
         EXPECT_FALSE(built.ok);
-        EXPECT_EQ("this property has no typed form", built.reason);
+        EXPECT_EQ("the property has no typed form: its meaning is not known", built.reason);
     }
     EXPECT_EQ(State::kUnmapped, Describe(7, kVlan, Bytes().U8(1)).state);
 }
@@ -275,8 +275,10 @@ TEST_F(Typed, NamesTheFieldAtFault) {
          "\"10.0.0.300\" is no IPv4 address, expected one as 192.0.2.1"},
         {kGlobal, "com.orbeno.etherswitch.beaconTimeout", Number(1LL << 40), "",
          "1099511627776 is out of range, expected -2147483648 to 2147483647"},
-        {kGlobal, "com.orbeno.common.uplinkPorts", List({}), "", "loads as no property"},
-        {kPort, "com.orbeno.etherswitch.port.ipfix", Bool(false), "", "loads as no property"},
+        {kGlobal, "com.orbeno.common.uplinkPorts", List({}), "",
+         "is what there is without the property; leave the property out"},
+        {kPort, "com.orbeno.etherswitch.port.ipfix", Bool(false), "",
+         "is what there is without the property; leave the property out"},
     };
     for (const auto &row : rows) {
         const Built built = Build(row.propClass, row.key, row.tree);
@@ -304,9 +306,10 @@ TEST_F(Typed, FailureCriteriaAreWrittenAsTheyAreGiven) {
 }
 
 TEST_F(Typed, TellsWhatReadsBackOtherwise) {
-    const Built both = Build(kPort, kVlan, Object({Number(1, "vlan_id"), Number(2, "pvlan_id")}));
-    ASSERT_EQ(1u, both.differences.size());
-    EXPECT_EQ("vlan_id: 1 reads back as absent", both.differences[0]);
+    const Node filters = Object({List({Object({Text("01", "slot_number")})}, "network_filters")});
+    const Built built = Build(kPort, "com.orbeno.common.port.dvfilter", filters);
+    ASSERT_EQ(1u, built.differences.size());
+    EXPECT_EQ("network_filters[0].slot_number: 01 reads back as 1", built.differences[0]);
 }
 
 TEST_F(Typed, LeavesTheConvertersValuesAsTheyWere) {

@@ -20,6 +20,7 @@
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/json_parse.h"
 #include "tools/dvsctl/model.h"
+#include "tools/dvsctl/typed_json.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -63,33 +64,6 @@ bool IsKnown(const Target &target) {
     if (target.property.empty()) return false;
     return typed::Describe(static_cast<std::uint32_t>(target.list), target.property, {}).state !=
            typed::State::kUnmapped;
-}
-
-typed::Node ToNode(const json::value &value, std::string name = {}) {
-    using Kind = typed::Node::Kind;
-    typed::Node node;
-    node.name = std::move(name);
-    if (value.is_bool()) {
-        node.kind = Kind::kBool;
-        node.flag = value.get_bool();
-    } else if (value.is_int64()) {
-        node.kind = Kind::kNumber;
-        node.number = value.get_int64();
-    } else if (value.is_string()) {
-        node.kind = Kind::kText;
-        node.text = value.get_string();
-    } else if (value.is_array()) {
-        node.kind = Kind::kList;
-        for (const json::value &item : value.get_array())
-            node.items.push_back(ToNode(item));
-    } else if (value.is_object()) {
-        node.kind = Kind::kObject;
-        for (const auto &[key, member] : value.get_object())
-            node.items.push_back(ToNode(member, key));
-    } else if (!value.is_null()) {
-        throw Error(Exit::Malformed, "a number in the value is too large or has a fraction");
-    }
-    return node;
 }
 
 /// A value of the states' JSON form ({"hex": "01ff"}), for properties without a form of their own.
@@ -167,6 +141,16 @@ private:
                             {isTree ? switchVersion_() : 0});
     }
 
+    typed::Node ToNode(const json::value &value) {
+        NodeFlaw flaw;
+        auto node = NodeFromJson(value, flaw);
+        if (node) return std::move(*node);
+        typed::Built built;
+        built.field = flaw.field;
+        built.reason = flaw.reason;
+        Refuse(built);
+    }
+
     Buffer Build(const typed::Node &node) {
         typed::Built built = TryBuild(node);
         if (!built.ok) Refuse(built);
@@ -174,7 +158,7 @@ private:
             // Set in silence, it would be another value than the one that was asked for.
             Error error(Exit::Malformed, "the property cannot hold this value as it is given");
             error.path = target_.property;
-            error.why = "it would read back otherwise: " + built.differences.front();
+            error.why = built.differences.front();
             error.next = "write what it reads back as, or give the bytes: --as hex, --file";
             throw Error(error);
         }
