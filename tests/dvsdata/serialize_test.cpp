@@ -186,6 +186,10 @@ TEST(DataSerialize, OfAVersionBelowFourWritesAllTheSame) {
     const Buffer old = TakeBytes(list.get(), output);
     EXPECT_EQ(messages.All(), (std::vector<std::string>{"DVS version 3 is smaller than 6.0.\n"}));
     EXPECT_EQ(old, Serialized(list.get()));
+    output = {};
+    output.status = DVSData_Serialize(list.get(), &output.buf, &output.len, 4);
+    EXPECT_EQ(TakeBytes(list.get(), output), old);
+    EXPECT_EQ(messages.All().size(), 1u); // version 4 is no reason for a remark
 }
 
 TEST(DataSerializeExNamedProp, VolatileLeavesOutTheTypeButKeepsThePersistFlag) {
