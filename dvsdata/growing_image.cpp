@@ -55,7 +55,7 @@ std::uint8_t *GrowingImage::Claim(std::size_t size) {
 
 void GrowingImage::BeginBuffer() {
     assert(depth_ < kMaxDepth);
-    levels_[depth_++] = {at_, at_ + kUnsummedSize, 0, 0, 0};
+    levels_[depth_++] = {OpenBufferAt(at_), 0, 0};
     if (std::uint8_t *const header = Claim(kHeaderSize)) std::memset(header, 0, kHeaderSize);
 }
 
@@ -66,24 +66,17 @@ void GrowingImage::EndBuffer() {
     if (!marker) return;
     Store32(marker, 0);
 
-    const Bytes written(begin_, at_);
-    const std::size_t size = at_ - level.start;
-    std::uint32_t checksum = level.sum;
-    if (at_ > level.summedTo) checksum += Sum(written.subspan(level.summedTo));
-    std::uint8_t *const header = begin_ + level.start;
-    Store32(header + kTotalLengthOffset, static_cast<std::uint32_t>(size));
-    Store32(header + kChecksumOffset, checksum);
-    Store16(header + kVersionOffset, kFormatVersion);
-    if (depth_ == 0) return;
-
+    if (depth_ == 0) {
+        FinishBuffer(begin_, at_, level.buffer, nullptr);
+        return;
+    }
+    // The entry's sizes come first: the buffer around sums them too.
     Level &outer = levels_[depth_ - 1];
+    const auto size = static_cast<std::uint32_t>(at_ - level.buffer.start);
     std::uint8_t *const entry = begin_ + outer.entry;
-    Store32(entry + kEntrySizeOffset, EntrySize(static_cast<std::uint32_t>(size)));
-    Store32(entry + kDataLenOffset, static_cast<std::uint32_t>(size));
-    // The buffer around sums this one's first bytes too, and the bytes since its last nested buffer.
-    outer.sum += checksum + Sum(written.subspan(level.start, std::min<std::size_t>(size, kUnsummedSize))) +
-                 Sum(written.subspan(outer.summedTo, level.start - outer.summedTo));
-    outer.summedTo = at_;
+    Store32(entry + kEntrySizeOffset, EntrySize(size));
+    Store32(entry + kDataLenOffset, size);
+    FinishBuffer(begin_, at_, level.buffer, &outer.buffer);
 }
 
 void GrowingImage::BeginEntry(std::string_view name, std::uint32_t propType) {
@@ -121,7 +114,7 @@ void GrowingImage::Put(std::string_view name, Bytes value, std::uint32_t propTyp
 }
 
 std::size_t GrowingImage::Find(std::string_view name) const {
-    std::size_t at = levels_[depth_ - 1].start + kHeaderSize;
+    std::size_t at = levels_[depth_ - 1].buffer.start + kHeaderSize;
     const std::size_t last = name.empty() ? 0 : std::min<std::size_t>(name.size(), kNameSize) - 1;
     for (; at < at_; at += Load32(begin_ + at + kEntrySizeOffset)) {
         const auto *const field = reinterpret_cast<const char *>(begin_ + at + kNameOffset);

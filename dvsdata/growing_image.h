@@ -17,6 +17,7 @@
 #include <string_view>
 
 #include "dvsdata/format.h"
+#include "dvsdata/open_buffer.h"
 
 namespace dvs::data {
 
@@ -51,10 +52,8 @@ public:
 
 private:
     struct Level {
-        std::size_t start;     // of the buffer
-        std::size_t summedTo;  // bytes from start + 32 to here are in `sum`
+        OpenBuffer buffer;
         std::size_t entry;     // the last one
-        std::uint32_t sum;     //
         std::uint32_t entries; // by Update
     };
 

@@ -2,7 +2,6 @@
 // Writing nested buffers into one block, and the filters of a serialization. Leans on format.h; serialize.cpp
 // and the state's serialization stand on it.
 
-#include <algorithm>
 #include <cassert>
 #include <cstring>
 
@@ -77,7 +76,7 @@ void ImageWriter::Zero(std::size_t size) {
 
 void ImageWriter::BeginBuffer() {
     assert(depth_ < kMaxDepth);
-    levels_[depth_++] = {at_, at_ + kUnsummedSize, 0, 0};
+    levels_[depth_++] = {OpenBufferAt(at_), 0};
     Zero(kHeaderSize);
 }
 
@@ -85,23 +84,7 @@ void ImageWriter::EndBuffer() {
     assert(depth_ > 0);
     const Level level = levels_[--depth_];
     Zero(kMarkerSize);
-    if (failed_) return;
-
-    const Bytes written(begin_, at_);
-    const std::size_t size = at_ - level.start;
-    std::uint32_t checksum = level.sum;
-    if (at_ > level.summedTo) checksum += Sum(written.subspan(level.summedTo));
-    std::uint8_t *const header = begin_ + level.start;
-    Store32(header + kTotalLengthOffset, static_cast<std::uint32_t>(size));
-    Store32(header + kChecksumOffset, checksum);
-    Store16(header + kVersionOffset, kFormatVersion);
-
-    if (depth_ == 0) return;
-    // The buffer around sums this one's first bytes too, and the bytes since its last nested buffer.
-    Level &outer = levels_[depth_ - 1];
-    outer.sum += checksum + Sum(written.subspan(level.start, std::min<std::size_t>(size, kUnsummedSize))) +
-                 Sum(written.subspan(outer.summedTo, level.start - outer.summedTo));
-    outer.summedTo = at_;
+    if (!failed_) FinishBuffer(begin_, at_, level.buffer, depth_ ? &levels_[depth_ - 1].buffer : nullptr);
 }
 
 void ImageWriter::BeginEntry(std::string_view name, std::uint32_t propType, std::uint32_t dataLen) {

@@ -16,6 +16,7 @@
 
 #include "dvs/data.h"
 #include "dvsdata/format.h"
+#include "dvsdata/open_buffer.h"
 
 namespace dvs::data {
 
@@ -136,9 +137,7 @@ public:
 
 private:
     struct Level {
-        std::size_t start;    // of the buffer
-        std::size_t summedTo; // bytes from start + 32 to here are in `sum`
-        std::uint32_t sum;
+        OpenBuffer buffer;
         std::size_t entryEnd; // of the entry being written
     };
 
