@@ -180,11 +180,14 @@ HYP_ReturnStatus DVSStatePortRemove(DVSwitch *sw, const char *portId, uint32_t k
     return HYP_OK;
 }
 
-void RemoveAllPorts(DVSwitch *sw) {
+bool RemoveAllPorts(DVSwitch *sw) {
     FrontOf(sw).bucketNum = 0; // no index, which would follow each step to nobody's use
-    WalkSlots(sw, [sw](DVSPort *port, uint32_t slot) {
+    bool endsHere = false;     // a slot just emptied is still marked: the next port would not be found
+    return !WalkSlots(sw, [&](DVSPort *port, uint32_t slot) {
         if (Prints(kTrace)) Message(kTrace, "DVSState_PortRemove %s, %s\n", sw->switchId, port->portId);
+        if (endsHere) return true;
         TakeOut(sw, port, slot);
+        endsHere = BitVector_IsSet(sw->portBitmap, slot);
         return false;
     });
 }

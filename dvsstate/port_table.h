@@ -32,9 +32,10 @@ extern uint32_t numPortsInUseHostWide;
 /// Removes the first port of this id and kind and frees its data. HYP_NOT_FOUND when there is none.
 [[nodiscard]] HYP_ReturnStatus DVSStatePortRemove(DVSwitch *sw, const char *portId, uint32_t kind);
 
-/// Removes the ports of a switch in slot order, up to a slot that is marked and holds none. By id and kind
-/// each would be found where it stands, as nothing of its kind is left before it, so none can fail to go.
-void RemoveAllPorts(DVSwitch *sw);
+/// Removes the ports of a switch in slot order, up to a slot that is marked and holds none, with what the
+/// removal of each by id and kind comes to. False when one cannot be removed, which stays with those behind
+/// it: its search ends at a slot emptied before it that the host's bit vector did not unmark.
+[[nodiscard]] bool RemoveAllPorts(DVSwitch *sw);
 
 /// The first port in slot order of this id and kind; none when there is none.
 [[nodiscard]] DVSPort *FindPort(DVSwitch *sw, std::string_view portId, uint32_t kind);

