@@ -19,12 +19,21 @@ import seam_check
 DEVICE = "device.h"
 
 
+def dynamic_names(nm, library, which):
+    """The plain names in a library's dynamic symbol table, without versions and parameters."""
+    out = subprocess.run([nm, "-D", "-C", which, library], check=True, capture_output=True, text=True).stdout
+    fields = (line.split(None, 2 if which == "--defined-only" else 1) for line in out.splitlines())
+    return {field[-1].split("@")[0].split("(")[0] for field in fields if field[-2] not in ("w", "v")}
+
+
 def undefined(nm, library):
-    """The plain names of what no system library has: those have a version behind an @."""
-    out = subprocess.run([nm, "-D", "-C", "--undefined-only", library], check=True, capture_output=True, text=True).stdout
-    names = {line.split(None, 1)[1] for line in out.splitlines() if "@" not in line and line.split()[0] == "U"}
-    names = {name.split("(")[0] for name in names}
-    # Sanitizers and coverage bring names of the compiler's own.
+    """What no library that this one is linked with has: a sanitizer's runtime takes over much of the system's."""
+    names = dynamic_names(nm, library, "--undefined-only")
+    for line in subprocess.run(["ldd", library], check=True, capture_output=True, text=True).stdout.splitlines():
+        path = next((word for word in line.split() if word.startswith("/")), None)
+        if path:
+            names -= dynamic_names(nm, path, "--defined-only")
+    # The compiler's own.
     return {name for name in names if not name.startswith("__")}
 
 
