@@ -82,6 +82,10 @@ sed 's/"vlan_id": 100/"vlan_id": 150/' site.json >moved.json
 run diff json:site.json json:moved.json && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
 run diff json:site.json json:moved.json --raw && exit 1 || [ $? -eq 1 ]
 
+say "A state of any size for trials: realistic, every known property, the same for the same seed"
+run generate --switches 4 --ports 100 --seed 7 trial.db
+run show trial.db --props '*.vlan' --columns port,value --no-headings | head -n 8 || true
+
 say "The first bytes of the smaller site, and what they are"
 run hexdump site.db | head -n 24 || true
 

@@ -36,6 +36,19 @@ Flaw EncodeVlan(const Record &, const Node &tree, std::vector<uint8_t> *) {
     return {};
 }
 
+// A value that was never told of failure criteria has none, rather than some that are all false: writing
+// those would leave a load's mark.
+void CompleteTeaming(const Record &record, std::span<const uint8_t> value, const layout::StoreField &,
+                     Node *tree) {
+    for (const char *name : {"failure_flags", "percentage", "full_duplex", "speed"}) {
+        const Field &field = *layout::Find(record, name);
+        for (const uint8_t byte : value.subspan(field.offset, field.width)) {
+            if (byte) return;
+        }
+    }
+    std::erase_if(tree->items, [](const Node &member) { return member.name == "failure_criteria"; });
+}
+
 // Only so many names have a slot.
 Flaw CountUplinks(const Record &record, const Node &tree) {
     const Node *order = tree.Find("uplink_port_order");
@@ -105,8 +118,8 @@ Flaw EncodeFilters(const Record &record, const Node &tree, std::vector<uint8_t> 
 
 constexpr OwnForm kOwnForms[] = {
     {9, CompleteSessions, EncodeSessions},
-    {17, nullptr, EncodeTeaming},
-    {18, nullptr, EncodeTeaming},
+    {17, CompleteTeaming, EncodeTeaming},
+    {18, CompleteTeaming, EncodeTeaming},
     {24, nullptr, EncodeVlan},
     {25, nullptr, EncodeVlan},
     {29, nullptr, EncodeFilters},

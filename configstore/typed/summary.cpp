@@ -23,6 +23,17 @@ std::string NumberText(const Node &node) {
     return *node.unit ? number + " " + node.unit : number;
 }
 
+// "100 Mbit/s" where that says all of it.
+std::string RateText(const Node &node) {
+    constexpr std::pair<int64_t, const char *> kSteps[] = {
+        {1'000'000'000, " G"}, {1'000'000, " M"}, {1'000, " k"}};
+    for (const auto &[step, letter] : kSteps) {
+        if (node.number > 0 && node.number % step == 0)
+            return std::to_string(node.number / step) + letter + node.unit;
+    }
+    return NumberText(node);
+}
+
 int64_t NumberOf(const Node &object, std::string_view name) {
     const Node *member = object.Find(name);
     return member ? member->number : 0;
@@ -70,7 +81,7 @@ std::string SummarizeShaping(const Node &tree) {
     for (const auto &[name, words] :
          {std::pair("average_bandwidth", "average "), std::pair("peak_bandwidth", "peak "),
           std::pair("burst_size", "burst ")}) {
-        if (const Node *limit = tree.Find(name)) parts.push_back(words + NumberText(*limit));
+        if (const Node *limit = tree.Find(name)) parts.push_back(words + RateText(*limit));
     }
     return Join(parts);
 }

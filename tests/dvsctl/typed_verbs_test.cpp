@@ -46,7 +46,7 @@ protected:
 TEST_F(Typed, ShowSaysWhatPropertiesMean) {
     const std::string out = Dvsctl({"show", At("site.db")}).out;
     EXPECT_TRUE(Has(out, "trunk 1-10,20-30")) << out;
-    EXPECT_TRUE(Has(out, "average 1000000 bit/s, peak 2000000 bit/s")) << out;
+    EXPECT_TRUE(Has(out, "average 1 Mbit/s, peak 2 Mbit/s")) << out;
     EXPECT_TRUE(Has(out, "LOADBALANCE_SRCID, active uplink1, standby uplink2")) << out;
     EXPECT_TRUE(Has(out, "notify_switches")) << out;
 }
@@ -94,6 +94,8 @@ TEST_F(Typed, CopiesComeBackByteForByte) {
 TEST_F(Typed, TheExampleSiteIsTypedAndComesBack) {
     const std::string example = "json:" DVS_SOURCE_DIR "/examples/site.json";
     ASSERT_EQ(Dvsctl({"copy", example, At("example.db")}).status, 0);
+    ASSERT_EQ(Dvsctl({"copy", At("example.db"), "json:" + At("typed.json")}).status, 0);
+    EXPECT_FALSE(Has(Get("typed.json"), "base64"));
     const std::string out = Dvsctl({"show", At("example.db")}).out;
     for (const char *part : {"200/201 ISOLATED", "trunk 0-4094", "VLAN 100", "mode ACTIVE", "FAIL_OPEN",
                              "REMOTE_MIRROR_SOURCE", "collector_address 198.51.100.7", "interval 60"})
@@ -122,6 +124,18 @@ TEST_F(Typed, DiffNamesTheRecordsFieldWhereTheMeaningIsTheSame) {
     EXPECT_EQ(diff.status, 1);
     EXPECT_TRUE(Has(diff.out, "port.vlan: VLAN 100\n")) << diff.out;
     EXPECT_TRUE(Has(diff.out, "~ reserved of the record: ")) << diff.out;
+}
+
+TEST_F(Typed, DiffNamesTheSizeWhereNothingElseDiffers) {
+    for (const auto &[name, value] : {std::pair("a.db", "true\0"s), std::pair("b.db", "true\0f"s)})
+        PutState(name,
+                 EncodeList(std::vector<dvs::ctl::NewEntry>{MakeSwitch(
+                     "s", {}, {},
+                     {MakeList("7", {MakeProperty("com.orbeno.common.port.block", Raw(value), 0x10)})})}));
+    const Result diff = Dvsctl({"diff", At("a.db"), At("b.db")});
+    EXPECT_EQ(diff.status, 1);
+    EXPECT_TRUE(Has(diff.out, "com.orbeno.common.port.block: true\n")) << diff.out;
+    EXPECT_TRUE(Has(diff.out, "~ size of the record: 5 -> 6 bytes")) << diff.out;
 }
 
 TEST_F(Typed, DiffSaysBothMeanings) {

@@ -173,6 +173,9 @@ std::vector<std::string> RecordChanges(const Owner &owner, const Property &befor
         if (was != left.end() && was->second != now)
             lines.push_back(Escape(fmt::format("~ {} of the record: {} -> {}", item.path, was->second, now)));
     });
+    if (lines.empty() && before.value.size() != after.value.size())
+        lines.push_back(
+            fmt::format("~ size of the record: {} -> {} bytes", before.value.size(), after.value.size()));
     return lines;
 }
 

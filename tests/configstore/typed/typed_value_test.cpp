@@ -77,7 +77,7 @@ TEST_F(Typed, SummarizesWhatPeopleLookFor) {
         {kPort, "com.orbeno.vswitch.port.vlan", Bytes().U16(0).U16(5).U32(0), "VLAN 5"},
         {kPort, kTeaming, Teaming(3), "LOADBALANCE_SRCID, active up1, up2, standby up3"},
         {kPort, "com.orbeno.common.port.shaper.input", Bytes().U64(1000000).U64(2000000).U64(100),
-         "average 8000000 bit/s, peak 16000000 bit/s, burst 800 bit"},
+         "average 8 Mbit/s, peak 16 Mbit/s, burst 800 bit"},
         {kPort, "com.orbeno.etherswitch.port.security", Bytes().U32(5),
          "rejects promiscuous mode, forged transmits"},
         {kPort, "com.orbeno.vswitch.port.security", Bytes().U32(0), "rejects nothing"},
