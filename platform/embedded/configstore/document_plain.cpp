@@ -11,6 +11,7 @@
 #include <bit>
 #include <cassert>
 #include <cstring>
+#include <span>
 #include <string>
 #include <vector>
 
@@ -27,6 +28,26 @@ static_assert(kMaxPlainDepth < kMaxDepth);
 
 constexpr std::size_t kWord = sizeof(uint64_t);
 constexpr std::size_t kEmptyList = 2; // bytes: {}
+
+/// May reorder the hashes.
+bool AllDiffer(std::span<uint64_t> hashes) {
+    constexpr std::size_t kFew = 32;
+    if (hashes.size() <= kFew) {
+        std::sort(hashes.begin(), hashes.end());
+        return std::adjacent_find(hashes.begin(), hashes.end()) == hashes.end();
+    }
+    // Many are not sorted, which takes longer than reading them. Half of a hash and its place are enough.
+    std::vector<uint32_t> seen(std::bit_ceil(hashes.size() + hashes.size() / 3)); // 0 is nothing
+    for (const uint64_t hash : hashes) {
+        const auto half = static_cast<uint32_t>(hash >> 32 | 1);
+        std::size_t at = hash & (seen.size() - 1);
+        for (; seen[at] != 0; at = (at + 1) & (seen.size() - 1)) {
+            if (seen[at] == half) return false;
+        }
+        seen[at] = half;
+    }
+    return true;
+}
 
 class PlainReader {
 public:
@@ -68,36 +89,46 @@ private:
         if (!shape || depth > kMaxPlainDepth) return false;
         if (*at_ == '}') return TakeEnd(depth);
         uint64_t seen = 0;
-        const void *before = shape;
+        uint32_t before = shape->Number();
         do {
             const Field *const field = NextField(shape, before);
             if (!field) return false;
             const uint64_t bit = uint64_t{1} << field->index;
             if (seen & bit) return false;
             seen |= bit;
-            before = field;
+            before = field->number;
             Object *const member = AddDescribed(tree_, object, field);
             if (!Value(member, field, depth)) return false;
         } while (Take(','));
         return TakeEnd(depth);
     }
 
-    /// A name with its colon. What came behind a field once, mostly comes behind it again.
-    const Field *NextField(const Shape *shape, const void *before) {
-        Guess &guess = guesses_[(reinterpret_cast<uintptr_t>(before) / sizeof(Field)) % guesses_.size()];
-        if (guess.before == before) {
-            const std::string &prefix = guess.field->prefix;
-            if (prefix.size() <= static_cast<std::size_t>(last_ - at_) &&
-                std::memcmp(at_, prefix.data(), prefix.size()) == 0) {
-                at_ += prefix.size();
-                return guess.field;
-            }
+    /// A name with its colon. What came behind a field once, mostly comes behind it again. `before` is the
+    /// number of that field, or of the shape.
+    const Field *NextField(const Shape *shape, uint32_t before) {
+        const Field *const guess = before < next_.size() ? next_[before] : nullptr;
+        if (guess && IsNext(*guess)) {
+            at_ += guess->prefix.size();
+            return guess;
         }
         std::string_view name;
         if (!Text(&name) || !Take(':')) return nullptr;
         const Field *const field = shape->Find(name);
-        if (field) guess = {before, field};
+        if (field && before < next_.size()) next_[before] = field;
         return field;
+    }
+
+    [[nodiscard]] bool IsNext(const Field &field) const {
+        if (last_ - at_ < static_cast<std::ptrdiff_t>(sizeof field.words)) return false;
+        uint64_t word = 0;
+        const char *at = at_;
+        const uint64_t *wanted = field.words.data();
+        for (uint32_t left = field.wordNum; left > 1; left--, at += kWord) {
+            std::memcpy(&word, at, kWord);
+            if (word != *wanted++) return false;
+        }
+        std::memcpy(&word, at, kWord);
+        return field.wordNum > 0 && (word & field.lastMask) == *wanted;
     }
 
     bool Value(Object *node, const Field *field, std::size_t depth) {
@@ -116,15 +147,15 @@ private:
         case '"':
             return TextValue(node, field);
         case 't':
-            return Literal(node, "true", Kind::Bool, true);
+            return Literal(node, field, "true", Kind::Bool, true);
         case 'f':
-            return Literal(node, "false", Kind::Bool, false);
+            return Literal(node, field, "false", Kind::Bool, false);
         case 'n':
-            return Literal(node, "null", Kind::Null, false);
+            return Literal(node, field, "null", Kind::Null, false);
         default:
             if (!Integer(&node->integer)) return false;
             node->kind = Kind::Integer;
-            Judge(tree_, node);
+            if (field->type != FieldType::Integer || !IntegerFits(field, node->integer)) Judge(tree_, node);
             return true;
         }
     }
@@ -171,11 +202,9 @@ private:
             if (!Members(AddInstance(tree_, list, id), shape, depth + 1)) return false;
         } while (Take(','));
         if (!TakeEnd(depth)) return false;
-        const auto from = ids_.begin() + static_cast<std::ptrdiff_t>(firstId);
-        std::sort(from, ids_.end());
-        const bool twice = std::adjacent_find(from, ids_.end()) != ids_.end();
+        const bool differ = AllDiffer(std::span(ids_).subspan(firstId));
         ids_.resize(firstId);
-        return !twice;
+        return differ;
     }
 
     /// Behind the opening bracket, through the closing one.
@@ -217,7 +246,7 @@ private:
         }
         node->kind = Kind::Text;
         node->span = {tree_->arena.Copy(text), text.size()};
-        Judge(tree_, node);
+        if (field->type != FieldType::Text || !TextFits(field, text.size())) Judge(tree_, node);
         return true;
     }
 
@@ -229,14 +258,15 @@ private:
         return true;
     }
 
-    bool Literal(Object *node, std::string_view word, Kind kind, bool value) {
-        if (static_cast<std::size_t>(last_ - at_) < word.size() ||
-            std::memcmp(at_, word.data(), word.size()) != 0)
+    template <std::size_t kSize>
+    bool Literal(Object *node, const Field *field, const char (&word)[kSize], Kind kind, bool value) {
+        constexpr std::size_t kLength = kSize - 1;
+        if (static_cast<std::size_t>(last_ - at_) < kLength || std::memcmp(at_, word, kLength) != 0)
             return false;
-        at_ += word.size();
+        at_ += kLength;
         node->kind = kind;
         if (kind == Kind::Bool) node->boolean = value;
-        Judge(tree_, node);
+        if (kind != Kind::Bool || field->type != FieldType::Bool) Judge(tree_, node);
         return true;
     }
 
@@ -320,11 +350,6 @@ private:
         }
     }
 
-    struct Guess {
-        const void *before = nullptr; // the field before, or the shape
-        const Field *field = nullptr;
-    };
-
     Tree *const tree_;
     const char *const start_;
     const char *at_;
@@ -332,7 +357,7 @@ private:
     const Outline *const known_;
     const Lists lists_;
     Outline found_;
-    std::array<Guess, 128> guesses_{};
+    std::array<const Field *, 256> next_{}; // by the number of the field before, or of the shape
     std::string unescaped_;
     std::vector<uint64_t> ids_; // of the lists of instances being read
 };

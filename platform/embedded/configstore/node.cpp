@@ -93,29 +93,43 @@ Tree::~Tree() {
 
 Tree *TreeOf(Object *node) {
     while (!node->isRoot) {
-        if (node->kind == Kind::Dead || !node->parent) return nullptr;
+        if (node->kind == Kind::Dead) return nullptr;
         node = node->parent;
     }
-    return node->kind == Kind::Dead ? nullptr : reinterpret_cast<Tree *>(node);
+    return reinterpret_cast<Tree *>(node);
 }
 
-const Shape *ShapeOf(const Object *object) {
-    if (object->isRoot) return reinterpret_cast<const Tree *>(object)->shape;
-    if (object->described) return object->field->shape;
-    const Object *const list = object->parent;
-    if (list->kind == Kind::Instances && list->described) return list->field->shape;
-    return nullptr;
+namespace {
+
+Object *WithField(const Object *object, const Field *field) {
+    if (!(object->present & field->mark)) return nullptr;
+    Object *member = object->members.first;
+    while (member && member->field != field) // a name is never at a field's address
+        member = member->next;
+    return member;
 }
 
-// Names are told apart by the shape or by their texts, and the texts are enough: where the shape knows a
-// name, every member of that name has its field. Objects are small; comparing lengths costs less than a hash.
+Object *Undescribed(const Object *object, std::string_view name) {
+    if (!(object->present & kUndescribedMark)) return nullptr;
+    Object *member = object->members.first;
+    while (member && (member->described || NameOf(member) != name))
+        member = member->next;
+    return member;
+}
+
+} // namespace
+
+// Where the shape knows a name, every member of that name has its field.
 Object *FindMember(Object *object, std::string_view name) {
-    for (Object *member = object->members.first; member; member = member->next) {
-        const std::string_view own = NameOf(member);
-        if (own.size() == name.size() && std::memcmp(own.data(), name.data(), name.size()) == 0)
-            return member;
-    }
-    return nullptr;
+    const Shape *const shape = ShapeOf(object);
+    const Field *const field = shape ? shape->Find(name) : nullptr;
+    return field ? WithField(object, field) : Undescribed(object, name);
+}
+
+Object *FindMember(Object *object, const char *name) {
+    const Shape *const shape = ShapeOf(object);
+    const Field *const field = shape ? shape->FindAgain(name) : nullptr;
+    return field ? WithField(object, field) : Undescribed(object, name);
 }
 
 Object *FindInstance(Object *list, std::string_view id) {
@@ -191,6 +205,19 @@ void MakeInstances(Tree *tree, Object *node) {
     node->table = table;
 }
 
+namespace {
+
+/// Of a node and all below it: nobody need walk up from a node to know whether it is still there.
+void MarkDead(Object *node) {
+    if (node->kind == Kind::Object || node->kind == Kind::Instances) {
+        for (Object *child = FirstChild(node); child; child = child->next)
+            MarkDead(child);
+    }
+    node->kind = Kind::Dead;
+}
+
+} // namespace
+
 void RemoveChild(Object *container, Object *child) {
     const bool instances = container->kind == Kind::Instances;
     Object *before = nullptr;
@@ -200,7 +227,7 @@ void RemoveChild(Object *container, Object *child) {
     Object *&last = instances ? container->table->last : container->members.last;
     (before ? before->next : first) = child->next;
     if (last == child) last = before;
-    child->kind = Kind::Dead;
+    MarkDead(child);
     if (instances) {
         container->table->count--;
         DropIndex(container->table);
@@ -209,7 +236,7 @@ void RemoveChild(Object *container, Object *child) {
 
 void RemoveAllChildren(Object *container) {
     for (Object *child = FirstChild(container); child; child = child->next)
-        child->kind = Kind::Dead;
+        MarkDead(child);
     if (container->kind == Kind::Instances) {
         InstanceTable *const table = container->table;
         DropIndex(table);
@@ -217,6 +244,7 @@ void RemoveAllChildren(Object *container) {
         table->count = 0;
     } else {
         container->members = {nullptr, nullptr};
+        container->present = 0;
     }
 }
 

@@ -24,7 +24,8 @@
 namespace configstore {
 
 enum class Kind : uint8_t {
-    Dead, // deleted; kept so that a stale handle meets a refusal and not somebody else's node
+    Dead, // deleted, or below what is; kept so that a stale handle meets a refusal and not somebody else's
+          // node
     Null,
     Bool,
     Integer,
@@ -92,10 +93,12 @@ struct Object {
     };
     Kind kind;
     bool described;
-    bool bad;         // not what the schema allows here
-    bool isRoot;      // the node is the first member of a Tree
-    bool maybeBinary; // a Text of an unknown name in a document, where binary values are texts too
+    bool bad : 1;         // not what the schema allows here
+    bool isRoot : 1;      // the node is the first member of a Tree
+    bool maybeBinary : 1; // a Text of an unknown name in a document, where binary values are texts too
+    uint32_t present;     // Object: marks of its members, and of some that it had
 };
+static_assert(sizeof(Object) == 48); // documents of nothing but small values are mostly these
 
 struct Tree {
     Object root; // first: a root handle is its tree's address
@@ -113,6 +116,14 @@ struct Tree {
     Tree &operator=(const Tree &) = delete;
 };
 
+/// Of an Object; null where nothing is known.
+[[nodiscard]] inline const Shape *ShapeOf(const Object *object) {
+    if (object->described) return object->field->shape;
+    if (object->isRoot) return reinterpret_cast<const Tree *>(object)->shape;
+    const Object *const list = object->parent;
+    return list->kind == Kind::Instances && list->described ? list->field->shape : nullptr;
+}
+
 /// What a filter spec selects by; also the address of a store object.
 struct FilterSpec {
     std::string key, group, component, instance;
@@ -128,9 +139,9 @@ struct FilterSpec {
     return node->described ? std::string_view(node->field->name)
                            : std::string_view(node->name->text, node->name->size);
 }
-[[nodiscard]] Tree *TreeOf(Object *node);                 // null below a deleted node
-[[nodiscard]] const Shape *ShapeOf(const Object *object); // of an Object; null where nothing is known
+[[nodiscard]] Tree *TreeOf(Object *node); // null of a deleted node
 [[nodiscard]] Object *FindMember(Object *object, std::string_view name);
+[[nodiscard]] Object *FindMember(Object *object, const char *name);
 [[nodiscard]] Object *FindInstance(Object *list, std::string_view id);
 [[nodiscard]] Object *FirstChild(const Object *container); // of an Object or Instances
 /// "settings/vlan/vlan_id", with the ids of instances in brackets.
@@ -152,9 +163,11 @@ inline Object *NewNode(Arena &arena, Object *parent) {
     node->bad = false;
     node->isRoot = false;
     node->maybeBinary = false;
+    node->present = 0;
     return node;
 }
 inline void LinkMember(Object *object, Object *member) {
+    object->present |= member->described ? member->field->mark : kUndescribedMark;
     (object->members.last ? object->members.last->next : object->members.first) = member;
     object->members.last = member;
 }
@@ -175,6 +188,7 @@ Object *AddInstance(Tree *tree, Object *list, std::string_view id);
 inline void MakeObject(Object *node) {
     node->kind = Kind::Object;
     node->members = {nullptr, nullptr};
+    node->present = 0;
 }
 void MakeInstances(Tree *tree, Object *node);
 void RemoveChild(Object *container, Object *child);

@@ -23,33 +23,32 @@ bool IsObject(const Object *object) {
 }
 
 /// A member as a list of instances: null when it is something else.
-Object *AsInstances(Tree *tree, Object *member) {
-    if ((member->kind == Kind::Raw || member->kind == Kind::Later) && !Expand(tree, member)) return nullptr;
-    if (member->kind == Kind::Object && !TreatAsInstances(tree, member)) return nullptr;
+Object *AsInstances(Object *member) {
+    if ((member->kind == Kind::Raw || member->kind == Kind::Later) && !Expand(TreeOf(member), member))
+        return nullptr;
+    if (member->kind == Kind::Object && !TreatAsInstances(TreeOf(member), member)) return nullptr;
     return member->kind == Kind::Instances ? member : nullptr;
 }
 
 /// A member or instance as an object: null when it is something else.
-Object *AsObject(Tree *tree, Object *node) {
-    if (node->kind == Kind::Raw && !Expand(tree, node)) return nullptr;
+Object *AsObject(Object *node) {
+    if (node->kind == Kind::Raw && !Expand(TreeOf(node), node)) return nullptr;
     return node->kind == Kind::Object ? node : nullptr;
 }
 
 int32_t Find(Object *parent, const char *name, const char *instanceId, Object **out) {
-    Tree *const tree = TreeOf(parent);
-    if (!tree) return BAD_PARAMETER;
     Object *const member = FindMember(parent, name);
     if (!member) return NOT_FOUND;
     const std::string_view id = IdOf(instanceId);
     Object *node = member;
     if (!id.empty()) {
         if (member->kind == Kind::EmptyList) return NOT_FOUND;
-        Object *const list = AsInstances(tree, member);
+        Object *const list = AsInstances(member);
         if (!list) return SCHEMA_VIOLATION;
         node = FindInstance(list, id);
         if (!node) return NOT_FOUND;
     }
-    node = AsObject(tree, node);
+    node = AsObject(node);
     if (!node) return SCHEMA_VIOLATION;
     *out = node;
     return OK;
@@ -57,7 +56,7 @@ int32_t Find(Object *parent, const char *name, const char *instanceId, Object **
 
 int32_t CreateSingleton(Tree *tree, Object *parent, const char *name, Object *member, Object **out) {
     if (member) {
-        if (!AsObject(tree, member)) return SCHEMA_VIOLATION;
+        if (!AsObject(member)) return SCHEMA_VIOLATION;
         RemoveAllChildren(member);
     } else {
         member = AddMember(tree, parent, name);
@@ -75,12 +74,12 @@ int32_t CreateInstance(Tree *tree, Object *parent, const char *name, Object *mem
         member->kind = Kind::EmptyList;
     }
     if (member->kind == Kind::EmptyList) MakeInstances(tree, member);
-    if (!AsInstances(tree, member)) return SCHEMA_VIOLATION;
+    if (!AsInstances(member)) return SCHEMA_VIOLATION;
     Object *instance = FindInstance(member, id);
     if (!instance) {
         instance = AddInstance(tree, member, id);
     } else {
-        if (!AsObject(tree, instance)) return SCHEMA_VIOLATION;
+        if (!AsObject(instance)) return SCHEMA_VIOLATION;
         RemoveAllChildren(instance);
     }
     Judge(tree, member);
@@ -95,53 +94,53 @@ void RemoveInstance(Object *parent, Object *list, Object *instance) {
 
 /// Whether a search for `key` goes on in the child: in singletons. What is kept as text of an object that the
 /// schema does not know counts as one, and is read only where it has that name in it.
-bool LeadsOn(Tree *tree, Object *child, std::string_view key) {
+bool LeadsOn(Object *child, std::string_view key) {
     if (child->kind != Kind::Raw || child->described) return child->kind == Kind::Object;
     Buffer name;
     WriteText(key, false, &name);
     const std::string_view text(child->span.data, child->span.size);
-    return text.front() == '{' && text.find(name.View()) != std::string_view::npos && AsObject(tree, child);
+    return text.front() == '{' && text.find(name.View()) != std::string_view::npos && AsObject(child);
 }
 
 /// What a filter spec selects on one object that has a member of its key.
-int32_t SelectMember(Tree *tree, Object *member, const FilterSpec &spec, std::vector<Object *> *found) {
-    if (member->kind == Kind::Raw && !Expand(tree, member)) return OK;
+int32_t SelectMember(Object *member, const FilterSpec &spec, std::vector<Object *> *found) {
+    if (member->kind == Kind::Raw && !Expand(TreeOf(member), member)) return OK;
     if (member->kind == Kind::TextList) {
         // The elements have nothing to tell but how many they are: each is the list's own handle.
         found->insert(found->end(), member->list->count, member);
         return OK;
     }
-    if (!AsInstances(tree, member)) return OK;
+    if (!AsInstances(member)) return OK;
     if (!spec.instance.empty()) {
         Object *const instance = FindInstance(member, spec.instance);
-        if (instance && !AsObject(tree, instance)) return SCHEMA_VIOLATION;
+        if (instance && !AsObject(instance)) return SCHEMA_VIOLATION;
         if (instance) found->push_back(instance);
         return OK;
     }
     for (Object *instance = member->table->first; instance; instance = instance->next) {
-        if (!AsObject(tree, instance)) return SCHEMA_VIOLATION;
+        if (!AsObject(instance)) return SCHEMA_VIOLATION;
         found->push_back(instance);
     }
     return OK;
 }
 
-int32_t Select(Tree *tree, Object *object, const FilterSpec &spec, std::vector<Object *> *found) {
-    if (Object *const member = FindMember(object, spec.key)) return SelectMember(tree, member, spec, found);
+int32_t Select(Object *object, const FilterSpec &spec, std::vector<Object *> *found) {
+    if (Object *const member = FindMember(object, spec.key)) return SelectMember(member, spec, found);
     for (Object *child = object->members.first; child; child = child->next) {
-        if (!LeadsOn(tree, child, spec.key)) continue;
-        if (const int32_t status = Select(tree, child, spec, found); status != OK) return status;
+        if (!LeadsOn(child, spec.key)) continue;
+        if (const int32_t status = Select(child, spec, found); status != OK) return status;
     }
     return OK;
 }
 
-bool DeleteSelected(Tree *tree, Object *object, const FilterSpec &spec) {
+bool DeleteSelected(Object *object, const FilterSpec &spec) {
     if (Object *const member = FindMember(object, spec.key)) {
         if (member->kind == Kind::Later && spec.instance.empty()) {
             RemoveChild(object, member);
             return true;
         }
         std::vector<Object *> found;
-        if (SelectMember(tree, member, spec, &found) != OK) {
+        if (SelectMember(member, spec, &found) != OK) {
             // Something among the instances is not one; deleting them all gets rid of that as well.
             if (!spec.instance.empty()) return false;
             found.push_back(member);
@@ -159,7 +158,7 @@ bool DeleteSelected(Tree *tree, Object *object, const FilterSpec &spec) {
     Object *next = nullptr;
     for (Object *child = object->members.first; child; child = next) {
         next = child->next;
-        if (LeadsOn(tree, child, spec.key)) any |= DeleteSelected(tree, child, spec);
+        if (LeadsOn(child, spec.key)) any |= DeleteSelected(child, spec);
     }
     return any;
 }
@@ -239,10 +238,8 @@ int32_t DeleteSubObject(Object *parent, const char *name, const char *instanceId
 int32_t GetSubObjectInstances(Object *parent, const FilterSpec *spec, Object ***objects, int32_t *count) {
     if (!IsObject(parent) || !spec || !objects || !count) return BAD_PARAMETER;
     return Guarded([&]() -> int32_t {
-        Tree *const tree = TreeOf(parent);
-        if (!tree) return BAD_PARAMETER;
         std::vector<Object *> found;
-        if (const int32_t status = Select(tree, parent, *spec, &found); status != OK) return status;
+        if (const int32_t status = Select(parent, *spec, &found); status != OK) return status;
         if (found.empty()) return NOT_FOUND;
         if (found.size() > INT32_MAX) return FAILED;
         auto **const array = static_cast<Object **>(std::malloc(found.size() * sizeof(Object *)));
@@ -256,11 +253,7 @@ int32_t GetSubObjectInstances(Object *parent, const FilterSpec *spec, Object ***
 
 int32_t DeleteSubObjectInstances(Object *parent, const FilterSpec *spec) {
     if (!IsObject(parent) || !spec) return BAD_PARAMETER;
-    return Guarded([&]() -> int32_t {
-        Tree *const tree = TreeOf(parent);
-        if (!tree) return BAD_PARAMETER;
-        return DeleteSelected(tree, parent, *spec) ? OK : NOT_FOUND;
-    });
+    return Guarded([&]() -> int32_t { return DeleteSelected(parent, *spec) ? OK : NOT_FOUND; });
 }
 
 void FreeSubObjectArray(Object **objects) {

@@ -26,8 +26,12 @@ std::size_t Shape::Hash(std::string_view name) {
     if (name.size() >= 8) {
         std::memcpy(&first, name.data(), 8);
         std::memcpy(&last, name.data() + name.size() - 8, 8);
+    } else if (name.size() >= 4) {
+        std::memcpy(&first, name.data(), 4);
+        std::memcpy(&last, name.data() + name.size() - 4, 4);
     } else if (!name.empty()) {
-        std::memcpy(&first, name.data(), name.size());
+        std::memcpy(&first, name.data(), 1);
+        std::memcpy(&last, name.data() + name.size() - 1, 1);
     }
     const uint64_t mixed = (first ^ (last * 0x9e3779b97f4a7c15U) ^ name.size()) * 0xff51afd7ed558ccdU;
     return static_cast<std::size_t>(mixed >> 32);
@@ -42,9 +46,28 @@ const Field *Shape::Find(std::string_view name) const {
     return nullptr;
 }
 
+const Field *Shape::FindAnew(const char *name) const {
+    const Field *const field = Find(name);
+    if (!field) return nullptr;
+    // Two names that fall together get two places; a third one takes the second place.
+    const std::size_t at = GuessOf(name);
+    const bool isTaken = guesses_[at].load(std::memory_order_relaxed) != nullptr;
+    guesses_[isTaken ? at ^ 1 : at].store(field, std::memory_order_relaxed);
+    return field;
+}
+
 void Shape::Add(Field field) {
     field.prefix = '"' + field.name + "\":";
+    constexpr std::size_t kWord = sizeof field.words[0];
+    const std::size_t words = (field.prefix.size() + kWord - 1) / kWord;
+    if (words <= Field::kMaxWords) {
+        field.wordNum = static_cast<uint32_t>(words);
+        std::memcpy(field.words.data(), field.prefix.data(), field.prefix.size());
+        field.lastMask = UINT64_MAX >> (words * kWord - field.prefix.size()) * 8; // little-endian
+    }
     field.index = fields_.size();
+    field.mark = uint32_t{1} << field.index % 31;
+    static_assert(kUndescribedMark == uint32_t{1} << 31);
     owned_.push_back(std::move(field));
     fields_.push_back(&owned_.back());
     Rehash();
@@ -90,12 +113,14 @@ private:
         shapes_.emplace_back();
         Shape *const shape = &shapes_.back();
         known_.emplace(&node, shape);
+        shape->SetNumber(++number_);
         const json::object &properties = node.at("properties").as_object();
         if (properties.size() > Shape::kMaxFields)
             throw std::runtime_error("an object with too many properties");
         for (const auto &[name, value] : properties) {
             Field field = FieldOf(value);
             field.name.assign(name.data(), name.size());
+            field.number = ++number_;
             shape->Add(std::move(field));
         }
         return shape;
@@ -154,6 +179,7 @@ private:
     std::deque<Shape> shapes_;
     std::map<const json::value *, const Shape *> known_;
     const Shape *root_ = nullptr;
+    uint32_t number_ = 0;
 };
 
 void CompiledSchemaDeleter::operator()(CompiledSchema *schema) const {

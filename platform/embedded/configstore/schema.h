@@ -7,7 +7,10 @@
 // process. The nodes of a tree (node.h) point to these descriptors, so that checking a value needs no walk
 // and no lookup.
 
+#include <array>
+#include <atomic>
 #include <cstdint>
+#include <cstring>
 #include <deque>
 #include <memory>
 #include <string>
@@ -30,6 +33,9 @@ enum class FieldType : uint8_t {
 
 class Shape;
 
+/// The mark of all members without a field.
+inline constexpr uint32_t kUndescribedMark = uint32_t{1} << 31;
+
 struct Field {
     std::string name;
     FieldType type = FieldType::Any;
@@ -39,7 +45,14 @@ struct Field {
     uint64_t maxItems = UINT64_MAX; // of a list, or instances; imports only
     const Shape *shape = nullptr;
     std::size_t index = 0; // among the fields of the shape that has it
+    uint32_t mark = 0;     // the bit by which an object tells whether it may have such a member
     std::string prefix;    // the name as a document writes it: "name":
+    uint32_t number = 0;   // among the fields and shapes of the schema, from 1
+    // The prefix once more, for comparing it word by word; no words when it is longer than that.
+    static constexpr std::size_t kMaxWords = 5;
+    std::array<uint64_t, kMaxWords> words{};
+    uint64_t lastMask = 0; // of what counts in the last word
+    uint32_t wordNum = 0;
 };
 
 /// The fields of one kind of object, found by name.
@@ -48,16 +61,35 @@ public:
     static constexpr std::size_t kMaxFields = 64; // a reader marks what it has seen in one 64-bit word
 
     [[nodiscard]] const Field *Find(std::string_view name) const;
+    /// The same for a name that is asked for again and again, as those that stand in the code are: where a
+    /// text stood before, the same text mostly stands again.
+    [[nodiscard]] const Field *FindAgain(const char *name) const {
+        const std::size_t at = GuessOf(name);
+        const Field *field = guesses_[at].load(std::memory_order_relaxed);
+        if (field && std::strcmp(field->name.c_str(), name) == 0) return field;
+        field = guesses_[at ^ 1].load(std::memory_order_relaxed);
+        return field && std::strcmp(field->name.c_str(), name) == 0 ? field : FindAnew(name);
+    }
     [[nodiscard]] const std::vector<const Field *> &Fields() const { return fields_; }
     void Add(Field field);
+    void SetNumber(uint32_t number) { number_ = number; }
+    [[nodiscard]] uint32_t Number() const { return number_; }
 
 private:
+    static std::size_t GuessOf(const char *name) {
+        return reinterpret_cast<uintptr_t>(name) * 0x9e3779b97f4a7c15U >> (64 - kGuessBits);
+    }
+    const Field *FindAnew(const char *name) const;
     static std::size_t Hash(std::string_view name);
     void Rehash();
 
+    uint32_t number_ = 0; // as a field's
     std::deque<Field> owned_;
     std::vector<const Field *> fields_;
     std::vector<const Field *> slots_; // open addressing, a power of two, at most half full
+    static constexpr unsigned kGuessBits = 8;
+    /// By the address of the name. Guesses only: any thread may put in another at any time.
+    mutable std::array<std::atomic<const Field *>, std::size_t{1} << kGuessBits> guesses_{};
 };
 
 /// The shape of the objects of a key and group; null when the store has no schema for them.

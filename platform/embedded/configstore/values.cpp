@@ -48,7 +48,7 @@ int32_t PutInteger(Object *object, const char *name, int64_t value) {
 
 /// Finds a value for a getter; `out` is the getter's output, which must be there.
 int32_t Lookup(Object *object, const char *name, const void *out, Object **value) {
-    if (!out || !CheckTarget(object, name)) return BAD_PARAMETER;
+    if (!out || !object || object->kind != Kind::Object || !name || !*name) return BAD_PARAMETER;
     Object *const member = FindMember(object, name);
     if (!member) return NOT_FOUND;
     *value = member;

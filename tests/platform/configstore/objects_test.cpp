@@ -3,6 +3,8 @@
 
 #include "platform/configstore/support.h"
 
+#include <cstring>
+
 using namespace configstore;
 using namespace store_test;
 
@@ -98,6 +100,33 @@ TEST(StoreObjects, DeletedHandleIsRefused) {
     ASSERT_EQ(DeleteSubObject(object.get(), "settings", ""), OK);
     EXPECT_EQ(SetValueBool(settings, "x", true), BAD_PARAMETER);
     EXPECT_EQ(SetValueBool(beacon, "x", true), BAD_PARAMETER);
+}
+
+TEST(StoreObjects, HandlesBelowWhatIsDeletedAreRefused) {
+    const ObjectPtr object = NewSwitch();
+    Object *const vlan = Sub(Sub(Sub(object.get(), "ports", "1"), "settings"), "vlan");
+    Object *const shares = Sub(Sub(Sub(object.get(), "settings"), "unheard_of"), "of");
+    ASSERT_EQ(SetValueBool(shares, "flag", true), OK);
+    ASSERT_EQ(DeleteSubObject(object.get(), "ports", "1"), OK);
+    Object *out = nullptr;
+    ASSERT_EQ(CreateSubObject(object.get(), "settings", "", &out), OK) << "emptied";
+    bool flag = false;
+    EXPECT_EQ(GetValueBool(shares, "flag", &flag), BAD_PARAMETER);
+    uint32_t number = 0;
+    EXPECT_EQ(GetValueUint32(vlan, "vlan_id", &number), BAD_PARAMETER);
+    EXPECT_EQ(GetSubObject(vlan, "trunk_vlan_ids", "1", &out), BAD_PARAMETER);
+}
+
+TEST(StoreObjects, NamesAreToldApartByTheirTextsNotByWhereTheyStand) {
+    const ObjectPtr object = NewSwitch(R"({"name":"n","uuid":"u","new":"w"})");
+    char name[8] = "name";
+    EXPECT_EQ(Text(object.get(), name), "n");
+    std::strcpy(name, "uuid");
+    EXPECT_EQ(Text(object.get(), name), "u");
+    std::strcpy(name, "new");
+    EXPECT_EQ(Text(object.get(), name), "w");
+    std::strcpy(name, "newer");
+    EXPECT_EQ(Text(object.get(), name), "<6>");
 }
 
 TEST(StoreObjects, InstancesComeInInsertionOrder) {
