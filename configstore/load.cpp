@@ -18,6 +18,7 @@
 #include "configstore/converters/switch_version.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
+#include "configstore/maps/prop_loader.h"
 #include "configstore/switch_object.h"
 #include "dvsdata/emit.h"
 #include "dvsdata/growing_image.h"
@@ -86,9 +87,15 @@ struct Target {
         return HYP_OK;
     }
     [[nodiscard]] int32_t AppendProps(const char *name, configstore::Object *object, uint32_t propClass,
-                                      uint32_t version, configstore::Object *resources) const {
-        return image ? LoadPropsInto(image, name, object, propClass, version, resources)
-                     : LoadProps(name, object, list, propClass, version, resources);
+                                      uint32_t version) const {
+        return image ? PropLoader(propClass).LoadInto(image, name, object, version, nullptr)
+                     : LoadProps(name, object, list, propClass, version, nullptr);
+    }
+    /// `loader` is one of ports.
+    [[nodiscard]] int32_t AppendPort(const char *key, configstore::Object *port, uint32_t version,
+                                     configstore::Object *resources, PropLoader *loader) const {
+        return image ? loader->LoadInto(image, key, port, version, resources)
+                     : LoadProps(key, port, list, DVS_PROP_CLASS_PORT, version, resources);
     }
 };
 
@@ -136,13 +143,11 @@ private:
     bool isSound_ = true;
 };
 
-int32_t LoadPort(configstore::Object *port, const char *key, const Target &target, uint32_t version,
-                 const StoreTexts &uplinkKeys, configstore::Object *resources) {
+bool IsUplink(const char *key, const StoreTexts &uplinkKeys) {
     const auto uplinks = uplinkKeys.items();
     // The function only reads; C's const does not reach through two pointers.
-    const bool isUplink = StringExistInArray(key, const_cast<const char **>(uplinks.data()),
-                                             static_cast<uint32_t>(uplinks.size()));
-    return target.AppendProps(key, port, DVS_PROP_CLASS_PORT, version, isUplink ? resources : nullptr);
+    return StringExistInArray(key, const_cast<const char **>(uplinks.data()),
+                              static_cast<uint32_t>(uplinks.size()));
 }
 
 // The store's "not found" ends the walk over the ports without failing the switch, wherever it comes from:
@@ -159,11 +164,15 @@ int32_t LoadPorts(configstore::Object *object, const Target &target, uint32_t ve
     status = uplinkKeys.Read(object, "uplink_port_keys");
     EntryNames names(target.image ? ports.items().size() : 0);
     if (target.image) target.image->Expect(ports.items().size() * kUsualPortSize);
+    PropLoader loader(DVS_PROP_CLASS_PORT);
     for (auto *port : ports.items()) {
         StoreText key;
         status = key.Read(port, "key");
         if (status == 0 && target.image) names.Add(key.get());
-        if (status == 0) status = LoadPort(port, key.get(), target, version, uplinkKeys, resources);
+        if (status == 0) {
+            auto *const shared = IsUplink(key.get(), uplinkKeys) ? resources : nullptr;
+            status = target.AppendPort(key.get(), port, version, shared, &loader);
+        }
         if (status) break;
     }
     if (target.image && !names.AreUnique()) target.image->GiveUp();
@@ -171,8 +180,8 @@ int32_t LoadPorts(configstore::Object *object, const Target &target, uint32_t ve
 }
 
 int32_t LoadProperties(configstore::Object *object, const Target &target, uint32_t version) {
-    int32_t status = target.AppendProps(kGlobalEntry, object, DVS_PROP_CLASS_GLOBAL, version, nullptr);
-    if (!status) status = target.AppendProps(kHostEntry, object, DVS_PROP_CLASS_HOST, version, nullptr);
+    int32_t status = target.AppendProps(kGlobalEntry, object, DVS_PROP_CLASS_GLOBAL, version);
+    if (!status) status = target.AppendProps(kHostEntry, object, DVS_PROP_CLASS_HOST, version);
     return status ? status : LoadPorts(object, target, version);
 }
 

@@ -46,16 +46,9 @@ void GrowingImage::Expect(std::size_t size) {
     if (!gaveUp_ && size > capacity_ - at_ && size < kMaxSize / 4) (void)Grow(size / 2);
 }
 
-std::uint8_t *GrowingImage::Claim(std::size_t size) {
-    if (gaveUp_ || (size > capacity_ - at_ && !Grow(size))) return nullptr;
-    std::uint8_t *const at = begin_ + at_;
-    at_ += size;
-    return at;
-}
-
 void GrowingImage::BeginBuffer() {
     assert(depth_ < kMaxDepth);
-    levels_[depth_++] = {OpenBufferAt(at_), 0, 0};
+    levels_[depth_++] = {OpenBufferAt(at_), 0, 0, 0};
     if (std::uint8_t *const header = Claim(kHeaderSize)) std::memset(header, 0, kHeaderSize);
 }
 
@@ -128,7 +121,9 @@ void GrowingImage::Update(std::string_view name, Bytes value, std::uint32_t prop
     assert(depth_ > 0);
     if (gaveUp_) return;
     Level &level = levels_[depth_ - 1];
-    const std::size_t found = Find(name);
+    const std::uint64_t mark = MarkOf(name);
+    const std::size_t found = level.names & mark ? Find(name) : at_;
+    level.names |= mark;
     std::uint32_t type = propType ? propType : kDefaultPropType;
     if (found == at_) {
         if (++level.entries > kMaxUpdates) gaveUp_ = true;

@@ -55,10 +55,22 @@ private:
         OpenBuffer buffer;
         std::size_t entry;     // the last one
         std::uint32_t entries; // by Update
+        std::uint64_t names;   // their marks (MarkOf)
     };
 
     /// Room at the end; null when there is none.
-    std::uint8_t *Claim(std::size_t size);
+    std::uint8_t *Claim(std::size_t size) {
+        if ((gaveUp_ || size > capacity_ - at_) && !MakeRoom(size)) return nullptr;
+        std::uint8_t *const at = begin_ + at_;
+        at_ += size;
+        return at;
+    }
+    bool MakeRoom(std::size_t size) { return !gaveUp_ && Grow(size); }
+    /// One of 64: entries whose marks differ have different names, and most are told apart by that.
+    [[nodiscard]] static std::uint64_t MarkOf(std::string_view name) {
+        const std::size_t last = name.empty() ? 0 : static_cast<std::uint8_t>(name.back());
+        return std::uint64_t{1} << (name.size() * 5 + last * 3) % 64;
+    }
     bool Grow(std::size_t size);
     void Put(std::string_view name, Bytes value, std::uint32_t propType);
     [[nodiscard]] std::size_t Find(std::string_view name) const;

@@ -51,13 +51,29 @@ void CopyBounded(std::span<uint8_t> slot, const char *text) {
     slot[length] = 0;
 }
 
-int32_t StoreAs(const LoadArgs &args, const char *key, std::span<const uint8_t> value, uint32_t propType) {
+int32_t StoreAs(const LoadArgs &args, std::string_view key, std::span<const uint8_t> value,
+                uint32_t propType) {
     if (args.image) {
         args.image->Update(key, value, propType);
         return 0;
     }
     return static_cast<int32_t>(
-        DVSData_Update(args.list, key, value.data(), static_cast<uint32_t>(value.size()), propType));
+        DVSData_Update(args.list, key.data(), value.data(), static_cast<uint32_t>(value.size()), propType));
+}
+
+int32_t KnownFilters::Get(const char *name, const configstore::FilterSpec **spec) {
+    for (std::size_t i = 0; i < num_; ++i) {
+        if (std::strcmp(known_[i].name, name) != 0) continue;
+        *spec = known_[i].filter.get();
+        return 0;
+    }
+    const std::size_t length = strnlen(name, kNameSize);
+    const bool fits = num_ < kNum && length < kNameSize;
+    Filter &filter = fits ? known_[num_].filter : other_.emplace();
+    if (const int32_t status = filter.Create(name)) return status;
+    *spec = filter.get();
+    if (fits) std::memcpy(known_[num_++].name, name, length + 1);
+    return 0;
 }
 
 const char *EnumText(std::span<const char *const> table, uint32_t index) {

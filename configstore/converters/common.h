@@ -104,8 +104,9 @@ private:
     std::size_t size_ = 0;
 };
 
-/// DVSData_Update of the list under construction, whatever it is built as; the status is the converter's.
-[[nodiscard]] int32_t StoreAs(const LoadArgs &args, const char *key, std::span<const uint8_t> value,
+/// DVSData_Update of the list under construction, whatever it is built as; the status is the converter's. A
+/// NUL follows the key.
+[[nodiscard]] int32_t StoreAs(const LoadArgs &args, std::string_view key, std::span<const uint8_t> value,
                               uint32_t propType);
 /// The same with the row's key and type.
 [[nodiscard]] inline int32_t Store(const LoadArgs &args, std::span<const uint8_t> value) {
@@ -229,6 +230,26 @@ private:
     configstore::FilterSpec *spec_ = nullptr;
 };
 
+/// The filter specs that one load has made so far: every port is asked for the same lists.
+class KnownFilters {
+public:
+    /// The spec on one name, made when it is asked for first; good until the next call. A status, and
+    /// nothing in `spec`, when it cannot be made.
+    [[nodiscard]] int32_t Get(const char *name, const configstore::FilterSpec **spec);
+
+private:
+    static constexpr std::size_t kNum = 8;
+    static constexpr std::size_t kNameSize = 32; // with the terminator
+
+    struct Known {
+        char name[kNameSize];
+        Filter filter;
+    };
+    Known known_[kNum];
+    std::size_t num_ = 0;
+    std::optional<Filter> other_; // for which there was no room
+};
+
 /// The instances of one list, in the store's order. Empty after a failed or absent read.
 class Instances {
 public:
@@ -236,15 +257,21 @@ public:
     ~Instances() { Release(); }
     Instances(const Instances &) = delete;
     Instances &operator=(const Instances &) = delete;
-    [[nodiscard]] int32_t Read(configstore::Object *parent, const Filter &filter) {
+    [[nodiscard]] int32_t Read(configstore::Object *parent, const configstore::FilterSpec *spec) {
         Release();
-        return configstore::GetSubObjectInstances(parent, filter.get(), &objects_, &count_);
+        return configstore::GetSubObjectInstances(parent, spec, &objects_, &count_);
     }
     /// Both steps at once, for callers to whom a failed filter spec is a failed read.
     [[nodiscard]] int32_t Read(configstore::Object *parent, const char *name) {
         Filter filter;
         const int32_t status = filter.Create(name);
-        return status ? status : Read(parent, filter);
+        return status ? status : Read(parent, filter.get());
+    }
+    /// The same with the filter specs of the load.
+    [[nodiscard]] int32_t Read(const LoadArgs &args, configstore::Object *parent, const char *name) {
+        const configstore::FilterSpec *spec = nullptr;
+        const int32_t status = args.filters->Get(name, &spec);
+        return status ? status : Read(parent, spec);
     }
     [[nodiscard]] std::span<configstore::Object *const> items() const {
         if (!objects_ || count_ < 1) return {};

@@ -9,6 +9,7 @@
 
 #include <cstdint>
 #include <span>
+#include <string_view>
 
 #include "dvs/data.h"
 #include "platform/configstore.h"
@@ -18,6 +19,8 @@ class GrowingImage;
 }
 
 namespace dvs::convert {
+
+class KnownFilters;
 
 struct SaveArgs {
     configstore::Object *root;   // the object the frame was given: the switch's, or the port's for class 2
@@ -35,9 +38,10 @@ struct LoadArgs {
     configstore::Object *parent; // as above, reached without creating anything
     DVSData *list;               // the property list under construction
     const char *leaf;
-    const char *key;                          // the row's key
+    std::string_view key;                     // the row's key; a NUL follows
     uint32_t propType;                        // the row's load property type
     uint32_t propClass;                       // DVS_PROP_CLASS_*: whose list is being built
+    KnownFilters *filters = nullptr;          // of this load; tests of scalars go without
     dvs::data::GrowingImage *image = nullptr; // stands for the list, which is null then
 };
 

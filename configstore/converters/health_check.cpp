@@ -55,7 +55,7 @@ int32_t SaveHealthCheck(const SaveArgs &args) {
 }
 
 int32_t LoadHealthCheck(const LoadArgs &args) {
-    const char *id = HealthCheckInstance(args.key);
+    const char *id = HealthCheckInstance(args.key.data());
     if (!id) return kFailed;
     configstore::Object *check = nullptr;
     const int32_t status = configstore::GetSubObject(args.parent, args.leaf, id, &check);

@@ -287,12 +287,11 @@ int32_t HasWideRecords(const LoadArgs &args, bool *wide) {
     return status;
 }
 
-bool IsKeyOfThisClass(const char *key) {
-    const bool isVswitchKey = std::strcmp(key, "com.orbeno.vswitch.mirrorSessions") == 0 ||
-                              std::strcmp(key, "com.orbeno.vswitch.port.mirrorSessions") == 0;
-    const bool isEtherswitchKey = std::strcmp(key, "com.orbeno.etherswitch.mirrorSessions") == 0 ||
-                                  std::strcmp(key, "com.orbeno.etherswitch.port.mirrorSessions") == 0;
-    return dvsSwitchClass ? isVswitchKey : isEtherswitchKey;
+bool IsKeyOfThisClass(std::string_view key) {
+    return dvsSwitchClass
+               ? key == "com.orbeno.vswitch.mirrorSessions" || key == "com.orbeno.vswitch.port.mirrorSessions"
+               : key == "com.orbeno.etherswitch.mirrorSessions" ||
+                     key == "com.orbeno.etherswitch.port.mirrorSessions";
 }
 
 } // namespace
@@ -314,7 +313,7 @@ int32_t SaveMirrorSessions(const SaveArgs &args) {
 int32_t LoadMirrorSessions(const LoadArgs &args) {
     if (!IsKeyOfThisClass(args.key)) return 0;
     Instances vspans;
-    const int32_t found = vspans.Read(args.parent, args.leaf);
+    const int32_t found = vspans.Read(args, args.parent, args.leaf);
     // A switch that is being loaded has had its version read before any of its ports: most have no sessions,
     // and those need not ask again.
     const bool known = args.propClass == DVS_PROP_CLASS_PORT && args.image;

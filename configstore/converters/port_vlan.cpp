@@ -128,11 +128,11 @@ void LoadSingleId(configstore::Object *vlan, std::span<uint8_t> value) {
 int32_t LoadPortVlan(const LoadArgs &args, Family family) {
     configstore::Object *vlan = nullptr;
     if (configstore::GetSubObject(args.parent, args.leaf, nullptr, &vlan) || !vlan) return 0;
-    Filter filter;
-    const int32_t status = filter.Create("trunk_vlan_ids");
+    const configstore::FilterSpec *spec = nullptr;
+    const int32_t status = args.filters->Get("trunk_vlan_ids", &spec);
     if (status) return status;
     Instances ranges;
-    (void)ranges.Read(vlan, filter); // a list that cannot be read is no list
+    (void)ranges.Read(vlan, spec); // a list that cannot be read is no list
 
     Block block;
     if (!block.Allocate(kPortVlan.size + ranges.items().size() * kRangeSize)) {

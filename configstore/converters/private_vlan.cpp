@@ -132,7 +132,7 @@ int32_t LoadPrivateVlans(const LoadArgs &args) {
     const char *key = nullptr;
     int32_t status = ChooseKey(args.root, &key);
     if (status) return status;
-    if (std::strcmp(args.key, key) != 0) return 0;
+    if (args.key != key) return 0;
 
     Instances entries;
     status = entries.Read(args.parent, args.leaf);

@@ -27,10 +27,6 @@ int32_t LoadBoolAs(const LoadArgs &args, std::span<const uint8_t> whenTrue,
     return value.empty() ? 0 : Store(args, value);
 }
 
-bool IsKey(const LoadArgs &args, const char *key) {
-    return std::strcmp(args.key, key) == 0;
-}
-
 } // namespace
 
 int32_t SaveUint32(const SaveArgs &args) {
@@ -46,9 +42,9 @@ int32_t LoadUint32(const LoadArgs &args) {
 }
 
 int32_t LoadMtu(const LoadArgs &args) {
-    const bool wanted = IsKey(args, "com.orbeno.common.portset.mtu") ||
-                        (dvsSwitchClass == 1 && IsKey(args, "com.orbeno.vswitch.mtu")) ||
-                        (dvsSwitchClass == 0 && IsKey(args, "com.orbeno.etherswitch.mtu"));
+    const bool wanted = args.key == "com.orbeno.common.portset.mtu" ||
+                        (dvsSwitchClass == 1 && args.key == "com.orbeno.vswitch.mtu") ||
+                        (dvsSwitchClass == 0 && args.key == "com.orbeno.etherswitch.mtu");
     return wanted ? LoadUint32(args) : 0;
 }
 
@@ -57,9 +53,9 @@ int32_t SaveText(const SaveArgs &args) {
 }
 
 int32_t LoadText(const LoadArgs &args) {
-    const char *otherFamily =
-        dvsSwitchClass == 0 ? "com.orbeno.vswitch.multicastFilter" : "com.orbeno.etherswitch.multicastFilter";
-    if (IsKey(args, otherFamily)) return 0;
+    if (dvsSwitchClass == 0 ? args.key == "com.orbeno.vswitch.multicastFilter"
+                            : args.key == "com.orbeno.etherswitch.multicastFilter")
+        return 0;
     StoreText text;
     const int32_t status = text.Read(args.parent, args.leaf);
     if (status) return status == configstore::NOT_FOUND ? 0 : status;

@@ -46,8 +46,8 @@ constexpr NamedSlot kLimits[] = {
 };
 
 // Each direction's key goes with its own leaf and no other.
-bool IsDirection(const LoadArgs &args, const char *key, const char *leaf) {
-    return std::strcmp(args.key, key) == 0 && std::strcmp(args.leaf, leaf) == 0;
+bool IsDirection(const LoadArgs &args, std::string_view key, const char *leaf) {
+    return args.key == key && std::strcmp(args.leaf, leaf) == 0;
 }
 
 } // namespace

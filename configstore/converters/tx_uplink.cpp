@@ -34,9 +34,9 @@ int32_t SaveTxUplink(const SaveArgs &args) {
 }
 
 int32_t LoadTxUplink(const LoadArgs &args) {
-    const char *wanted =
-        dvsSwitchClass == 0 ? "com.orbeno.etherswitch.port.txUplink" : "com.orbeno.vswitch.port.txUplink";
-    if (std::strcmp(args.key, wanted) != 0) return 0;
+    const bool wanted = dvsSwitchClass == 0 ? args.key == "com.orbeno.etherswitch.port.txUplink"
+                                            : args.key == "com.orbeno.vswitch.port.txUplink";
+    if (!wanted) return 0;
     bool always = false;
     const int32_t status = configstore::GetValueBool(args.parent, args.leaf, &always);
     if (status) return status == configstore::NOT_FOUND ? 0 : status;

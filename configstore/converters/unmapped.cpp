@@ -144,7 +144,7 @@ constexpr ListRow kPortLists[] = {
 
 int32_t LoadList(const LoadArgs &args, configstore::Object *data, const ListRow &row) {
     Instances instances;
-    const int32_t status = instances.Read(data, row.list);
+    const int32_t status = instances.Read(args, data, row.list);
     if (status) return status == configstore::NOT_FOUND ? 0 : status;
     if (!row.load) return 0;
     for (auto *instance : instances.items()) {
@@ -156,7 +156,7 @@ int32_t LoadList(const LoadArgs &args, configstore::Object *data, const ListRow 
 // Like LoadList, for lists of which whatever can be read is taken and nothing fails the load.
 void LoadWhatReads(const LoadArgs &args, configstore::Object *data, const ListRow &row) {
     Instances instances;
-    if (instances.Read(data, row.list)) return;
+    if (instances.Read(args, data, row.list)) return;
     for (auto *instance : instances.items())
         (void)row.load(args, instance);
 }

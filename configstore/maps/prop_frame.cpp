@@ -14,9 +14,9 @@
 #include "configstore/converters/converter.h"
 #include "configstore/converters/table.h"
 #include "configstore/log.h"
+#include "configstore/maps/prop_loader.h"
 #include "configstore/maps/prop_lookup.h"
 #include "configstore/maps/prop_saver.h"
-#include "dvsdata/growing_image.h"
 #include "dvsdata/list_internal.h"
 #include "dvsstate/owned_list.h"
 
@@ -33,26 +33,14 @@ using dvs::config::Tracing;
 using dvs::convert::ConverterFor;
 
 constexpr int32_t kFailed = -1;
-constexpr uint32_t kMaxDepth = std::extent_v<decltype(DVSProp2ConfigEntry::path)>;
 constexpr uint32_t kPropTypeState = 0x10;
-constexpr const char *kPortResourcePoolsKey = "com.orbeno.common.port.respools.cfg";
-constexpr const char *kTrafficResourcesLeaf = "traffic_resources";
 
-// The tables are writable: a row's depth may have been set to anything.
-uint32_t Depth(const DVSProp2ConfigEntry &row) {
-    return std::min(row.depth, kMaxDepth);
-}
 const char *Leaf(const DVSProp2ConfigEntry &row) {
-    return row.path[std::max(Depth(row), 1U) - 1];
+    return LeafOf(row, DepthOf(row));
 }
 
 std::span<const uint8_t> Bytes(const void *value, uint32_t len) {
     return {static_cast<const uint8_t *>(value), value ? len : 0};
-}
-
-uint32_t KnownClass(uint32_t propClass) {
-    const bool known = propClass == DVS_PROP_CLASS_HOST || propClass == DVS_PROP_CLASS_PORT;
-    return known ? propClass : uint32_t{DVS_PROP_CLASS_GLOBAL};
 }
 
 uint32_t DefaultType(uint32_t propClass) {
@@ -82,90 +70,18 @@ int32_t RunSave(const DVSProp2ConfigEntry &row, const dvs::convert::SaveArgs &ar
     return status ? FailedToSet(args.key, status) : 0;
 }
 
-// The list under construction and where it comes from, as every row's converter is given them.
-struct LoadRun {
-    configstore::Object *object;
-    DVSData *list; // or
-    dvs::data::GrowingImage *image;
-    uint32_t propClass;
-};
-
-int32_t FailedToLoad(const char *key, const char *leaf, uint32_t type, int32_t status) {
-    LogError("Faild to load prop: %s, key: %s, type:%d from configstore, rc: %d\n", key, leaf,
-             static_cast<int>(type), status);
-    return status;
-}
-
-// Sub-objects of the object being loaded that rows have asked for: most rows of a table lead through the same
-// one.
-class KnownParents {
-public:
-    // As GetSubObjectByPath without creating; only rows of two names are remembered.
-    [[nodiscard]] int32_t Reach(const DVSProp2ConfigEntry &row, configstore::Object *object,
-                                configstore::Object **parent) {
-        constexpr uint32_t kRememberedDepth = 2;
-        if (Depth(row) != kRememberedDepth)
-            return GetSubObjectByPath(row.path, Depth(row), object, parent, false);
-        for (uint32_t i = 0; i < num_; ++i) {
-            if (std::strcmp(known_[i].name, row.path[0]) != 0) continue;
-            *parent = known_[i].object;
-            return known_[i].status;
-        }
-        const int32_t status = GetSubObjectByPath(row.path, kRememberedDepth, object, parent, false);
-        if (num_ < std::size(known_)) known_[num_++] = {row.path[0], *parent, status};
-        return status;
-    }
-
-private:
-    struct Known {
-        const char *name;
-        configstore::Object *object;
-        int32_t status;
-    };
-    Known known_[4];
-    uint32_t num_ = 0;
-};
-
-int32_t LoadRow(const LoadRun &run, const DVSProp2ConfigEntry &row, KnownParents *parents) {
-    configstore::Object *parent = nullptr;
-    int32_t status = parents->Reach(row, run.object, &parent);
-    if (status == configstore::NOT_FOUND) return 0;
-    if (status) return status;
-    const auto *converter = ConverterFor(row.converterType);
-    status = converter ? converter->load({run.object, parent, run.list, Leaf(row), row.key, row.loadPropType,
-                                          run.propClass, run.image})
-                       : kFailed;
-    return status ? FailedToLoad(row.key, Leaf(row), row.converterType, status) : 0;
-}
-
-int32_t LoadRows(const LoadRun &run, configstore::Object *trafficResources) {
-    KnownParents parents;
-    for (const auto *row = GetConfigMap(static_cast<int>(KnownClass(run.propClass))); row->key; ++row) {
-        if (const int32_t status = LoadRow(run, *row, &parents)) return status;
-    }
-    if (run.propClass != DVS_PROP_CLASS_PORT || !trafficResources) return 0;
-    return ConverterFor(dvs::convert::kTypeTrafficResources)
-        ->load({run.object, trafficResources, run.list, kTrafficResourcesLeaf, kPortResourcePoolsKey,
-                kPropTypeState, run.propClass, run.image});
-}
-
 int32_t BuildProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
                    uint32_t serializeFlags, configstore::Object *trafficResources) {
     dvs::state::OwnedList list;
     if (dvs::state::NewList(list) != HYP_OK) return kFailed;
-    if (const int32_t status = LoadRows({object, list.get(), nullptr, propClass}, trafficResources))
-        return status;
+    dvs::config::PropLoader loader(propClass);
+    if (const int32_t status = loader.LoadRows(object, list.get(), nullptr, trafficResources)) return status;
     void *buf = nullptr;
     uint32_t len = 0;
     HYP_ReturnStatus status = DVSData_Serialize(list.get(), &buf, &len, serializeFlags);
     if (status == HYP_OK) status = DVSData_Update(outList, propsName, buf, len, kPropTypeState);
     std::free(buf);
     return static_cast<int32_t>(status);
-}
-
-int32_t Reported(const char *propsName, int32_t status) {
-    if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
-    return status;
 }
 
 } // namespace
@@ -212,7 +128,7 @@ int32_t SaveProp(configstore::Object *object, const char *key, const void *value
     if (Tracing()) LogTrace("Compare %s : %s success\n", key, row->key);
 
     configstore::Object *parent = object;
-    if (const int32_t status = GetSubObjectByPath(row->path, Depth(*row), object, &parent, true))
+    if (const int32_t status = GetSubObjectByPath(row->path, DepthOf(*row), object, &parent, true))
         return FailedToReach(key, status);
     const int64_t start = dvsConfigStoreNowMs();
     const int32_t status =
@@ -224,19 +140,10 @@ int32_t SaveProp(configstore::Object *object, const char *key, const void *value
 int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList, uint32_t propClass,
                   uint32_t serializeFlags, configstore::Object *trafficResources) {
     LogTrace("LoadProps: %s\n", propsName);
-    return Reported(propsName,
-                    BuildProps(propsName, object, outList, propClass, serializeFlags, trafficResources));
-}
-
-int32_t LoadPropsInto(dvs::data::GrowingImage *image, const char *propsName, configstore::Object *object,
-                      uint32_t propClass, uint32_t serializeFlags, configstore::Object *trafficResources) {
-    image->BeginEntry(propsName, kPropTypeState);
-    image->BeginBuffer();
-    const int32_t status = LoadRows({object, nullptr, image, propClass}, trafficResources);
-    if (status == 0) dvs::data::EmitOldVersion(serializeFlags);
-    image->EndBuffer();
-    image->EndEntry();
-    return Reported(propsName, status);
+    const int32_t status =
+        BuildProps(propsName, object, outList, propClass, serializeFlags, trafficResources);
+    if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
+    return status;
 }
 
 namespace dvs::config {
@@ -264,15 +171,15 @@ int32_t PropSaver::ParentOf(const RowIndex::Found &found, configstore::Object **
     const auto &row = *found.row;
     if (found.way == RowIndex::kOtherWay) {
         // A row that writes the remembered sub-object itself might make another of it.
-        if (lastWay_ != RowIndex::kOtherWay && Depth(row) <= 1 && std::strcmp(lastName_, row.path[0]) == 0)
+        if (lastWay_ != RowIndex::kOtherWay && DepthOf(row) <= 1 && std::strcmp(lastName_, row.path[0]) == 0)
             lastWay_ = RowIndex::kOtherWay;
-        return GetSubObjectByPath(row.path, Depth(row), object_, parent, true);
+        return GetSubObjectByPath(row.path, DepthOf(row), object_, parent, true);
     }
     if (found.way == lastWay_) {
         *parent = lastParent_;
         return 0;
     }
-    const int32_t status = GetSubObjectByPath(row.path, Depth(row), object_, parent, true);
+    const int32_t status = GetSubObjectByPath(row.path, DepthOf(row), object_, parent, true);
     lastWay_ = status ? RowIndex::kOtherWay : found.way;
     lastName_ = row.path[0];
     lastParent_ = *parent;

@@ -11,14 +11,11 @@
 // locks: the process-wide values below are written without one, and callers run one save or load at a time.
 
 #include <cstdint>
+#include <type_traits>
 
 #include "dvs/configstore.h"
 #include "dvs/data.h"
 #include "platform/configstore.h"
-
-namespace dvs::data {
-class GrowingImage;
-}
 
 /// The class of the switch at hand: 1 for "vswitch", 2 for "cswitch", 0 for every other class name.
 extern uint32_t dvsSwitchClass;
@@ -36,6 +33,22 @@ extern int64_t dvsConfigStoreTimeMs;
 
 /// The monotonic clock in milliseconds, as the accumulator counts them.
 int64_t dvsConfigStoreNowMs();
+
+/// The class whose table serves `propClass`.
+[[nodiscard]] inline uint32_t KnownClass(uint32_t propClass) {
+    const bool known = propClass == DVS_PROP_CLASS_HOST || propClass == DVS_PROP_CLASS_PORT;
+    return known ? propClass : uint32_t{DVS_PROP_CLASS_GLOBAL};
+}
+
+/// How many names of a row's path count. The tables are writable: the depth may have been set to anything.
+[[nodiscard]] inline uint32_t DepthOf(const DVSProp2ConfigEntry &row) {
+    constexpr uint32_t kMaxDepth = std::extent_v<decltype(DVSProp2ConfigEntry::path)>;
+    return row.depth < kMaxDepth ? row.depth : kMaxDepth;
+}
+/// The last of them.
+[[nodiscard]] inline const char *LeafOf(const DVSProp2ConfigEntry &row, uint32_t depth) {
+    return row.path[depth > 1 ? depth - 1 : 0];
+}
 
 /// Reaches the sub-object `name` of `parent`, creating it where it is absent and `create` is set.
 /// instanceId  null or empty for a singleton, else the id within the list of instances.
@@ -65,11 +78,5 @@ int64_t dvsConfigStoreNowMs();
 [[nodiscard]] int32_t LoadProps(const char *propsName, configstore::Object *object, DVSData *outList,
                                 uint32_t propClass, uint32_t serializeFlags,
                                 configstore::Object *trafficResources);
-
-/// LoadProps as an entry of the image's innermost buffer. On a failure, and when the image has given up, the
-/// image is of no use any more.
-[[nodiscard]] int32_t LoadPropsInto(dvs::data::GrowingImage *image, const char *propsName,
-                                    configstore::Object *object, uint32_t propClass, uint32_t serializeFlags,
-                                    configstore::Object *trafficResources);
 
 #endif

@@ -114,8 +114,9 @@ private:
         if (const int32_t status = DescribeSwitch()) return status;
         state::OwnedList list;
         if (state::NewList(list) != HYP_OK) return convert::kFailed;
+        convert::KnownFilters filters;
         const int32_t status = converter_->load(
-            {root_.get(), parent_, list.get(), leaf_, row_->key, row_->loadPropType, propClass_});
+            {root_.get(), parent_, list.get(), leaf_, row_->key, row_->loadPropType, propClass_, &filters});
         DVSDataEntry *entry = nullptr;
         *found = status == 0 && DVSData_Lookup(list.get(), row_->key, &entry) == HYP_OK;
         if (*found) bytes->assign(entry->data, entry->data + entry->dataLen);

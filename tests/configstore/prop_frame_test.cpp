@@ -4,7 +4,10 @@
 
 #include "configstore/maps/prop_frame.h"
 
+#include <cstdio>
 #include <cstring>
+#include <utility>
+#include <vector>
 
 #include "configstore/frame_fixture.h"
 
@@ -123,6 +126,24 @@ TEST_F(PropFrame, RebuildsEveryPropertyWithTheRowsType) {
 }
 
 // --- The tables may change under the lookup. ---
+
+TEST_F(PropFrame, LoadsTablesOfAnyLength) {
+    ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
+    ASSERT_EQ(0, Save("com.orbeno.common.resv.threshold", U32(7)));
+    // Rows through more sub-objects than there are, and the two that find something at the end.
+    std::vector<DVSProp2ConfigEntry> table(60, dvsGlobalProp2Config[26]);
+    for (std::size_t i = 0; i < table.size(); ++i)
+        std::snprintf(table[i].path[0], sizeof table[i].path[0], "absent%zu", i % 10);
+    table.push_back(dvsGlobalProp2Config[26]);
+    table.push_back(dvsGlobalProp2Config[0]);
+    table.push_back({});
+    DVSProp2ConfigEntry *const usual = std::exchange(dvsConfigMaps[DVS_PROP_CLASS_GLOBAL], table.data());
+    const Props loaded = Load();
+    dvsConfigMaps[DVS_PROP_CLASS_GLOBAL] = usual;
+    const Props expected = {{"com.orbeno.common.resv.threshold", U32(7), 0x10},
+                            {"com.orbeno.common.alias", Text("n"), 0x10}};
+    EXPECT_EQ(expected, loaded) << messages;
+}
 
 TEST_F(PropFrame, NoticesAChangedKey) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));

@@ -5,6 +5,7 @@
 #include <algorithm>
 #include <set>
 
+#include "configstore/converters/common.h"
 #include "configstore/converters/converter_fixture.h"
 #include "configstore/converters/table.h"
 #include "configstore/layouts/registry.h"
@@ -124,9 +125,10 @@ struct StoreFailures : ConverterTest {
         DVSData *list = nullptr;
         EXPECT_EQ(HYP_OK, DVSData_Alloc(
                               &list, [](uint64_t size) { return std::malloc(size); }, std::free));
+        dvs::convert::KnownFilters filters;
         const int32_t status =
             dvs::convert::ConverterFor(row.converterType)
-                ->load({object, parent, list, row.path[row.depth - 1], row.key, 16, propClass});
+                ->load({object, parent, list, row.path[row.depth - 1], row.key, 16, propClass, &filters});
         DVSData_Free(list);
         return status;
     }
