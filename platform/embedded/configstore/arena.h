@@ -31,7 +31,7 @@ public:
     /// `size` bytes aligned for a pointer; throws std::bad_alloc.
     void *Allocate(std::size_t size) {
         size = (size + 7) & ~std::size_t{7};
-        if (size <= left_) {
+        if (size <= left_) [[likely]] {
             void *const block = cursor_;
             cursor_ += size;
             left_ -= size;
@@ -45,6 +45,9 @@ public:
         while (nextChunk_ < kLargestChunk && nextChunk_ < size)
             nextChunk_ *= 2;
     }
+
+    /// Bytes taken from the system so far.
+    [[nodiscard]] std::size_t Taken() const { return taken_; }
 
     /// A copy of the bytes with a NUL behind them.
     char *Copy(std::string_view bytes) {
@@ -104,7 +107,7 @@ private:
         return reinterpret_cast<uintptr_t>(block) % kLargestChunk;
     }
 
-    void *AllocateSlow(std::size_t size) {
+    [[gnu::noinline]] void *AllocateSlow(std::size_t size) {
         // A large piece gets a chunk of its own behind the current one, so that the current one's rest stays
         // in use.
         const bool alone = size > nextChunk_ / 4;
@@ -113,6 +116,7 @@ private:
         auto *const chunk = static_cast<Chunk *>(TakeBlock(&whole));
         if (!chunk) throw std::bad_alloc();
         chunk->size = whole;
+        taken_ += whole;
         char *const start = reinterpret_cast<char *>(chunk + 1);
         if (alone && chunks_) {
             chunk->next = chunks_->next;
@@ -131,6 +135,7 @@ private:
     char *cursor_ = nullptr;
     std::size_t left_ = 0;
     std::size_t nextChunk_ = kFirstChunk;
+    std::size_t taken_ = 0;
 };
 
 } // namespace configstore

@@ -120,10 +120,16 @@ void WriteNode(const Object &node, Buffer *out);
 void WriteChildren(const Object &container, Buffer *out) {
     char separator = '{';
     for (const Object *child = FirstChild(&container); child; child = child->next, separator = ',') {
-        out->Put(separator);
-        if (child->described) {
+        if (child->described && child->field->wordNum > 0) {
+            char *const at = out->Room(1 + sizeof child->field->words);
+            *at = separator;
+            std::memcpy(at + 1, child->field->words.data(), sizeof child->field->words);
+            out->Used(at + 1 + child->field->prefix.size());
+        } else if (child->described) {
+            out->Put(separator);
             out->Put(std::string_view(child->field->prefix));
         } else {
+            out->Put(separator);
             WriteText(NameOf(child), false, out);
             out->Put(':');
         }
@@ -217,6 +223,8 @@ void WriteText(std::string_view text, bool asIs, Buffer *out) {
 }
 
 void WriteDocument(const Tree &tree, Buffer *out) {
+    // Nodes take several times what is written of them. What is taken here and not used costs nothing.
+    (void)out->Room(tree.arena.Taken() / 4);
     WriteChildren(tree.root, out);
 }
 

@@ -84,12 +84,10 @@ const Object *FindBelow(const Object *node) {
 
 } // namespace
 
-void Judge(Tree *tree, Object *node) {
-    if (node->described)
-        node->bad = !Fits(node->field, node);
-    else // an instance has to be an object; what an unknown member is, nobody knows
-        node->bad = !node->isRoot && node->parent->kind == Kind::Instances && node->kind != Kind::Object;
-    if (node->bad) tree->suspect = true;
+bool IsBad(const Object *node) {
+    if (node->described) return !Fits(node->field, node);
+    // An instance has to be an object; what an unknown member is, nobody knows.
+    return !node->isRoot && node->parent->kind == Kind::Instances && node->kind != Kind::Object;
 }
 
 const Object *FindViolation(Tree *tree) {

@@ -91,14 +91,6 @@ Tree::~Tree() {
         DropIndex(table);
 }
 
-Tree *TreeOf(Object *node) {
-    while (!node->isRoot) {
-        if (node->kind == Kind::Dead) return nullptr;
-        node = node->parent;
-    }
-    return reinterpret_cast<Tree *>(node);
-}
-
 namespace {
 
 Object *WithField(const Object *object, const Field *field) {
@@ -126,10 +118,14 @@ Object *FindMember(Object *object, std::string_view name) {
     return field ? WithField(object, field) : Undescribed(object, name);
 }
 
-Object *FindMember(Object *object, const char *name) {
+Place FindPlace(Object *object, const char *name) {
     const Shape *const shape = ShapeOf(object);
     const Field *const field = shape ? shape->FindAgain(name) : nullptr;
-    return field ? WithField(object, field) : Undescribed(object, name);
+    return {field ? WithField(object, field) : Undescribed(object, name), field};
+}
+
+Object *FindMember(Object *object, const char *name) {
+    return FindPlace(object, name).member;
 }
 
 Object *FindInstance(Object *list, std::string_view id) {
@@ -168,11 +164,6 @@ Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_vi
     member->name = ownName;
     LinkMember(object, member);
     return member;
-}
-
-Object *AddMember(Tree *tree, Object *object, std::string_view name) {
-    const Shape *const shape = ShapeOf(object);
-    return AddMember(tree, object, shape ? shape->Find(name) : nullptr, name);
 }
 
 Object *AddInstance(Tree *tree, Object *list, std::string_view id) {

@@ -139,9 +139,22 @@ struct FilterSpec {
     return node->described ? std::string_view(node->field->name)
                            : std::string_view(node->name->text, node->name->size);
 }
-[[nodiscard]] Tree *TreeOf(Object *node); // null of a deleted node
+/// Null of a deleted node.
+[[nodiscard]] inline Tree *TreeOf(Object *node) {
+    while (!node->isRoot) {
+        if (node->kind == Kind::Dead) return nullptr;
+        node = node->parent;
+    }
+    return reinterpret_cast<Tree *>(node);
+}
 [[nodiscard]] Object *FindMember(Object *object, std::string_view name);
 [[nodiscard]] Object *FindMember(Object *object, const char *name);
+/// For writers: the member of a name, or null and the field that it will have, if the shape knows the name.
+struct Place {
+    Object *member;
+    const Field *field;
+};
+[[nodiscard]] Place FindPlace(Object *object, const char *name);
 [[nodiscard]] Object *FindInstance(Object *list, std::string_view id);
 [[nodiscard]] Object *FirstChild(const Object *container); // of an Object or Instances
 /// "settings/vlan/vlan_id", with the ids of instances in brackets.
@@ -182,7 +195,6 @@ inline Object *AddDescribed(Tree *tree, Object *object, const Field *field) {
 /// A new last member; `field` is the shape's field of that name, if any. Its kind is Null until it is given
 /// another.
 Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name);
-Object *AddMember(Tree *tree, Object *object, std::string_view name);
 /// A new last instance, an empty Object. The id is not there yet.
 Object *AddInstance(Tree *tree, Object *list, std::string_view id);
 inline void MakeObject(Object *node) {
@@ -209,13 +221,26 @@ void AppendInteger(Tree *tree, PackedList *list, int64_t value);
 
 // Judging.
 
-/// Sets the node's mark by its field and content.
-void Judge(Tree *tree, Object *node);
 [[nodiscard]] inline bool TextFits(const Field *field, std::size_t size) {
     return size <= field->maxBytes;
 }
 [[nodiscard]] inline bool IntegerFits(const Field *field, int64_t value) {
     return value >= field->minimum && value <= field->maximum;
+}
+/// Whether the schema does not allow the node's content.
+[[nodiscard]] bool IsBad(const Object *node);
+/// Sets the node's mark by its field and content.
+inline void Judge(Tree *tree, Object *node) {
+    const FieldType type = node->described ? node->field->type : FieldType::Any;
+    if (type == FieldType::Bool && node->kind == Kind::Bool)
+        node->bad = false;
+    else if (type == FieldType::Integer && node->kind == Kind::Integer)
+        node->bad = !IntegerFits(node->field, node->integer);
+    else if (type == FieldType::Text && node->kind == Kind::Text)
+        node->bad = !TextFits(node->field, node->span.size);
+    else
+        node->bad = IsBad(node);
+    if (node->bad) tree->suspect = true;
 }
 /// The first node that the schema does not allow, in document order; null when all is well.
 [[nodiscard]] const Object *FindViolation(Tree *tree);

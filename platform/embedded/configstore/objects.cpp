@@ -54,12 +54,13 @@ int32_t Find(Object *parent, const char *name, const char *instanceId, Object **
     return OK;
 }
 
-int32_t CreateSingleton(Tree *tree, Object *parent, const char *name, Object *member, Object **out) {
+int32_t CreateSingleton(Tree *tree, Object *parent, const char *name, Place place, Object **out) {
+    Object *member = place.member;
     if (member) {
         if (!AsObject(member)) return SCHEMA_VIOLATION;
         RemoveAllChildren(member);
     } else {
-        member = AddMember(tree, parent, name);
+        member = AddMember(tree, parent, place.field, name);
         MakeObject(member);
     }
     Judge(tree, member);
@@ -67,10 +68,11 @@ int32_t CreateSingleton(Tree *tree, Object *parent, const char *name, Object *me
     return OK;
 }
 
-int32_t CreateInstance(Tree *tree, Object *parent, const char *name, Object *member, std::string_view id,
+int32_t CreateInstance(Tree *tree, Object *parent, const char *name, Place place, std::string_view id,
                        Object **out) {
+    Object *member = place.member;
     if (!member) {
-        member = AddMember(tree, parent, name);
+        member = AddMember(tree, parent, place.field, name);
         member->kind = Kind::EmptyList;
     }
     if (member->kind == Kind::EmptyList) MakeInstances(tree, member);
@@ -214,10 +216,10 @@ int32_t CreateSubObject(Object *parent, const char *name, const char *instanceId
     return Guarded([&]() -> int32_t {
         Tree *const tree = TreeOf(parent);
         if (!tree) return BAD_PARAMETER;
-        Object *const member = FindMember(parent, name);
+        const Place place = FindPlace(parent, name);
         const std::string_view id = IdOf(instanceId);
-        if (id.empty()) return CreateSingleton(tree, parent, name, member, out);
-        return CreateInstance(tree, parent, name, member, id, out);
+        if (id.empty()) return CreateSingleton(tree, parent, name, place, out);
+        return CreateInstance(tree, parent, name, place, id, out);
     });
 }
 

@@ -25,12 +25,14 @@ template <typename Fill> int32_t Put(Object *object, const char *name, Fill &&fi
     return Guarded([&]() -> int32_t {
         Tree *const tree = CheckTarget(object, name);
         if (!tree) return BAD_PARAMETER;
-        Object *member = FindMember(object, name);
+        auto [member, field] = FindPlace(object, name);
         if (member && HoldsObjects(member)) return SCHEMA_VIOLATION;
         // What needs memory comes first: without it nothing is changed.
-        Object content{};
+        Object content;
+        content.span = {nullptr, 0};
         fill(tree, &content);
-        if (!member) member = AddMember(tree, object, name);
+        if (!member)
+            member = field ? AddDescribed(tree, object, field) : AddMember(tree, object, nullptr, name);
         member->kind = content.kind;
         member->span = content.span;
         member->maybeBinary = false; // it is known now what it is
@@ -119,14 +121,14 @@ int32_t Append(Object *object, const char *name, Kind kind, bool (*fits)(const F
     return Guarded([&]() -> int32_t {
         Tree *const tree = CheckTarget(object, name);
         if (!tree) return BAD_PARAMETER;
-        Object *member = FindMember(object, name);
+        auto [member, field] = FindPlace(object, name);
         if (member && member->kind == Kind::Raw) (void)Expand(tree, member);
         const bool empty = !member || member->kind == Kind::EmptyList ||
                            (member->kind == Kind::Instances && member->table->count == 0);
         if (!empty && member->kind != kind) return SCHEMA_VIOLATION;
         PackedList *const list = empty ? NewList(tree) : member->list;
         append(tree, list);
-        if (!member) member = AddMember(tree, object, name);
+        if (!member) member = AddMember(tree, object, field, name);
         if (empty) {
             member->kind = kind;
             member->list = list;
@@ -181,9 +183,9 @@ int32_t SetValueEmptyList(Object *object, const char *name) {
     return Guarded([&]() -> int32_t {
         Tree *const tree = CheckTarget(object, name);
         if (!tree) return BAD_PARAMETER;
-        Object *member = FindMember(object, name);
+        auto [member, field] = FindPlace(object, name);
         if (member && member->kind == Kind::Object) return SCHEMA_VIOLATION;
-        if (!member) member = AddMember(tree, object, name);
+        if (!member) member = AddMember(tree, object, field, name);
         if (member->kind == Kind::Instances)
             RemoveAllChildren(member);
         else if (member->described && member->field->type == FieldType::Instances)
