@@ -11,7 +11,8 @@
 #include <cstring>
 #include <new>
 #include <string_view>
-#include <sys/mman.h>
+
+#include "platform/embedded/configstore/huge_pages.h"
 
 namespace configstore {
 
@@ -63,48 +64,17 @@ private:
         std::size_t size; // with this
     };
     static constexpr std::size_t kFirstChunk = 2048;
-    static constexpr std::size_t kLargestChunk = std::size_t{1} << 21; // a huge page
+    static constexpr std::size_t kLargestChunk = kHugePage;
 
-    /// A tree of thousands of ports takes megabytes, used once: its page faults cost more than all the rest,
-    /// unless they are few. Large chunks are whole huge pages from the system and go back to it: in the heap
-    /// they would leave holes, more with every save.
     static void *TakeBlock(std::size_t *size) {
-        if (*size < kLargestChunk) return std::malloc(*size);
-        if (*size > SIZE_MAX - 2 * kLargestChunk) return nullptr;
-        *size = (*size + kLargestChunk - 1) / kLargestChunk * kLargestChunk;
-        char *block = Map(*size);
-        if (block && PastHugePage(block) != 0) {
-            (void)munmap(block, *size);
-            block = MapAligned(*size);
-        }
-        if (block) (void)madvise(block, *size, MADV_HUGEPAGE);
-        return block;
+        return *size < kHugePage ? std::malloc(*size) : MapHugePages(size);
     }
 
     static void GiveBlock(Chunk *chunk) {
-        if (chunk->size < kLargestChunk)
+        if (chunk->size < kHugePage)
             std::free(chunk);
         else
-            (void)munmap(chunk, chunk->size);
-    }
-
-    static char *Map(std::size_t size) {
-        void *const block = mmap(nullptr, size, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
-        return block == MAP_FAILED ? nullptr : static_cast<char *>(block);
-    }
-
-    /// Only the first chunk of a tree needs this, where the system puts mappings side by side.
-    static char *MapAligned(std::size_t size) {
-        char *const block = Map(size + kLargestChunk);
-        if (!block) return nullptr;
-        const std::size_t before = (kLargestChunk - PastHugePage(block)) % kLargestChunk;
-        if (before > 0) (void)munmap(block, before);
-        (void)munmap(block + before + size, kLargestChunk - before);
-        return block + before;
-    }
-
-    static std::size_t PastHugePage(const char *block) {
-        return reinterpret_cast<uintptr_t>(block) % kLargestChunk;
+            UnmapHugePages(chunk, chunk->size);
     }
 
     [[gnu::noinline]] void *AllocateSlow(std::size_t size) {

@@ -17,12 +17,16 @@ namespace configstore {
 /// Text under construction, in a block of its own that is not cleared first.
 class Buffer {
 public:
+    Buffer() = default;
+    ~Buffer() { Release(); }
+    Buffer(const Buffer &) = delete;
+    Buffer &operator=(const Buffer &) = delete;
     /// At least `size` more bytes to write to; throws std::bad_alloc.
     char *Room(std::size_t size) {
         if (capacity_ - size_ < size) Grow(size);
-        return data_.get() + size_;
+        return data_ + size_;
     }
-    void Used(const char *end) { size_ = static_cast<std::size_t>(end - data_.get()); }
+    void Used(const char *end) { size_ = static_cast<std::size_t>(end - data_); }
     void Put(char c) {
         *Room(1) = c;
         size_++;
@@ -34,15 +38,13 @@ public:
     }
     void Clear() { size_ = 0; }
     [[nodiscard]] bool Empty() const { return size_ == 0; }
-    [[nodiscard]] std::string_view View() const { return {data_.get(), size_}; }
+    [[nodiscard]] std::string_view View() const { return {data_, size_}; }
 
 private:
-    struct Free {
-        void operator()(char *block) const { std::free(block); }
-    };
     void Grow(std::size_t size);
+    void Release();
 
-    std::unique_ptr<char, Free> data_;
+    char *data_ = nullptr; // from the heap, or huge pages when the capacity is that large
     std::size_t size_ = 0;
     std::size_t capacity_ = 0;
 };

@@ -13,12 +13,26 @@
 namespace configstore {
 
 void Buffer::Grow(std::size_t size) {
-    const std::size_t capacity = (capacity_ + size) * 2 + 256;
-    auto *const data = static_cast<char *>(std::realloc(data_.get(), capacity));
-    if (!data) throw std::bad_alloc();
-    (void)data_.release();
-    data_.reset(data);
+    std::size_t capacity = (capacity_ + size) * 2 + 256;
+    if (capacity < kHugePage) {
+        auto *const data = static_cast<char *>(std::realloc(data_, capacity));
+        if (!data) throw std::bad_alloc();
+        data_ = data;
+    } else {
+        char *const data = MapHugePages(&capacity);
+        if (!data) throw std::bad_alloc();
+        if (size_ > 0) std::memcpy(data, data_, size_);
+        Release();
+        data_ = data;
+    }
     capacity_ = capacity;
+}
+
+void Buffer::Release() {
+    if (capacity_ < kHugePage)
+        std::free(data_);
+    else
+        UnmapHugePages(data_, capacity_);
 }
 
 namespace {
