@@ -68,9 +68,10 @@ bool Connection::JudgeHeader() {
 
 bool Connection::Receive() {
     for (;;) {
-        // Announced sizes cost what has arrived of them, twice over at most.
-        const std::size_t room = std::min(needed_, std::max(received_ * 2, kFirstCapacity));
-        if (!Reserve(std::max(room, kFirstCapacity))) return false;
+        // Announced sizes cost what has arrived of them, twice over at most. Room is made where there is none
+        // left, not with each receive: what has arrived is copied along.
+        const std::size_t room = std::min(needed_, received_ * 2);
+        if (received_ == capacity_ && !Reserve(std::max(room, kFirstCapacity))) return false;
         const ssize_t got = recv(fd_, in_.get() + received_, capacity_ - received_, MSG_DONTWAIT);
         if (got == 0) return false;
         if (got < 0 && errno == EINTR) continue;
