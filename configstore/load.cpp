@@ -173,7 +173,10 @@ int32_t LoadPorts(configstore::Object *object, const Target &target, uint32_t ve
             auto *const shared = IsUplink(key.get(), uplinkKeys) ? resources : nullptr;
             status = target.AppendPort(key.get(), port, version, shared, &loader);
         }
-        if (status) break;
+        if (!status) continue;
+        // An image cannot take back what it has of the port that ended the walk; a list never gets it.
+        if (target.image) target.image->GiveUp();
+        break;
     }
     if (target.image && !names.AreUnique()) target.image->GiveUp();
     return status == configstore::NOT_FOUND ? 0 : status;

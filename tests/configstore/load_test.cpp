@@ -267,18 +267,28 @@ TEST_F(LoadTest, APortThatFailsEndsTheLoad) {
     ExpectSuccessWithoutBuffer();
 }
 
+// In both ways of building the buffer: nothing of the port that ended the walk is in it.
 TEST_F(LoadTest, APortThatLacksSomethingEndsTheWalkOverThePortsWithoutFailingTheSwitch) {
     configstore::Object *object = New("a");
     Sub(object, "ports", "first");
-    configstore::Object *policy = Sub(Sub(Sub(object, "ports", "second"), "settings"), "lacp_policy");
+    configstore::Object *second = Sub(object, "ports", "second");
+    ASSERT_EQ(0, configstore::SetValueStr(second, "name", "two"));
+    configstore::Object *policy = Sub(Sub(second, "settings"), "lacp_policy");
     ASSERT_EQ(0, configstore::SetValueBool(policy, "enabled", true));
     Sub(object, "ports", "third");
     Put(object);
-    const auto loaded = Load();
-    ASSERT_EQ(1u, loaded.size());
-    ASSERT_EQ(1u, loaded[0].ports.size());
-    EXPECT_EQ("first", loaded[0].ports[0].id);
-    EXPECT_TRUE(Said("Load dvs props from configstore failed, props type:second\n"));
+    for (const int level : {10, 0}) {
+        dvsconfigstore_debug = level;
+        messages.clear();
+        const auto loaded = Load();
+        ASSERT_EQ(1u, loaded.size()) << level;
+        ASSERT_EQ(1u, loaded[0].ports.size()) << level;
+        EXPECT_EQ("first", loaded[0].ports[0].id) << level;
+        constexpr std::string_view reason = "Load dvs props from configstore failed, props type:second\n";
+        const auto at = messages.find(reason);
+        ASSERT_NE(std::string::npos, at) << level << messages;
+        EXPECT_EQ(std::string::npos, messages.find(reason, at + 1)) << level << " says it twice";
+    }
 }
 
 // --- What ends a load. ---
