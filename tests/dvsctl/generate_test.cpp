@@ -79,10 +79,10 @@ TEST_F(Generate, TheBytesAreTheSameWithEveryCompiler) {
     EXPECT_EQ(hash, 12289001475230931003u);
 }
 
-TEST_F(Generate, ThreeSwitchesOfTwelvePortsHaveEveryMappedKeyOfTheirClass) {
-    for (const char *seed : {"1", "2", "3"}) {
+TEST_F(Generate, EverySwitchHasEveryMappedKeyOfItsClass) {
+    for (const char *ports : {"2", "3", "4", "5", "9", "12"}) {
         std::set<std::string> classes;
-        for (const json::value &sw : Switches({"--ports", "12", "--seed", seed})) {
+        for (const json::value &sw : Switches({"--ports", ports, "--seed", ports})) {
             const std::string className(sw.at("class").as_string());
             classes.insert(className);
             ExpectAll(Names(sw.at("global")), MappedKeys(DVS_PROP_CLASS_GLOBAL, className), sw.at("class"));
@@ -90,6 +90,19 @@ TEST_F(Generate, ThreeSwitchesOfTwelvePortsHaveEveryMappedKeyOfTheirClass) {
             ExpectAll(NamesOfPorts(sw), MappedKeys(DVS_PROP_CLASS_PORT, className), sw.at("class"));
         }
         EXPECT_EQ(classes, (std::set<std::string>{"etherswitch", "vswitch", "cswitch"}));
+    }
+}
+
+TEST_F(Generate, TwoSwitchesOfTwoPortsHaveEveryMappedKeyBetweenThem) {
+    std::set<std::string> found;
+    for (const json::value &sw : Switches({"--switches", "2", "--ports", "2"})) {
+        found.merge(Names(sw.at("global")));
+        found.merge(Names(sw.at("host")));
+        found.merge(NamesOfPorts(sw));
+    }
+    for (const int propClass : {DVS_PROP_CLASS_GLOBAL, DVS_PROP_CLASS_HOST, DVS_PROP_CLASS_PORT}) {
+        for (const auto *row = GetConfigMap(propClass); row->key; ++row)
+            EXPECT_TRUE(found.contains(row->key) || std::string_view(row->key) == "DEFAULT") << row->key;
     }
 }
 

@@ -133,8 +133,7 @@ constexpr Command kCommands[] = {
     {"generate", "Make a state of any size for trials", kGenerateOptions,
      "Realistic values, by the rules of each switch's class and version: uplinks and guests, ports of every "
      "kind, some\n"
-     "without names. With 3 switches of 12 ports or more, every property that has a place in the config "
-     "store "
+     "without names. With 2 switches of 2 ports or more, every property that has a place in the config store "
      "is there.\n"
      "The same numbers give the same bytes on any machine.\n",
      "  dvsctl generate --switches 32 --ports 512 --seed 7 trial.db\n"

@@ -24,7 +24,7 @@ namespace json = boost::json;
 
 constexpr std::uint32_t kFirstOverlayVersion = 100;
 constexpr std::uint32_t kLastEtherswitchMap = 106; // later versions have the vswitch's private VLAN map
-constexpr std::uint32_t kGuestPeriod = 8;          // over so many guest ports every key is there
+constexpr std::uint32_t kGuestPeriod = 8;          // over so many guest ports every key is there, or over all
 
 // The first three have a key of every row between them.
 constexpr SwitchSort kSorts[] = {
@@ -370,7 +370,8 @@ bool IsGiven(const Row &row, const Draw &d) {
     const bool isLucky = d.r.Percent(row.chance);
     if (IsUplink(d)) return row.who != Who::Guests && isLucky;
     const auto turn = static_cast<std::uint32_t>(&row - kRows);
-    const bool isDue = (d.port - d.sw.uplinks + turn) % kGuestPeriod == 0;
+    const auto guests = static_cast<std::uint32_t>(d.sw.ports.size()) - d.sw.uplinks;
+    const bool isDue = (d.port - d.sw.uplinks + turn) % std::min(kGuestPeriod, guests) == 0;
     return row.who != Who::Uplinks && (isDue || isLucky);
 }
 
@@ -426,7 +427,8 @@ SwitchPlan PlanSwitch(Random &random, std::uint32_t number, SwitchSort sort, std
     plan.className = sort.className;
     plan.version = sort.version;
     plan.versionText = VersionText(sort.version);
-    plan.uplinks = std::min(2 + number % 3, ports);
+    plan.uplinks = std::min(2 + number % 3, std::max(ports, 2u) - 1); // of two ports or more one is a guest
+    plan.uplinks = std::min(plan.uplinks, ports);
     for (std::uint32_t i = 0; i < ports; ++i)
         plan.ports.push_back(PortId(random, plan, i));
     for (std::uint32_t i = 0; i < std::max(plan.uplinks, 2u); ++i)
