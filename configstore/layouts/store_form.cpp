@@ -126,11 +126,11 @@ constexpr StoreField kLacpGroup[] = {
     {"name",                   Form::kText,   "", 64, nullptr,         nullptr, {}, "name of the group"},
     {"mode",                   Form::kText,   "", 0,  &kLacpModeTexts, nullptr, {}, "whether the group speaks first, answers only, or neither"},
     {"load_balance_algorithm", Form::kText,   "", 0,  &kLbPolicies,    nullptr, {}, "what decides over which uplink a frame goes"},
-    {"uplink_num",             Form::kUint32, "", 0,  nullptr,         nullptr, {}, "number of uplinks"},
+    {"uplink_num",             Form::kUint32, "", 0,  nullptr,         nullptr, {}, "number of uplinks", Rule::kNone, true},
 };
 constexpr StoreField kLinkDiscoveryMembers[] = {
-    {"protocol",  Form::kText, "", 0, &kCdpModes,      nullptr, {}, "protocol spoken"},
-    {"operation", Form::kText, "", 0, &kCdpOperations, nullptr, {}, "whether the switch listens, speaks, or both"},
+    {"protocol",  Form::kText, "", 0, &kCdpModes,      nullptr, {}, "protocol spoken", Rule::kNone, true},
+    {"operation", Form::kText, "", 0, &kCdpOperations, nullptr, {}, "whether the switch listens, speaks, or both", Rule::kNone, true},
 };
 constexpr StoreField kIpfixMembers[] = {
     {"idle_flow_timeout",     Form::kUint32, "seconds", 0, nullptr, nullptr, {}, "until a flow without traffic is reported"},

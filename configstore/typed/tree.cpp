@@ -291,8 +291,10 @@ Flaw WriteInstances(const StoreField &form, const Place &place, const Node &node
         std::string id = std::to_string(i);
         if (form.id) {
             const Node *member = item.Find(form.id);
-            if (!member || member->text.empty())
-                return {itemPath + "." + form.id, "is missing; it tells the entries apart"};
+            const std::string memberPath = itemPath + "." + form.id;
+            if (!member) return {memberPath, "is missing; it tells the entries apart"};
+            if (Flaw flaw = Expect(*member, Node::Kind::kText, memberPath)) return flaw;
+            if (member->text.empty()) return {memberPath, "is empty; it tells the entries apart"};
             id = member->text;
         }
         configstore::Object *object = nullptr;

@@ -39,6 +39,8 @@ TEST(TypedMistakes, AnotherType) {
                   "is a number, expected an object");
     ExpectRefusal(kVlan, R"({"vlan_id": 1.5})", ".vlan_id", "it is no whole number");
     ExpectRefusal(kVlan, "null", "", "is null, expected an object");
+    ExpectRefusal("common.port.dvfilter", R"({"network_filters": [{"slot_number": 3}]})",
+                  ".network_filters[0].slot_number", "is a number, expected a text");
 }
 
 TEST(TypedMistakes, AMemberThatThereIsNot) {
@@ -75,6 +77,7 @@ TEST(TypedMistakes, AMemberLeftOut) {
                   "is missing; the value needs it");
     ExpectRefusal("common.port.dvfilter", R"({"network_filters": [{"agent_name": "x"}]})",
                   ".network_filters[0].slot_number", "is missing; it tells the entries apart");
+    ExpectRefusal(kSessions, R"([{"key": ""}])", "[0].key", "is empty; it tells the entries apart");
 }
 
 TEST(TypedMistakes, TooManyElements) {
