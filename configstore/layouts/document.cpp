@@ -3,7 +3,10 @@
 
 #include "configstore/layouts/document.h"
 
+#include <algorithm>
 #include <set>
+#include <string>
+#include <vector>
 
 #include "configstore/layouts/registry.h"
 
@@ -131,22 +134,29 @@ std::string RecordText(const Record &record, std::set<const Record *> *described
     return text;
 }
 
-std::string FormRows(const StoreField &field, const std::string &path) {
-    std::string text =
-        "| `" + path + "` | " + FormText(field) + " | " + field.meaning + DomainText(field) + " |\n";
-    const std::string below = path + (field.form == Form::kInstances ? "[]." : ".");
+// `names` are what the field is called: a leaf's can be several.
+std::string FormRows(const StoreField &field, const std::vector<std::string> &names) {
+    std::string text;
+    for (const std::string &name : names)
+        text += (text.empty() ? "| `" : ", `") + name + "`";
+    text += " | " + FormText(field) + " | " + field.meaning + DomainText(field) + " |\n";
+    const std::string below = names.front() + (field.form == Form::kInstances ? "[]." : ".");
     for (const StoreField &member : field.members)
-        text += FormRows(member, below + member.name);
+        text += FormRows(member, {below + member.name});
     return text;
 }
 
-std::string LeafOf(uint32_t type) {
+// The last path names of the type's rows, each once.
+std::vector<std::string> LeavesOf(uint32_t type) {
+    std::vector<std::string> leaves;
     for (const ClassName &each : kClasses) {
         for (const auto *row = GetConfigMap(static_cast<int>(each.propClass)); row->key; ++row) {
-            if (row->converterType == type) return row->path[row->depth - 1];
+            const std::string leaf = row->path[row->depth - 1];
+            if (row->converterType == type && std::find(leaves.begin(), leaves.end(), leaf) == leaves.end())
+                leaves.push_back(leaf);
         }
     }
-    return "";
+    return leaves;
 }
 
 std::string Types() {
@@ -157,12 +167,12 @@ std::string Types() {
         if (!info) continue;
         text += "\n### Type " + std::to_string(type) + "\n\n" + info->name + "." +
                 (*info->quirks ? " " : "") + info->quirks + "\n";
-        for (const Record *record : {info->record, info->wide}) {
-            const std::string layout = RecordText(*record, &described);
-            const bool isRepeated = layout.empty() && record == info->record;
-            text += isRepeated ? std::string("\nThe value is a *") + record->name + "* as above.\n" : layout;
-        }
-        text += "\n| in the store | form | meaning |\n|---|---|---|\n" + FormRows(*info->form, LeafOf(type));
+        const std::string layout = RecordText(*info->record, &described);
+        text += layout.empty() ? std::string("\nThe value is a *") + info->record->name + "* as above.\n"
+                               : layout;
+        text += RecordText(*info->wide, &described); // where it is another one
+        text +=
+            "\n| in the store | form | meaning |\n|---|---|---|\n" + FormRows(*info->form, LeavesOf(type));
     }
     return text;
 }

@@ -44,6 +44,36 @@ TEST(PropertiesDocument, ExplainsEveryKey) {
     EXPECT_EQ(nullptr, RecordOf(0, "com.acme.other", false));
 }
 
+// The document's part about one type.
+std::string SectionOf(uint32_t type) {
+    const std::string document = PropertiesDocument() + "\n###";
+    const auto at = document.find("### Type " + std::to_string(type) + "\n");
+    if (at == std::string::npos) return "";
+    return document.substr(at, document.find("\n###", at) - at);
+}
+
+TEST(PropertiesDocument, DescribesEachRecordOnceAndRefersToItElsewhere) {
+    const std::string number = SectionOf(0);
+    EXPECT_NE(std::string::npos, number.find("*number*, 4 bytes"));
+    EXPECT_EQ(std::string::npos, number.find("as above")) << number;
+    const std::string mtu = SectionOf(21);
+    EXPECT_EQ(std::string::npos, mtu.find("*number*, 4 bytes"));
+    const auto reference = mtu.find("The value is a *number* as above.");
+    ASSERT_NE(std::string::npos, reference);
+    EXPECT_EQ(std::string::npos, mtu.find("as above", reference + 30)) << mtu;
+    EXPECT_NE(std::string::npos, SectionOf(9).find("wide port record"));
+}
+
+TEST(PropertiesDocument, NamesEveryPlaceOfAType) {
+    for (uint32_t propClass = 0; propClass <= 2; ++propClass) {
+        for (const auto *row = GetConfigMap(static_cast<int>(propClass)); row->key; ++row) {
+            const std::string leaf = std::string("`") + row->path[row->depth - 1] + "`";
+            EXPECT_NE(std::string::npos, SectionOf(row->converterType).find(leaf))
+                << row->key << " is not under " << leaf;
+        }
+    }
+}
+
 // Every test that docs/config-store.md names for an oddity.
 TEST(DeliberateOddities, NameTestsThatThereAre) {
     std::string sources;
