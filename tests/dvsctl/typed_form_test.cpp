@@ -162,6 +162,16 @@ TEST(TypedForm, RefusesWhatHasNoSuchForm) {
     EXPECT_NE(Refusal(Named(kVlan, R"("type": 16)")).why.find("\"value\" or \"typed\""), std::string::npos);
 }
 
+TEST(TypedForm, SaysWhereFieldsBelong) {
+    for (const char *fields : {R"({"vlan_id": 100})", "[1]", "true", "{}"}) {
+        const Error error = Refusal(Named(kVlan, R"("value": )" + std::string(fields)));
+        EXPECT_EQ(error.path, "$.switches[0].ports[0].properties[0].value");
+        EXPECT_EQ(error.why, "these are no bytes; what a value means is given as \"typed\" in its place");
+    }
+    EXPECT_NE(Refusal(Named(kVlan, R"("value": {"hex": "00", "vlan_id": 1})")).why.find("not known here"),
+              std::string::npos);
+}
+
 TEST(TypedForm, RefusesWhatWouldReadBackOtherwise) {
     // The record counts bytes: three bits are none.
     const Error error = Refusal(Named(

@@ -11,6 +11,7 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
+#include "configstore/layouts/registry.h"
 #include "dvs/configstore.h"
 #include "dvs/state.h"
 #include "dvsdata/format.h"
@@ -250,6 +251,19 @@ void CheckTyped(const Place &place, const json::value &value, const Owner &owner
     place.Refuse("\"value\" says something else; leave out the one that is not meant");
 }
 
+// Under "value" stand bytes in one of their notations. A known property's fields there are a slip, and where
+// they belong is said.
+void RefuseFields(const Place &place, const json::value &value, const Owner &owner, const std::string &name) {
+    if (value.is_string() || value.is_number() || value.is_null()) return;
+    const auto isNotation = [](const auto &member) {
+        constexpr std::string_view kMembers[] = {"hex", "base64", "text", "size", "names", "slot", "comment"};
+        return std::ranges::find(kMembers, std::string_view(member.key())) != std::end(kMembers);
+    };
+    if (value.is_object() && std::ranges::any_of(value.get_object(), isNotation)) return;
+    if (layout::FindProperty(owner.propClass, name))
+        place.Refuse("these are no bytes; what a value means is given as \"typed\" in its place");
+}
+
 NewEntry PropertyAt(const Place &place, const json::value &value, const Owner &owner) {
     const json::object &object = ObjectAt(place, value);
     AllowOnly(place, object, {"name", "type", "value", "typed", "summary", "damage"});
@@ -257,6 +271,7 @@ NewEntry PropertyAt(const Place &place, const json::value &value, const Owner &o
     const json::value *raw = Find(object, "value"), *typed = Find(object, "typed");
     entry.type = TypeAt(place, object, typed && !raw ? kStateType : kDefaultType);
     if (!raw && !typed) place.Refuse("the key \"value\" or \"typed\" is missing");
+    if (raw) RefuseFields(place.Member("value"), *raw, owner, entry.name);
     if (raw) entry.value = ValueAt(place.Member("value"), *raw);
     if (raw && typed) CheckTyped(place.Member("typed"), *typed, owner, entry);
     if (!raw) entry.value = TypedAt(place.Member("typed"), *typed, owner, entry.name);
