@@ -15,6 +15,7 @@
 #include <boost/json/parse.hpp>
 #include <fcntl.h>
 #include <pty.h>
+#include <sys/resource.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -33,11 +34,13 @@ std::string ReadToEnd(int fd) {
     }
 }
 
-int StatusOf(pid_t child) {
+void AwaitEnd(pid_t child, Result &result) {
     int status = 0;
-    while (waitpid(child, &status, 0) < 0 && errno == EINTR) {
+    rusage usage{};
+    while (wait4(child, &status, 0, &usage) < 0 && errno == EINTR) {
     }
-    return WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    result.status = WIFEXITED(status) ? WEXITSTATUS(status) : 128 + WTERMSIG(status);
+    result.peakKilobytes = usage.ru_maxrss;
 }
 
 [[noreturn]] void Become(const std::vector<std::string> &args, const std::vector<std::string> &environment) {
@@ -95,7 +98,7 @@ Result RunProgram(const Run &run) {
     if (run.openInput) close(in[1]);
     close(out[0]);
     close(err[0]);
-    result.status = StatusOf(child);
+    AwaitEnd(child, result);
     return result;
 }
 
@@ -108,7 +111,7 @@ Result RunInTerminal(const std::vector<std::string> &args, const std::vector<std
     Result result;
     result.out = ReadToEnd(terminal);
     close(terminal);
-    result.status = StatusOf(child);
+    AwaitEnd(child, result);
     return result;
 }
 

@@ -18,6 +18,7 @@ namespace dvs::ctl::test {
 struct Result {
     int status = -1; ///< exit status, or 128 plus the signal that ended it
     std::string out, err;
+    long peakKilobytes = 0; ///< the most memory that it had at once
 };
 
 struct Run {

@@ -12,6 +12,12 @@ using dvs::ctl::NewEntry;
 
 using StoreSource = StoreProgram;
 
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping is most of it
+#else
+constexpr bool kMemoryCounts = true;
+#endif
+
 TEST_F(StoreSource, ReadOfAStoreThatIsNotThereIsAnErrorAndMakesNone) {
     for (const char *verb : {"show", "verify"}) {
         const Result result = Ctl({verb, "store:"});
@@ -182,6 +188,30 @@ TEST_F(StoreSource, LoadThatGivesNothingIsAFailure) {
         EXPECT_NE(failed.err.find("forwarding_class"), std::string::npos) << failed.err;
     }
     EXPECT_EQ(Ctl({"copy", "store:", At("out.db")}).status, 7);
+}
+
+// What a save of the most ports of a host may take follows from this.
+TEST_F(StoreSource, CopyTakesFewTimesTheStatesSize) {
+    constexpr long kIdleKilobytes = 14000;
+    const char *const ports = kMemoryCounts ? "2048" : "64";
+    ASSERT_EQ(Ctl({"generate", At("large.db"), "--switches", "1", "--ports", ports}).status, 0);
+    for (int save = 0; save < 2; ++save) { // the second one has documents to replace
+        const Result copied = Ctl({"copy", At("large.db"), "store:"});
+        ASSERT_EQ(copied.status, 0) << copied.err;
+        const auto size = static_cast<long>(Get("large.db").size() / 1024);
+        if (kMemoryCounts) {
+            EXPECT_LT(copied.peakKilobytes, kIdleKilobytes + 4 * size);
+        }
+    }
+}
+
+// Traces are for --verbose: a load that is followed builds every list apart.
+TEST_F(StoreSource, TheLibraryTracesOnlyWhenAsked) {
+    const Result quiet = Ctl({"copy", At("site.db"), "store:"});
+    EXPECT_EQ(quiet.err.find("SaveDVS"), std::string::npos) << quiet.err;
+    const Result verbose = Ctl({"copy", At("site.db"), "store:", "--verbose"});
+    EXPECT_NE(verbose.err.find("libdvs: SaveDVS: production"), std::string::npos) << verbose.err;
+    EXPECT_NE(verbose.err.find("libdvs: Loading switch:alpha"), std::string::npos) << verbose.err;
 }
 
 } // namespace

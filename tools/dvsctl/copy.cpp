@@ -2,6 +2,8 @@
 // `dvsctl copy`: a verified state from one source to another. Nothing is written before everything has been
 // read and judged; what then goes wrong leaves the target as it was.
 
+#include <utility>
+
 #include <fmt/format.h>
 
 #include "tools/dvsctl/commands.h"
@@ -49,7 +51,7 @@ Exit RunCopy(Context &context) {
     if (!read) throw Error(AbsentError(*from));
     LoadedState loaded = JudgeState(*from, std::move(*read));
     if (options.switchId) loaded = OnlySwitch(context, *from, loaded);
-    return PutState(context, job, loaded, *to);
+    return PutState(context, job, std::move(loaded), *to);
 }
 
 } // namespace dvs::ctl

@@ -3,9 +3,11 @@
 
 #include "tools/dvsctl/log_capture.h"
 
+#include <algorithm>
 #include <cstdio>
 #include <utility>
 
+#include "dvs/configstore.h"
 #include "dvs/log.h"
 #include "tools/dvsctl/text.h"
 
@@ -17,16 +19,21 @@ constexpr std::size_t kMostKept = 8;
 
 } // namespace
 
-LogCapture::LogCapture() {
+LogCapture::LogCapture() : storeLevel_(dvsconfigstore_debug) {
+    SetVerbose(false);
     DVSLog_SetSink(Receive, this);
 }
 
 LogCapture::~LogCapture() {
     DVSLog_SetSink(nullptr, nullptr);
+    dvsconfigstore_debug = storeLevel_;
 }
 
+// Traces that nobody reads are not only formatted in vain: a load that is followed builds lists in lists, at
+// twice the memory.
 void LogCapture::SetVerbose(bool verbose) {
     verbose_ = verbose;
+    dvsconfigstore_debug = verbose ? storeLevel_ : std::min(storeLevel_, 0);
 }
 
 std::vector<std::string> LogCapture::Take() {

@@ -5,6 +5,7 @@
 // Catches the library's messages, so that they become the cause in dvsctl's own errors instead of lines
 // between its output. With --verbose they are also printed on standard error as they come.
 
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -12,8 +13,7 @@ namespace dvs::ctl {
 
 class LogCapture {
 public:
-    /// Becomes the library's sink until it is destroyed, with the debug levels raised so that error messages
-    /// come.
+    /// Becomes the library's sink until it is destroyed, and has it say errors only until then.
     LogCapture();
     ~LogCapture();
     LogCapture(const LogCapture &) = delete;
@@ -28,6 +28,7 @@ public:
 private:
     static void Receive(int level, const char *text, void *self);
 
+    const std::int32_t storeLevel_; // of the config store's messages, as it was
     std::vector<std::string> messages_;
     bool verbose_ = false;
 };

@@ -130,7 +130,7 @@ void CheckPutOptions(const Options &options, const Source &to) {
         throw Error(Exit::Usage, "--may-exist and --no-replace exclude each other");
 }
 
-Exit PutState(Context &context, const PutJob &job, const LoadedState &loaded, Source &to) {
+Exit PutState(Context &context, const PutJob &job, LoadedState loaded, Source &to) {
     const Options &options = context.options;
     const Bytes state = Bytes(loaded.raw.bytes).first(loaded.state.size);
     Outcome outcome{job, to, CountState(loaded.state), state.size(), false};
@@ -144,6 +144,7 @@ Exit PutState(Context &context, const PutJob &job, const LoadedState &loaded, So
         planned = JudgeState(to, {to.Plan(context, state), {}});
         changes = Compare(target.loaded.state, planned.state, {});
     } else {
+        loaded.state.switches = {}; // a third of the bytes' size that the write can have
         to.Write(context, state);
         outcome.isWritten = true;
     }

@@ -22,7 +22,7 @@ void CheckPutOptions(const Options &options, const Source &to);
 
 /// Writes the state to `to`, or with --dry-run says what that would change, and reports. `loaded` has been
 /// judged.
-Exit PutState(Context &context, const PutJob &job, const LoadedState &loaded, Source &to);
+Exit PutState(Context &context, const PutJob &job, LoadedState loaded, Source &to);
 
 /// The JSON report of a job that had nothing to put.
 void ReportNothingPut(Context &context, const PutJob &job, const Source &to);

@@ -3,6 +3,7 @@
 // checked save, so that a copy is what an agent's save or load would be. Stands on store/.
 
 #include <cstdlib>
+#include <malloc.h>
 #include <memory>
 
 #include <fmt/format.h>
@@ -33,6 +34,25 @@ constexpr const char *kTimingText = "DVSState_SaveBufToConfigStore_ByInstance";
 struct FreeBuffer {
     void operator()(void *buffer) const { std::free(buffer); }
 };
+
+// A state as the library hands it out.
+struct LibraryBuffer {
+    std::unique_ptr<void, FreeBuffer> buffer;
+    std::uint32_t length = 0;
+
+    std::vector<std::uint8_t> Copy() const {
+        const auto *bytes = static_cast<const std::uint8_t *>(buffer.get());
+        return {bytes, bytes + length};
+    }
+};
+
+// Looking at a state and saving it take its size and more in many small blocks each. What their ends leave of
+// them in the heap would add to what the next step takes.
+void GiveBackFreedMemory() {
+#ifdef __GLIBC__
+    (void)malloc_trim(0);
+#endif
+}
 
 std::size_t CountLayer(const OpenStore &store, admin::Layer layer) {
     std::size_t count = 0;
@@ -67,6 +87,7 @@ public:
         RefuseDesired();
         AwaitTurn(context, path_, "cannot save to the config store");
         const Progress progress(context, "saving " + ShowCount(CountState(ParseState(state))));
+        GiveBackFreedMemory();
         PointLibraryAt(path_);
         Save(context, state);
         (void)LoadSaved(context, state);
@@ -76,7 +97,7 @@ public:
         RefuseDesired();
         const ScratchStore scratch(context, path_);
         Save(context, state);
-        if (auto loaded = LoadSaved(context, state)) return *std::move(loaded);
+        if (const auto loaded = LoadSaved(context, state)) return loaded->Copy();
         return {state.begin(), state.end()}; // what it would hold, although nobody could read it
     }
 
@@ -121,12 +142,13 @@ private:
 
     std::vector<std::uint8_t> Load(Context &context) {
         PointLibraryAt(path_);
-        return LoadHere(context);
+        return LoadHere(context).Copy();
     }
 
     // The state that has just been saved, as the store gives it back. A save takes states that no load does:
     // then nothing, and a warning.
-    std::optional<std::vector<std::uint8_t>> LoadSaved(Context &context, Bytes state) {
+    std::optional<LibraryBuffer> LoadSaved(Context &context, Bytes state) {
+        GiveBackFreedMemory();
         try {
             return LoadHere(context);
         } catch (const Error &error) {
@@ -135,17 +157,14 @@ private:
         }
     }
 
-    std::vector<std::uint8_t> LoadHere(Context &context) {
+    LibraryBuffer LoadHere(Context &context) {
         (void)context.log.Take(); // what was said before has been told
         const configstore::MessageCollector messages;
         void *out = nullptr;
         std::uint32_t length = 0;
         const std::int32_t status = DVSState_LoadFromConfigStoreAsBuf(&out, &length, desired_);
-        const std::unique_ptr<void, FreeBuffer> buffer(out);
-        if (status == 0 && out) {
-            const auto *bytes = static_cast<const std::uint8_t *>(out);
-            return {bytes, bytes + length};
-        }
+        LibraryBuffer loaded{std::unique_ptr<void, FreeBuffer>(out), length};
+        if (status == 0 && out) return loaded;
         Error error = Failure(context, status, "cannot load the switches of the config store", messages);
         if (status == 0) error.why = "the load ended at a switch that it could not load, and gave nothing";
         if (error.status == Exit::Malformed || error.status == Exit::NotThere || error.status == Exit::Failed)
