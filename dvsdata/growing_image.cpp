@@ -48,13 +48,15 @@ void GrowingImage::Expect(std::size_t size) {
 
 void GrowingImage::BeginBuffer() {
     assert(depth_ < kMaxDepth);
-    levels_[depth_++] = {OpenBufferAt(at_), 0, 0, 0};
+    level_ = &levels_[depth_++];
+    *level_ = {OpenBufferAt(at_), 0, 0, 0};
     if (std::uint8_t *const header = Claim(kHeaderSize)) std::memset(header, 0, kHeaderSize);
 }
 
 void GrowingImage::EndBuffer() {
     assert(depth_ > 0);
     const Level level = levels_[--depth_];
+    level_ = depth_ > 0 ? &levels_[depth_ - 1] : nullptr;
     std::uint8_t *const marker = Claim(kMarkerSize);
     if (!marker) return;
     Store32(marker, 0);
@@ -64,7 +66,7 @@ void GrowingImage::EndBuffer() {
         return;
     }
     // The entry's sizes come first: the buffer around sums them too.
-    Level &outer = levels_[depth_ - 1];
+    Level &outer = *level_;
     const auto size = static_cast<std::uint32_t>(at_ - level.buffer.start);
     std::uint8_t *const entry = begin_ + outer.entry;
     Store32(entry + kEntrySizeOffset, EntrySize(size));
@@ -74,7 +76,7 @@ void GrowingImage::EndBuffer() {
 
 void GrowingImage::BeginEntry(std::string_view name, std::uint32_t propType) {
     assert(depth_ > 0);
-    levels_[depth_ - 1].entry = at_;
+    level_->entry = at_;
     std::uint8_t *const fixed = Claim(kEntryFixedSize);
     if (!fixed) return;
     StoreName(fixed + kNameOffset, name);
@@ -84,16 +86,34 @@ void GrowingImage::BeginEntry(std::string_view name, std::uint32_t propType) {
 void GrowingImage::EndEntry() {
     assert(depth_ > 0);
     if (gaveUp_) return;
-    const std::size_t entry = levels_[depth_ - 1].entry;
+    const std::size_t entry = level_->entry;
     const std::size_t padding = entry + Load32(begin_ + entry + kEntrySizeOffset) - at_;
     if (std::uint8_t *const to = Claim(padding)) std::memset(to, 0, padding);
 }
 
-void GrowingImage::Append(std::string_view name, Bytes value, std::uint32_t propType) {
-    Put(name, value, propType);
+namespace {
+
+/// Most values are a few bytes, which a call would take longer to look at than to copy.
+inline void CopyValue(std::uint8_t *to, Bytes value) {
+    const std::uint8_t *const from = value.data();
+    const std::size_t size = value.size();
+    if (size > 16) {
+        std::memcpy(to, from, size);
+    } else if (size >= 8) {
+        std::memcpy(to, from, 8);
+        std::memcpy(to + size - 8, from + size - 8, 8);
+    } else if (size >= 4) {
+        std::memcpy(to, from, 4);
+        std::memcpy(to + size - 4, from + size - 4, 4);
+    } else {
+        for (std::size_t i = 0; i < size; ++i)
+            to[i] = from[i];
+    }
 }
 
-void GrowingImage::Put(std::string_view name, Bytes value, std::uint32_t propType) {
+} // namespace
+
+inline void GrowingImage::Put(std::string_view name, Bytes value, std::uint32_t propType) {
     if (value.size() > kMaxSize) gaveUp_ = true;
     const std::size_t size = EntrySize(static_cast<std::uint32_t>(value.size()));
     std::uint8_t *const entry = Claim(size);
@@ -103,11 +123,15 @@ void GrowingImage::Put(std::string_view name, Bytes value, std::uint32_t propTyp
     StoreName(entry + kNameOffset, name);
     Store32(entry + kPropTypeOffset, propType);
     Store32(entry + kDataLenOffset, static_cast<std::uint32_t>(value.size()));
-    if (!value.empty()) std::memcpy(entry + kEntryFixedSize, value.data(), value.size());
+    CopyValue(entry + kEntryFixedSize, value);
+}
+
+void GrowingImage::Append(std::string_view name, Bytes value, std::uint32_t propType) {
+    Put(name, value, propType);
 }
 
 std::size_t GrowingImage::Find(std::string_view name) const {
-    std::size_t at = levels_[depth_ - 1].buffer.start + kHeaderSize;
+    std::size_t at = level_->buffer.start + kHeaderSize;
     const std::size_t last = name.empty() ? 0 : std::min<std::size_t>(name.size(), kNameSize) - 1;
     for (; at < at_; at += Load32(begin_ + at + kEntrySizeOffset)) {
         const auto *const field = reinterpret_cast<const char *>(begin_ + at + kNameOffset);
@@ -120,33 +144,39 @@ std::size_t GrowingImage::Find(std::string_view name) const {
 void GrowingImage::Update(std::string_view name, Bytes value, std::uint32_t propType) {
     assert(depth_ > 0);
     if (gaveUp_) return;
-    Level &level = levels_[depth_ - 1];
     const std::uint64_t mark = MarkOf(name);
-    const std::size_t found = level.names & mark ? Find(name) : at_;
-    level.names |= mark;
-    std::uint32_t type = propType ? propType : kDefaultPropType;
-    if (found == at_) {
-        if (++level.entries > kMaxUpdates) gaveUp_ = true;
-        Put(name, value, type);
-        return;
+    if (level_->names & mark) {
+        const std::size_t found = Find(name);
+        if (found != at_) return UpdateInPlace(found, name, value, propType);
     }
-    std::uint8_t *const entry = begin_ + found;
+    level_->names |= mark;
+    if (++level_->entries > kMaxUpdates) gaveUp_ = true;
+    Put(name, value, propType ? propType : kDefaultPropType);
+}
+
+void GrowingImage::UpdateInPlace(std::size_t at, std::string_view name, Bytes value, std::uint32_t propType) {
+    std::uint8_t *const entry = begin_ + at;
+    std::uint32_t type = propType ? propType : kDefaultPropType;
     if (Load32(entry + kDataLenOffset) == value.size()) {
-        if (!value.empty()) std::memcpy(entry + kEntryFixedSize, value.data(), value.size());
+        CopyValue(entry + kEntryFixedSize, value);
         Store32(entry + kPropTypeOffset, type);
         return;
     }
     // Another length: the entry goes and comes back as the last one, with its old type where there is no new.
     if (!propType) type = Load32(entry + kPropTypeOffset);
     const std::size_t size = Load32(entry + kEntrySizeOffset);
-    std::memmove(entry, entry + size, at_ - found - size);
+    std::memmove(entry, entry + size, at_ - at - size);
     at_ -= size;
     Put(name, value, type);
 }
 
 void GrowingImage::HandOver(void **buf, std::uint32_t *len) {
     assert(depth_ == 0 && !gaveUp_);
-    void *const fitting = std::realloc(begin_, at_);
+    // A block that is not much too large is handed out as it is: mapped memory would be mapped anew by each
+    // load for the sake of pages that nobody has touched, where the heap keeps a block that it gets back
+    // whole.
+    const bool isWasteful = at_ < capacity_ / 2;
+    void *const fitting = isWasteful ? std::realloc(begin_, at_) : nullptr;
     *buf = fitting ? fitting : begin_;
     *len = static_cast<std::uint32_t>(at_);
     begin_ = nullptr;

@@ -66,13 +66,20 @@ private:
         return at;
     }
     bool MakeRoom(std::size_t size) { return !gaveUp_ && Grow(size); }
-    /// One of 64: entries whose marks differ have different names, and most are told apart by that.
+    /// One of 64: entries whose marks differ have different names, and most are told apart by that. The
+    /// factors are such that hardly any two known keys of a table fall together.
     [[nodiscard]] static std::uint64_t MarkOf(std::string_view name) {
-        const std::size_t last = name.empty() ? 0 : static_cast<std::uint8_t>(name.back());
-        return std::uint64_t{1} << (name.size() * 5 + last * 3) % 64;
+        constexpr std::size_t kLast = 34;
+        constexpr std::size_t kThirdLast = 15;
+        std::size_t mark = name.size();
+        if (name.size() >= 3) [[likely]]
+            mark += static_cast<std::uint8_t>(name.back()) * kLast +
+                    static_cast<std::uint8_t>(name[name.size() - 3]) * kThirdLast;
+        return std::uint64_t{1} << mark % 64;
     }
     bool Grow(std::size_t size);
-    void Put(std::string_view name, Bytes value, std::uint32_t propType);
+    [[gnu::always_inline]] inline void Put(std::string_view name, Bytes value, std::uint32_t propType);
+    void UpdateInPlace(std::size_t entry, std::string_view name, Bytes value, std::uint32_t propType);
     [[nodiscard]] std::size_t Find(std::string_view name) const;
 
     std::uint8_t *begin_ = nullptr;
@@ -80,6 +87,7 @@ private:
     std::size_t capacity_ = 0;
     std::array<Level, kMaxDepth> levels_{};
     std::size_t depth_ = 0;
+    Level *level_ = nullptr; // the innermost
     bool gaveUp_ = false;
 };
 
