@@ -120,15 +120,15 @@ private:
 
     [[nodiscard]] bool IsNext(const Field &field) const {
         if (last_ - at_ < static_cast<std::ptrdiff_t>(sizeof field.words)) return false;
-        uint64_t word = 0;
-        const char *at = at_;
-        const uint64_t *wanted = field.words.data();
-        for (uint32_t left = field.wordNum; left > 1; left--, at += kWord) {
-            std::memcpy(&word, at, kWord);
-            if (word != *wanted++) return false;
-        }
-        std::memcpy(&word, at, kWord);
-        return field.wordNum > 0 && (word & field.lastMask) == *wanted;
+        const auto difference = [this, &field](std::size_t i) {
+            uint64_t word = 0;
+            std::memcpy(&word, at_ + i * kWord, kWord);
+            return (word ^ field.words[i]) & field.masks[i];
+        };
+        // All words, whether they count or not: that takes less than counting them.
+        static_assert(Field::kMaxWords == 5);
+        const uint64_t all = difference(0) | difference(1) | difference(2) | difference(3) | difference(4);
+        return all == 0 && field.wordNum > 0;
     }
 
     bool Value(Object *node, const Field *field, std::size_t depth) {
@@ -274,13 +274,18 @@ private:
         constexpr std::ptrdiff_t kSafeDigits = 18; // of any such number fits
         const bool negative = Take('-');
         const char *const digits = at_;
-        int64_t value = 0;
-        while (*at_ >= '0' && *at_ <= '9' && at_ - digits < kSafeDigits)
-            value = value * 10 + (*at_++ - '0');
-        const std::ptrdiff_t count = at_ - digits;
-        if (count == 0 || (*digits == '0' && (count > 1 || negative))) return false;
-        if (*at_ != ',' && *at_ != '}' && *at_ != ']') return false;
-        *number = negative ? -value : value;
+        const char *at = digits;
+        uint64_t value = 0;
+        unsigned digit = 0;
+        while ((digit = static_cast<unsigned char>(*at) - unsigned{'0'}) < 10) {
+            value = value * 10 + digit; // as long as it is kept
+            at++;
+        }
+        const std::ptrdiff_t count = at - digits;
+        if (count == 0 || count > kSafeDigits || (*digits == '0' && (count > 1 || negative))) return false;
+        if (*at != ',' && *at != '}' && *at != ']') return false;
+        at_ = at;
+        *number = negative ? -static_cast<int64_t>(value) : static_cast<int64_t>(value);
         return true;
     }
 

@@ -7,41 +7,16 @@
 // they leave holes.
 
 #include <cstddef>
-#include <cstdint>
-#include <sys/mman.h>
 
 namespace configstore {
 
 inline constexpr std::size_t kHugePage = std::size_t{1} << 21;
 
-[[nodiscard]] inline char *MapPages(std::size_t size) {
-    void *const block = mmap(nullptr, size, PROT_READ | PROT_WRITE, MAP_PRIVATE | MAP_ANONYMOUS, -1, 0);
-    return block == MAP_FAILED ? nullptr : static_cast<char *>(block);
-}
-
-/// A zeroed block of at least *size bytes, which is rounded up to whole huge pages. Null when there is no
-/// memory.
-[[nodiscard]] inline char *MapHugePages(std::size_t *size) {
-    const auto past = [](const char *block) { return reinterpret_cast<uintptr_t>(block) % kHugePage; };
-    if (*size > SIZE_MAX - 2 * kHugePage) return nullptr;
-    *size = (*size + kHugePage - 1) / kHugePage * kHugePage;
-    char *block = MapPages(*size);
-    if (block && past(block) != 0) { // rare, as the system puts mappings side by side
-        (void)munmap(block, *size);
-        block = MapPages(*size + kHugePage);
-        if (!block) return nullptr;
-        const std::size_t before = (kHugePage - past(block)) % kHugePage;
-        if (before > 0) (void)munmap(block, before);
-        (void)munmap(block + before + *size, kHugePage - before);
-        block += before;
-    }
-    if (block) (void)madvise(block, *size, MADV_HUGEPAGE);
-    return block;
-}
-
-inline void UnmapHugePages(void *block, std::size_t size) {
-    (void)munmap(block, size);
-}
+/// A block of at least *size bytes, which is rounded up to whole huge pages. Nothing is promised of what it
+/// holds. Null when there is no memory.
+[[nodiscard]] char *MapHugePages(std::size_t *size);
+/// Gives such a block back; `size` as MapHugePages has left it.
+void UnmapHugePages(void *block, std::size_t size);
 
 } // namespace configstore
 

@@ -91,17 +91,7 @@ Tree::~Tree() {
         DropIndex(table);
 }
 
-namespace {
-
-Object *WithField(const Object *object, const Field *field) {
-    if (!(object->present & field->mark)) return nullptr;
-    Object *member = object->members.first;
-    while (member && member->field != field) // a name is never at a field's address
-        member = member->next;
-    return member;
-}
-
-Object *Undescribed(const Object *object, std::string_view name) {
+Object *FindUndescribed(const Object *object, std::string_view name) {
     if (!(object->present & kUndescribedMark)) return nullptr;
     Object *member = object->members.first;
     while (member && (member->described || NameOf(member) != name))
@@ -109,23 +99,10 @@ Object *Undescribed(const Object *object, std::string_view name) {
     return member;
 }
 
-} // namespace
-
-// Where the shape knows a name, every member of that name has its field.
 Object *FindMember(Object *object, std::string_view name) {
     const Shape *const shape = ShapeOf(object);
     const Field *const field = shape ? shape->Find(name) : nullptr;
-    return field ? WithField(object, field) : Undescribed(object, name);
-}
-
-Place FindPlace(Object *object, const char *name) {
-    const Shape *const shape = ShapeOf(object);
-    const Field *const field = shape ? shape->FindAgain(name) : nullptr;
-    return {field ? WithField(object, field) : Undescribed(object, name), field};
-}
-
-Object *FindMember(Object *object, const char *name) {
-    return FindPlace(object, name).member;
+    return field ? WithField(object, field) : FindUndescribed(object, name);
 }
 
 Object *FindInstance(Object *list, std::string_view id) {
@@ -160,6 +137,7 @@ std::string PathOf(const Object *node) {
 Object *AddMember(Tree *tree, Object *object, const Field *field, std::string_view name) {
     if (field) return AddDescribed(tree, object, field);
     const Name *const ownName = NewName(tree->arena, name);
+    tree->hasUnknown = true;
     Object *const member = NewNode(tree->arena, object);
     member->name = ownName;
     LinkMember(object, member);

@@ -106,6 +106,7 @@ struct Tree {
     const Shape *shape = nullptr;
     InstanceTable *tables = nullptr;
     bool suspect = false;                    // some node was bad once
+    bool hasUnknown = false;                 // some object had a member without a field once
     std::shared_ptr<const std::string> text; // that its Later nodes are in
     std::string key, group, component, instance;
 
@@ -127,6 +128,9 @@ struct Tree {
 /// What a filter spec selects by; also the address of a store object.
 struct FilterSpec {
     std::string key, group, component, instance;
+    /// A shape below which no field has the key's name, found by a search before: searches of one load ask
+    /// the same of thousands of objects. Any thread may put in another at any time.
+    mutable const Shape *notBelow = nullptr;
 };
 
 // Walking.
@@ -147,14 +151,29 @@ struct FilterSpec {
     }
     return reinterpret_cast<Tree *>(node);
 }
-[[nodiscard]] Object *FindMember(Object *object, std::string_view name);
-[[nodiscard]] Object *FindMember(Object *object, const char *name);
+[[nodiscard]] inline Object *WithField(const Object *object, const Field *field) {
+    if (!(object->present & field->mark)) return nullptr;
+    Object *member = object->members.first;
+    while (member && member->field != field) // a name is never at a field's address
+        member = member->next;
+    return member;
+}
+[[nodiscard]] Object *FindUndescribed(const Object *object, std::string_view name);
 /// For writers: the member of a name, or null and the field that it will have, if the shape knows the name.
+/// Where it does, every member of that name has its field.
 struct Place {
     Object *member;
     const Field *field;
 };
-[[nodiscard]] Place FindPlace(Object *object, const char *name);
+[[nodiscard]] inline Place FindPlace(const Object *object, const char *name) {
+    const Shape *const shape = ShapeOf(object);
+    const Field *const field = shape ? shape->FindAgain(name) : nullptr;
+    return {field ? WithField(object, field) : FindUndescribed(object, name), field};
+}
+[[nodiscard]] inline Object *FindMember(Object *object, const char *name) {
+    return FindPlace(object, name).member;
+}
+[[nodiscard]] Object *FindMember(Object *object, std::string_view name);
 [[nodiscard]] Object *FindInstance(Object *list, std::string_view id);
 [[nodiscard]] Object *FirstChild(const Object *container); // of an Object or Instances
 /// "settings/vlan/vlan_id", with the ids of instances in brackets.

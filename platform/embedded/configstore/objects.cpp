@@ -2,6 +2,7 @@
 // Objects, sub-objects and filter specs of the client interface (platform/configstore.h): a thin face over
 // the tree of node.h.
 
+#include <atomic>
 #include <cstdlib>
 #include <memory>
 #include <sys/random.h>
@@ -126,8 +127,21 @@ int32_t SelectMember(Object *member, const FilterSpec &spec, std::vector<Object 
     return OK;
 }
 
+/// Whether members of the key's name may stand in singletons below the object, for all that its shape tells.
+bool MayLeadOn(Object *object, const FilterSpec &spec) {
+    const Shape *const shape = ShapeOf(object);
+    if (!shape) return true;
+    const std::atomic_ref<const Shape *> known(spec.notBelow);
+    if (known.load(std::memory_order_relaxed) != shape) {
+        if (shape->HasBelow(spec.key)) return true;
+        known.store(shape, std::memory_order_relaxed);
+    }
+    return TreeOf(object)->hasUnknown;
+}
+
 int32_t Select(Object *object, const FilterSpec &spec, std::vector<Object *> *found) {
     if (Object *const member = FindMember(object, spec.key)) return SelectMember(member, spec, found);
+    if (!MayLeadOn(object, spec)) return OK;
     for (Object *child = object->members.first; child; child = child->next) {
         if (!LeadsOn(child, spec.key)) continue;
         if (const int32_t status = Select(child, spec, found); status != OK) return status;

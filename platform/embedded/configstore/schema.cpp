@@ -5,6 +5,7 @@
 
 #include "platform/embedded/configstore/schema.h"
 
+#include <algorithm>
 #include <boost/json.hpp>
 #include <cassert>
 #include <cstring>
@@ -46,11 +47,26 @@ const Field *Shape::Find(std::string_view name) const {
     return nullptr;
 }
 
+bool Shape::HasBelow(std::string_view name) const {
+    std::vector<const Shape *> shapes = {this}; // one may lead back to another
+    for (std::size_t i = 0; i < shapes.size(); i++) {
+        for (const Field *field : shapes[i]->fields_) {
+            if (!field->shape) continue;
+            if (field->shape->Find(name)) return true;
+            if (std::find(shapes.begin(), shapes.end(), field->shape) == shapes.end())
+                shapes.push_back(field->shape);
+        }
+    }
+    return false;
+}
+
 const Field *Shape::FindAnew(const char *name) const {
+    const std::size_t at = GuessOf(name);
+    const Field *const second = guesses_[at ^ 1].load(std::memory_order_relaxed);
+    if (second && std::strcmp(second->name.c_str(), name) == 0) return second;
     const Field *const field = Find(name);
     if (!field) return nullptr;
     // Two names that fall together get two places; a third one takes the second place.
-    const std::size_t at = GuessOf(name);
     const bool isTaken = guesses_[at].load(std::memory_order_relaxed) != nullptr;
     guesses_[isTaken ? at ^ 1 : at].store(field, std::memory_order_relaxed);
     return field;
@@ -63,7 +79,8 @@ void Shape::Add(Field field) {
     if (words <= Field::kMaxWords) {
         field.wordNum = static_cast<uint32_t>(words);
         std::memcpy(field.words.data(), field.prefix.data(), field.prefix.size());
-        field.lastMask = UINT64_MAX >> (words * kWord - field.prefix.size()) * 8; // little-endian
+        const std::string ones(field.prefix.size(), '\xff');
+        std::memcpy(field.masks.data(), ones.data(), ones.size());
     }
     field.index = fields_.size();
     field.mark = uint32_t{1} << field.index % 31;

@@ -51,7 +51,7 @@ struct Field {
     // The prefix once more, for comparing it word by word; no words when it is longer than that.
     static constexpr std::size_t kMaxWords = 5;
     std::array<uint64_t, kMaxWords> words{};
-    uint64_t lastMask = 0; // of what counts in the last word
+    std::array<uint64_t, kMaxWords> masks{}; // of what counts in the words
     uint32_t wordNum = 0;
 };
 
@@ -64,12 +64,13 @@ public:
     /// The same for a name that is asked for again and again, as those that stand in the code are: where a
     /// text stood before, the same text mostly stands again.
     [[nodiscard]] const Field *FindAgain(const char *name) const {
-        const std::size_t at = GuessOf(name);
-        const Field *field = guesses_[at].load(std::memory_order_relaxed);
-        if (field && std::strcmp(field->name.c_str(), name) == 0) return field;
-        field = guesses_[at ^ 1].load(std::memory_order_relaxed);
-        return field && std::strcmp(field->name.c_str(), name) == 0 ? field : FindAnew(name);
+        const Field *const field = guesses_[GuessOf(name)].load(std::memory_order_relaxed);
+        if (field && std::strcmp(field->name.c_str(), name) == 0) [[likely]]
+            return field;
+        return FindAnew(name);
     }
+    /// Whether a field of a field's shape, or of one further down, has the name.
+    [[nodiscard]] bool HasBelow(std::string_view name) const;
     [[nodiscard]] const std::vector<const Field *> &Fields() const { return fields_; }
     void Add(Field field);
     void SetNumber(uint32_t number) { number_ = number; }
@@ -79,7 +80,8 @@ private:
     static std::size_t GuessOf(const char *name) {
         return reinterpret_cast<uintptr_t>(name) * 0x9e3779b97f4a7c15U >> (64 - kGuessBits);
     }
-    const Field *FindAnew(const char *name) const;
+    /// By the second guess, then by the name.
+    [[gnu::noinline]] const Field *FindAnew(const char *name) const;
     static std::size_t Hash(std::string_view name);
     void Rehash();
 

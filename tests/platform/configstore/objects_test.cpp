@@ -191,6 +191,37 @@ TEST(StoreFilter, DescendsIntoUnknownSingletonsOfADocumentToo) {
                                  R"("text":"things","list":["things"],"one":{"b\"y\u0001":{"e":{}}}})");
 }
 
+// A search remembers what kinds of objects cannot lead to its key; an unknown singleton can, wherever it is.
+TEST(StoreFilter, DescendsIntoUnknownSingletonsThatCameAfterASearch) {
+    const ObjectPtr object = NewSwitch(R"({"ports":{"p":{"settings":{"blocked":true}}}})");
+    Object *const port = Sub(object.get(), "ports", "p");
+    Object *const settings = Sub(port, "settings");
+    const SpecPtr spec = NewSpec("vspans");
+    Object **found = nullptr;
+    int32_t count = 0;
+    EXPECT_EQ(GetSubObjectInstances(port, spec.get(), &found, &count), NOT_FOUND);
+    Object *const wanted = Sub(Sub(settings, "unheard_of"), "vspans", "s");
+    ASSERT_EQ(GetSubObjectInstances(port, spec.get(), &found, &count), OK);
+    ASSERT_EQ(count, 1);
+    EXPECT_EQ(found[0], wanted);
+    FreeSubObjectArray(found);
+}
+
+// The switch's settings have sessions of their own, a port's have none: one search may ask both.
+TEST(StoreFilter, RemembersWhatCannotLeadToItsKeyByKindOfObject) {
+    const ObjectPtr object = NewSwitch(R"({"settings":{"vspans":{"s":{}}},"ports":{"p":{"settings":{}}}})");
+    Object *const port = Sub(object.get(), "ports", "p");
+    const SpecPtr spec = NewSpec("vspans");
+    for (int round = 0; round < 2; round++) {
+        Object **found = nullptr;
+        int32_t count = 0;
+        EXPECT_EQ(GetSubObjectInstances(port, spec.get(), &found, &count), NOT_FOUND);
+        ASSERT_EQ(GetSubObjectInstances(object.get(), spec.get(), &found, &count), OK);
+        EXPECT_EQ(count, 1);
+        FreeSubObjectArray(found);
+    }
+}
+
 TEST(StoreFilter, CountsTheTextsOfAllSingletons) {
     const ObjectPtr object = NewSwitch(
         R"({"settings":{"vspans":{"s":{"source_recv_port":{"port_keys":["a"]},"destination_port":{"port_keys":["b","c"]}}}}})");
