@@ -85,6 +85,7 @@ private:
     HYP_ReturnStatus TextSave(const TextArguments &arguments, std::string *reply);
     HYP_ReturnStatus TextFault(const TextArguments &arguments, std::string *reply);
 
+    uint32_t NextConnectionId();
     HYP_ReturnStatus LinkUp(DVSPort *port);
     HYP_ReturnStatus LinkDown(DVSPort *port);
 

@@ -8,6 +8,7 @@
 #include <cstring>
 #include <string>
 #include <string_view>
+#include <unordered_set>
 #include <vector>
 
 #include "emulator/give.h"
@@ -135,6 +136,18 @@ bool ListPort(DVSPort *port, void *arg) {
     return false;
 }
 
+using Ids = std::unordered_set<uint32_t>;
+
+bool CollectConnectionId(DVSPort *port, void *arg) {
+    static_cast<Ids *>(arg)->insert(ConnectionId(port));
+    return false;
+}
+
+bool CollectConnectionIds(DVSwitch *sw, void *arg) {
+    DVSState_PortForEach(sw, CollectConnectionId, arg);
+    return false;
+}
+
 bool CountSwitch(DVSwitch *sw, void *arg) {
     auto *counts = static_cast<std::pair<uint32_t, uint32_t> *>(arg);
     counts->first++;
@@ -208,12 +221,21 @@ HYP_ReturnStatus Module::TextEvent(const TextArguments &arguments, std::string *
     return status == HYP_OK && sync_ ? SaveState() : status;
 }
 
+/// A number that no port has: agents give some themselves, and a loaded state brings others with it.
+uint32_t Module::NextConnectionId() {
+    Ids taken{0}; // 0 is none
+    DVSState_SwitchForEach(CollectConnectionIds, &taken);
+    while (taken.contains(++lastConnectionId_)) {
+    }
+    return lastConnectionId_;
+}
+
 /// A link that comes up is a connection, and gets a number; one that the agent gave the port is kept.
 HYP_ReturnStatus Module::LinkUp(DVSPort *port) {
     PortExtras &extras = ExtrasOf(port);
     extras.linkUp = true;
     if (ConnectionId(port) != 0) return HYP_OK;
-    const uint32_t id = ++lastConnectionId_;
+    const uint32_t id = NextConnectionId();
     const HYP_ReturnStatus status = DVSState_PortDataSet(port, kConnectionIdProp, &id, sizeof id, 0);
     extras.gaveConnectionId = status == HYP_OK;
     return status;

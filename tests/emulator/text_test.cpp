@@ -94,6 +94,20 @@ TEST_F(TextCommands, AConnectionIdOfTheAgentsIsKept) {
     EXPECT_EQ(ConnectionId("p1"), 4711U);
 }
 
+TEST_F(TextCommands, AConnectionIdThatAPortHasIsGivenToNoOther) {
+    // A state that comes back has the ids of a module that counted from 1 as well.
+    uint32_t own = 1;
+    for (const char *port : {"p1", "p2"}) {
+        ASSERT_EQ(AddPort(kSwitch, port), HYP_OK);
+        ASSERT_EQ(DVSHYP_PortDataSet(kSwitch, port, "com.orbeno.common.port.connectid", &own, sizeof own, 16),
+                  HYP_OK);
+        own++;
+    }
+    ASSERT_EQ(AddPort(kSwitch, "p3"), HYP_OK);
+    EXPECT_EQ(Exec("event p3 up", kSwitch).status, HYP_OK);
+    EXPECT_EQ(ConnectionId("p3"), 3U);
+}
+
 TEST_F(TextCommands, EventsAreRefusedWhereTheyMeanNothing) {
     EXPECT_EQ(Exec("event p1 up", kSwitch).status, HYP_NOT_FOUND);
     EXPECT_EQ(Exec("event p1 sideways", kSwitch).status, HYP_BAD_PARAM);
