@@ -16,7 +16,7 @@
 
 namespace {
 
-/// How long a message that has begun may stand still.
+/// How long a message that has begun may stand still, and a connection may take to come about.
 constexpr int kStallSeconds = 30;
 
 bool WaitReadable(int fd) {
@@ -30,6 +30,11 @@ bool WaitReadable(int fd) {
         }
         if (errno != EINTR) return false;
     }
+}
+
+void LimitWait(int fd, int option) {
+    const timeval stall{kStallSeconds, 0};
+    (void)setsockopt(fd, SOL_SOCKET, option, &stall, sizeof stall); // the default is no limit
 }
 
 /// Skips `size` sent or received bytes of the parts.
@@ -98,6 +103,8 @@ int ConnectEmulator(const char *path) {
     std::strcpy(address.sun_path, path);
     const int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
     if (fd == -1) return -1;
+    // Before connecting, which waits as well: for as long as a peer that listens takes nobody in.
+    LimitWait(fd, SO_SNDTIMEO);
     while (connect(fd, reinterpret_cast<const sockaddr *>(&address), sizeof address) != 0) {
         if (errno == EINTR) continue;
         const int error = errno;
@@ -105,9 +112,11 @@ int ConnectEmulator(const char *path) {
         errno = error;
         return -1;
     }
-    const timeval stall{kStallSeconds, 0};
-    (void)setsockopt(fd, SOL_SOCKET, SO_SNDTIMEO, &stall, sizeof stall); // the default is no limit
     return fd;
+}
+
+void LimitReceive(int fd) {
+    LimitWait(fd, SO_RCVTIMEO);
 }
 
 bool SendWhole(int fd, iovec *parts, std::size_t num) {

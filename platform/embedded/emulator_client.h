@@ -17,8 +17,13 @@ namespace dvs::embedded {
 /// The socket named by DVS_EMULATOR; none when no emulator is configured.
 [[nodiscard]] const char *EmulatorPath();
 
-/// A connected descriptor, closed on exec; -1 with errno.
+/// A connected descriptor, closed on exec; -1 with errno, also when the peer takes nobody in for half a
+/// minute.
 [[nodiscard]] int ConnectEmulator(const char *path);
+
+/// Ends waits for the first byte of a reply, too, after half a minute. Not for commands, which take as long
+/// as they take.
+void LimitReceive(int fd);
 
 /// Sends all of `parts` (which it consumes). False with errno when the peer did not get the whole.
 [[nodiscard]] bool SendWhole(int fd, iovec *parts, std::size_t num);

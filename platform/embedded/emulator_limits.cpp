@@ -15,6 +15,8 @@ HYP_ReturnStatus EmulatorMaxPorts(uint32_t *ports) {
     const int fd = ConnectEmulator(path);
     // An emulator that is not there is no source of limits, as a missing device is none.
     if (fd == -1) return HYP_NOT_FOUND;
+    // Who asks for a limit has asked for no command, and may hold the lock of the switch table.
+    LimitReceive(fd);
     wire::RequestHeader request{};
     request.magic = wire::kMagic;
     request.version = wire::kVersion;
