@@ -9,6 +9,7 @@
 #include <cstdlib>
 #include <cstring>
 
+#include <fcntl.h>
 #include <sys/signalfd.h>
 #include <unistd.h>
 
@@ -33,12 +34,31 @@ bool SettleLimit(uint32_t maxPorts) {
     return status == HYP_OK;
 }
 
+/// Started without its standard streams, what is opened first would take their numbers, and messages would go
+/// there: to a client, or into the state file.
+void HoldStandardStreams() {
+    int fd = 0;
+    while (fd != -1 && fd <= STDERR_FILENO)
+        fd = open("/dev/null", O_RDWR);
+    if (fd != -1) close(fd);
+}
+
+/// Whoever starts programs under nohup means them to outlive the terminal. SIGINT is another matter: shells
+/// ignore it for whatever they start in the background.
+bool OutlivesTerminal() {
+    struct sigaction action {};
+    return sigaction(SIGHUP, nullptr, &action) == 0 && action.sa_handler == SIG_IGN;
+}
+
 /// A descriptor that becomes readable when the process is told to end.
 int EndSignals() {
+    // Nobody has to listen to the ready line.
+    std::signal(SIGPIPE, SIG_IGN);
     sigset_t signals;
     sigemptyset(&signals);
-    for (const int signal : {SIGTERM, SIGINT, SIGHUP})
+    for (const int signal : {SIGTERM, SIGINT})
         sigaddset(&signals, signal);
+    if (!OutlivesTerminal()) sigaddset(&signals, SIGHUP);
     sigprocmask(SIG_BLOCK, &signals, nullptr);
     return signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK);
 }
@@ -62,6 +82,7 @@ void Complain(const std::string &text) {
 }
 
 int Serve(const Options &options, const std::function<void()> &ready) {
+    HoldStandardStreams();
     const int stopFd = EndSignals();
     if (!SettleLimit(options.maxPorts)) return kExitUsage;
     Module module(options.state, options.sync);

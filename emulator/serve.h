@@ -10,8 +10,8 @@
 
 namespace dvs::emulator {
 
-/// Serves until SIGTERM, SIGINT or SIGHUP and saves the state; the exit status. `ready` is called once
-/// clients can connect.
+/// Serves until SIGTERM, SIGINT or SIGHUP (unless that is ignored) and saves the state; the exit status.
+/// `ready` is called once clients can connect.
 [[nodiscard]] int Serve(const Options &options, const std::function<void()> &ready);
 
 /// Starts an emulator and a store of its own for the options' command; the command's exit status.

@@ -46,6 +46,7 @@ pid_t Spawn(const std::vector<std::string> &words, int out, int err) {
     if (child != 0) return child;
     if (out != -1) dup2(out, 1);
     if (err != -1) dup2(err, 2);
+    std::signal(SIGHUP, SIG_DFL); // whatever the tests were started under
     execv(argv[0], argv.data());
     _exit(127);
 }

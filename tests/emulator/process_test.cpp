@@ -10,6 +10,7 @@
 #include <fstream>
 #include <thread>
 
+#include <fcntl.h>
 #include <gtest/gtest.h>
 #include <sys/socket.h>
 #include <sys/stat.h>
@@ -308,6 +309,77 @@ TEST_F(EmulatorState, SignalsEndItOrderly) {
         EXPECT_EQ(process_.Stop(signal), 0);
         EXPECT_TRUE(std::filesystem::remove(state_));
     }
+}
+
+/// An emulator whose surroundings are not what programs are used to.
+class EmulatorSurroundings : public EmulatorState {
+protected:
+    ~EmulatorSurroundings() override {
+        if (pid_ != -1) End();
+    }
+
+    /// Starts it after `prepare` in its process, and waits until it serves.
+    template <class Prepare> bool StartAfter(Prepare prepare) {
+        const std::string binary = EmulatorProcess::Binary();
+        pid_ = fork();
+        if (pid_ == 0) {
+            prepare();
+            execl(binary.c_str(), binary.c_str(), "--socket", socket_.c_str(), nullptr);
+            _exit(127);
+        }
+        return Serves();
+    }
+
+    bool Serves() {
+        testing::internal::CaptureStderr();
+        bool serves = false;
+        for (int i = 0; i < 500 && !serves && waitpid(pid_, nullptr, WNOHANG) == 0; i++) {
+            serves = DVSHYP_StateCleanup() == HYP_OK;
+            usleep(10 * 1000);
+        }
+        testing::internal::GetCapturedStderr();
+        return serves;
+    }
+
+    int End() {
+        kill(pid_, SIGTERM);
+        int status = -1;
+        waitpid(pid_, &status, 0);
+        pid_ = -1;
+        return status;
+    }
+
+    pid_t pid_ = -1;
+};
+
+TEST_F(EmulatorSurroundings, NobodyHasToHearThatItIsReady) {
+    ASSERT_TRUE(StartAfter([] {
+        int pipe[2];
+        if (pipe2(pipe, O_CLOEXEC) != 0) _exit(126);
+        dup2(pipe[1], STDOUT_FILENO);
+        close(pipe[0]);
+    }));
+    EXPECT_EQ(End(), 0);
+    EXPECT_FALSE(std::filesystem::exists(socket_));
+}
+
+TEST_F(EmulatorSurroundings, MissingStandardStreamsAreNobodyElses) {
+    ASSERT_TRUE(StartAfter([] {
+        for (int fd = 0; fd <= STDERR_FILENO; fd++)
+            close(fd);
+    }));
+    const std::string descriptors = "/proc/" + std::to_string(pid_) + "/fd/";
+    for (const char *fd : {"0", "1", "2"})
+        EXPECT_EQ(std::filesystem::read_symlink(descriptors + fd), "/dev/null") << fd;
+    EXPECT_EQ(End(), 0);
+}
+
+TEST_F(EmulatorSurroundings, UnderNohupItOutlivesTheTerminal) {
+    ASSERT_TRUE(StartAfter([] { std::signal(SIGHUP, SIG_IGN); }));
+    kill(pid_, SIGHUP);
+    usleep(50 * 1000); // time to end, if it were to
+    EXPECT_TRUE(Serves());
+    EXPECT_EQ(End(), 0);
 }
 
 class EmulatorRun : public testing::Test {
