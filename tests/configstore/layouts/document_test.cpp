@@ -74,6 +74,22 @@ TEST(PropertiesDocument, NamesEveryPlaceOfAType) {
     }
 }
 
+// `dvsctl props` shows them one at a time, by the property's name.
+TEST(Oddities, StandForThemselves) {
+    for (uint32_t type = 0; type <= 36; ++type) {
+        const TypeInfo *info = FindType(type);
+        if (!info) continue;
+        EXPECT_FALSE(std::regex_search(info->quirks, std::regex("type [0-9]"))) << info->quirks;
+    }
+}
+
+TEST(Oddities, SayWhichSwitchesATypeOfOneFamilyIsFor) {
+    for (const uint32_t type : {17u, 18u, 24u, 25u, 27u, 28u})
+        EXPECT_NE(std::string::npos, std::string(FindType(type)->quirks).find("cswitch")) << type;
+    for (const uint32_t type : {1u, 9u, 21u, 23u})
+        EXPECT_NE(std::string::npos, std::string(FindType(type)->quirks).find("family")) << type;
+}
+
 // Every test that docs/config-store.md names for an oddity.
 TEST(DeliberateOddities, NameTestsThatThereAre) {
     std::string sources;
