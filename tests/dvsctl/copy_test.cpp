@@ -114,6 +114,38 @@ TEST_F(Copy, ADryRunRefusesWhatTheCopyWouldRefuse) {
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("a.db"), "--dry-run", "--no-replace"}).status, 1);
 }
 
+TEST_F(Copy, ADryRunRefusesPlacesThatCannotBeWritten) {
+    ASSERT_EQ(mkdir(At("directory").c_str(), 0700), 0);
+    for (const std::string &target :
+         {At("none/b.db"), JsonAt("none/b.json"), At("a.db/below"), At("directory"), JsonAt("directory")}) {
+        for (const std::vector<std::string> &more : {std::vector<std::string>{}, {"--dry-run"}}) {
+            std::vector<std::string> args = {"copy", At("a.db"), target};
+            args.insert(args.end(), more.begin(), more.end());
+            const Result result = Dvsctl(args);
+            EXPECT_EQ(result.status, 1) << target << result.out;
+            EXPECT_EQ(result.out, "") << target;
+        }
+    }
+    EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("directory/b.db"), "--dry-run"}).status, 0);
+    ASSERT_EQ(symlink("directory/c.db", At("link.db").c_str()), 0);
+    EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("link.db"), "--dry-run"}).status, 0);
+    EXPECT_EQ(Files(), (std::vector<std::string>{"a.db", "directory", "link.db"}));
+}
+
+TEST_F(Copy, SaysWhatStandsWhereTheFileShouldGo) {
+    ASSERT_EQ(mkdir(At("directory").c_str(), 0700), 0);
+    ASSERT_EQ(mkfifo(At("fifo").c_str(), 0600), 0);
+    const std::pair<std::string, std::string> places[] = {{At("directory"), "it is a directory"},
+                                                          {JsonAt("directory"), "it is a directory"},
+                                                          {At("fifo"), "it is a FIFO"},
+                                                          {"/dev/null", "it is a device"}};
+    for (const auto &[target, reason] : places) {
+        const Result result = Dvsctl({"copy", At("a.db"), target});
+        EXPECT_EQ(result.status, 1) << target;
+        EXPECT_NE(result.err.find("why:    " + reason), std::string::npos) << result.err;
+    }
+}
+
 TEST_F(Copy, CanRefuseToReplace) {
     Put("b.db", "precious");
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("b.db"), "--no-replace"}).status, 1);

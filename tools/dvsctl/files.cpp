@@ -5,6 +5,7 @@
 
 #include <cerrno>
 #include <cstring>
+#include <filesystem>
 
 #include <fcntl.h>
 #include <poll.h>
@@ -20,6 +21,7 @@ namespace {
 
 constexpr std::uint64_t kLargestFile = std::uint64_t{1} << 32;
 constexpr std::size_t kPiece = 1 << 20;
+constexpr char kCheckDirectory[] = "check that the directory exists and may be written to";
 
 class Descriptor {
 public:
@@ -50,6 +52,17 @@ const char *KindName(mode_t mode) {
     if (S_ISFIFO(mode)) return "it is a FIFO";
     if (S_ISSOCK(mode)) return "it is a socket";
     return "it is a device";
+}
+
+Error NoFile(const char *what, const std::string &source, mode_t mode) {
+    return Error(Exit::Failed, what).In(source).Because(KindName(mode)).Try("name a file");
+}
+
+// The library refuses these too, but with the error of whichever call fails first.
+void RefuseOtherKinds(const std::string &path, const std::string &source) {
+    struct stat info {};
+    if (stat(path.c_str(), &info) == 0 && !S_ISREG(info.st_mode))
+        throw NoFile("cannot write", source, info.st_mode);
 }
 
 // Reads to the end, waiting where the descriptor makes us wait.
@@ -92,11 +105,7 @@ std::string ReadWholeFile(Context &context, const std::string &path, const std::
     struct stat info {};
     if (fstat(file.Get(), &info) != 0) ThrowRead(source, errno);
     const bool isPipe = S_ISFIFO(info.st_mode) && accept == Accept::Pipes;
-    if (!S_ISREG(info.st_mode) && !isPipe)
-        throw Error(Exit::Failed, "cannot read")
-            .In(source)
-            .Because(KindName(info.st_mode))
-            .Try("name a file");
+    if (!S_ISREG(info.st_mode) && !isPipe) throw NoFile("cannot read", source, info.st_mode);
     const auto size = S_ISREG(info.st_mode) ? static_cast<std::uint64_t>(info.st_size) : 0;
     if (size >= kLargestFile)
         throw Error(Exit::Malformed, "the input is too large").In(source).Because("it has 4 GiB or more");
@@ -107,8 +116,22 @@ std::string ReadStandardInput(Context &context, const std::string &source) {
     return ReadAll(context, STDIN_FILENO, source, 0);
 }
 
+void CheckReplaceable(const std::string &path, const std::string &source) {
+    RefuseOtherKinds(path, source);
+    std::error_code ignored; // what cannot be resolved cannot be opened either
+    std::filesystem::path directory = std::filesystem::weakly_canonical(path, ignored).parent_path();
+    if (directory.empty()) directory = ".";
+    if (faccessat(AT_FDCWD, directory.c_str(), R_OK | W_OK | X_OK, AT_EACCESS) == 0) return;
+    Error failure(Exit::Failed, "cannot write");
+    failure.source = source;
+    failure.why = std::strerror(errno);
+    failure.next = kCheckDirectory;
+    throw failure;
+}
+
 void ReplaceFile(Context &context, const std::string &path, const std::string &source, Bytes contents,
                  FileForm form) {
+    RefuseOtherKinds(path, source);
     const auto wait = std::chrono::milliseconds(context.deadline.MillisecondsLeft());
     const auto padding = form == FileForm::State ? file::Padding::ToBlock : file::Padding::None;
     if (contents.size() >= kLargestFile - file::kBlockSize)
@@ -127,7 +150,7 @@ void ReplaceFile(Context &context, const std::string &path, const std::string &s
     failure.next = busy ? "repeat, or wait longer: --timeout SECONDS"
                    : status == HYP_WRITE_ERROR
                        ? "check the space and the health of the file system, and repeat"
-                       : "check that the directory exists and may be written to";
+                       : kCheckDirectory;
     throw failure;
 }
 

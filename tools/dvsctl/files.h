@@ -29,6 +29,10 @@ std::string ReadStandardInput(Context &context, const std::string &source);
 
 enum class FileForm { State, Document }; ///< padded to what state files need, or as it is
 
+/// Throws what ReplaceFile would throw because of the place: no file, or a directory that cannot be written
+/// to. Changes nothing.
+void CheckReplaceable(const std::string &path, const std::string &source);
+
 /// Replaces the file durably (see dvs/file.h, DVSFile_WriteDurable). Throws Error; Busy when another writer
 /// held the directory for too long.
 void ReplaceFile(Context &context, const std::string &path, const std::string &source, Bytes contents,

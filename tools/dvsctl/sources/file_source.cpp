@@ -43,6 +43,11 @@ public:
         ReplaceFile(context, path_, Name(), state, FileForm::State);
     }
 
+    std::vector<std::uint8_t> Plan(Context &context, Bytes state) override {
+        CheckReplaceable(path_, Name());
+        return Source::Plan(context, state);
+    }
+
 private:
     StateBytes ReadThroughLibrary(Context &context) {
         struct stat info {};

@@ -31,6 +31,11 @@ public:
             ReplaceFile(context, path_, Name(), AsBytes(text), FileForm::Document);
     }
 
+    std::vector<std::uint8_t> Plan(Context &context, Bytes state) override {
+        if (path_ != "-") CheckReplaceable(path_, Name());
+        return Source::Plan(context, state);
+    }
+
 private:
     StateBytes Decode(const std::string &text) {
         try {
