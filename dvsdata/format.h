@@ -19,8 +19,8 @@
 //                 4   128  name, NUL-terminated; bytes behind the NUL written as 0
 //               132     4  property type word
 //               136     4  value length
-//               140        value, then padding up to the entry size (2 to 5 bytes when written here), written
-//               as 0
+//               140        value, then padding up to the entry size (2 to 5 bytes when written here),
+//                          written as 0
 
 #include <bit>
 #include <cstddef>

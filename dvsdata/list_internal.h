@@ -20,8 +20,7 @@
 
 namespace dvs::data {
 
-// ---- Lists
-// ---------------------------------------------------------------------------------------------------------
+// ---- Lists ----
 
 /// DVSData_Append for a name that need not end in NUL. Characters from the 128th on are cut.
 [[nodiscard]] HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data,
@@ -57,8 +56,7 @@ void EmitWriting(std::string_view name, std::uint32_t dataLen, std::uint32_t ent
            std::memcmp(field, name.data(), name.size()) == 0;
 }
 
-// ---- Writing
-// -------------------------------------------------------------------------------------------------------
+// ---- Writing ----
 
 /// Which entries a serialization leaves out. Asking prints the filter's trace.
 class Filter {
@@ -154,8 +152,7 @@ private:
     bool failed_ = false; // for good: nothing is written any more
 };
 
-// ---- Reading
-// -------------------------------------------------------------------------------------------------------
+// ---- Reading ----
 
 /// A sum known from the buffer around a value, so that no byte need be summed twice.
 struct KnownSum {

@@ -33,9 +33,11 @@ extern int32_t dvsconfigstore_debug;
  * exists is emptied of everything this library writes and written afresh.
  *
  * buf, len  the state buffer. A buffer that does not deserialize counts as one without switches, which in a
- * save of all deletes every switch of the store: DVSState_SaveBufToConfigStoreChecked refuses such a buffer.
+ *           save of all deletes every switch of the store: DVSState_SaveBufToConfigStoreChecked refuses such
+ *           a buffer.
  * switchId  saves this switch only and leaves all other objects alone. Where the buffer lacks it, its own
- * object is deleted. NULL saves all, and deletes the objects of switches that the buffer does not hold.
+ *           object is deleted. NULL saves all, and deletes the objects of switches that the buffer does not
+ *           hold.
  *
  * Returns 0 when everything is committed; -1 when the store cannot be opened, an object cannot be created,
  * memory is short or a value cannot be expressed; else the status of the store call that failed. The store is
@@ -73,8 +75,10 @@ int32_t DVSState_SaveBufToConfigStoreChecked(const void *buf, uint32_t len, cons
  * Rebuilds a state buffer from the store's switch objects.
  *
  * out, outLen  receive the buffer and its length in bytes; released with free(). Untouched unless a buffer
- * was made. desired      loads the desired user configuration, each object completed with the "portset_name"
- * of the current object at the same position; -1 where the two layers hold different numbers of switches.
+ *              was made.
+ * desired      loads the desired user configuration, each object completed with the "portset_name" of the
+ *              current object at the same position; -1 where the two layers hold different numbers of
+ *              switches.
  *
  * Returns 0 or the failing status. A switch that cannot be rebuilt ends the load WITHOUT a buffer and, where
  * its "uuid" still reads, with the result 0: test the buffer as well as the result.
@@ -123,8 +127,7 @@ enum {
 /* One row of a mapping table: where a property lives in the store, and which converter carries it there and
  * back. */
 typedef struct {
-    const char
-        *key; /* the property's key; "DEFAULT" in the row that takes what no other does; NULL at the end */
+    const char *key;   /* the property's key; "DEFAULT": the row for what no other takes; NULL at the end */
     char path[5][128]; /* names from the switch's or port's object down to the leaf; unused slots all zero */
     uint32_t depth;    /* how many names the path has; 0 at the end */
     uint32_t converterType; /* 0 to 36; 37 at the end */

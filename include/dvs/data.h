@@ -14,20 +14,22 @@ extern "C" {
 /*
  * Property lists: ordered lists of named, typed values of any length, and their serialized form.
  *
- * Names      end in NUL and are compared byte by byte over at most 128 characters. A list keeps the first 127
- *            characters of a longer one, which is then never found by its full text. Duplicates are possible;
- * whatever looks for a name finds the first. Values     `dataLen` counts bytes; the data pointer may be NULL
- * only when it is 0. Values are copied in. Types      the property type word: bits 2 to 7 (mask 0xfc) are the
- * kind, the others flags. 0x20 is the default, 0x10 marks the switch state's own fields, 0x08 an opaque
- * value. Memory     the handle, each entry (one block each) and every buffer serialized from a list come from
- * the two functions given at its creation, and go back through them. A list of more than a few dozen entries
- * keeps an index of its names in further blocks of the same functions; without memory for it, it does
- * without. An entry pointer, and the value it leads to, is lent until the entry is removed, updated with
- * another length, or the list freed. Outputs    are written on success and left alone on failure unless a
- * comment says otherwise. No pointer argument may be NULL unless its comment says so. Locking    none. A list
- * belongs to one caller at a time; several may read it as long as nobody changes it. Lists of the switch
- * table are guarded by DVSwitchHandleLock where the caller takes it. Messages   go to standard output, or to
- * the sink of dvs/log.h, when dvsdata_debug asks for them.
+ * Names     end in NUL and are compared byte by byte over at most 128 characters. A list keeps the first 127
+ *           characters of a longer one, which is then never found by its full text. Duplicates are
+ *           possible; whatever looks for a name finds the first.
+ * Values    `dataLen` counts bytes; the data pointer may be NULL only when it is 0. Values are copied in.
+ * Types     the property type word: bits 2 to 7 (mask 0xfc) are the kind, the others flags. 0x20 is the
+ *           default, 0x10 marks the switch state's own fields, 0x08 an opaque value.
+ * Memory    the handle, each entry (one block each) and every buffer serialized from a list come from the
+ *           two functions given at its creation, and go back through them. A list of more than a few dozen
+ *           entries keeps an index of its names in further blocks of the same functions; without memory for
+ *           it, it does without. An entry pointer, and the value it leads to, is lent until the entry is
+ *           removed, updated with another length, or the list freed.
+ * Outputs   are written on success and left alone on failure unless a comment says otherwise. No pointer
+ *           argument may be NULL unless its comment says so.
+ * Locking   none. A list belongs to one caller at a time; several may read it as long as nobody changes it.
+ *           Lists of the switch table are guarded by DVSwitchHandleLock where the caller takes it.
+ * Messages  go to standard output, or to the sink of dvs/log.h, when dvsdata_debug asks for them.
  */
 
 /* Allocates `size` bytes aligned as malloc does, or returns NULL. */
@@ -154,8 +156,8 @@ void DVSData_GetMemFreeFn(DVSData *list, DVSDataFreeFn *freeFn);
  * Serialization. docs/buffer-format.md describes the form.
  *
  * buf     where `*buf` is NULL it receives a new buffer of the list's allocator, the caller's from then on
- * (released with DVSData_FreeAssocData); otherwise it is the caller's buffer. bufLen  on entry the capacity
- * of a caller's buffer in bytes, on success the bytes written, header included.
+ *         (released with DVSData_FreeAssocData); otherwise it is the caller's buffer.
+ * bufLen  on entry the capacity of a caller's buffer in bytes, on success the bytes written, header included.
  *
  * HYP_LIMIT_EXCEEDED: the caller's buffer is too small, or the list's size and its entries do not agree; then
  * a new buffer was released again and `*buf` is NULL. HYP_NO_MEMORY: no new buffer.
@@ -197,7 +199,8 @@ HYP_ReturnStatus DVSData_SerializeEntry(DVSData *list, const char *name, void **
  * list     receives a new list on the two functions; released with DVSData_Free.
  * buf      read only during the call; any alignment. NULL is a buffer of no bytes.
  * bufLen   bytes there are. The header may claim fewer; what lies behind that, or behind the end marker, is
- * ignored. typeMask entries whose type word has none of these bits are left out.
+ *          ignored.
+ * typeMask entries whose type word has none of these bits are left out.
  *
  * HYP_BAD_PARAM: malformed, or of another format version. HYP_BAD_CHECKSUM. HYP_NO_MEMORY. There is no list
  * after any of them.

@@ -19,22 +19,26 @@ extern "C" {
  *
  * What holds for every function here:
  *
- * Arguments   Texts end in NUL and are cut to their field: switch name 63 characters, port id 47, property
- * and class name 127, command text 127. Lengths are bytes. None of the pointers may be null unless it is
- * said. Outputs     `out` receives a buffer, `outLen` its size in bytes. Buffers are released with
- * DVSHYP_DataFree, property lists with DVSData_Free. Commands that fetch a reply set *out to null when they
- * do not succeed, and *outLen to the length the module last named (untouched when the device cannot be
- * opened; 0 when the module claims more bytes than the buffer holds). Other functions leave their outputs
- * alone on failure. Statuses    HYP_FAILURE: the device cannot be opened, or the module failed the command
- * without giving a status, or it claimed more bytes than the buffer holds. HYP_NO_MEMORY: a buffer could not
- * be allocated. Anything else is the module's own answer: HYP_NOT_FOUND for an absent switch, port or
- * property, HYP_EXISTS for a duplicate, HYP_LIMIT_EXCEEDED, HYP_BAD_PARAM, HYP_NOT_SUPPORTED for a version or
- * command it does not know. Messages    Go to standard error, whatever the debug levels: "failed to open
- * dvsdev device %s\n" when the device cannot be opened; "ioctl failed: %s\n" when a plain call fails with
- * another errno than ENOENT. Locks       Plain commands take none and may be called from several threads.
- * Functions that use the switch table as scratch say so: they hold "dvshyp" (DVSwitchHYPLock) from loading
- * the table to resetting it, and leave the table empty on every path. "dvshyp" is taken before the
- * switch-state lock.
+ * Arguments  Texts end in NUL and are cut to their field: switch name 63 characters, port id 47, property
+ *            and class name 127, command text 127. Lengths are bytes. None of the pointers may be null
+ *            unless it is said.
+ * Outputs    `out` receives a buffer, `outLen` its size in bytes. Buffers are released with DVSHYP_DataFree,
+ *            property lists with DVSData_Free. Commands that fetch a reply set *out to null when they do not
+ *            succeed, and *outLen to the length the module last named (untouched when the device cannot be
+ *            opened; 0 when the module claims more bytes than the buffer holds). Other functions leave their
+ *            outputs alone on failure.
+ * Statuses   HYP_FAILURE: the device cannot be opened, or the module failed the command without giving a
+ *            status, or it claimed more bytes than the buffer holds. HYP_NO_MEMORY: a buffer could not be
+ *            allocated. Anything else is the module's own answer: HYP_NOT_FOUND for an absent switch, port
+ *            or property, HYP_EXISTS for a duplicate, HYP_LIMIT_EXCEEDED, HYP_BAD_PARAM, HYP_NOT_SUPPORTED
+ *            for a version or command it does not know.
+ * Messages   Go to standard error, whatever the debug levels: "failed to open dvsdev device %s\n" when the
+ *            device cannot be opened; "ioctl failed: %s\n" when a plain call fails with another errno than
+ *            ENOENT.
+ * Locks      Plain commands take none and may be called from several threads. Functions that use the switch
+ *            table as scratch say so: they hold "dvshyp" (DVSwitchHYPLock) from loading the table to
+ *            resetting it, and leave the table empty on every path. "dvshyp" is taken before the
+ *            switch-state lock.
  */
 
 /*
@@ -44,21 +48,19 @@ extern "C" {
 typedef struct __attribute__((packed)) DVSHYPRequest {
     char switchName[64]; /*   0 switch name */
     char portId[48];     /*  64 port id */
-    char propName[128];  /* 112 property name; class name of a switch add; uplink number in decimal of uplink
-                            data */
+    char propName[128];  /* 112 property name; class of a switch add; decimal number of an uplink */
     uint32_t maxPorts;   /* 240 port limit of a switch */
     uint32_t version;    /* 244 switch version number */
     uint32_t propType;   /* 248 type word of a value being set */
     uint32_t reserved;   /* 252 always 0 */
     uint32_t status;     /* 256 HYP_FAILURE going in; written by the module when it fails the call */
-    uint32_t
-        dataLen;   /* 260 size of the value at `data`; of a fetch: capacity in, size needed or returned out */
-    uint64_t data; /* 264 address of the value or of the receive buffer */
-    char cmd[128]; /* 272 command text (DVSHYP_CmdExec) */
-    uint32_t cmdInLen;  /* 400 size of the command's input */
-    uint64_t cmdIn;     /* 404 address of the command's input; the one field off its natural boundary */
-    uint32_t cmdOutLen; /* 412 capacity of the reply buffer in, size needed or returned out */
-    uint64_t cmdOut;    /* 416 address of the reply buffer */
+    uint32_t dataLen;    /* 260 size of the value at `data`; fetch: capacity in, size needed or got out */
+    uint64_t data;       /* 264 address of the value or of the receive buffer */
+    char cmd[128];       /* 272 command text (DVSHYP_CmdExec) */
+    uint32_t cmdInLen;   /* 400 size of the command's input */
+    uint64_t cmdIn;      /* 404 address of the command's input; the one field off its natural boundary */
+    uint32_t cmdOutLen;  /* 412 capacity of the reply buffer in, size needed or returned out */
+    uint64_t cmdOut;     /* 416 address of the reply buffer */
 } DVSHYPRequest;
 
 /* What DVSHYP_PortGetByExternalId finds; 176 bytes. */
@@ -84,8 +86,7 @@ typedef struct {
 } DVSHYPPortList;
 #pragma GCC diagnostic pop
 
-/* ---- The channel
- * ------------------------------------------------------------------------------------------------- */
+/* ---- The channel ---- */
 
 /*
  * Sends one command over the process's cached device descriptor, which the first successful call opens and
@@ -114,8 +115,7 @@ void DVSHYP_DataFree(void *buf);
 MXUserRecLock *DVSwitchHYPLock(void);
 void DVSwitchHYPUnlock(MXUserRecLock *lock);
 
-/* ---- Whole states
- * -------------------------------------------------------------------------------------------------- */
+/* ---- Whole states ---- */
 
 /* 0: replaces the module's state by a serialized one of `len` bytes. 1: empties it. 2: tidies it up. */
 HYP_ReturnStatus DVSHYP_StateInit(const void *state, uint32_t len);
@@ -125,8 +125,7 @@ HYP_ReturnStatus DVSHYP_StateSanitize(void);
 /* 3: fetches the module's whole state, serialized as DVSState_ConfigSerialize does. */
 HYP_ReturnStatus DVSHYP_StateGet(void **out, uint32_t *outLen);
 
-/* ---- Switches
- * ------------------------------------------------------------------------------------------------------ */
+/* ---- Switches ---- */
 
 /* 4, 5: adds and removes a switch. HYP_EXISTS, HYP_LIMIT_EXCEEDED; HYP_NOT_FOUND. */
 HYP_ReturnStatus DVSHYP_SwitchAdd(const char *switchName, const char *className, uint32_t maxPorts,
@@ -141,8 +140,7 @@ HYP_ReturnStatus DVSHYP_SwitchDissociate(const char *switchName);
 HYP_ReturnStatus DVSHYP_SwitchSetMaxPorts(const char *switchName, uint32_t maxPorts);
 HYP_ReturnStatus DVSHYP_SwitchSetVersion(const char *switchName, uint32_t version);
 
-/* ---- Switch properties
- * --------------------------------------------------------------------------------------------- */
+/* ---- Switch properties ---- */
 
 /* 8, 9, 10: fetches, sets and clears a global property. `propType` is the property type word (see
  * dvs/data.h). */
@@ -168,9 +166,7 @@ HYP_ReturnStatus DVSHYP_SmartNICGlobalPropGet(const char *switchName, const char
 HYP_ReturnStatus DVSHYP_SmartNICHostPropGet(const char *switchName, const char *propName, void **out,
                                             uint32_t *outLen);
 
-/* ---- Ports
- * ---------------------------------------------------------------------------------------------------------
- */
+/* ---- Ports ---- */
 
 /* 14: adds a port; `portData` is its serialized property list of `len` bytes. 15: removes it. */
 HYP_ReturnStatus DVSHYP_PortAdd(const char *switchName, const char *portId, const void *portData,
@@ -210,8 +206,7 @@ HYP_ReturnStatus DVSHYP_SmartNICPortDataGet(const char *switchName, const char *
 HYP_ReturnStatus DVSHYP_PortGetByExternalId(const char *switchName, const char *externalId,
                                             DVSHYPExternalIdResult **out);
 
-/* ---- Persistent state
- * ---------------------------------------------------------------------------------------------- */
+/* ---- Persistent state ---- */
 
 /*
  * Fetches the module's state and serializes what of it is worth keeping: without switches marked
@@ -220,9 +215,10 @@ HYP_ReturnStatus DVSHYP_PortGetByExternalId(const char *switchName, const char *
  * whose host property "com.orbeno.common.portset.opaque" begins with "true", without ports whose id is a
  * number above 999.
  *
- * out, outLen   as the lists' serialization has them: *out is null and receives a new buffer, or a buffer of
- * *outLen bytes that is filled. Left as they were on failure. stateFile     may be null. Otherwise switches
- * marked "nopersist" are replaced by their versions in this state file.
+ * out, outLen  as the lists' serialization has them: *out is null and receives a new buffer, or a buffer of
+ *              *outLen bytes that is filled. Left as they were on failure.
+ * stateFile    may be null. Otherwise switches marked "nopersist" are replaced by their versions in this
+ *              state file.
  *
  * Statuses of the fetch, of loading a state (HYP_BAD_PARAM, HYP_BAD_CHECKSUM, …), of DVSFile_Read and of the
  * serialization (HYP_EXISTS; HYP_LIMIT_EXCEEDED for a buffer too small). A state file whose contents cannot
@@ -239,8 +235,7 @@ HYP_ReturnStatus DVSHYP_PersistentStateGetWithFile(void **out, uint32_t *outLen,
 HYP_ReturnStatus DVSHYP_PersistentPortStateGet(const char *switchName, const char *portId,
                                                uint32_t dvsVersion, void **out, uint32_t *outLen);
 
-/* ---- Filters over property lists
- * ----------------------------------------------------------------------------------- */
+/* ---- Filters over property lists ---- */
 
 /*
  * Each walks `list` and removes entries, judging every entry by itself, namesakes included. An entry is of a
@@ -261,8 +256,7 @@ HYP_ReturnStatus DVSHYPStripNamedPropForType(DVSData *list, const char *needle, 
 /* Removes every entry but those of the type whose name contains `needle`. */
 HYP_ReturnStatus DVSHYPExtractNamedPropForType(DVSData *list, const char *needle, uint32_t propType);
 
-/* ---- Queries
- * ------------------------------------------------------------------------------------------------------- */
+/* ---- Queries ---- */
 
 /*
  * Each fetches state, narrows one list of it to entries of `propType` and hands that list over

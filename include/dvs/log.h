@@ -2,7 +2,6 @@
 #ifndef DVS_LOG_H
 #define DVS_LOG_H
 
-
 #ifdef __cplusplus
 extern "C" {
 #endif

@@ -50,12 +50,11 @@ typedef struct DVSPort DVSPort;
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wpedantic"
 typedef struct DVSwitch {
-    uint32_t numPorts; /* ports of all kinds on this switch */
-    uint32_t maxPorts; /* port limit; the host-wide limit for the classes that have none of their own */
-    uint32_t
-        newMaxPorts;   /* pending limit, callers set it; see DVS_UpdateMaxPorts. This is what is serialized */
-    uint32_t version;  /* 4 to 12, 100, 107 to 112; see DVSState_SwitchSetVersion */
-    char switchId[64]; /* NUL-terminated; a UUID's text where the switch is to be found by UUID */
+    uint32_t numPorts;       /* ports of all kinds on this switch */
+    uint32_t maxPorts;       /* port limit; the host-wide limit for the classes that have none of their own */
+    uint32_t newMaxPorts;    /* pending limit, callers set it; see DVS_UpdateMaxPorts. The one serialized */
+    uint32_t version;        /* 4 to 12, 100, 107 to 112; see DVSState_SwitchSetVersion */
+    char switchId[64];       /* NUL-terminated; a UUID's text where the switch is to be found by UUID */
     char className[128];     /* NUL-terminated; see DVS_SetClassName */
     DVSData *globalPropList; /* settings that are the same on every host; NULL: none */
     DVSData *hostPropList;   /* settings of this host; NULL: none */
@@ -89,12 +88,10 @@ typedef bool (*DVSPropForEachFn)(DVSDataEntry *entry, void *arg);
 /* Debug level of the switch state; -1, the default, prints nothing. */
 extern int32_t dvs_debug;
 
-/* Ports that the kernel allows on the whole host. 0 until the first switch add reads it; kept from then on.
- */
+/* Ports that the kernel allows on the whole host. 0 until the first switch add reads it, then kept. */
 extern uint32_t uwMaxNumActivePortsSystemWide;
 
-/* ---- The lock
- * ------------------------------------------------------------------------------------------------- */
+/* ---- The lock ---- */
 
 /*
  * Takes the lock "dvsstate", made on first use. Recursive; "dvshyp" of dvs/hyp.h comes before it where both
@@ -105,15 +102,15 @@ MXUserRecLock *DVSwitchHandleLock(void);
 /* Releases what DVSwitchHandleLock took. NULL is fine. */
 void DVSwitchHandleUnlock(MXUserRecLock *lock);
 
-/* ---- Switches
- * ------------------------------------------------------------------------------------------------- */
+/* ---- Switches ---- */
 
 /*
  * Adds a switch, without ports and properties, in the first free slot.
  *
- * className   cut after 127 characters. The classes "ovlvswitch", "etherswitch", "stub-vswitch", "cswitch"
- * and "vswitch" are not held to a limit: they get the host-wide one. maxPorts    the limit of a switch of any
- * other class; ignored for those five. version     taken as it is.
+ * className  cut after 127 characters. The classes "ovlvswitch", "etherswitch", "stub-vswitch", "cswitch"
+ *            and "vswitch" are not held to a limit: they get the host-wide one.
+ * maxPorts   the limit of a switch of any other class; ignored for those five.
+ * version    taken as it is.
  *
  * HYP_OK.
  * HYP_BAD_PARAM       an id of 64 characters or more.
@@ -178,8 +175,7 @@ void DVS_SetClassName(DVSwitch *sw, const char *className);
 /* Makes the pending port limit the limit, and gives it. No lock. */
 uint32_t DVS_UpdateMaxPorts(DVSwitch *sw);
 
-/* ---- Ports
- * ---------------------------------------------------------------------------------------------------- */
+/* ---- Ports ---- */
 
 /*
  * Adds an active (a local-cache) port in the switch's first free slot.
@@ -249,8 +245,7 @@ const char *DVS_PortId(DVSPort *port);
 /* The value of the port's property "com.orbeno.common.port.alias"; "unknown" when it is not there. */
 const char *DVS_PortAlias(DVSPort *port);
 
-/* ---- Properties
- * ----------------------------------------------------------------------------------------------- */
+/* ---- Properties ---- */
 
 /*
  * Two families alike: host properties (hostPropList) and global properties (globalPropList). A switch without
@@ -304,8 +299,7 @@ HYP_ReturnStatus DVSState_PortDataClear(DVSPort *port, const char *name);
 HYP_ReturnStatus DVSState_PortDataRead(DVSPort *port, const char *name, void **data, uint32_t *len);
 HYP_ReturnStatus DVSState_PortDataForEach(DVSPort *port, DVSPropForEachFn callback, void *arg);
 
-/* ---- Serialized state
- * ----------------------------------------------------------------------------------------- */
+/* ---- Serialized state ---- */
 
 /*
  * Three levels of the format of dvs/data.h, nested as values of type 0x10:
@@ -313,9 +307,10 @@ HYP_ReturnStatus DVSState_PortDataForEach(DVSPort *port, DVSPropForEachFn callba
  *   the state     one entry per switch in slot order, named by its id; the value is
  *   a switch      "switchVersion" (u32), "className" (128 bytes), "maxPorts" (u32, the pending limit),
  *                 "globalPropList" and "hostPropList" where the switch has them, then one entry per port in
- * slot order, named by its id; lists and ports have for value a list        the properties. A port that is
- * not active carries its kind as "com.orbeno.common.port.volatile.type" (u32): added to the output where the
- * port's data lack it, and taken out again on reading.
+ *                 slot order, named by its id; lists and ports have for value
+ *   a list        the properties. A port that is not active carries its kind as
+ *                 "com.orbeno.common.port.volatile.type" (u32): added to the output where the port's data
+ *                 lack it, and taken out again on reading.
  *
  * Ports of kind 0 are left out. A switch of version 99 leaves out properties whose type word has bit 2, 5, 6
  * or 31.
@@ -366,8 +361,7 @@ HYP_ReturnStatus DVSState_SwitchDeserialize(const char *switchId, const void *bu
  */
 HYP_ReturnStatus DVSState_ConfigDeserialize(const void *buf, uint32_t len);
 
-/* ---- The whole table
- * ------------------------------------------------------------------------------------------ */
+/* ---- The whole table ---- */
 
 /* Removes every switch. HYP_EXISTS when one cannot be removed; the rest stays then. Holds the lock
  * throughout. */
@@ -378,9 +372,9 @@ HYP_ReturnStatus DVSState_ConfigReset(void);
  * "com.orbeno.common.volatile.nopersist" begins with a byte other than 0.
  *
  * parked      32 slots. When true is returned, all remaining switches, which have left the table and belong
- * to the caller (see DVSState_FreeDVSArray); otherwise NULL in each. removedIds  32 rows; the first ones
- * receive the ids of the removed switches, the rest is untouched. park        whether to move the remaining
- * switches away at all.
+ *             to the caller (see DVSState_FreeDVSArray); otherwise NULL in each.
+ * removedIds  32 rows; the first ones receive the ids of the removed switches, the rest is untouched.
+ * park        whether to move the remaining switches away at all.
  *
  * True when `park` was set and a switch was removed. Holds the lock throughout.
  */

@@ -6,8 +6,9 @@
 // ends run on one host, so numbers travel in its byte order. The request record and the buffers it points to
 // travel by value; its addresses stay at home and only say, as flags, whether there is a buffer.
 //
-//   request:  RequestHeader | record, 424 bytes | value at `data`, dataSize bytes | command input, cmdInSize
-//   bytes reply:    ReplyHeader   | payload, payloadSize bytes
+//   request:  RequestHeader | record, 424 bytes | value at `data`, dataSize bytes | command input,
+//             cmdInSize bytes
+//   reply:    ReplyHeader   | payload, payloadSize bytes
 //
 // Without a record (kind Limits) a request is its header alone, and the reply's payload is the port limit, a
 // u32.

@@ -98,8 +98,7 @@ TEST_F(DurableWrite, LeavesTheOtherNamesOfTheOldFileAlone) {
     EXPECT_EQ(Contents(dir_ + "/other"), "old");
 }
 
-// --- links
-// ----------------------------------------------------------------------------------------------------------
+// ---- links ----
 
 TEST_F(DurableWrite, FollowsALinkAndKeepsIt) {
     fs::create_directory(dir_ + "/real");
@@ -141,8 +140,7 @@ TEST_F(DurableWrite, GivesUpOnAPathThatIsTooLong) {
         << "a link that makes it so";
 }
 
-// --- what is in the way
-// ---------------------------------------------------------------------------------------------
+// ---- what is in the way ----
 
 TEST_F(DurableWrite, WithoutAFolderIsAnIoError) {
     EXPECT_EQ(Write(dir_ + "/none/state", "new"), HYP_IO_ERROR);
@@ -215,8 +213,7 @@ TEST_F(DurableWrite, IsNotInTheWayOfThePlainWritesTemporaryName) {
     }
 }
 
-// --- the lock
-// -------------------------------------------------------------------------------------------------------
+// ---- the lock ----
 
 TEST_F(DurableWrite, GivesUpWhenTheDirectoryStaysLocked) {
     Put(path_, "old");

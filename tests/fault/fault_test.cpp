@@ -315,8 +315,7 @@ TEST(FaultAlloc, LiveBlocksAreCounted) {
     EXPECT_EQ(fault_live_blocks(), before);
 }
 
-// --- the sweep
-// ------------------------------------------------------------------------------------------------------
+// ---- the sweep ----
 
 /// Three allocations; with `leak`, the first stays behind when a later one fails.
 uint32_t ThreeBlocks(bool leak) {

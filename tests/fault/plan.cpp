@@ -74,8 +74,7 @@ std::atomic<int64_t> g_blocks{0};
 // The interposer may be preloaded; other models of thread-local storage could allocate on first use.
 thread_local int t_quiet __attribute__((tls_model("initial-exec"))) = 0;
 
-// --- text form
-// ------------------------------------------------------------------------------------------------------
+// ---- text form ----
 
 std::string_view CutAt(std::string_view *rest, char separator) {
     const std::size_t end = rest->find(separator);
@@ -165,8 +164,7 @@ bool ParsePlan(std::string_view text, Plan *plan) {
     return true;
 }
 
-// --- matching
-// -------------------------------------------------------------------------------------------------------
+// ---- matching ----
 
 using PathBuffer = std::array<char, 4200>;
 

@@ -5,13 +5,13 @@
 // The SQLite database below the store: opening it with the precautions a hostile file calls for, its tables,
 // its errors as store statuses. store.cpp and the operators' functions (admin.h) stand on this.
 //
-//   object_row   one row per object and layer: address, revision, the document it holds
-//   history_row  one row for every document that was replaced or deleted: the same, and the revision that
-//   ended it document     the documents' texts; a row is written once and never changed, so that ending an
-//   object's document
-//                moves a number and not megabytes, and bringing one back copies nothing
-//   revision     one row per transaction that changed something
-//   object, history   views for people: one row per object and layer, with the document
+//   object_row       one row per object and layer: address, revision, the document it holds
+//   history_row      one row for every document that was replaced or deleted: the same, and the revision
+//                    that ended it
+//   document         the documents' texts; a row is written once and never changed, so that ending an
+//                    object's document moves a number and not megabytes, and bringing one back copies nothing
+//   revision         one row per transaction that changed something
+//   object, history  views for people: one row per object and layer, with the document
 //
 // A transaction takes one revision for all that it changes, at its first change.
 

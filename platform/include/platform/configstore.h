@@ -44,8 +44,7 @@ enum Status : int32_t {
     NO_MEMORY = 9,
 };
 
-// -- Stores and transactions
-// ------------------------------------------------------------------------------------------
+// ---- Stores and transactions ----
 
 /// Opens the host's store, making it if there is none. Released with DestroyStore.
 /// FAILED, CORRUPT and IO_ERROR leave the file as it is; the host's log says which file and why.
@@ -69,8 +68,7 @@ int32_t CommitTransaction(Store *store);
 /// Takes the transaction's changes back. OK also after a transaction that could not begin.
 int32_t CancelTransaction(Store *store);
 
-// -- Filter specs
-// -----------------------------------------------------------------------------------------------------
+// ---- Filter specs ----
 
 /// Makes a filter spec. For GetInstances all of key, group and component count; on an object only the key
 /// does. An instance id that is not empty selects that instance alone. Released with DestroyFilterSpecObject.
@@ -80,8 +78,7 @@ int32_t CreateFilterSpecObject(const char *key, const char *group, const char *c
 /// Releases a filter spec. Null is allowed.
 void DestroyFilterSpecObject(FilterSpec *spec);
 
-// -- Objects
-// ----------------------------------------------------------------------------------------------------------
+// ---- Objects ----
 
 /// Lists the current objects that the spec selects, in ascending order of their instance ids (as bytes). None
 /// is OK with count 0 and a null array. Objects are copies, released with the array by DestroyObjects.
@@ -119,8 +116,7 @@ void DestroyObject(Object *object);
 /// Releases the objects of a listing and the array. A null array is allowed.
 void DestroyObjects(Object **objects, int32_t count);
 
-// -- Sub-objects
-// ------------------------------------------------------------------------------------------------------
+// ---- Sub-objects ----
 // Handles into their root object's tree, valid until the root is destroyed or the node is deleted; nothing to
 // release. Singletons have no instance id; instances have one each and are kept in the order in which they
 // were made.
@@ -156,8 +152,7 @@ int32_t GenerateInstanceId(char **id);
 /// Releases a text handed out by this interface. Null is allowed.
 void FreeString(char *text);
 
-// -- Values
-// -----------------------------------------------------------------------------------------------------------
+// ---- Values ----
 // A setter puts a value in place of whatever value the name had, at the end of the object if it had none. It
 // takes what the schema does not allow too: Set refuses it, unless it has been mended by then. A sub-object
 // or a list with instances is not overwritten (SCHEMA_VIOLATION).
