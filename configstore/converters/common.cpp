@@ -61,6 +61,12 @@ int32_t StoreAs(const LoadArgs &args, std::string_view key, std::span<const uint
         DVSData_Update(args.list, key.data(), value.data(), static_cast<uint32_t>(value.size()), propType));
 }
 
+void LoadNumber(configstore::Object *object, const char *name, std::span<uint8_t> value,
+                layout::Slot<uint32_t> slot) {
+    uint32_t number = 0;
+    if (configstore::GetValueUint32(object, name, &number) == 0) Put(value, slot, number);
+}
+
 int32_t KnownFilters::Get(const char *name, const configstore::FilterSpec **spec) {
     for (std::size_t i = 0; i < num_; ++i) {
         if (std::strcmp(known_[i].name, name) != 0) continue;

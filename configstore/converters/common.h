@@ -16,6 +16,7 @@
 #include <span>
 
 #include "configstore/converters/converter.h"
+#include "configstore/layouts/layout.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
 #include "platform/configstore.h"
@@ -52,6 +53,14 @@ inline void PutU32(std::span<uint8_t> value, std::size_t offset, uint32_t field)
 [[nodiscard]] inline bool HoldsRecords(std::span<const uint8_t> value, std::size_t headerSize, uint64_t count,
                                        std::size_t recordSize) {
     return value.size() >= headerSize && count <= (value.size() - headerSize) / recordSize;
+}
+
+/// The count that a value of equal records begins with; nothing where so many do not lie behind it.
+[[nodiscard]] inline std::optional<uint32_t> CountOf(std::span<const uint8_t> value, std::size_t recordSize) {
+    if (value.size() < sizeof(uint32_t)) return std::nullopt;
+    const uint32_t count = GetU32(value, 0);
+    if (!HoldsRecords(value, sizeof count, count, recordSize)) return std::nullopt;
+    return count;
 }
 
 /// Whether the value begins with `text` and its NUL. A shorter value is simply not equal.
@@ -117,6 +126,10 @@ template <typename T> [[nodiscard]] inline int32_t StoreNumber(const LoadArgs &a
     std::memcpy(bytes, &number, sizeof number);
     return Store(args, bytes);
 }
+
+/// A uint32 of the store into its field. One that cannot be read leaves the field as it is.
+void LoadNumber(configstore::Object *object, const char *name, std::span<uint8_t> value,
+                layout::Slot<uint32_t> slot);
 
 // --- Enumeration tables: text of a value, and the way back ---
 

@@ -67,9 +67,7 @@ int32_t LoadHealthCheck(const LoadArgs &args) {
     }
     bool enabled = false;
     if (configstore::GetValueBool(check, "enabled", &enabled) == 0) Put(block.bytes(), kEnabled, enabled);
-    uint32_t interval = 0;
-    if (configstore::GetValueUint32(check, "interval", &interval) == 0)
-        Put(block.bytes(), kInterval, interval);
+    LoadNumber(check, "interval", block.bytes(), kInterval);
     return Store(args, block.bytes());
 }
 

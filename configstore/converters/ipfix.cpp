@@ -46,13 +46,6 @@ constexpr auto kInternalOnly = At<uint8_t>(kIpfix, "internal_flows_only");
 constexpr auto kIsIpv6 = At<uint8_t>(kIpfix, "is_ipv6");
 constexpr auto kDomainId = At<uint32_t>(kIpfix, "observation_domain_id");
 
-// A field that cannot be read stays 0.
-void LoadNumber(configstore::Object *ipfix, const char *name, std::span<uint8_t> value,
-                layout::Slot<uint32_t> slot) {
-    uint32_t number = 0;
-    if (configstore::GetValueUint32(ipfix, name, &number) == 0) Put(value, slot, number);
-}
-
 void LoadAddress(configstore::Object *ipfix, std::span<uint8_t> value) {
     StoreText text;
     if (text.Read(ipfix, "collector_address")) return;

@@ -85,6 +85,7 @@ constexpr auto kAlgorithm = At<uint32_t>(kGroup, "load_balance_algorithm");
 constexpr auto kUplinkNum = At<uint32_t>(kGroup, "uplink_num");
 
 constexpr std::size_t kHeadSize = layout::kLacpTable.size;
+static_assert(kCount.offset == 0 && kHeadSize == kCount.End());
 constexpr uint32_t kUnknown = 0xFFFFFFFF;
 
 // `bytes` starts at the group and runs to the value's end: a text that lacks its NUL ends there.
@@ -131,11 +132,10 @@ uint32_t LacpModeOf(const char *text) {
 }
 
 int32_t SaveLacpGroups(const SaveArgs &args) {
-    if (args.value.size() < kHeadSize) return kFailed;
-    const uint32_t count = Get(args.value, kCount);
-    if (!HoldsRecords(args.value, kHeadSize, count, kGroup.size)) return kFailed;
+    const auto count = CountOf(args.value, kGroup.size);
+    if (!count) return kFailed;
     int32_t status = 0;
-    for (std::size_t i = 0; i < count && !status; ++i) {
+    for (std::size_t i = 0; i < *count && !status; ++i) {
         status = SaveGroup(args, args.value.subspan(kHeadSize + i * kGroup.size));
     }
     return status;

@@ -212,12 +212,6 @@ uint16_t LoadConnecteeTypes(configstore::Object *ports) {
     return bits;
 }
 
-void LoadNumber(configstore::Object *vspan, const char *name, std::span<uint8_t> session,
-                Slot<uint32_t> slot) {
-    uint32_t number = 0;
-    if (configstore::GetValueUint32(vspan, name, &number) == 0) Put(session, slot, number);
-}
-
 // A text that cannot be read leaves 0, one that the table lacks stores kNotSet after `message`.
 void LoadEnum(configstore::Object *vspan, const char *name, std::span<const char *const> table,
               const char *message, std::span<uint8_t> session, Slot<uint32_t> slot) {

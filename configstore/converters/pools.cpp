@@ -69,14 +69,7 @@ constexpr auto kLimit = At<int32_t>(kPool, "limit");
 constexpr auto kListKey = AreaOf(kPoolKey, "key");
 
 constexpr std::size_t kHeadSize = layout::kPoolConfig.size;
-
-// The count, once it is known that so many entries are there; nothing for a value that is too short.
-std::optional<uint32_t> CountOf(std::span<const uint8_t> value, std::size_t entrySize) {
-    if (value.size() < kHeadSize) return std::nullopt;
-    const uint32_t count = Get(value, kCount);
-    if (!HoldsRecords(value, kHeadSize, count, entrySize)) return std::nullopt;
-    return count;
-}
+static_assert(kCount.offset == 0 && kHeadSize == kCount.End());
 
 // `bytes` starts at the pool and runs to the value's end: a text that lacks its NUL ends there.
 int32_t SavePool(const SaveArgs &args, std::span<const uint8_t> bytes) {
@@ -105,12 +98,10 @@ void LoadPool(configstore::Object *pool, std::span<uint8_t> entry) {
     if (configstore::GetSubObject(pool, "allocation", nullptr, &allocation) || !allocation) return;
     int32_t limit = 0;
     if (configstore::GetValueInt(allocation, "limit", &limit) == 0) Put(entry, kLimit, limit);
-    uint32_t number = 0;
-    if (configstore::GetValueUint32(allocation, "reservation", &number) == 0)
-        Put(entry, kReservation, number);
+    LoadNumber(allocation, "reservation", entry, kReservation);
     configstore::Object *shares = nullptr;
     if (configstore::GetSubObject(allocation, "shares", nullptr, &shares) || !shares) return;
-    if (configstore::GetValueUint32(shares, "shares", &number) == 0) Put(entry, kShares, number);
+    LoadNumber(shares, "shares", entry, kShares);
 }
 
 } // namespace

@@ -12,14 +12,6 @@ constexpr std::size_t kCountSize = sizeof(uint32_t);
 constexpr std::size_t kKeySlotSize = 48;
 constexpr std::size_t kNameSlotSize = 81;
 
-// The count, once it is known that so many slots are there; nothing for a value that is too short.
-std::optional<uint32_t> CountOf(std::span<const uint8_t> value, std::size_t slotSize) {
-    if (value.size() < kCountSize) return std::nullopt;
-    const uint32_t count = GetU32(value, 0);
-    if (!HoldsRecords(value, kCountSize, count, slotSize)) return std::nullopt;
-    return count;
-}
-
 int32_t AppendSlots(const SaveArgs &args, uint32_t count, std::size_t slotSize) {
     for (uint32_t slot = 0; slot < count; ++slot) {
         const auto text = args.value.subspan(kCountSize + slot * slotSize);
