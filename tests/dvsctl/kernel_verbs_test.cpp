@@ -85,6 +85,17 @@ TEST_F(KernelVerbs, RefusalsHaveTheirStatusAndChangeNothing) {
     }
 }
 
+TEST_F(KernelVerbs, TheProgramsVersionIsNotTakenForTheSwitchs) {
+    const std::string before = Everything();
+    for (const Words &words : {Words{"--version", "9"}, Words{"9", "--version"}, Words{"--version"}}) {
+        const Result result =
+            Verb(Plus({"switch", "add", "new", "--class", "vswitch", "--max-ports", "8"}, words));
+        EXPECT_EQ(result.status, 2);
+        EXPECT_NE(result.err.find("--switch-version"), std::string::npos) << result.err;
+    }
+    EXPECT_EQ(Everything(), before);
+}
+
 TEST_F(KernelVerbs, WhatIsThereAlreadyOrNotThereIsAllowedWhenAskedFor) {
     const Words add = {"switch", "add", "alpha", "--class", "x", "--max-ports", "5", "--switch-version", "8"};
     EXPECT_EQ(Json(Verb(Plus(add, {"--may-exist", "--json"}))).at("was_there"), true);

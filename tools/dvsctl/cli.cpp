@@ -84,6 +84,17 @@ void CheckOptions(const Options &options) {
         throw Error(Exit::Usage, "--quiet and --verbose exclude each other");
 }
 
+// Where a switch's version can be given, the program's own is not meant; answering with it would pass for
+// done.
+void RefuseProgramVersion(const Parsed &parsed) {
+    if (!parsed.version || parsed.help || !parsed.command) return;
+    for (const OptionRow &row : parsed.command->options) {
+        if (std::strcmp(row.name, "--switch-version") == 0)
+            throw Error(Exit::Usage, "--version is the program's own version")
+                .Try("a switch's version is given with --switch-version");
+    }
+}
+
 // Fills `parsed` as far as it gets, also when it throws: an error names its verb.
 void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
     CLI::App root;
@@ -108,8 +119,10 @@ void Parse(int argc, char **argv, Options &options, Parsed &parsed) {
     try {
         root.parse(argc, argv);
         find();
+        RefuseProgramVersion(parsed);
     } catch (const CLI::ParseError &failure) {
         find();
+        RefuseProgramVersion(parsed);
         if (parsed.IsAbout()) return;
         Error error(Exit::Usage, failure.what());
         if (!parsed.command) ExplainUnknownVerb(error, argc, argv);
