@@ -39,13 +39,14 @@ TEST(JsonParse, SaysWhereAndWhy) {
         {"[1", "$", "incomplete"},
         {"{\"a\": tru}", "$.a", ""},
         {"// no comments\n{}", "$, line 1, column 1", ""},
-        {"[\"\xff\"]", "$[0]", ""},
+        {"[\"\xff\"]", "$[0]", "it is not UTF-8"},
         {"[\"\\ud800\"]", "$[0]", ""},
         {"[\"a\nb\"]", "$[0]", ""},
         {"[01]", "$[1]", ""},
         {"[NaN]", "$[0]", ""},
     };
     for (const BadCase &c : cases) {
+        EXPECT_THROW((void)IsJsonObject(c.text), Error) << c.text;
         try {
             (void)ParseJson(c.text);
             ADD_FAILURE() << c.text;
@@ -56,6 +57,12 @@ TEST(JsonParse, SaysWhereAndWhy) {
             EXPECT_FALSE(error.why.empty());
         }
     }
+}
+
+TEST(JsonParse, TellsAnObjectFromOtherValues) {
+    EXPECT_TRUE(IsJsonObject(R"({"a": [{"a": "b"}, {"a": null}]})"));
+    for (const char *other : {"[{}]", "null", "\"{}\"", "1"})
+        EXPECT_FALSE(IsJsonObject(other)) << other;
 }
 
 TEST(JsonParse, RefusesAbsurdDepth) {

@@ -62,6 +62,14 @@ TEST_F(StoreVerbs, ImportRefusesWithTheFieldAndStoresNothing) {
     const std::string before = Get("store.db");
     const BadDocument cases[] = {
         {"unknown member", R"({"uuid": "alpha", "settings": {"max_mtuu": 1}})", "field settings/max_mtuu"},
+        {"unknown member of an instance", R"({"uuid": "alpha", "ports": {"7": {"nmae": "a"}}})",
+         "field ports[7]/nmae"},
+        {"NUL in a text", R"({"uuid": "alpha", "product": {"version": "7\u0000"}})", "field product/version"},
+        {"NUL in a text of a list", R"({"uuid": "alpha", "uplink_port_keys": ["7", "8\u0000"]})",
+         "field uplink_port_keys"},
+        {"NUL in a name", R"({"uuid": "alpha", "settings": {"max\u0000": 1}})", "field settings/max\\x00"},
+        {"NUL in an id", R"({"uuid": "alpha", "ports": {"7\u0000": {}}})", "field ports"},
+        {"not UTF-8", "{\"uuid\": \"alpha\", \"name\": \"a\xff\"}", "it is not UTF-8"},
         {"type", R"({"uuid": "alpha", "max_ports": "many"})", "max_ports"},
         {"range", R"({"uuid": "alpha", "settings": {"max_mtu": -1}})", "settings/max_mtu"},
         {"duplicate key", R"({"uuid": "alpha", "name": "a", "name": "b"})", "name"},
@@ -79,6 +87,34 @@ TEST_F(StoreVerbs, ImportRefusesWithTheFieldAndStoresNothing) {
     Put("document.json", std::string(100000, '[') + std::string(100000, ']'));
     EXPECT_EQ(Ctl({"store", "import", At("document.json")}).status, 6);
     EXPECT_EQ(Get("store.db"), before);
+}
+
+#if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
+constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping is most of it
+#else
+constexpr bool kMemoryCounts = true;
+#endif
+
+// However little text there is to each value of it.
+TEST_F(StoreVerbs, ImportRefusesWithinTenTimesTheDocumentsSize) {
+    constexpr std::size_t size = kMemoryCounts ? 2'000'000 : 100'000;
+    const long idle = Dvsctl({"store", "import", At("none.json")}).peakKilobytes;
+    std::string ids = R"({"uuid": "alpha", "ports": {"p": {})";
+    std::string numbers = R"({"uuid": "alpha", "uplink_port_keys": [0)",
+                unknown = R"({"uuid": "alpha", "new": [[])";
+    for (int i = 0; ids.size() < size; ++i)
+        ids += ",\"" + std::to_string(i) + "\":{}";
+    while (numbers.size() < size)
+        numbers += ",0", unknown += ",[]";
+    for (const std::string &document : {ids + "}}", numbers + "]}", unknown + "]}"}) {
+        Put("document.json", document);
+        const Result refused = Ctl({"store", "import", At("document.json")});
+        EXPECT_EQ(refused.status, 6) << refused.out << refused.err;
+        if (kMemoryCounts) {
+            EXPECT_LE(refused.peakKilobytes - idle, static_cast<long>(document.size() / 100))
+                << document.substr(0, 60);
+        }
+    }
 }
 
 TEST_F(StoreVerbs, DeleteGoesIntoHistoryAndComesBack) {
@@ -174,6 +210,10 @@ TEST_F(StoreVerbs, SchemaIsWholeOrExplainsAField) {
     const std::string vlan = Dvsctl({"schema", "ports.settings.vlan"}).out;
     EXPECT_NE(vlan.find("vlan_id"), std::string::npos);
     EXPECT_EQ(Dvsctl({"schema", "ports.7.settings.vlan"}).status, 0); // with an instance's id too
+    // As a refusal names it.
+    EXPECT_NE(Dvsctl({"schema", "ports[a/b]/settings/vlan"}).out.find("private VLAN"), std::string::npos);
+    EXPECT_EQ(Dvsctl({"schema", "ports[7]"}).status, 0);
+    EXPECT_EQ(Dvsctl({"schema", "ports[7"}).status, 4);
     EXPECT_EQ(Json(Dvsctl({"schema", "settings.max_mtu", "--json"})).at("type"), "integer");
     EXPECT_EQ(Dvsctl({"schema", "settings.nothing"}).status, 4);
 }

@@ -7,8 +7,9 @@
 
 #include <algorithm>
 #include <cctype>
+#include <functional>
+#include <optional>
 #include <string>
-#include <unordered_set>
 #include <vector>
 
 #include <boost/json/basic_parser_impl.hpp>
@@ -32,6 +33,39 @@ constexpr std::size_t kMostDepth = 32;
 // An object's keys are looked through one by one until there are more than this.
 constexpr std::size_t kFewKeys = 16;
 
+// Hashes in one flat table: an object may have a key for each few bytes of its text.
+class HashSet {
+public:
+    bool IsEmpty() const { return count_ == 0; }
+    /// False when it is in already.
+    bool Insert(std::size_t hash) {
+        if (4 * (count_ + 1) > 3 * slots_.size()) Grow();
+        std::size_t &slot = Find(hash | 1); // 0 is an empty slot
+        if (slot) return false;
+        slot = hash | 1;
+        ++count_;
+        return true;
+    }
+
+private:
+    std::size_t &Find(std::size_t value) {
+        const std::size_t mask = slots_.size() - 1;
+        std::size_t at = (value >> 1) & mask;
+        while (slots_[at] && slots_[at] != value)
+            at = (at + 1) & mask;
+        return slots_[at];
+    }
+    void Grow() {
+        std::vector<std::size_t> old(slots_.empty() ? 64 : 2 * slots_.size());
+        old.swap(slots_);
+        for (const std::size_t value : old)
+            if (value) Find(value) = value;
+    }
+
+    std::vector<std::size_t> slots_; // a power of two of them
+    std::size_t count_ = 0;
+};
+
 class Handler {
 public:
     // Limits the event parser asks for; depth is its own option.
@@ -40,19 +74,23 @@ public:
     static constexpr std::size_t max_key_size = SIZE_MAX;
     static constexpr std::size_t max_string_size = SIZE_MAX;
 
+    /// Without `keeps`, there is no document in the end.
+    explicit Handler(bool keeps) : keeps_(keeps) {}
+
     bool on_document_begin(Code &) {
-        stack_.reset(json::make_shared_resource<json::monotonic_resource>());
+        if (keeps_) stack_.reset(json::make_shared_resource<json::monotonic_resource>());
         return true;
     }
     bool on_document_end(Code &) { return true; }
 
     bool on_object_begin(Code &) {
+        isObject_ = isObject_ || levels_.empty();
         levels_.emplace_back();
         levels_.back().isObject = true;
         return true;
     }
     bool on_object_end(std::size_t count, Code &) {
-        stack_.push_object(count);
+        if (keeps_) stack_.push_object(count);
         return Leave();
     }
     bool on_array_begin(Code &) {
@@ -60,18 +98,18 @@ public:
         return true;
     }
     bool on_array_end(std::size_t count, Code &) {
-        stack_.push_array(count);
+        if (keeps_) stack_.push_array(count);
         return Leave();
     }
 
     bool on_key_part(View part, std::size_t, Code &) {
         key_.append(part.data(), part.size());
-        stack_.push_chars(part);
+        if (keeps_) stack_.push_chars(part);
         return true;
     }
     bool on_key(View part, std::size_t, Code &code) {
         key_.append(part.data(), part.size());
-        stack_.push_key(part);
+        if (keeps_) stack_.push_key(part);
         const bool isNew = levels_.back().AddKey(std::move(key_));
         key_.clear();
         if (!isNew) {
@@ -82,38 +120,39 @@ public:
     }
 
     bool on_string_part(View part, std::size_t, Code &) {
-        stack_.push_chars(part);
+        if (keeps_) stack_.push_chars(part);
         return true;
     }
     bool on_string(View part, std::size_t, Code &) {
-        stack_.push_string(part);
+        if (keeps_) stack_.push_string(part);
         return Done();
     }
     bool on_number_part(View, Code &) { return true; }
     bool on_int64(std::int64_t value, View, Code &) {
-        stack_.push_int64(value);
+        if (keeps_) stack_.push_int64(value);
         return Done();
     }
     bool on_uint64(std::uint64_t value, View, Code &) {
-        stack_.push_uint64(value);
+        if (keeps_) stack_.push_uint64(value);
         return Done();
     }
     bool on_double(double value, View, Code &) {
-        stack_.push_double(value);
+        if (keeps_) stack_.push_double(value);
         return Done();
     }
     bool on_bool(bool value, Code &) {
-        stack_.push_bool(value);
+        if (keeps_) stack_.push_bool(value);
         return Done();
     }
     bool on_null(Code &) {
-        stack_.push_null();
+        if (keeps_) stack_.push_null();
         return Done();
     }
     bool on_comment_part(View, Code &) { return true; }
     bool on_comment(View, Code &) { return true; }
 
     json::value Take() { return stack_.release(); }
+    bool IsObject() const { return isObject_; }
 
     /// The reason of a refusal of this handler's own; empty when it was the parser's.
     const std::string &Why() const { return why_; }
@@ -122,29 +161,31 @@ public:
     std::string Path() const {
         std::string path = "$";
         for (const Level &level : levels_)
-            path += !level.isObject      ? fmt::format("[{}]", level.count)
-                    : level.keys.empty() ? ""
-                                         : "." + level.keys.back();
+            path += !level.isObject ? fmt::format("[{}]", level.count) : level.key ? "." + *level.key : "";
         return path;
     }
 
 private:
     struct Level {
         bool isObject = false;
-        std::size_t count = 0;                 // elements that are complete
-        std::vector<std::string> keys;         // in order; the last one is current
-        std::unordered_set<std::string> index; // of the same keys, once there are many
+        std::size_t count = 0;          // elements that are complete
+        std::optional<std::string> key; // of the current member
+        std::vector<std::size_t> few;   // hashes of all keys, or, once there are many,
+        HashSet many;
 
-        bool AddKey(std::string &&key) {
-            bool isNew;
-            if (keys.size() < kFewKeys) {
-                isNew = std::find(keys.begin(), keys.end(), key) == keys.end();
-            } else {
-                if (index.empty()) index.insert(keys.begin(), keys.end());
-                isNew = index.insert(key).second;
+        // A hash is enough to tell keys apart by: that two have the same takes someone who means it to.
+        bool AddKey(std::string &&name) {
+            const std::size_t hash = std::hash<std::string>()(name);
+            key = std::move(name);
+            if (few.size() == kFewKeys) {
+                if (many.IsEmpty())
+                    for (const std::size_t earlier : few)
+                        (void)many.Insert(earlier);
+                return many.Insert(hash);
             }
-            keys.push_back(std::move(key));
-            return isNew;
+            if (std::find(few.begin(), few.end(), hash) != few.end()) return false;
+            few.push_back(hash);
+            return true;
         }
     };
 
@@ -157,6 +198,8 @@ private:
         return Done();
     }
 
+    const bool keeps_;
+    bool isObject_ = false;
     json::value_stack stack_;
     std::vector<Level> levels_;
     std::string key_;
@@ -179,26 +222,48 @@ std::string LineAndColumn(std::string_view text, std::size_t offset) {
         .Try("correct the document there; nothing was changed");
 }
 
-} // namespace
+// Whether the bytes there begin a character: the library calls it a syntax error when they do not.
+bool IsCharacterAt(std::string_view text, std::size_t offset) {
+    return offset >= text.size() || DecodeUtf8(text, &offset).has_value();
+}
 
-json::value ParseJson(std::string_view text) {
+using Parser = json::basic_parser<Handler>;
+
+json::parse_options Strict() {
     json::parse_options options;
     options.max_depth = kMostDepth;
-    json::basic_parser<Handler> parser(options);
+    return options;
+}
+
+void Run(Parser &parser, std::string_view text) {
     Code code;
     const std::size_t used = parser.write_some(false, text.data(), text.size(), code);
     if (code) {
         const Handler &handler = parser.handler();
-        const std::string why =
-            !handler.Why().empty()          ? handler.Why()
-            : code == json::error::too_deep ? fmt::format("more than {} levels deep", kMostDepth)
-            : text.find_first_not_of(" \t\r\n") == std::string_view::npos ? "it is empty"
-                                                                          : code.message();
+        const std::string why = !handler.Why().empty() ? handler.Why()
+                                : code == json::error::too_deep
+                                    ? fmt::format("more than {} levels deep", kMostDepth)
+                                : text.find_first_not_of(" \t\r\n") == std::string_view::npos ? "it is empty"
+                                : !IsCharacterAt(text, used) ? "it is not UTF-8"
+                                                             : code.message();
         Refuse(text, used, handler.Path(), why);
     }
     const std::size_t rest = text.find_first_not_of(" \t\r\n", used);
     if (rest != std::string_view::npos) Refuse(text, rest, "$", "there is more behind the document");
+}
+
+} // namespace
+
+json::value ParseJson(std::string_view text) {
+    Parser parser(Strict(), true);
+    Run(parser, text);
     return parser.handler().Take();
+}
+
+bool IsJsonObject(std::string_view text) {
+    Parser parser(Strict(), false);
+    Run(parser, text);
+    return parser.handler().IsObject();
 }
 
 } // namespace dvs::ctl

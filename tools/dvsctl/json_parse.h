@@ -14,6 +14,10 @@ namespace dvs::ctl {
 /// Throws Error(Malformed) with line, column and the path ("$.switches[0].ports[3]") of the fault.
 boost::json::value ParseJson(std::string_view text);
 
+/// Refuses what ParseJson does, in little more memory than the names of one object's members take. Whether
+/// the document is an object.
+bool IsJsonObject(std::string_view text);
+
 } // namespace dvs::ctl
 
 #endif

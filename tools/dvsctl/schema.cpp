@@ -1,8 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // `dvsctl schema`: the schema of the store's documents, whole or field by field.
 
-#include "tools/dvsctl/schema.h"
-
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
 #include <boost/json/parse.hpp>
@@ -85,11 +83,23 @@ std::string MembersOf(const json::object &schema) {
     return members;
 }
 
+// "ports[a/b]/name", as the store's refusals have it, is "ports/name": which instance does not matter.
+std::string WithoutIds(std::string path) {
+    for (std::size_t at = path.find('['); at != std::string::npos; at = path.find('[', at)) {
+        std::size_t end = path.find("]/", at);
+        if (end == std::string::npos) end = path.back() == ']' ? path.size() - 1 : end;
+        if (end == std::string::npos) break;
+        path.erase(at, end + 1 - at);
+    }
+    return path;
+}
+
 Place Walk(const json::object &root, const std::string &path) {
     Place place{&root, &root};
-    std::string_view rest = path;
+    const std::string named = WithoutIds(path);
+    std::string_view rest = named;
     // Errors and differences write paths with slashes, for ids may have dots in them.
-    const char separator = path.find('/') != std::string::npos ? '/' : '.';
+    const char separator = path.find_first_of("/[") != std::string::npos ? '/' : '.';
     for (bool more = !rest.empty(); more;) {
         const std::size_t end = rest.find(separator);
         const std::string_view word = rest.substr(0, end);
@@ -154,32 +164,7 @@ void ShowPlace(Context &context, const json::object &root, const Place &place, c
     table.Write(out);
 }
 
-json::value ReadSchema() {
-    const admin::Address address = SwitchAddress(admin::Layer::Current, "");
-    return json::parse(admin::Schema(address.key, address.group));
-}
-
-// Goes only where both the document and the schema have members.
-std::string FindUnknown(const json::object &root, const json::object &given, const json::value &value,
-                        const std::string &path) {
-    const json::object &schema = Resolve(root, given);
-    if (!value.is_object() || (!schema.contains("properties") && !Instances(schema))) return {};
-    for (const auto &[name, member] : value.as_object()) {
-        const std::string below =
-            path.empty() ? std::string(name) : fmt::format("{}/{}", path, std::string_view(name));
-        const json::object *next = Step(schema, name);
-        if (!next) return below;
-        if (std::string found = FindUnknown(root, *next, member, below); !found.empty()) return found;
-    }
-    return {};
-}
-
 } // namespace
-
-std::string UnknownField(const json::value &document) {
-    const json::value schema = ReadSchema();
-    return FindUnknown(schema.as_object(), schema.as_object(), document, "");
-}
 
 Exit RunSchema(Context &context) {
     const admin::Address address = SwitchAddress(admin::Layer::Current, "");

@@ -39,9 +39,9 @@ int32_t CheckCompiled(const std::string &key, const std::string &group, std::str
         problems->push_back({key + '/' + group, "there is no schema for such objects"});
         return BAD_PARAMETER;
     }
-    std::string why;
-    if (!ReadDocument(json, Reading::Strict, &tree, &why)) {
-        problems->push_back({"", why});
+    std::string why, where;
+    if (!ReadDocument(json, Reading::Strict, &tree, &why, &where)) {
+        problems->push_back({where, why});
         return BAD_PARAMETER;
     }
     const Object *const bad = FindViolation(&tree);

@@ -73,7 +73,9 @@ struct Outline {
 /// Fills an empty tree. What the schema does not allow is marked in the tree and is no failure. False, with
 /// the reason and the place, for what is not JSON, not an object, too deep, has a name twice or a NUL in a
 /// name or text; the tree then holds what had been read.
-[[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why);
+/// `where`, unless null, receives the path of the member that was refused or was being read.
+[[nodiscard]] bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why,
+                                std::string *where = nullptr);
 
 /// Fills an empty tree from a document as the store writes them in which all is allowed, and finds its
 /// outline. The root's lists of instances are looked through and stay text. False, with the tree in an

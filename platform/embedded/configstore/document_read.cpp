@@ -31,6 +31,13 @@ public:
         : tree_(tree), root_(root), open_(open), strict_(reading == Reading::Strict) {}
 
     [[nodiscard]] const std::string &Why() const { return why_; }
+    /// The path of what was refused, or of what was being read.
+    [[nodiscard]] std::string Where() const {
+        if (depth_ == 0) return "";
+        const std::string path = PathOf(rawDepth_ > 0 ? target_ : frames_[depth_ - 1].node);
+        if (member_.empty()) return path;
+        return path.empty() ? member_ : path + '/' + member_;
+    }
 
     bool on_document_begin(error_code &) { return true; }
     bool on_document_end(error_code &) { return true; }
@@ -116,8 +123,11 @@ public:
 
     bool on_key(json::string_view last, std::size_t, error_code &ec) {
         std::string_view key = Whole(last);
-        if (key.find('\0') != std::string_view::npos) return Refuse(ec, "a name with a NUL character");
         Frame &frame = frames_[depth_ - 1];
+        if (key.find('\0') != std::string_view::npos) {
+            if (frame.kind == Kind::Object) member_ = Shown(key);
+            return Refuse(ec, "a name with a NUL character");
+        }
         if (rawDepth_ > 0) {
             hashes_.push_back(HashName(key));
             Separate();
@@ -136,12 +146,16 @@ public:
         if (field_) {
             const uint64_t bit = uint64_t{1} << frame.next++;
             if (frame.next == frame.shape->Fields().size()) frame.next = 0;
-            if (frame.seen & bit)
+            if (frame.seen & bit) {
+                member_ = Shown(key);
                 return Refuse(ec, "the name \"" + Shown(key) + "\" occurs twice in an object");
+            }
             frame.seen |= bit;
         } else {
-            if (strict_ && frame.kind == Kind::Object && frame.shape)
+            if (strict_ && frame.kind == Kind::Object && frame.shape) {
+                member_ = Shown(key);
                 return Refuse(ec, "the schema knows no member \"" + Shown(key) + "\" here");
+            }
             hashes_.push_back(HashName(key));
             key_.assign(key);
         }
@@ -156,7 +170,11 @@ public:
 
     bool on_string(json::string_view last, std::size_t, error_code &ec) {
         const std::string_view text = Whole(last);
-        if (text.find('\0') != std::string_view::npos) return Refuse(ec, "a text with a NUL character");
+        if (text.find('\0') != std::string_view::npos) {
+            if (rawDepth_ == 0 && depth_ > 0 && frames_[depth_ - 1].kind == Kind::Object)
+                member_ = field_ ? std::string(field_->name) : Shown(key_);
+            return Refuse(ec, "a text with a NUL character");
+        }
         if (!PutText(text, ec)) return false;
         text_.clear();
         if (text_.capacity() > kKeptCapacity) std::string().swap(text_);
@@ -398,6 +416,7 @@ private:
     const bool open_; // the root may be a list: content that was kept as text
     const bool strict_;
     std::string why_;
+    std::string member_; // of the innermost object, that was refused
     Frame frames_[kMaxDepth + 2];
     std::size_t depth_ = 0;
     std::size_t rawDepth_ = 0;
@@ -411,7 +430,8 @@ private:
     std::vector<uint64_t> hashes_; // of undescribed names in the open objects
 };
 
-bool Parse(std::string_view text, Tree *tree, Object *root, bool open, Reading reading, std::string *why) {
+bool Parse(std::string_view text, Tree *tree, Object *root, bool open, Reading reading, std::string *why,
+           std::string *where) {
     json::parse_options options;
     options.max_depth = kMaxDepth;
     json::basic_parser<Builder> parser(options, tree, root, open, reading);
@@ -421,14 +441,15 @@ bool Parse(std::string_view text, Tree *tree, Object *root, bool open, Reading r
     if (!ec) return true;
     const std::string &own = parser.handler().Why();
     *why = "at byte " + std::to_string(used) + ": " + (own.empty() ? ec.message() : own);
+    if (where) *where = parser.handler().Where();
     return false;
 }
 
 } // namespace
 
-bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why) {
+bool ReadDocument(std::string_view text, Reading reading, Tree *tree, std::string *why, std::string *where) {
     if (reading == Reading::Tolerant && ReadPlainDocument(text, tree)) return true;
-    return Parse(text, tree, &tree->root, false, reading, why);
+    return Parse(text, tree, &tree->root, false, reading, why, where);
 }
 
 bool Expand(Tree *tree, Object *node) {
@@ -439,7 +460,7 @@ bool Expand(Tree *tree, Object *node) {
     if (node->kind != Kind::Raw || node->bad) return false;
     const Span raw = node->span;
     std::string why;
-    if (Parse({raw.data, raw.size}, tree, node, true, Reading::Tolerant, &why)) return true;
+    if (Parse({raw.data, raw.size}, tree, node, true, Reading::Tolerant, &why, nullptr)) return true;
     node->kind = Kind::Raw;
     node->span = raw;
     return false;

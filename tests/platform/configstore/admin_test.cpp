@@ -61,12 +61,16 @@ TEST_F(StoreAdmin, ImportRefusesWhatSetWouldKeepAndStoresNothing) {
     struct {
         const char *json;
         int32_t status;
-        const char *where;
+        std::string_view where;
     } const cases[] = {
-        {R"({"unheard_of":1})", BAD_PARAMETER, ""},                                  // unknown member
-        {R"({"settings":{"unheard_of":1}})", BAD_PARAMETER, ""},                     // also below
-        {R"({"name":"a","name":"b"})", BAD_PARAMETER, ""},                           // duplicate
-        {R"({"ports":{"p":{},"p":{}}})", BAD_PARAMETER, ""},                         // duplicate instance
+        {R"({"unheard_of":1})", BAD_PARAMETER, "unheard_of"},                       // unknown member
+        {R"({"settings":{"unheard_of":1}})", BAD_PARAMETER, "settings/unheard_of"}, // also below
+        {R"({"name":"a","name":"b"})", BAD_PARAMETER, "name"},                      // duplicate
+        {R"({"ports":{"p":{},"p":{}}})", BAD_PARAMETER, "ports"},                   // duplicate instance
+        {R"({"ports":{"p":{"name":"a\u0000"}}})", BAD_PARAMETER, "ports[p]/name"},  // NUL in a text
+        {R"({"ports":{"p":{"nam\u0000":"a"}}})", BAD_PARAMETER,
+         std::string_view("ports[p]/nam\0", 13)}, // NUL in a name
+        {R"({"uplink_port_keys":["a\u0000"]})", BAD_PARAMETER, "uplink_port_keys"},
         {R"({"product":{"version":"9.9.9"}})", SCHEMA_VIOLATION, "product/version"}, // enumeration
         {R"({"switch_address":"10.0.0.300"})", SCHEMA_VIOLATION, "switch_address"},  // pattern
         {R"({"name":1})", SCHEMA_VIOLATION, "name"},

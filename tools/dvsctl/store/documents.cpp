@@ -9,7 +9,6 @@
 #include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/files.h"
 #include "tools/dvsctl/json_parse.h"
-#include "tools/dvsctl/schema.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/verbs.h"
@@ -57,11 +56,11 @@ Error RefusedDocument(std::int32_t status, const std::string &file,
     return error;
 }
 
-// The document in the store's eyes. Its JSON is looked at first, for line and column.
+// The document in the store's eyes. Its JSON is looked at first, for line and column. Neither look makes a
+// document of it, for it may be anything.
 void CheckInput(const admin::Address &address, const std::string &file, const std::string &text) {
     try {
-        if (!ParseJson(text).is_object())
-            throw Error(Exit::Malformed, "a switch's document is a JSON object");
+        if (!IsJsonObject(text)) throw Error(Exit::Malformed, "a switch's document is a JSON object");
     } catch (Error &error) {
         if (error.source.empty()) error.source = file;
         throw;
@@ -69,11 +68,7 @@ void CheckInput(const admin::Address &address, const std::string &file, const st
     std::vector<admin::Problem> problems;
     const configstore::MessageCollector messages;
     const std::int32_t status = admin::CheckDocument(address.key, address.group, text, &problems);
-    if (status == configstore::OK) return;
-    // The store stops at the byte of such a member; people look for its name.
-    if (!problems.empty() && problems.front().where.empty())
-        if (const auto document = ReadDocument(text)) problems.front().where = UnknownField(*document);
-    throw Error(RefusedDocument(status, file, problems));
+    if (status != configstore::OK) throw Error(RefusedDocument(status, file, problems));
 }
 
 } // namespace
