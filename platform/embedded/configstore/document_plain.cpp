@@ -6,7 +6,6 @@
 
 #include "platform/embedded/configstore/document_plain.h"
 
-#include <algorithm>
 #include <array>
 #include <bit>
 #include <cassert>
@@ -16,6 +15,7 @@
 #include <vector>
 
 #include "platform/embedded/configstore/document.h"
+#include "platform/embedded/configstore/document_parts.h"
 #include "platform/embedded/configstore/document_skim.h"
 #include "platform/embedded/configstore/text_code.h"
 
@@ -28,26 +28,6 @@ static_assert(kMaxPlainDepth < kMaxDepth);
 
 constexpr std::size_t kWord = sizeof(uint64_t);
 constexpr std::size_t kEmptyList = 2; // bytes: {}
-
-/// May reorder the hashes.
-bool AllDiffer(std::span<uint64_t> hashes) {
-    constexpr std::size_t kFew = 32;
-    if (hashes.size() <= kFew) {
-        std::sort(hashes.begin(), hashes.end());
-        return std::adjacent_find(hashes.begin(), hashes.end()) == hashes.end();
-    }
-    // Many are not sorted, which takes longer than reading them. Half of a hash and its place are enough.
-    std::vector<uint32_t> seen(std::bit_ceil(hashes.size() + hashes.size() / 3)); // 0 is nothing
-    for (const uint64_t hash : hashes) {
-        const auto half = static_cast<uint32_t>(hash >> 32 | 1);
-        std::size_t at = hash & (seen.size() - 1);
-        for (; seen[at] != 0; at = (at + 1) & (seen.size() - 1)) {
-            if (seen[at] == half) return false;
-        }
-        seen[at] = half;
-    }
-    return true;
-}
 
 class PlainReader {
 public:
@@ -118,18 +98,7 @@ private:
         return field;
     }
 
-    [[nodiscard]] bool IsNext(const Field &field) const {
-        if (last_ - at_ < static_cast<std::ptrdiff_t>(sizeof field.words)) return false;
-        const auto difference = [this, &field](std::size_t i) {
-            uint64_t word = 0;
-            std::memcpy(&word, at_ + i * kWord, kWord);
-            return (word ^ field.words[i]) & field.masks[i];
-        };
-        // All words, whether they count or not: that takes less than counting them.
-        static_assert(Field::kMaxWords == 5);
-        const uint64_t all = difference(0) | difference(1) | difference(2) | difference(3) | difference(4);
-        return all == 0 && field.wordNum > 0;
-    }
+    [[nodiscard]] bool IsNext(const Field &field) const { return StandsAt(field, at_, last_); }
 
     bool Value(Object *node, const Field *field, std::size_t depth) {
         switch (*at_) {
@@ -153,7 +122,7 @@ private:
         case 'n':
             return Literal(node, field, "null", Kind::Null, false);
         default:
-            if (!Integer(&node->integer)) return false;
+            if (!TakeInteger(&at_, &node->integer)) return false;
             node->kind = Kind::Integer;
             if (field->type != FieldType::Integer || !IntegerFits(field, node->integer)) Judge(tree_, node);
             return true;
@@ -226,7 +195,7 @@ private:
                 if (!Text(&text)) return false;
                 AppendText(tree_, list, text);
             } else {
-                if (!Integer(&number)) return false;
+                if (!TakeInteger(&at_, &number)) return false;
                 AppendInteger(tree_, list, number);
             }
         } while (Take(','));
@@ -267,25 +236,6 @@ private:
         node->kind = kind;
         if (kind == Kind::Bool) node->boolean = value;
         if (kind != Kind::Bool || field->type != FieldType::Bool) Judge(tree_, node);
-        return true;
-    }
-
-    bool Integer(int64_t *number) {
-        constexpr std::ptrdiff_t kSafeDigits = 18; // of any such number fits
-        const bool negative = Take('-');
-        const char *const digits = at_;
-        const char *at = digits;
-        uint64_t value = 0;
-        unsigned digit = 0;
-        while ((digit = static_cast<unsigned char>(*at) - unsigned{'0'}) < 10) {
-            value = value * 10 + digit; // as long as it is kept
-            at++;
-        }
-        const std::ptrdiff_t count = at - digits;
-        if (count == 0 || count > kSafeDigits || (*digits == '0' && (count > 1 || negative))) return false;
-        if (*at != ',' && *at != '}' && *at != ']') return false;
-        at_ = at;
-        *number = negative ? -static_cast<int64_t>(value) : static_cast<int64_t>(value);
         return true;
     }
 

@@ -4,12 +4,14 @@
 
 #include "platform/embedded/configstore/document_skim.h"
 
-#include <algorithm>
 #include <array>
 #include <bit>
 #include <cstring>
+#include <span>
+#include <string>
 #include <vector>
 
+#include "platform/embedded/configstore/document_parts.h"
 #include "platform/embedded/configstore/node.h"
 #include "platform/embedded/configstore/text_code.h"
 
@@ -19,12 +21,6 @@ namespace {
 
 constexpr std::size_t kMaxSkimDepth = 8;
 constexpr std::size_t kWord = sizeof(uint64_t);
-
-uint64_t WordAt(const char *at) {
-    uint64_t word = 0;
-    std::memcpy(&word, at, kWord);
-    return word;
-}
 
 class Skimmer {
 public:
@@ -51,42 +47,31 @@ private:
         if (!shape || depth > kMaxSkimDepth || !Take('{')) return false;
         if (*at_ == '}') return TakeEnd();
         uint64_t seen = 0;
-        const void *before = shape;
+        uint32_t before = shape->Number();
         do {
             const Field *const field = NextField(shape, before);
             if (!field) return false;
             const uint64_t bit = uint64_t{1} << field->index;
             if (seen & bit) return false;
             seen |= bit;
-            before = field;
+            before = field->number;
             if (!Value(*field, depth)) return false;
         } while (Take(','));
         return TakeEnd();
     }
 
-    const Field *NextField(const Shape *shape, const void *before) {
-        Guess &guess = guesses_[(reinterpret_cast<uintptr_t>(before) / sizeof(Field)) % guesses_.size()];
-        if (guess.before == before && TakePrefix(guess.field->prefix)) return guess.field;
+    /// As the quick reader's.
+    const Field *NextField(const Shape *shape, uint32_t before) {
+        const Field *const guess = before < next_.size() ? next_[before] : nullptr;
+        if (guess && StandsAt(*guess, at_, last_)) {
+            at_ += guess->prefix.size();
+            return guess;
+        }
         std::string_view name;
         if (!Text(&name) || !Take(':')) return nullptr;
         const Field *const field = shape->Find(name);
-        if (field) guess = {before, field};
+        if (field && before < next_.size()) next_[before] = field;
         return field;
-    }
-
-    bool TakePrefix(const std::string &prefix) {
-        const std::size_t size = prefix.size();
-        if (size > static_cast<std::size_t>(last_ - at_)) return false;
-        if (size < kWord) {
-            if (std::memcmp(at_, prefix.data(), size) != 0) return false;
-        } else {
-            for (std::size_t i = 0; i + kWord < size; i += kWord) {
-                if (WordAt(at_ + i) != WordAt(prefix.data() + i)) return false;
-            }
-            if (WordAt(at_ + size - kWord) != WordAt(prefix.data() + size - kWord)) return false;
-        }
-        at_ += size;
-        return true;
     }
 
     /// Of an object, from its opening brace through the closing one.
@@ -101,11 +86,9 @@ private:
             if (!Members(shape, depth + 1)) return false;
         } while (Take(','));
         if (!TakeEnd()) return false;
-        const auto from = ids_.begin() + static_cast<std::ptrdiff_t>(firstId);
-        std::sort(from, ids_.end());
-        const bool twice = std::adjacent_find(from, ids_.end()) != ids_.end();
+        const bool differ = AllDiffer(std::span(ids_).subspan(firstId));
         ids_.resize(firstId);
-        return !twice;
+        return differ;
     }
 
     bool Value(const Field &field, std::size_t depth) {
@@ -140,16 +123,8 @@ private:
     }
 
     bool Integer(const Field &field) {
-        constexpr std::ptrdiff_t kSafeDigits = 18; // of any such number fits
-        const bool negative = Take('-');
-        const char *const digits = at_;
-        int64_t value = 0;
-        while (*at_ >= '0' && *at_ <= '9' && at_ - digits < kSafeDigits)
-            value = value * 10 + (*at_++ - '0');
-        const std::ptrdiff_t count = at_ - digits;
-        if (count == 0 || (*digits == '0' && (count > 1 || negative))) return false;
-        if (*at_ != ',' && *at_ != '}' && *at_ != ']') return false;
-        return IntegerFits(&field, negative ? -value : value);
+        int64_t number = 0;
+        return TakeInteger(&at_, &number) && IntegerFits(&field, number);
     }
 
     bool List(const Field &field) {
@@ -218,15 +193,10 @@ private:
         return length > 0;
     }
 
-    struct Guess {
-        const void *before = nullptr; // the field before, or the shape
-        const Field *field = nullptr;
-    };
-
     const char *at_;
     const char *const last_;
-    std::array<Guess, 128> guesses_{};
-    std::vector<uint64_t> ids_; // of the lists of instances being looked through
+    std::array<const Field *, 256> next_{}; // by the number of the field before, or of the shape
+    std::vector<uint64_t> ids_;             // of the lists of instances being looked through
     std::string decoded_;
 };
 
