@@ -4,12 +4,12 @@
 
 #include "dvs/configstore.h"
 
-#include <algorithm>
 #include <array>
+#include <bit>
 #include <cstdlib>
 #include <cstring>
+#include <exception>
 #include <functional>
-#include <new>
 #include <optional>
 #include <string_view>
 #include <vector>
@@ -122,25 +122,39 @@ class EntryNames {
 public:
     explicit EntryNames(std::size_t ports) noexcept {
         try {
-            hashes_.reserve(ports + kOwnEntries.size());
-        } catch (const std::bad_alloc &) {
-            isSound_ = false;
+            hashes_.resize(std::bit_ceil((ports + kOwnEntries.size()) * 2)); // 0 is nothing
+        } catch (const std::exception &) {
+            areUnique_ = false;
+            return;
         }
         for (const char *name : kOwnEntries)
             Add(name);
     }
     void Add(std::string_view name) {
-        isSound_ = isSound_ && name.size() <= dvs::data::kMaxNameLen && hashes_.size() < hashes_.capacity();
-        if (isSound_) hashes_.push_back(std::hash<std::string_view>()(name));
+        areUnique_ = areUnique_ && name.size() <= dvs::data::kMaxNameLen && Insert(name);
     }
-    [[nodiscard]] bool AreUnique() {
-        std::sort(hashes_.begin(), hashes_.end());
-        return isSound_ && std::adjacent_find(hashes_.begin(), hashes_.end()) == hashes_.end();
-    }
+    [[nodiscard]] bool AreUnique() const { return areUnique_; }
 
 private:
-    std::vector<std::size_t> hashes_;
-    bool isSound_ = true;
+    // Ids that were chosen to fall together must not take long: the lists' way is one for them, too.
+    static constexpr std::size_t kMostSteps = 64;
+
+    bool Insert(std::string_view name) {
+        const std::size_t hash = std::hash<std::string_view>()(name);
+        const auto rest = static_cast<uint32_t>(hash >> 32 | 1);
+        const std::size_t mask = hashes_.size() - 1;
+        std::size_t at = hash & mask;
+        for (std::size_t steps = 0; steps < kMostSteps; ++steps, at = (at + 1) & mask) {
+            if (hashes_[at] == rest) return false;
+            if (hashes_[at] != 0) continue;
+            hashes_[at] = rest;
+            return true;
+        }
+        return false;
+    }
+
+    std::vector<uint32_t> hashes_; // the halves of them that their places do not tell
+    bool areUnique_ = true;
 };
 
 bool IsUplink(const char *key, const StoreTexts &uplinkKeys) {

@@ -69,7 +69,7 @@ void LoadNumber(configstore::Object *object, const char *name, std::span<uint8_t
 
 int32_t KnownFilters::Get(const char *name, const configstore::FilterSpec **spec) {
     for (std::size_t i = 0; i < num_; ++i) {
-        if (std::strcmp(known_[i].name, name) != 0) continue;
+        if (known_[i].name[0] != name[0] || std::strcmp(known_[i].name, name) != 0) continue;
         *spec = known_[i].filter.get();
         return 0;
     }
