@@ -42,7 +42,7 @@ using Database = std::unique_ptr<sqlite3, DatabaseCloser>;
 
 /// A document that this transaction has read.
 struct ReadBefore {
-    std::shared_ptr<const std::string> text;
+    std::shared_ptr<const Buffer> text;
     Outline outline;
 };
 

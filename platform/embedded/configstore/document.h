@@ -80,11 +80,11 @@ struct Outline {
 /// Fills an empty tree from a document as the store writes them in which all is allowed, and finds its
 /// outline. The root's lists of instances are looked through and stay text. False, with the tree in an
 /// unknown state, for any other document: ReadDocument has more to say about it.
-[[nodiscard]] bool ReadOutline(std::shared_ptr<const std::string> text, Tree *tree, Outline *outline);
+[[nodiscard]] bool ReadOutline(std::shared_ptr<const Buffer> text, Tree *tree, Outline *outline);
 
 /// Fills an empty tree from a document that was read before, all but the list of the outline, which stays
 /// text for now. False, with the tree in an unknown state, when it was not for an object of this kind.
-[[nodiscard]] bool ReadAgain(std::shared_ptr<const std::string> text, const Outline &outline, Tree *tree);
+[[nodiscard]] bool ReadAgain(std::shared_ptr<const Buffer> text, const Outline &outline, Tree *tree);
 
 } // namespace configstore
 

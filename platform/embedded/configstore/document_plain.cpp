@@ -328,18 +328,18 @@ bool ReadPlainDocument(std::string_view text, Tree *tree) {
     return false;
 }
 
-bool ReadOutline(std::shared_ptr<const std::string> text, Tree *tree, Outline *outline) {
-    if (text->empty()) return false;
+bool ReadOutline(std::shared_ptr<const Buffer> text, Tree *tree, Outline *outline) {
+    if (text->Empty()) return false;
     tree->text = std::move(text);
-    PlainReader reader(*tree->text, tree, nullptr, PlainReader::Lists::Skimmed);
+    PlainReader reader(tree->text->View(), tree, nullptr, PlainReader::Lists::Skimmed);
     if (!reader.Read() || tree->suspect) return false; // what has to be refused must be there to be found
     *outline = reader.Found();
     return true;
 }
 
-bool ReadAgain(std::shared_ptr<const std::string> text, const Outline &outline, Tree *tree) {
+bool ReadAgain(std::shared_ptr<const Buffer> text, const Outline &outline, Tree *tree) {
     tree->text = std::move(text);
-    return PlainReader(*tree->text, tree, &outline).Read();
+    return PlainReader(tree->text->View(), tree, &outline).Read();
 }
 
 void ReadLater(Tree *tree, Object *node) {

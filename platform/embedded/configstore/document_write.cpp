@@ -12,9 +12,17 @@
 
 namespace configstore {
 
+namespace {
+
+constexpr std::size_t kLargeText = kHugePage / 2; // more than that goes into huge pages
+
+} // namespace
+
 void Buffer::Grow(std::size_t size) {
-    std::size_t capacity = (capacity_ + size) * 2 + 256;
-    if (capacity < kHugePage) {
+    // Who begins with that much knows how much it will be.
+    const bool isExact = capacity_ == 0 && size > kLargeText;
+    std::size_t capacity = isExact ? size : (capacity_ + size) * 2 + 256;
+    if (capacity <= kLargeText) {
         auto *const data = static_cast<char *>(std::realloc(data_, capacity));
         if (!data) throw std::bad_alloc();
         data_ = data;
@@ -237,8 +245,8 @@ void WriteText(std::string_view text, bool asIs, Buffer *out) {
 }
 
 void WriteDocument(const Tree &tree, Buffer *out) {
-    // Nodes take several times what is written of them. What is taken here and not used costs nothing.
-    (void)out->Room(tree.arena.Taken() / 4);
+    // Nodes take three times what is written of them, or more. What is taken here and not used costs nothing.
+    (void)out->Room(tree.arena.Taken() / 3);
     WriteChildren(tree.root, out);
 }
 

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Large blocks from the system (huge_pages.h). A few blocks of one page stay with the process for the next
-// tree: clearing a fresh page of that size takes the system as long as filling it takes a reader of
+// tree or text: clearing a fresh page of that size takes the system as long as filling it takes a reader of
 // documents.
 
 #include "platform/embedded/configstore/huge_pages.h"
@@ -14,7 +14,7 @@ namespace configstore {
 
 namespace {
 
-constexpr std::size_t kMostKept = 2; // what a switch of some four thousand ports takes
+constexpr std::size_t kMostKept = 4; // what a save of a switch of some four thousand ports takes
 
 std::array<std::atomic<char *>, kMostKept> g_kept{};
 

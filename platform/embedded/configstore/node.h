@@ -23,6 +23,8 @@
 
 namespace configstore {
 
+class Buffer;
+
 enum class Kind : uint8_t {
     Dead, // deleted, or below what is; kept so that a stale handle meets a refusal and not somebody else's
           // node
@@ -105,9 +107,9 @@ struct Tree {
     Arena arena;
     const Shape *shape = nullptr;
     InstanceTable *tables = nullptr;
-    bool suspect = false;                    // some node was bad once
-    bool hasUnknown = false;                 // some object had a member without a field once
-    std::shared_ptr<const std::string> text; // that its Later nodes are in
+    bool suspect = false;               // some node was bad once
+    bool hasUnknown = false;            // some object had a member without a field once
+    std::shared_ptr<const Buffer> text; // that its Later nodes are in
     std::string key, group, component, instance;
 
     Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent,

@@ -35,7 +35,8 @@ int32_t HandOut(Trees *trees, Object ***objects, int32_t *count) {
 std::unique_ptr<Tree> ReadForRewrite(Store *store, const FilterSpec &address, int64_t document,
                                      std::string_view text) {
     auto tree = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
-    const auto kept = std::make_shared<const std::string>(text);
+    const auto kept = std::make_shared<Buffer>();
+    kept->Put(text);
     Outline outline;
     if (!ReadOutline(kept, tree.get(), &outline)) return nullptr;
     if (outline.field) store->readBefore[document] = {kept, outline};

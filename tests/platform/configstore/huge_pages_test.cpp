@@ -8,7 +8,11 @@
 #include <cstdint>
 #include <cstring>
 #include <set>
+#include <string>
+#include <string_view>
 #include <vector>
+
+#include "platform/embedded/configstore/document.h"
 
 using namespace configstore;
 
@@ -63,4 +67,16 @@ TEST(HugePages, WhatIsGivenBackComesAgainAndIsNeverGivenTwice) {
     const Block again = Take(kHugePage);
     EXPECT_EQ(again.data, first.data);
     UnmapHugePages(again.data, again.size);
+}
+
+TEST(HugePages, TextsOfAnySizeKeepWhatTheyHoldWhileTheyGrow) {
+    const std::string large(kHugePage - 100, 'l');
+    for (const std::size_t first : {std::size_t{1}, kHugePage / 2, kHugePage / 2 + 1, kHugePage - 100}) {
+        const std::string expected = large.substr(0, first) + "small" + large;
+        Buffer text;
+        text.Put(std::string_view(large).substr(0, first));
+        text.Put("small");
+        text.Put(large);
+        EXPECT_TRUE(text.View() == expected) << first;
+    }
 }

@@ -64,11 +64,17 @@ constexpr const char *kDocuments[] = {
     "",
 };
 
+std::shared_ptr<const Buffer> Kept(const std::string &text) {
+    const auto kept = std::make_shared<Buffer>();
+    kept->Put(text);
+    return kept;
+}
+
 /// What the look at a document for a rewrite finds: nothing, or the document with its lists read after all.
 std::optional<std::string> ReadOutlined(const std::string &json) {
     Tree tree(kKey, kGroup, kComponent, "sw1");
     Outline outline;
-    if (!ReadOutline(std::make_shared<const std::string>(json), &tree, &outline)) return std::nullopt;
+    if (!ReadOutline(Kept(json), &tree, &outline)) return std::nullopt;
     for (Object *member = tree.root.members.first; member; member = member->next) {
         if (member->kind == Kind::Later && !Expand(&tree, member)) return "a list that is none";
     }
@@ -101,7 +107,7 @@ TEST(PlainDocument, OutlineOfASoundDocumentLeavesItsLongestListText) {
     EXPECT_EQ(ReadOutlined(json), Read(json).document);
     Tree tree(kKey, kGroup, kComponent, "sw1");
     Outline outline;
-    ASSERT_TRUE(ReadOutline(std::make_shared<const std::string>(json), &tree, &outline));
+    ASSERT_TRUE(ReadOutline(Kept(json), &tree, &outline));
     EXPECT_EQ(json.substr(outline.begin, outline.end - outline.begin).substr(0, 8), R"({"1":{"n)");
     EXPECT_EQ(json.substr(outline.end, 7), R"(,"uuid")");
     EXPECT_EQ(FindMember(&tree.root, "ports")->kind, Kind::Later);
