@@ -1,4 +1,5 @@
 #!/bin/bash
+# SPDX-License-Identifier: Apache-2.0
 # From a bare machine to a first look: installs what is missing, builds, and takes the example site through a state
 # file, verification, display, a change, the difference, and back. Works in a directory of its own and leaves nothing
 # behind but build/release.

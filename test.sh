@@ -1,4 +1,5 @@
 #!/bin/bash
+# SPDX-License-Identifier: Apache-2.0
 # Builds everything and runs every test, in the release build and under AddressSanitizer and
 # UndefinedBehaviorSanitizer. The last line says how many tests passed and failed.
 set -euo pipefail

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # Installs the Debian packages of packages.txt that are missing. Used by quickstart.sh and test.sh.
 set -eu
 

@@ -1,4 +1,5 @@
 #!/bin/bash
+# SPDX-License-Identifier: Apache-2.0
 # Writes docs/properties.md from the tables in configstore/. A test compares the file with the tables.
 set -euo pipefail
 cd "$(dirname "$0")/.."

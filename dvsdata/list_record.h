@@ -45,6 +45,12 @@ struct ListRecord {
     std::uint32_t separateNum;    // entries with a block of their own
 };
 static_assert(offsetof(ListRecord, face) == 0);
+// Agents are compiled with the handle: its fields stay where they are.
+static_assert(offsetof(DVSData, serialSize) == 0);
+static_assert(offsetof(DVSData, head) == 8);
+static_assert(offsetof(DVSData, tail) == 16);
+static_assert(offsetof(DVSData, allocFn) == 24);
+static_assert(offsetof(DVSData, freeFn) == 32);
 static_assert(sizeof(ListRecord) % alignof(DVSDataEntry) == 0);
 
 inline ListRecord &RecordOf(DVSData *list) {

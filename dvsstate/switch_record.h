@@ -10,11 +10,31 @@
 //
 // Used by the switch table (creation, removal), the port table (slots) and the port index (buckets, links).
 
+#include <cstddef>
 #include <cstdint>
 
 #include "dvs/state.h"
 
 namespace dvs::state {
+
+// Agents are compiled with these records: a field that moves breaks every one of them.
+static_assert(sizeof(DVSwitch) == 240);
+static_assert(offsetof(DVSwitch, numPorts) == 0);
+static_assert(offsetof(DVSwitch, maxPorts) == 4);
+static_assert(offsetof(DVSwitch, newMaxPorts) == 8);
+static_assert(offsetof(DVSwitch, version) == 12);
+static_assert(offsetof(DVSwitch, switchId) == 16);
+static_assert(offsetof(DVSwitch, className) == 80);
+static_assert(offsetof(DVSwitch, globalPropList) == 208);
+static_assert(offsetof(DVSwitch, hostPropList) == 216);
+static_assert(offsetof(DVSwitch, classFlags) == 224);
+static_assert(offsetof(DVSwitch, portBitmap) == 232);
+static_assert(offsetof(DVSwitch, ports) == 240);
+static_assert(sizeof(DVSPort) == 72);
+static_assert(offsetof(DVSPort, portId) == 0);
+static_assert(offsetof(DVSPort, portData) == 48);
+static_assert(offsetof(DVSPort, owner) == 56);
+static_assert(offsetof(DVSPort, portType) == 64);
 
 /// Private fields of a switch. They are valid as long as the record.
 struct SwitchFront {

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # exported_names.sh NM LIBRARY LIST: the library exports the names of the list, no more and no fewer.
 set -eu
 work=$(mktemp -d)

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # installed_copy.sh CMAKE BUILD_DIR LIBDIR CC SOURCE [FLAGS…]: an installed copy is enough to compile, link and run a
 # C program against, in the way a package of the library would be used.
 set -eu

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # installed_package.sh CMAKE BUILD_DIR LIBDIR CC SOURCE [FLAGS…]: an installed copy, moved elsewhere, is found by other
 # people's builds: by find_package, and by pkg-config where there is one.
 set -eu
