@@ -111,6 +111,21 @@ TEST_F(Verbs, VerifyCountsWhatIsSound) {
     EXPECT_FALSE(json.as_object().contains("error"));
 }
 
+TEST_F(Verbs, VerifyWarnsOfMoreSwitchesThanAnyTableHolds) {
+    std::vector<dvs::ctl::NewEntry> switches;
+    for (int i = 0; i < 32; ++i)
+        switches.push_back(MakeSwitch("s" + std::to_string(i), {}, {}, {}));
+    switches.push_back(MakeSwitch("s0", {}, {}, {})); // joins the first one
+    PutState("full.db", dvs::ctl::EncodeList(switches));
+    EXPECT_EQ(Dvsctl({"verify", At("full.db")}).err, "");
+    switches.push_back(MakeSwitch("one too many", {}, {}, {}));
+    PutState("over.db", dvs::ctl::EncodeList(switches));
+    const Result result = Dvsctl({"verify", At("over.db")});
+    EXPECT_EQ(result.status, 0) << "its bytes are sound";
+    EXPECT_NE(result.err.find("warning: no host loads this state"), std::string::npos) << result.err;
+    EXPECT_EQ(Json(Dvsctl({"verify", At("over.db"), "--json"})).at("warnings").as_array().size(), 1u);
+}
+
 TEST_F(Verbs, VerifyNamesTheInnermostFault) {
     Buffer state = SmallState();
     const std::string text = "shadow of 1";

@@ -6,6 +6,7 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
+#include "dvsstate/switch_table.h"
 #include "tools/dvsctl/commands.h"
 #include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/show.h"
@@ -57,6 +58,17 @@ void WriteReport(Context &context, const Source &source, const std::optional<Err
     if (!damage->next.empty()) out.Write(fmt::format("  next:   {}\n", Escape(damage->next)));
 }
 
+// Limits of ports differ from host to host, so a state may exceed those of this one. The switch table is as
+// large everywhere.
+void WarnOfTooManySwitches(Context &context, const Source &source, Bytes state) {
+    if (state::VerifyState(state, UINT32_MAX).first.kind != state::StateFaultKind::TooManySwitches) return;
+    context.out.Warn(
+        Error(Exit::Done, "no host loads this state")
+            .In(source.Name())
+            .Because(fmt::format("it has more switches than the {} of the switch table", state::kSwitchNum))
+            .Try("take some out in the JSON form, or copy single ones with --switch"));
+}
+
 } // namespace
 
 Exit RunVerify(Context &context) {
@@ -65,6 +77,7 @@ Exit RunVerify(Context &context) {
     const StateBytes read = ReadState(context, *source, ReadMode::Tolerant);
     const state::StateVerdict verdict = state::VerifyState(read.bytes);
     const std::optional<Error> damage = FindDamage(*source, read, verdict);
+    if (!damage) WarnOfTooManySwitches(context, *source, read.bytes);
     if (context.options.json) {
         boost::json::object document = Envelope("verify");
         document["source"] = ValidUtf8(source->Name());
