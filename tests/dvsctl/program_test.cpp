@@ -71,6 +71,7 @@ TEST_F(Program, RefusesWrongUsage) {
         {"show", At("a.db"), "--columns", "nmae"},
         {"show", At("a.db"), "--timeout", "soon"},
         {"show", At("a.db"), "--timeout", "-1"},
+        {"show", At("a.db"), "--timeout", ""},
         {"show", At("a.db"), "--timeout", "nan"},
         {"show", At("a.db"), "--quiet", "--verbose"},
         {"verify", At("a.db"), "--dry-run"},

@@ -30,6 +30,11 @@ struct Parsed {
     bool IsAbout() const { return help || version || completion; }
 };
 
+// An empty text, of a variable that is not set, is no number: it would count as 0.
+std::string RefuseEmpty(const std::string &text) {
+    return text.empty() ? "a number is wanted" : "";
+}
+
 void AddRow(CLI::App &app, const OptionRow &row, Options &options) {
     std::visit(
         [&](auto member) {
@@ -38,6 +43,8 @@ void AddRow(CLI::App &app, const OptionRow &row, Options &options) {
                 app.add_flag(row.name, options.*member);
             else if constexpr (std::is_same_v<Value, std::string>)
                 app.add_option(row.name, options.*member)->required();
+            else if constexpr (std::is_same_v<Value, double>)
+                app.add_option(row.name, options.*member)->take_last()->check(RefuseEmpty);
             else
                 app.add_option(row.name, options.*member)->take_last();
         },
