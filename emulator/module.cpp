@@ -373,10 +373,10 @@ HYP_ReturnStatus Module::SwitchSetVersion(const Call &call, Answer *) {
     const HYP_ReturnStatus status = DVSState_SwitchSetVersion(name, version);
     if (status != HYP_OK) return status;
     // Where the version is a property as well, the two are one.
-    DVSwitch *sw = DVSState_SwitchFind(name);
-    if (DVSState_GlobalPropIsSet(sw, kSwitchVersionProp))
-        return DVSState_GlobalPropSet(name, kSwitchVersionProp, &version, sizeof version, 0);
-    return HYP_OK;
+    DVSDataEntry *entry = nullptr;
+    if (DVSState_GlobalPropLookup(name, kSwitchVersionProp, &entry) != HYP_OK) return HYP_OK;
+    return DVSState_GlobalPropSet(name, kSwitchVersionProp, &version, sizeof version,
+                                  DVSData_PropType(entry));
 }
 
 } // namespace dvs::emulator

@@ -3,6 +3,7 @@
 // refuses.
 
 #include <cstring>
+#include <functional>
 #include <string>
 #include <string_view>
 
@@ -120,6 +121,18 @@ TEST_F(EmulatorCommands, TheVersionReadsAsAGlobalProperty) {
     EXPECT_EQ(FetchWord(DVSHYP_GlobalPropGet, "s1", "com.orbeno.common.version"), 112U);
 }
 
+TEST_F(EmulatorCommands, AVersionThatIsSetLeavesItsPropertysType) {
+    const uint32_t version = 106;
+    ASSERT_EQ(DVSHYP_GlobalPropSet("s1", "com.orbeno.common.version", &version, sizeof version, 16), HYP_OK);
+    ASSERT_EQ(DVSHYP_SwitchSetVersion("s1", 112), HYP_OK);
+    const Bytes state = Fetch(DVSHYP_StateGet);
+    ASSERT_EQ(DVSState_ConfigDeserialize(state.text.data(), state.Size()), HYP_OK);
+    DVSDataEntry *entry = nullptr;
+    ASSERT_EQ(DVSState_GlobalPropLookup("s1", "com.orbeno.common.version", &entry), HYP_OK);
+    EXPECT_EQ(DVSData_PropType(entry), 16U);
+    EXPECT_EQ(DVSState_ConfigReset(), HYP_OK);
+}
+
 TEST_F(EmulatorCommands, UnsupportedVersionsAreRefused) {
     EXPECT_EQ(DVSHYP_SwitchSetVersion("s1", 13), HYP_NOT_SUPPORTED);
     EXPECT_EQ(DVSHYP_SwitchSetVersion("none", 12), HYP_NOT_FOUND);
@@ -137,6 +150,15 @@ TEST_F(EmulatorCommands, MaxPortsAreSetAndHeldTo) {
     EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("none", 2), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("s1", 20), HYP_OK);
     EXPECT_NE(Exec("stats").text.find("max-ports 20 "), std::string::npos);
+}
+
+TEST_F(EmulatorCommands, ALimitBelowASlotInUseIsRefusedHoweverFewPortsThereAre) {
+    ASSERT_EQ(DVSHYP_SwitchAdd("c1", "custom", 3, 110), HYP_OK);
+    for (const char *port : {"a", "b", "c"})
+        ASSERT_EQ(AddPort("c1", port), HYP_OK);
+    ASSERT_EQ(DVSHYP_PortRemove("c1", "a"), HYP_OK);
+    EXPECT_EQ(DVSHYP_SwitchSetMaxPorts("c1", 2), HYP_LIMIT_EXCEEDED);
+    EXPECT_EQ(DVSHYP_PortFind("c1", "c"), HYP_OK);
 }
 
 TEST_F(EmulatorCommands, PortsComeAndGo) {
@@ -184,6 +206,57 @@ TEST_F(EmulatorCommands, UplinkDataIsKeptPerPortAndUplink) {
     EXPECT_EQ(DVSHYP_PortRemove("s1", "p1"), HYP_OK);
     ASSERT_EQ(AddPort("s1", "p1"), HYP_OK);
     EXPECT_EQ(FetchUplink("s1", "p1", 0).status, HYP_NOT_FOUND);
+}
+
+TEST_F(EmulatorCommands, WhatIsKeptBesideTheStateGoesWithItsSwitch) {
+    const Bytes state = Fetch(DVSHYP_StateGet);
+    const auto init = [&] { ASSERT_EQ(DVSHYP_StateInit(state.text.data(), state.Size()), HYP_OK); };
+    const std::function<void()> renewals[] = {
+        init,
+        [&] {
+            ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
+            init();
+        },
+        [] {
+            ASSERT_EQ(DVSHYP_SwitchRemove("s1"), HYP_OK);
+            ASSERT_EQ(DVSHYP_SwitchAdd("s1", "vswitch", 0, 110), HYP_OK);
+            ASSERT_EQ(AddPort("s1", "p1"), HYP_OK);
+        },
+    };
+    for (const auto &renew : renewals) {
+        ASSERT_EQ(DVSHYP_SwitchAssociate("s1"), HYP_OK);
+        ASSERT_EQ(DVSHYP_UplinkDataSet("s1", "p1", 0, "v", 1, 16), HYP_OK);
+        ASSERT_EQ(Exec("event s1 p1 up").status, HYP_OK);
+        renew();
+        EXPECT_NE(Exec("stats").text.find("dissociated\n"), std::string::npos);
+        EXPECT_EQ(FetchUplink("s1", "p1", 0).status, HYP_NOT_FOUND);
+        EXPECT_EQ(Exec("ports s1").text, "port \"p1\" kind active connection 0 link down\n");
+    }
+}
+
+TEST_F(EmulatorCommands, ARefusedFetchIsNoMemoryOfTheStateItWasAskedFor) {
+    // The state that did not fit is kept for the larger buffer, until it changes.
+    const auto change = [](const char *name) { return DVSHYP_HostPropSet("s1", name, "v", 1, 16); };
+    const auto refuse = [] {
+        DVSHYPRequest request{};
+        char small[4];
+        request.data = reinterpret_cast<uintptr_t>(small);
+        request.dataLen = sizeof small;
+        return DVSHYP_Ioctl(3, &request);
+    };
+    const auto shows = [](const char *text) {
+        return Fetch(DVSHYP_StateGet).text.find(text) != std::string::npos;
+    };
+    testing::internal::CaptureStderr();
+    ASSERT_EQ(refuse(), HYP_LIMIT_EXCEEDED);
+    EXPECT_FALSE(shows("changed.by.command"));
+    ASSERT_EQ(refuse(), HYP_LIMIT_EXCEEDED);
+    ASSERT_EQ(change("changed.by.command"), HYP_OK);
+    EXPECT_TRUE(shows("changed.by.command"));
+    ASSERT_EQ(refuse(), HYP_LIMIT_EXCEEDED);
+    ASSERT_EQ(Exec("event s1 p1 up").status, HYP_OK);
+    EXPECT_TRUE(shows("com.orbeno.common.port.connectid"));
+    testing::internal::GetCapturedStderr();
 }
 
 TEST_F(EmulatorCommands, LargeValuesTravelWhole) {
