@@ -12,6 +12,7 @@
 #include <unistd.h>
 
 #include "dvs/dvs.h"
+#include "emulator/connection.h"
 #include "emulator/emulator_process.h"
 #include "emulator/hyp_support.h"
 #include "platform/embedded/emulator_client.h"
@@ -40,6 +41,13 @@ public:
         const ssize_t got = recv(fd_, buffer, sizeof buffer, MSG_DONTWAIT);
         if (ended) *ended = got <= 0;
         return true;
+    }
+
+    /// True when a whole answer with this payload comes.
+    bool Received(const std::string &payload) {
+        wire::ReplyHeader header{};
+        std::string got(payload.size(), '\0');
+        return embedded::ReceiveReply(fd_, &header, got.data(), got.size()) && got == payload;
     }
 
 private:
@@ -233,6 +241,31 @@ TEST_F(HostileClients, AClientThatTakesNoAnswersHoldsUpNobody) {
     // What was lent for those answers was copied: changing the value changes none of them.
     EXPECT_EQ(DVSHYP_GlobalPropClear("s", "name"), HYP_OK);
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
+    EXPECT_TRUE(clients.front()->Received(value)) << "as it was when it was asked for";
+}
+
+TEST(ClientsTogether, WaitForNoMoreThanTheirBudget) {
+    int ends[2];
+    ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
+    constexpr uint64_t kBudget = 1 << 20;
+    emulator::MemoryBudget budget(kBudget);
+    {
+        emulator::Connection connection(ends[0], getpid(), &budget);
+        Parts parts = ValidRequest(0);
+        parts.header.dataSize = parts.record.dataLen = 64U << 20;
+        std::string bytes = parts.Bytes() + std::string(32 << 10, 'v');
+        std::size_t sent = 0;
+        while (sent < kBudget && send(ends[1], bytes.data(), bytes.size(), MSG_NOSIGNAL) > 0) {
+            sent += bytes.size();
+            bytes.assign(32 << 10, 'v');
+            if (!connection.Receive()) break;
+        }
+        EXPECT_GT(sent, kBudget / 4) << "what fits is taken in";
+        EXPECT_LT(sent, kBudget) << "and no more";
+        EXPECT_FALSE(budget.Take(kBudget));
+    }
+    EXPECT_TRUE(budget.Take(kBudget)) << "given back with the connection";
+    close(ends[1]);
 }
 
 } // namespace
