@@ -117,6 +117,39 @@ TEST_F(StoreVerbs, ImportRefusesWithinTenTimesTheDocumentsSize) {
     }
 }
 
+TEST_F(StoreVerbs, ImportAfterWhichTheStoreDoesNotLoadSaysSo) {
+    Save();
+    const BadDocument cases[] = {
+        {"no id", R"({"name": "a"})", "Failed to get uuid"},
+        {"no class", R"({"uuid": "beta"})", "Failed to get product obj"},
+        {"port id",
+         R"({"uuid": "beta", "max_ports": 1, "product": {"version": "7.0.2", "forwarding_class": "x"},
+         "ports": {"a123456789a123456789a123456789a123456789a123456789a123456789a123456789": {"name": "a"}}})",
+         "port id is too long"},
+    };
+    for (const BadDocument &bad : cases) {
+        Put("document.json", bad.text);
+        const Result imported = Ctl({"store", "import", At("document.json"), "--switch", "beta", "--quiet"});
+        EXPECT_EQ(imported.status, 0) << imported.err;
+        EXPECT_NE(imported.err.find("warning: as it is saved now, the config store cannot be loaded"),
+                  std::string::npos)
+            << bad.what << ": " << imported.err;
+        EXPECT_NE(imported.err.find(bad.named), std::string::npos) << bad.what << ": " << imported.err;
+        EXPECT_NE(Ctl({"verify", "store:"}).status, 0) << bad.what;
+        // The desired layer alone is no state.
+        EXPECT_EQ(Ctl({"store", "import", At("document.json"), "--switch", "beta", "--layer", "desired"}).err,
+                  "");
+    }
+    ASSERT_EQ(Ctl({"store", "restore", "--revision", "1"}).status, 0);
+    Put("document.json", Document());
+    EXPECT_EQ(Ctl({"store", "import", At("document.json")}).err, "");
+    EXPECT_EQ(Ctl({"store", "import", At("document.json"), "--switch", "alpha"}).err, "");
+    const Result other = Ctl({"store", "import", At("document.json"), "--switch", "gamma", "--dry-run"});
+    EXPECT_NE(other.err.find("warning: the document of switch gamma says that it is switch alpha"),
+              std::string::npos)
+        << other.err;
+}
+
 TEST_F(StoreVerbs, DeleteGoesIntoHistoryAndComesBack) {
     Save();
     const std::string before = Get("store.db"), document = Document();

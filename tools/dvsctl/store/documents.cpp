@@ -9,10 +9,13 @@
 #include "tools/dvsctl/envelope.h"
 #include "tools/dvsctl/files.h"
 #include "tools/dvsctl/json_parse.h"
+#include "tools/dvsctl/model.h"
+#include "tools/dvsctl/source.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/verbs.h"
 #include "tools/dvsctl/text.h"
+#include "tools/dvsctl/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -27,13 +30,16 @@ std::string ReadInput(Context &context, const std::string &file) {
     return ReadWholeFile(context, file, file, Accept::Pipes);
 }
 
-// The switch that a document says it is, unless the command line says.
-std::string InstanceOf(const Options &options, const std::string &file, std::string_view text) {
+// The switch that a document says it is; empty where it does not say.
+std::string UuidOf(const json::value &document) {
+    const json::value *uuid = document.is_object() ? document.as_object().if_contains("uuid") : nullptr;
+    return uuid && uuid->is_string() ? std::string(uuid->as_string()) : std::string();
+}
+
+// The switch that a document is for: the one it says it is, unless the command line says.
+std::string InstanceOf(const Options &options, const std::string &file, const json::value &document) {
     if (options.switchId) return *options.switchId;
-    const auto document = ReadDocument(text);
-    if (document && document->is_object())
-        if (const json::value *uuid = document->as_object().if_contains("uuid"); uuid && uuid->is_string())
-            if (!uuid->as_string().empty()) return std::string(uuid->as_string());
+    if (std::string uuid = UuidOf(document); !uuid.empty()) return uuid;
     throw Error(Exit::Malformed, "the document does not say whose it is")
         .In(file)
         .Field("uuid")
@@ -69,6 +75,29 @@ void CheckInput(const admin::Address &address, const std::string &file, const st
     const configstore::MessageCollector messages;
     const std::int32_t status = admin::CheckDocument(address.key, address.group, text, &problems);
     if (status != configstore::OK) throw Error(RefusedDocument(status, file, problems));
+}
+
+// Saves and loads know a stored switch by what its document says, wherever that stands.
+void WarnOfAnotherUuid(Context &context, const std::string &file, const std::string &instance,
+                       const json::value &document) {
+    const std::string uuid = UuidOf(document);
+    if (uuid.empty() || uuid == instance) return;
+    context.out.Warn(
+        Error(Exit::Done, fmt::format("the document of switch {} says that it is switch {}", instance, uuid))
+            .In(file)
+            .Field("uuid")
+            .Because("a load takes it for that one, and a save of all switches fails at it")
+            .Try("write the switch's own id there and import the document again"));
+}
+
+// Nothing is required of a document, but the loads require some of it. One switch that does not load keeps all
+// others from it, so that is told at once.
+void WarnIfUnloadable(Context &context, const std::string &path) {
+    try {
+        (void)LoadState(context, *OpenSource("store:" + path));
+    } catch (const Error &error) {
+        if (error.status != Exit::Busy) context.out.Warn(UnloadableWarning({}, error));
+    }
 }
 
 } // namespace
@@ -112,7 +141,9 @@ Exit RunStoreImport(Context &context) {
     const std::string path = StorePathOf(options.store.value_or(""));
     const std::string text = ReadInput(context, options.source);
     CheckInput(SwitchAddress(LayerOf(options), "x"), options.source, text);
-    const admin::Address address = SwitchAddress(LayerOf(options), InstanceOf(options, options.source, text));
+    const json::value document = ReadDocument(text).value();
+    const admin::Address address =
+        SwitchAddress(LayerOf(options), InstanceOf(options, options.source, document));
     std::optional<json::value> before;
     if (IsStoreThere(path)) {
         const OpenStore store(context, path, true);
@@ -127,11 +158,13 @@ Exit RunStoreImport(Context &context) {
         std::vector<admin::Problem> problems;
         store.Require(admin::Import(store.get(), address, text, &problems), "cannot import the document");
     }
+    WarnOfAnotherUuid(context, options.source, address.instance, document);
+    if (!options.dryRun && address.layer == admin::Layer::Current) WarnIfUnloadable(context, path);
     WriteReport(context, {"store import",
                           path,
                           fmt::format("imported switch {} into {}", ShowName(address.instance),
                                       ShowName(StoreName(path))),
-                          {{address, before, ReadDocument(text)}}});
+                          {{address, before, document}}});
     return Exit::Done;
 }
 
