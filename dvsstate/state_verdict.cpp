@@ -1,13 +1,14 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // The verdict over a whole state, and the words for its faults (state_view.h). Stands on the walk alone; the
-// tables of a load are kept here in small, so that nothing is allocated and the process-wide table stays
-// untouched.
+// tables of a load are kept here in small, so that the process-wide table stays untouched.
 
 #include <algorithm>
-#include <bitset>
+#include <bit>
 #include <cstdio>
-#include <iterator>
-#include <utility>
+#include <cstring>
+#include <functional>
+#include <new>
+#include <vector>
 
 #include "dvsstate/names.h"
 #include "dvsstate/port_table.h"
@@ -41,6 +42,7 @@ constexpr FaultRow kFaults[] = {
     {"more switches than the table holds", HYP_LIMIT_EXCEEDED},
     {"port limit of the switch exceeds the host's free ports", HYP_LIMIT_EXCEEDED},
     {"more ports than the switch or the host may have", HYP_LIMIT_EXCEEDED},
+    {"no memory for finding repeated ports", HYP_NO_MEMORY},
 };
 
 const FaultRow &Row(StateFaultKind kind) {
@@ -53,66 +55,72 @@ struct LoadedSwitch {
     uint32_t version, maxPorts, classFlags, portNum;
 };
 
-/// Calls visit(entry) for the entries of a buffer as far as they hang together, until it returns false. For
-/// going back over what was judged before: nothing is summed again.
-template <typename Visit> void WalkAgain(Bytes buffer, std::size_t base, Visit visit) {
-    std::size_t offset = data::kHeaderSize;
-    while (offset + data::kEntryFixedSize <= buffer.size()) {
-        const Bytes rest = buffer.subspan(offset);
-        const uint32_t size = data::Load32(rest.data() + data::kEntrySizeOffset);
-        const uint32_t dataLen = data::Load32(rest.data() + data::kDataLenOffset);
-        if (size > rest.size() || dataLen > size || size - dataLen < data::kMinEntryRoom) return;
-        data::EntryView entry;
-        entry.offset = base + offset;
-        entry.propType = data::Load32(rest.data() + data::kPropTypeOffset);
-        entry.nameField = rest.subspan(data::kNameOffset, data::kNameSize);
-        entry.value = rest.subspan(data::kEntryFixedSize, dataLen);
-        if ((entry.propType & data::kDeserializeTypeMask) != 0 && !visit(entry)) return;
-        offset += size;
-    }
-}
-
-uint32_t KindOf(const data::EntryView &port) {
-    uint32_t kind = DVS_PORT_ACTIVE;
-    WalkAgain(port.value, port.ValueOffset(), [&](const data::EntryView &entry) {
-        if (entry.Name() != kPortKind) return true;
-        if (entry.value.size() >= sizeof kind) kind = data::Load32(entry.value.data());
-        return false;
-    });
-    return kind;
-}
-
-/// The ports seen so far, by hash and with room for doubt: only where it says "maybe" is a port looked for
-/// among those before it, so that a state of many ports costs about one pass.
+/// The ports that a load would have in its table by now, by where their names stand in the bytes.
 class SeenPorts {
 public:
-    /// False when the port was certainly not there; it is from now on.
-    bool Insert(std::string_view switchId, std::string_view portId, uint32_t kind) {
-        uint64_t hash = kind;
-        for (const std::string_view text : {switchId, std::string_view("/"), portId}) {
-            for (const char c : text)
-                hash = (hash ^ static_cast<unsigned char>(c)) * 0x100000001b3;
-        }
-        hash ^= hash >> 29;
-        const bool first = Test(static_cast<std::size_t>(hash));
-        return Test(static_cast<std::size_t>(hash >> 32)) && first;
+    explicit SeenPorts(Bytes bytes) : bytes_(bytes) {}
+
+    /// HYP_EXISTS when the port was there; it is from now on. The names lie in the bytes.
+    HYP_ReturnStatus Insert(std::string_view switchId, std::string_view portId, uint32_t kind) {
+        if (used_ * 2 >= slots_.size() && !Grow()) return HYP_NO_MEMORY;
+        const std::size_t hash = std::hash<std::string_view>{}(portId) ^
+                                 std::rotl(std::hash<std::string_view>{}(switchId) + kind, 1);
+        const Slot wanted = {static_cast<uint32_t>(hash), OffsetOf(switchId), OffsetOf(portId), kind};
+        Slot *const slot = Find(wanted.hash, [&](const Slot &other) {
+            return other.hash == wanted.hash && other.kind == kind && NameAt(other.portName) == portId &&
+                   NameAt(other.switchName) == switchId;
+        });
+        if (slot->portName != 0) return HYP_EXISTS;
+        *slot = wanted;
+        used_++;
+        return HYP_OK;
     }
 
 private:
-    static constexpr std::size_t kBits = std::size_t{1} << 19;
+    struct Slot {
+        uint32_t hash;
+        uint32_t switchName, portName; // offsets, which a length of 32 bits bounds; 0 in a free slot
+        uint32_t kind;
+    };
 
-    bool Test(std::size_t hash) {
-        const bool was = bits_[hash % kBits];
-        bits_.set(hash % kBits);
-        return was;
+    [[nodiscard]] uint32_t OffsetOf(std::string_view name) const {
+        return static_cast<uint32_t>(reinterpret_cast<const uint8_t *>(name.data()) - bytes_.data());
+    }
+    [[nodiscard]] std::string_view NameAt(uint32_t offset) const {
+        const char *const name = reinterpret_cast<const char *>(bytes_.data()) + offset;
+        return {name, strnlen(name, data::kNameSize - 1)};
     }
 
-    std::bitset<kBits> bits_;
+    template <typename Is> Slot *Find(uint32_t hash, Is is) {
+        std::size_t at = hash & (slots_.size() - 1);
+        while (slots_[at].portName != 0 && !is(slots_[at]))
+            at = (at + 1) & (slots_.size() - 1);
+        return &slots_[at];
+    }
+
+    bool Grow() {
+        constexpr std::size_t kFirstSize = 1024;
+        try {
+            std::vector<Slot> old(std::max(kFirstSize, slots_.size() * 2));
+            old.swap(slots_);
+            for (const Slot &slot : old) {
+                if (slot.portName != 0) *Find(slot.hash, [](const Slot &) { return false; }) = slot;
+            }
+        } catch (const std::bad_alloc &) {
+            return false;
+        }
+        return true;
+    }
+
+    Bytes bytes_;
+    std::vector<Slot> slots_; // a power of two of them, at most half of them used
+    std::size_t used_ = 0;
 };
 
 class Judge {
 public:
-    Judge(Bytes bytes, std::optional<uint32_t> hostMaxPorts) : bytes_(bytes), hostMaxPorts_(hostMaxPorts) {}
+    Judge(Bytes bytes, std::optional<uint32_t> hostMaxPorts)
+        : bytes_(bytes), hostMaxPorts_(hostMaxPorts), seen_(bytes) {}
     StateVerdict Run();
 
 private:
@@ -120,7 +128,6 @@ private:
     StateFault LoadSwitch(const StateItem &item);
     StateFault LoadPort(const StateItem &item);
     [[nodiscard]] bool IsOverLimit() const;
-    [[nodiscard]] bool IsRepeated(const StateItem &item) const;
     void Take(const StateItem &item);
 
     Bytes bytes_;
@@ -219,8 +226,10 @@ StateFault Judge::LoadPort(const StateItem &item) {
     const std::string_view id = item.entry.Name();
     if (id.size() >= PortIdSize(current_->version)) return fault(StateFaultKind::PortIdLong);
     if (hostMaxPorts_ && IsOverLimit()) return fault(StateFaultKind::TooManyPorts);
-    if (item.portKind != DVS_PORT_ZOMBIE && seen_.Insert(current_->id, id, item.portKind) && IsRepeated(item))
-        return fault(StateFaultKind::PortRepeated);
+    HYP_ReturnStatus seen = HYP_OK;
+    if (item.portKind != DVS_PORT_ZOMBIE) seen = seen_.Insert(current_->id, id, item.portKind);
+    if (seen == HYP_EXISTS) return fault(StateFaultKind::PortRepeated);
+    if (seen != HYP_OK) return fault(StateFaultKind::NoMemory);
     current_->portNum++;
     portNum_++;
     return {};
@@ -229,26 +238,6 @@ StateFault Judge::LoadPort(const StateItem &item) {
 bool Judge::IsOverLimit() const {
     if ((current_->classFlags & kUnlimitedClass) == 0 && current_->portNum == current_->maxPorts) return true;
     return portNum_ == *hostMaxPorts_ || static_cast<int32_t>(current_->maxPorts) < 1;
-}
-
-bool Judge::IsRepeated(const StateItem &item) const {
-    bool found = false;
-    WalkAgain(bytes_, 0, [&](const data::EntryView &sw) {
-        if (sw.offset > item.entry.offset) return false;
-        if (sw.Name() != item.path.names[0]) return true;
-        std::array<bool, std::size(kFixedEntries)> have{};
-        WalkAgain(sw.value, sw.ValueOffset(), [&](const data::EntryView &port) {
-            if (port.offset >= item.entry.offset) return false;
-            const auto fixed = std::ranges::find(kFixedEntries, port.Name());
-            if (fixed != std::end(kFixedEntries) &&
-                !std::exchange(have[static_cast<std::size_t>(fixed - std::begin(kFixedEntries))], true))
-                return true;
-            found = port.Name() == item.entry.Name() && KindOf(port) == item.portKind;
-            return !found;
-        });
-        return !found;
-    });
-    return found;
 }
 
 } // namespace

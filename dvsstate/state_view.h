@@ -67,7 +67,8 @@ enum class StateFaultKind : std::uint8_t {
     // Only where host limits are asked for:
     TooManySwitches, // the table has no room for it; at the switch
     SwitchTooLarge,  // its port limit exceeds the host's free ports; at the switch
-    TooManyPorts     // one more port than the limit of its switch or of the host; at the port
+    TooManyPorts,    // one more port than the limit of its switch or of the host; at the port
+    NoMemory         // the rest of the state is not searched for repeated ports; at the port
 };
 
 /// What is wrong and where.

@@ -151,6 +151,24 @@ TEST_F(StateViewTest, SaysWhatALoadWouldRefuseAndWhere) {
         "s/p @1620: port of this id and kind is there already");
 }
 
+TEST_F(StateViewTest, FindsTheOneRepeatedPortAmongMany) {
+    const std::string kind = "com.orbeno.common.port.volatile.type";
+    Props ports;
+    for (int i = 0; i < 3000; i++)
+        ports.push_back(Nested(std::to_string(i), {}));
+    ports.push_back(
+        Nested("1500", {{kind, U32Value(DVS_PORT_SHADOW), 0x10}})); // another kind is another port
+    const Props twice = {Nested("s", SwitchWith(ports)), Nested("t", SwitchWith(ports))};
+    EXPECT_EQ(VerifyState(SerializedOf(twice)).first.Status(), HYP_OK);
+    ports.push_back(Nested("1500", {{kind, U32Value(DVS_PORT_SHADOW), 0x10}}));
+    const auto state = SerializedOf({Nested("s", SwitchWith(ports))});
+    const StateVerdict verdict = VerifyState(state);
+    EXPECT_EQ(verdict.first.kind, StateFaultKind::PortRepeated);
+    EXPECT_EQ(verdict.first.path.names[1], "1500");
+    EXPECT_EQ(verdict.all.ports, 3002u);
+    EXPECT_EQ(verdict.sound.ports, 3001u);
+}
+
 TEST_F(StateViewTest, KeepsToTheHostsLimitsOnlyWhenAsked) {
     const Props full = {Nested("s", SwitchWith({Nested("p", {}), Nested("q", {})}))};
     EXPECT_EQ(FirstOf(full, 1), "s/q @892: more ports than the switch or the host may have");
