@@ -68,6 +68,20 @@ TEST_F(StoreTrouble, AnotherWriterIsBusyOnceTheTimeIsOver) {
     EXPECT_EQ(Document(), document);
 }
 
+TEST_F(StoreTrouble, WaitingIsShownOnATerminalOnly) {
+    Save();
+    const Database other = OpenDatabase(store_);
+    Sql(other, "BEGIN IMMEDIATE");
+    const std::vector<std::string> verb = {"copy", At("site.db"), "store:", "--timeout", "1"};
+    const Result shown = RunInTerminal(verb, {"DVS_CONFIGSTORE=" + store_});
+    EXPECT_EQ(shown.status, 8);
+    EXPECT_NE(shown.out.find("\rwaiting for other writers of " + store_ + ": "), std::string::npos)
+        << shown.out;
+    EXPECT_NE(shown.out.find("\r\x1b[K"), std::string::npos) << "and taken away again: " << shown.out;
+    EXPECT_EQ(Ctl(verb).err.find("waiting"), std::string::npos);
+    Sql(other, "ROLLBACK");
+}
+
 TEST_F(StoreTrouble, ForeignDatabaseIsRefusedAndLeftAlone) {
     {
         const Database foreign = OpenDatabase(store_);

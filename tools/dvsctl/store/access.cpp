@@ -14,6 +14,7 @@
 
 #include "tools/dvsctl/files.h"
 #include "tools/dvsctl/store/document.h"
+#include "tools/dvsctl/store/progress.h"
 
 namespace dvs::ctl {
 
@@ -115,6 +116,7 @@ void OpenStore::Require(std::int32_t status, const char *title) const {
 
 void AwaitTurn(Context &context, const std::string &path, const char *title) {
     const OpenStore store(context, path, false);
+    const Progress progress(context, "waiting for other writers of " + path);
     std::int64_t revision = 0;
     std::int32_t status = configstore::BeginTransaction(store.get());
     if (status == configstore::OK) status = admin::LatestRevision(store.get(), &revision);
