@@ -253,6 +253,32 @@ TEST_F(KernelVerbs, PortsComeFromJsonOrSerializedData) {
     EXPECT_EQ(Verb({"port", "find", "alpha", "72"}).status, 4);
 }
 
+TEST_F(KernelVerbs, PropertiesOfTheModuleAreSaidInWordsToo) {
+    const std::string vlan = "com.orbeno.etherswitch.port.vlan",
+                      security = "com.orbeno.etherswitch.port.security";
+    ASSERT_EQ(Verb({"prop", "set", "alpha", vlan, R"({"vlan_id": 100})", "--port", "1"}).status, 0);
+    ASSERT_EQ(Verb({"prop", "set", "alpha", security, "00", "--as", "hex", "--port", "1"}).status, 0);
+    const boost::json::value one = Json(Verb({"prop", "get", "alpha", vlan, "--port", "1", "--json"}));
+    EXPECT_EQ(one.at("value").at("hex"), "0000640000000000");
+    EXPECT_EQ(one.at("typed").at("vlan_id"), 100);
+    EXPECT_EQ(one.at("summary"), "VLAN 100");
+    const boost::json::value bad = Json(Verb({"prop", "get", "alpha", security, "--port", "1", "--json"}));
+    EXPECT_FALSE(bad.as_object().contains("typed"));
+    EXPECT_NE(bad.at("damage").as_string().size(), 0U);
+
+    const Result state = Verb({"port", "state", "alpha", "1"});
+    EXPECT_NE(state.out.find("VLAN 100"), std::string::npos) << state.out;
+    EXPECT_NE(state.out.find("(does not fit: "), std::string::npos) << state.out;
+    bool found = false;
+    const boost::json::value list = Json(Verb({"port", "state", "alpha", "1", "--json"}));
+    for (const boost::json::value &property : list.at("properties").as_array()) {
+        if (property.at("name").as_string() != vlan) continue;
+        found = true;
+        EXPECT_EQ(property.at("typed"), one.at("typed"));
+    }
+    EXPECT_TRUE(found);
+}
+
 TEST_F(KernelVerbs, PortStateListsPropertiesWithOrWithoutTheVolatile) {
     ASSERT_EQ(Verb({"prop", "set", "alpha", "x.volatile.y", "z", "--port", "1"}).status, 0);
     EXPECT_NE(Verb({"port", "state", "alpha", "1"}).out.find("x.volatile.y"), std::string::npos);

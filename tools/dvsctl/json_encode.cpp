@@ -55,14 +55,13 @@ struct Notation {
 
 void AddTyped(Notation &notation, const Owner &owner, const Property &property, json::object &object) {
     const typed::View &view = notation.views.Of(owner, property);
-    if (view.state == typed::State::kDamaged && notation.form == TypedForm::Beside)
-        object["damage"] = ValidUtf8(view.reason);
+    if (notation.form == TypedForm::Beside) {
+        AddMeaning(view, object);
+        return;
+    }
     if (view.state != typed::State::kTyped) return;
     json::value tree = NodeToJson(view.tree);
-    if (notation.form == TypedForm::Beside) {
-        object["typed"] = std::move(tree);
-        if (!view.summary.empty()) object["summary"] = ValidUtf8(view.summary);
-    } else if (tree != object.at("value") && notation.views.IsExact(owner, property)) {
+    if (tree != object.at("value") && notation.views.IsExact(owner, property)) {
         object.erase("value");
         object["typed"] = std::move(tree);
     }

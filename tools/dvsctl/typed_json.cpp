@@ -100,6 +100,13 @@ json::value NodeToJson(const Node &node) {
     return nullptr;
 }
 
+void AddMeaning(const typed::View &view, json::object &object) {
+    if (view.state == typed::State::kDamaged) object["damage"] = ValidUtf8(view.reason);
+    if (view.state != typed::State::kTyped) return;
+    object["typed"] = NodeToJson(view.tree);
+    if (!view.summary.empty()) object["summary"] = ValidUtf8(view.summary);
+}
+
 std::optional<Node> NodeFromJson(const json::value &value, NodeFlaw &flaw) {
     return ItemFromJson(value, "", flaw);
 }

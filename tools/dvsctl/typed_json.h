@@ -28,6 +28,9 @@ Owner OwnerOf(const Switch &sw, const Entry &entry);
 
 boost::json::value NodeToJson(const typed::Node &node);
 
+/// "typed" and "summary" of a value, or "damage", as they stand beside its bytes.
+void AddMeaning(const typed::View &view, boost::json::object &object);
+
 /// What makes a JSON value no tree: a number that is not whole, or too large.
 struct NodeFlaw {
     std::string field, reason;

@@ -133,7 +133,8 @@ Exit RunKernelPortState(Context &context) {
     boost::json::object document = Envelope("kernel port state");
     AddTargetJson(document, target);
     document["is_there"] = isThere;
-    WriteProperties(context, properties, std::move(document));
+    WriteProperties(context, properties, std::move(document),
+                    Owner{DVS_PROP_CLASS_PORT, isThere ? VersionOf(context, target) : 0});
     return Exit::Done;
 }
 

@@ -15,6 +15,7 @@
 #include "tools/dvsctl/kernel/change.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
+#include "tools/dvsctl/typed_json.h"
 #include "tools/dvsctl/version_warning.h"
 #include "tools/dvsctl/value.h"
 
@@ -90,12 +91,9 @@ HYP_ReturnStatus CheckPort(const Target &at) {
     return static_cast<HYP_ReturnStatus>(port ? HYP_OK : HYP_NOT_FOUND);
 }
 
-/// The version that the module gives for a switch; 0 when it gives none.
-std::uint32_t VersionOf(Context &context, const Target &target) {
-    const Answer answer = FetchFromDevice(context, [&](void **out, std::uint32_t *size) {
-        return DVSHYP_GlobalPropGet(target.switchId.c_str(), kVersionProperty.data(), out, size);
-    });
-    return answer.status == HYP_OK ? AsNumber(answer.bytes).value_or(0) : 0;
+typed::View MeaningOf(Context &context, const Target &target, Bytes value) {
+    return typed::Describe(static_cast<std::uint32_t>(target.list), target.property, value,
+                           {VersionOf(context, target)}, typed::Ask::kResult);
 }
 
 /// One value on its way out: raw, as a line, or as JSON. Without one (--if-exists) nothing, or no "value".
@@ -112,6 +110,7 @@ void WriteValue(Context &context, const char *command, const Target &target, con
         if (isThere) {
             document["size"] = answer.bytes.size();
             document["value"] = ValueToJson(answer.bytes);
+            if (!target.property.empty()) AddMeaning(MeaningOf(context, target, answer.bytes), document);
         }
         context.out.Json(std::move(document));
         return;
@@ -123,8 +122,7 @@ void WriteValue(Context &context, const char *command, const Target &target, con
     }
     std::string line = ShowValue(answer.bytes, options.full);
     if (!target.property.empty()) {
-        const typed::View view = typed::Describe(static_cast<std::uint32_t>(target.list), target.property,
-                                                 answer.bytes, {VersionOf(context, target)});
+        const typed::View view = MeaningOf(context, target, answer.bytes);
         const bool adds = view.state == typed::State::kTyped && !view.summary.empty() &&
                           LookAt(answer.bytes).form == ValueForm::Raw;
         if (adds) line = Escape(view.summary) + "  " + line;

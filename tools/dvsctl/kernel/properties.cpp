@@ -10,6 +10,7 @@
 #include "dvsdata/buffer_view.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/table.h"
+#include "tools/dvsctl/typed_fields.h"
 #include "tools/dvsctl/value.h"
 
 namespace dvs::ctl {
@@ -40,22 +41,31 @@ std::vector<Property> PropertiesOf(Bytes bytes, const std::string &title) {
     throw Error(error);
 }
 
-void WriteProperties(Context &context, const std::vector<Property> &properties,
-                     boost::json::object document) {
+void WriteProperties(Context &context, const std::vector<Property> &properties, boost::json::object document,
+                     const std::optional<Owner> &owner) {
+    TypedViews views;
     if (context.options.json) {
         boost::json::array array;
-        for (const Property &property : properties)
-            array.emplace_back(PropertyToJson(property));
+        for (const Property &property : properties) {
+            boost::json::object object = PropertyToJson(property);
+            if (owner) AddMeaning(views.Of(*owner, property), object);
+            array.emplace_back(std::move(object));
+        }
         document["properties"] = std::move(array);
         context.out.Json(std::move(document));
         return;
     }
     Table table(kColumns, context.options);
-    for (const Property &property : properties)
+    for (const Property &property : properties) {
+        const TypedText text = owner ? DescribeProperty(views, *owner, property) : TypedText();
+        std::string value =
+            text.summary.empty() ? ShowValue(property.value, context.options.full) : text.summary;
+        if (!text.damage.empty()) value += " (does not fit: " + text.damage + ")";
         table.Add({{ShowName(property.name)},
                    {fmt::format("0x{:02x}", property.type), Style::Dim},
                    {std::to_string(property.value.size()), Style::Dim},
-                   {ShowValue(property.value, context.options.full)}});
+                   {std::move(value)}});
+    }
     if (!properties.empty()) table.Write(context.out);
 }
 

@@ -4,20 +4,24 @@
 
 // Property lists that the module hands back, as tables and JSON.
 
+#include <optional>
 #include <string>
 #include <vector>
 
 #include <boost/json/object.hpp>
 
 #include "tools/dvsctl/model.h"
+#include "tools/dvsctl/typed_json.h"
 
 namespace dvs::ctl {
 
 /// The entries of a serialized list from the module. Throws Error(Malformed) for one that is damaged.
 std::vector<Property> PropertiesOf(Bytes bytes, const std::string &title);
 
-/// The list as a table, or as "properties" of the document.
-void WriteProperties(Context &context, const std::vector<Property> &properties, boost::json::object document);
+/// The list as a table, or as "properties" of the document. With an owner, what known properties mean is said
+/// as `dvsctl show` says it.
+void WriteProperties(Context &context, const std::vector<Property> &properties, boost::json::object document,
+                     const std::optional<Owner> &owner = {});
 
 } // namespace dvs::ctl
 

@@ -10,6 +10,7 @@
 #include "dvs/hyp.h"
 #include "tools/dvsctl/json_codec.h"
 #include "tools/dvsctl/model.h"
+#include "tools/dvsctl/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -136,6 +137,13 @@ Answer CallFor(Context &context, Target &target, const std::string &title, const
     if (answer.status == HYP_NOT_FOUND && !context.options.ifExists)
         throw Error(MissingError(target, missing, title));
     return answer;
+}
+
+std::uint32_t VersionOf(Context &context, const Target &target) {
+    const Answer answer = FetchFromDevice(context, [&](void **out, std::uint32_t *size) {
+        return DVSHYP_GlobalPropGet(target.switchId.c_str(), kVersionProperty.data(), out, size);
+    });
+    return answer.status == HYP_OK ? AsNumber(answer.bytes).value_or(0) : 0;
 }
 
 Answer FetchFor(Context &context, Target &target, const std::string &title, const TargetFetch &fetch) {

@@ -45,6 +45,9 @@ std::string ResolveTarget(Context &context, Target &target);
 /// The error that says what of a target is not there; `missing` is from ResolveTarget.
 Error MissingError(const Target &target, const std::string &missing, const std::string &title);
 
+/// The version that the module gives for the target's switch; 0 when it gives none.
+std::uint32_t VersionOf(Context &context, const Target &target);
+
 /// A library call about a target.
 using TargetCall = std::function<HYP_ReturnStatus(const Target &target, std::vector<std::uint8_t> &reply)>;
 
