@@ -122,39 +122,45 @@ class EntryNames {
 public:
     explicit EntryNames(std::size_t ports) noexcept {
         try {
-            hashes_.resize(std::bit_ceil((ports + kOwnEntries.size()) * 2)); // 0 is nothing
+            hashes_.reserve(ports + kOwnEntries.size());
+            seen_.resize(std::bit_ceil(hashes_.capacity() * 2)); // 0 is nothing
         } catch (const std::exception &) {
-            areUnique_ = false;
-            return;
+            isSound_ = false;
         }
         for (const char *name : kOwnEntries)
             Add(name);
     }
     void Add(std::string_view name) {
-        areUnique_ = areUnique_ && name.size() <= dvs::data::kMaxNameLen && Insert(name);
+        isSound_ = isSound_ && name.size() <= dvs::data::kMaxNameLen && hashes_.size() < hashes_.capacity();
+        if (isSound_) hashes_.push_back(std::hash<std::string_view>()(name));
     }
-    [[nodiscard]] bool AreUnique() const { return areUnique_; }
+    // One after the other at the end: in between, the ports would push the table out of the cache.
+    [[nodiscard]] bool AreUnique() {
+        for (std::size_t i = 0; isSound_ && i < hashes_.size(); ++i)
+            isSound_ = Insert(hashes_[i]);
+        return isSound_;
+    }
 
 private:
     // Ids that were chosen to fall together must not take long: the lists' way is one for them, too.
     static constexpr std::size_t kMostSteps = 64;
 
-    bool Insert(std::string_view name) {
-        const std::size_t hash = std::hash<std::string_view>()(name);
+    bool Insert(std::size_t hash) {
         const auto rest = static_cast<uint32_t>(hash >> 32 | 1);
-        const std::size_t mask = hashes_.size() - 1;
+        const std::size_t mask = seen_.size() - 1;
         std::size_t at = hash & mask;
         for (std::size_t steps = 0; steps < kMostSteps; ++steps, at = (at + 1) & mask) {
-            if (hashes_[at] == rest) return false;
-            if (hashes_[at] != 0) continue;
-            hashes_[at] = rest;
+            if (seen_[at] == rest) return false;
+            if (seen_[at] != 0) continue;
+            seen_[at] = rest;
             return true;
         }
         return false;
     }
 
-    std::vector<uint32_t> hashes_; // the halves of them that their places do not tell
-    bool areUnique_ = true;
+    std::vector<std::size_t> hashes_;
+    std::vector<uint32_t> seen_; // the halves of them that their places do not tell
+    bool isSound_ = true;
 };
 
 bool IsUplink(const char *key, const StoreTexts &uplinkKeys) {
