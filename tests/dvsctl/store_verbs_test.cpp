@@ -106,7 +106,7 @@ TEST_F(StoreVerbs, ImportRefusesWithinTenTimesTheDocumentsSize) {
         ids += ",\"" + std::to_string(i) + "\":{}";
     while (numbers.size() < size)
         numbers += ",0", unknown += ",[]";
-    for (const std::string &document : {ids + "}}", numbers + "]}", unknown + "]}"}) {
+    for (const std::string &document : {ids + ",\"x\":1}}", numbers + "]}", unknown + "]}"}) {
         Put("document.json", document);
         const Result refused = Ctl({"store", "import", At("document.json")});
         EXPECT_EQ(refused.status, 6) << refused.out << refused.err;
