@@ -296,6 +296,8 @@ Flaw WriteInstances(const StoreField &form, const Place &place, const Node &node
             if (Flaw flaw = Expect(*member, Node::Kind::kText, memberPath)) return flaw;
             if (member->text.empty()) return {memberPath, "is empty; it tells the entries apart"};
             id = member->text;
+            if (!item.name.empty())
+                return {memberPath, "is \"" + id + "\", but the entry is named \"" + item.name + "\""};
         }
         configstore::Object *object = nullptr;
         if (configstore::GetSubObject(place.parent, place.name, id.c_str(), &object) == 0) {
@@ -379,6 +381,19 @@ void NormalizeMembers(const StoreField &form, Node *object) {
     }
 }
 
+// For a message: long lists are counted, and long texts cut.
+std::string Told(const Node &node) {
+    constexpr std::size_t kMostElements = 8, kMostBytes = 200;
+    if (node.kind == Node::Kind::kList && node.items.size() > kMostElements)
+        return std::to_string(node.items.size()) + " elements";
+    std::string line = ToLine(node);
+    if (line.size() <= kMostBytes) return line;
+    std::size_t cut = kMostBytes;
+    while (cut > 0 && (static_cast<unsigned char>(line[cut]) & 0xc0) == 0x80)
+        --cut; // not inside a character
+    return line.substr(0, cut) + "…";
+}
+
 void CompareAt(const Node &given, const Node *found, const std::string &path, std::vector<std::string> *out) {
     if (given.kind == Node::Kind::kObject && found) {
         for (const Node &item : given.items) {
@@ -396,10 +411,9 @@ void CompareAt(const Node &given, const Node *found, const std::string &path, st
         found->number == given.number)
         return;
     if (given.kind == Node::Kind::kList && given.items.empty() && !found) return; // none either way
-    const std::string before = ToLine(given);
-    const std::string after = found ? ToLine(*found) : "absent";
-    if (before == after) return;
-    out->push_back((path.empty() ? "the value" : path) + ": " + before + " reads back as " + after);
+    if (found && ToLine(given) == ToLine(*found)) return;
+    out->push_back((path.empty() ? "the value" : path) + ": " + Told(given) + " reads back as " +
+                   (found ? Told(*found) : "absent"));
 }
 
 } // namespace
@@ -430,12 +444,16 @@ Node Normalized(const layout::StoreField &form, const Node &node) {
     if (form.form == Form::kInstances && node.kind == Node::Kind::kObject) {
         result.kind = Node::Kind::kList;
         for (Node &item : result.items) {
-            if (form.id && !item.Find(form.id)) {
+            const Node *const own = form.id ? item.Find(form.id) : nullptr;
+            if (form.id && !own) {
                 Node id = TextNode(item.name.c_str());
                 id.name = form.id;
                 item.items.insert(item.items.begin(), std::move(id));
             }
-            item.name.clear();
+            // A name that its entry contradicts stays, and is refused. The store names slots as signed numbers.
+            const bool isRight =
+                !own || own->text == item.name || FindField(form, form.id)->rule == layout::Rule::kSlot;
+            if (isRight) item.name.clear();
         }
     }
     for (Node &item : result.items) {

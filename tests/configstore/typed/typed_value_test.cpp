@@ -237,6 +237,29 @@ TEST_F(Typed, TakesInstancesAsListOrById) {
               Build(kGlobal, "com.orbeno.etherswitch.lacp", group).bytes);
 }
 
+TEST_F(Typed, RefusesAnEntryThatContradictsItsName) {
+    const Node group = Object({Object({Text("other", "key"), Number(2, "uplink_num")}, "lag1")});
+    const Built built = Build(kGlobal, "com.orbeno.etherswitch.lacp", group);
+    EXPECT_FALSE(built.ok);
+    EXPECT_EQ("[0].key", built.field);
+    EXPECT_EQ("is \"other\", but the entry is named \"lag1\"", built.reason);
+    const Node same = Object({Object({Text("lag1", "key"), Number(2, "uplink_num")}, "lag1")});
+    EXPECT_TRUE(Build(kGlobal, "com.orbeno.etherswitch.lacp", same).ok);
+    // As the store names it.
+    const Node filters =
+        Object({Object({Object({Text("4294967295", "slot_number")}, "-1")}, "network_filters")});
+    EXPECT_TRUE(Build(kPort, "com.orbeno.common.port.dvfilter", filters).ok);
+}
+
+TEST_F(Typed, SaysInAFewWordsWhatReadsBackOtherwise) {
+    const Node range = Object({Number(1, "start"), Number(10, "end")});
+    const Built built =
+        Build(kPort, kVlan, Object({List(std::vector<Node>(65536, range), "trunk_vlan_ids")}));
+    ASSERT_EQ(1u, built.differences.size());
+    EXPECT_EQ(0u, built.differences[0].find("trunk_vlan_ids: 65536 elements reads back as "));
+    EXPECT_LT(built.differences[0].size(), 100u);
+}
+
 TEST_F(Typed, NamesTheFieldAtFault) {
     const std::string longName(81, 'x');
     const Node uplinks = Object(
