@@ -174,9 +174,10 @@ void GrowingImage::HandOver(void **buf, std::uint32_t *len) {
     assert(depth_ == 0 && !gaveUp_);
     // A block that is not much too large is handed out as it is: mapped memory would be mapped anew by each
     // load for the sake of pages that nobody has touched, where the heap keeps a block that it gets back
-    // whole.
-    const bool isWasteful = at_ < capacity_ / 2;
-    void *const fitting = isWasteful ? std::realloc(begin_, at_) : nullptr;
+    // whole. Very large ones are mapped in any case.
+    constexpr std::size_t kMostWhole = std::size_t{16} << 20;
+    const bool isWhole = capacity_ <= kMostWhole && at_ >= capacity_ / 4 * 3;
+    void *const fitting = isWhole ? nullptr : std::realloc(begin_, at_);
     *buf = fitting ? fitting : begin_;
     *len = static_cast<std::uint32_t>(at_);
     begin_ = nullptr;
