@@ -10,6 +10,7 @@ usage() {
 Usage: ./test.sh [OPTIONS]
 
   --fast         only the unit tests, only the debug build: the loop while editing
+  --long         the random and repeated tests in their full length, which takes an hour or two
   --no-install   do not install missing packages
   --jobs N       parallel compilations and tests (default: one per processor)
   --help         this text
@@ -18,13 +19,28 @@ Exit status: 0 when every test passed, 1 otherwise, 2 for wrong usage.
 EOF
 }
 
+# What each of these counts stands beside the default in the test that reads it. One that is set already stays.
+lengthen() {
+    timeout=7200
+    local count
+    for count in DVS_CODEC_COUNT=100000 DVS_HOSTILE_VALUES=1000000 DVS_KILL_ROUNDS=200 DVS_FAULT_STEP=1 \
+        DVS_LENGTH_FILLS=20 DVS_ROUND_TRIPS=1000 DVS_TEST_HOSTILE_REPLIES=10000 DVS_TEST_HOSTILE_REQUESTS=10000 \
+        DVS_TEST_KILLED_CLIENTS=200 DVS_TEST_MUTATIONS=100000 DVS_TEST_RESTARTS=50 DVS_TEST_SAVES=1000 \
+        DVS_TEST_THREAD_SECONDS=30 STORE_FAULT_STEP=1 STORE_FLIP_ROUNDS=2000 STORE_HOSTILE_MB=100 \
+        STORE_KILL_ROUNDS=200 STORE_MEMORY_STEP=1 STORE_ORACLE_ROUNDS=100000 STORE_RACE_SAVES=300; do
+        [ -v "${count%%=*}" ] || export "${count?}"
+    done
+}
+
 presets=(release asan)
 label=()
 install=yes
+timeout=300
 jobs=$(nproc)
 while [ $# -gt 0 ]; do
     case $1 in
     --fast) presets=(debug) label=(-L unit) ;;
+    --long) lengthen ;;
     --no-install) install=no ;;
     --jobs) jobs=${2:?--jobs wants a number} && shift ;;
     --help | -h) usage && exit 0 ;;
@@ -41,7 +57,7 @@ skipped=0
 summary=
 for preset in "${presets[@]}"; do
     echo "== $preset: build"
-    cmake --preset "$preset" -DDVS_WERROR=ON >/dev/null
+    cmake --preset "$preset" -DDVS_WERROR=ON -DDVS_TEST_TIMEOUT="$timeout" >/dev/null
     cmake --build --preset "$preset" --parallel "$jobs" -- --quiet
     echo "== $preset: test"
     report=build/$preset/test-results.xml

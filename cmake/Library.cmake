@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # The two libraries made of dvs_objects. The exported names stand in one list, dvs.symbols: the version script is
 # written from it, and a test compares it with what the shared library really exports.
 

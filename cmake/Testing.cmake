@@ -1,3 +1,6 @@
+# SPDX-License-Identifier: Apache-2.0
+set(DVS_TEST_TIMEOUT 300 CACHE STRING "Seconds until a test counts as hanging")
+
 # dvs_add_test(NAME <target> SOURCES <files…> [LIBS <targets…>] [LABEL unit|integration] [ARGS <arguments…>])
 #
 # One GoogleTest program; each of its tests is a ctest of its own, so that the process-wide switch table starts
@@ -13,5 +16,5 @@ function(dvs_add_test)
   target_compile_definitions(${T_NAME} PRIVATE
     DVS_SOURCE_DIR="${CMAKE_SOURCE_DIR}" DVS_BINARY_DIR="${CMAKE_BINARY_DIR}")
   gtest_discover_tests(${T_NAME} DISCOVERY_MODE PRE_TEST DISCOVERY_TIMEOUT 60
-    PROPERTIES LABELS ${T_LABEL} TIMEOUT 300 ENVIRONMENT "${T_ENVIRONMENT}")
+    PROPERTIES LABELS ${T_LABEL} TIMEOUT ${DVS_TEST_TIMEOUT} ENVIRONMENT "${T_ENVIRONMENT}")
 endfunction()

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Compiler settings every target of this tree shares, carried by the interface target dvs_flags.
 
 find_program(CCACHE_PROGRAM ccache)
