@@ -6,6 +6,7 @@
 #include <algorithm>
 #include <array>
 #include <cerrno>
+#include <cstring>
 #include <cstdlib>
 #include <filesystem>
 #include <fstream>
@@ -109,6 +110,10 @@ Result RunInTerminal(const std::vector<std::string> &args, const std::vector<std
     const pid_t child = forkpty(&terminal, nullptr, nullptr, &size);
     if (child == 0) Become(args, environment);
     Result result;
+    if (child == -1) {
+        ADD_FAILURE() << "no pseudo-terminal to be had here: " << std::strerror(errno);
+        return result;
+    }
     result.out = ReadToEnd(terminal);
     close(terminal);
     AwaitEnd(child, result);
