@@ -54,9 +54,11 @@ namespace configstore {
     return true;
 }
 
-/// Whether no two hashes of ids are the same, which may be reordered.
+/// Whether no two hashes of ids are the same, which may be reordered. False also where that would take long to
+/// say, as it does of ids that were chosen to fall together.
 [[nodiscard]] inline bool AllDiffer(std::span<uint64_t> hashes) {
     constexpr std::size_t kFew = 32;
+    constexpr std::size_t kMostSteps = 1024;
     if (hashes.size() <= kFew) {
         std::sort(hashes.begin(), hashes.end());
         return std::adjacent_find(hashes.begin(), hashes.end()) == hashes.end();
@@ -66,8 +68,8 @@ namespace configstore {
     for (const uint64_t hash : hashes) {
         const auto half = static_cast<uint32_t>(hash >> 32 | 1);
         std::size_t at = hash & (seen.size() - 1);
-        for (; seen[at] != 0; at = (at + 1) & (seen.size() - 1)) {
-            if (seen[at] == half) return false;
+        for (std::size_t steps = 0; seen[at] != 0; at = (at + 1) & (seen.size() - 1)) {
+            if (seen[at] == half || ++steps == kMostSteps) return false;
         }
         seen[at] = half;
     }
