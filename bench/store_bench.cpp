@@ -250,7 +250,7 @@ int main(int argc, char **argv) {
             if (kinds.empty() || kinds == kind.name) runs.emplace_back(&kind, count);
         }
     }
-    for (const auto &[kind, count] : runs)
-        RunApart(runs.size() > 1, [&] { Bench(*kind, count, rounds, directory); });
+    for (const auto &run : runs)
+        RunApart(runs.size() > 1, [&] { Bench(*run.first, run.second, rounds, directory); });
     return 0;
 }
