@@ -10,7 +10,7 @@ usage() {
 Usage: ./test.sh [OPTIONS]
 
   --fast         only the unit tests, only the debug build: the loop while editing
-  --long         the random and repeated tests in their full length, which takes an hour or two
+  --long         the random and repeated tests in their full length: minutes more
   --no-install   do not install missing packages
   --jobs N       parallel compilations and tests (default: one per processor)
   --help         this text

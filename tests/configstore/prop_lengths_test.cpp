@@ -36,7 +36,10 @@ struct PropLengths : FrameTest {
         configstore::DestroyObject(object);
         ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "sw", "{}", &object));
         const int32_t saved = Save(key, value, propClass, propType);
-        EXPECT_TRUE(saved == 0 || saved == -1 || saved == configstore::BAD_PARAMETER) << key << " " << saved;
+        // A list one of whose keys is empty is a single object for the store, which then has no instances.
+        EXPECT_TRUE(saved == 0 || saved == -1 || saved == configstore::BAD_PARAMETER ||
+                    saved == configstore::SCHEMA_VIOLATION)
+            << key << " " << saved;
         if (propClass != DVS_PROP_CLASS_PORT) MakeSwitch();
         dvsLoadedSwitch = nullptr;
         (void)Load(propClass);
