@@ -14,7 +14,8 @@ import subprocess
 import sys
 import tempfile
 
-import seam_check
+sys.dont_write_bytecode = True  # not into the source tree
+import seam_check  # noqa: E402
 
 DEVICE = "device.h"
 
