@@ -13,6 +13,7 @@
 using dvs::typed::Build;
 using dvs::typed::Built;
 using dvs::typed::Describe;
+using dvs::typed::Node;
 using dvs::typed::State;
 using dvs::typed::View;
 
@@ -56,6 +57,31 @@ TEST_F(TypedEmbedded, SoundValuesAreShownAndBuiltAgain) {
     }
     EXPECT_GT(exact, 50);
     EXPECT_EQ("", messages);
+}
+
+// The count of ranges has 16 bits. So many instances want a store with an index.
+TEST_F(TypedEmbedded, SaysInAFewWordsWhatReadsBackOtherwise) {
+    const auto number = [](int64_t value, const char *name) {
+        Node node;
+        node.kind = Node::Kind::kNumber;
+        node.number = value;
+        node.name = name;
+        return node;
+    };
+    Node range;
+    range.kind = Node::Kind::kObject;
+    range.items = {number(1, "start"), number(10, "end")};
+    Node ranges;
+    ranges.kind = Node::Kind::kList;
+    ranges.name = "trunk_vlan_ids";
+    ranges.items.assign(65536, range);
+    Node vlan;
+    vlan.kind = Node::Kind::kObject;
+    vlan.items = {std::move(ranges)};
+    const Built built = Build(DVS_PROP_CLASS_PORT, "com.orbeno.etherswitch.port.vlan", vlan);
+    ASSERT_EQ(1u, built.differences.size());
+    EXPECT_EQ(0u, built.differences[0].find("trunk_vlan_ids: 65536 elements reads back as "));
+    EXPECT_LT(built.differences[0].size(), 100u);
 }
 
 TEST_F(TypedEmbedded, NoBytesMakeItFail) {
