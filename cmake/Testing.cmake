@@ -13,8 +13,14 @@ function(dvs_add_test)
   add_executable(${T_NAME} ${T_SOURCES})
   target_link_libraries(${T_NAME} PRIVATE dvs_flags ${T_LIBS} dvs::dvs_static dvs::platform GTest::gtest_main)
   target_include_directories(${T_NAME} PRIVATE ${CMAKE_SOURCE_DIR}/tests)
-  target_compile_definitions(${T_NAME} PRIVATE
-    DVS_SOURCE_DIR="${CMAKE_SOURCE_DIR}" DVS_BINARY_DIR="${CMAKE_BINARY_DIR}")
+  # Only where they are used: all other objects are the same in every checkout, so ccache shares them.
+  foreach(source IN LISTS T_SOURCES)
+    file(READ ${source} text)
+    if(text MATCHES "DVS_(SOURCE|BINARY)_DIR")
+      set_source_files_properties(${source} PROPERTIES COMPILE_DEFINITIONS
+        "DVS_SOURCE_DIR=\"${CMAKE_SOURCE_DIR}\";DVS_BINARY_DIR=\"${CMAKE_BINARY_DIR}\"")
+    endif()
+  endforeach()
   gtest_discover_tests(${T_NAME} DISCOVERY_MODE PRE_TEST DISCOVERY_TIMEOUT 60
     PROPERTIES LABELS ${T_LABEL} TIMEOUT ${DVS_TEST_TIMEOUT} ENVIRONMENT "${T_ENVIRONMENT}")
 endfunction()
