@@ -8,6 +8,7 @@
 #include <memory>
 #include <utility>
 
+#include "kernel/failure.h"
 #include "kernel/log.h"
 #include "kernel/request.h"
 #include "platform/device.h"
@@ -17,6 +18,9 @@ namespace {
 
 using dvs::hyp::Address;
 using dvs::hyp::Command;
+using dvs::hyp::Failure;
+using dvs::hyp::Observe;
+using dvs::hyp::Step;
 
 constexpr const char *kDevicePath = "/pelo/devices/char/hypdriver/dvsdev";
 constexpr int kNoDescriptor = -1;
@@ -26,7 +30,10 @@ constinit std::atomic<int> g_cachedFd{kNoDescriptor};
 
 int OpenDevice() {
     const int fd = HostDevice_Open(kDevicePath);
-    if (fd == kNoDescriptor) dvs::hyp::Print("failed to open dvsdev device %s\n", kDevicePath);
+    if (fd == kNoDescriptor) {
+        Observe({Step::Open, errno});
+        dvs::hyp::Print("failed to open dvsdev device %s\n", kDevicePath);
+    }
     return fd;
 }
 
@@ -41,6 +48,14 @@ int CachedDescriptor() {
     return cached;
 }
 
+/// Presets the record's status and sends it. False, with errno, when the call failed.
+bool SendRequest(int fd, int command, DVSHYPRequest *req) {
+    req->status = HYP_FAILURE;
+    const bool sent = HostDevice_Ioctl(fd, command, req) != -1;
+    Observe(sent ? Failure{} : Failure{Step::Send, errno});
+    return sent;
+}
+
 /// One call's own descriptor.
 class Device {
 public:
@@ -53,10 +68,9 @@ public:
 
     bool IsOpen() const { return fd_ != kNoDescriptor; }
 
-    /// Presets the record's status and sends it. False when the call failed.
+    /// False when the call failed.
     bool Send(Command command, DVSHYPRequest *req) const {
-        req->status = HYP_FAILURE;
-        return HostDevice_Ioctl(fd_, static_cast<int>(command), req) != -1;
+        return SendRequest(fd_, static_cast<int>(command), req);
     }
 
 private:
@@ -68,14 +82,17 @@ struct FreeBlock {
 };
 using Block = std::unique_ptr<void, FreeBlock>;
 
-/// A module may name a size of 0, for which malloc may answer null.
+/// A module may name a size of 0, for which malloc may return null.
 Block AllocateBuffer(uint32_t size) {
-    return Block(std::malloc(size ? size : 1));
+    Block block(std::malloc(size ? size : 1));
+    if (!block) Observe({Step::Allocate, 0});
+    return block;
 }
 
 /// Hands the buffer over, unless the module claims more bytes than it holds.
 HYP_ReturnStatus HandOut(Block buffer, uint32_t capacity, uint32_t claimed, void **out, uint32_t *outLen) {
     if (claimed > capacity) {
+        Observe({Step::Reply, 0});
         *outLen = 0;
         return HYP_FAILURE;
     }
@@ -105,8 +122,7 @@ void FillExecution(DVSHYPRequest *req, const char *switchName, const char *cmd, 
 extern "C" HYP_ReturnStatus DVSHYP_Ioctl(int request, DVSHYPRequest *req) {
     const int fd = CachedDescriptor();
     if (fd == kNoDescriptor) return HYP_FAILURE;
-    req->status = HYP_FAILURE;
-    if (HostDevice_Ioctl(fd, request, req) != -1) return HYP_OK;
+    if (SendRequest(fd, request, req)) return HYP_OK;
     const int error = errno;
     // A missing object is an expected answer of the lookups.
     if (error != ENOENT) dvs::hyp::Print("ioctl failed: %s\n", Err_Errno2String(error));

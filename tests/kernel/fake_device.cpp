@@ -36,6 +36,7 @@ FakeDevice &FakeDevice::Get() {
 void FakeDevice::Reset() {
     const std::lock_guard guard(g_mutex);
     present = true;
+    openError = ENOENT;
     script.clear();
     replies.clear();
     always.clear();
@@ -49,7 +50,7 @@ int FakeDevice::Open(const char *path) {
     const std::lock_guard guard(g_mutex);
     openedPaths.emplace_back(path);
     if (!present) {
-        errno = ENOENT;
+        errno = openError;
         return -1;
     }
     opened++;

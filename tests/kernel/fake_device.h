@@ -5,6 +5,7 @@
 // A scripted switching module behind platform/device.h: it notes every call with all bytes of its record, and
 // answers as a test says. Test programs that link it leave the embedded device out.
 
+#include <cerrno>
 #include <cstdint>
 #include <deque>
 #include <functional>
@@ -40,6 +41,7 @@ public:
     void Reset();
 
     bool present = true;
+    int openError = ENOENT; // while not present
     std::deque<Step> script; // consumed first
     std::map<int, std::string>
         replies;                // then: what a fetch of this command yields, with a module's growing sizes

@@ -13,6 +13,7 @@
 
 #include "emulator/emulator_process.h"
 #include "fault/sweep.h"
+#include "kernel/failure.h"
 #include "kernel/state_support.h"
 #include "platform/device.h"
 
@@ -169,16 +170,18 @@ TEST(KernelWithoutMemory, AFetchTellsTheSizeOfItsMissingBuffer) {
             DVSLog_SetSink(fault::Child::NoteMessage, &child);
             void *out = &child;
             uint32_t outLen = 77;
+            const hyp::FailureObserver observer;
             const HYP_ReturnStatus status = DVSHYP_StateGet(&out, &outLen);
             DVSLog_SetSink(nullptr, nullptr);
             if (status != HYP_OK) child.Note(out == nullptr && outLen == 32768 ? "null" : "left");
+            if (observer.Last().step == hyp::Step::Allocate) child.Note(" recorded");
             if (status == HYP_OK) DVSHYP_DataFree(out);
             return status;
         },
         [&](uint64_t, const fault::Report &report) {
             if (report.hits == 0) return;
             EXPECT_EQ(report.status, HYP_NO_MEMORY);
-            EXPECT_EQ(report.notes, "null");
+            EXPECT_EQ(report.notes, "null recorded");
         },
         options);
 }
