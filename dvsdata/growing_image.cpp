@@ -10,8 +10,7 @@
 #include <cstring>
 #include <utility>
 
-#include <sys/mman.h>
-
+#include "base/huge_page.h"
 #include "dvsdata/list_internal.h"
 
 namespace dvs::data {
@@ -22,7 +21,6 @@ GrowingImage::~GrowingImage() {
 
 bool GrowingImage::Grow(std::size_t size) {
     constexpr std::size_t kFirst = std::size_t{1} << 16;
-    constexpr std::size_t kHugePage = std::size_t{2} << 20;
     const std::size_t capacity = std::max(kFirst, (capacity_ + size) * 2);
     auto *const block =
         capacity <= kMaxSize ? static_cast<std::uint8_t *>(std::realloc(begin_, capacity)) : nullptr;
@@ -32,13 +30,7 @@ bool GrowingImage::Grow(std::size_t size) {
     }
     begin_ = block;
     capacity_ = capacity;
-    if (capacity >= 2 * kHugePage) {
-        // The page faults of a large fresh block cost more than filling it. Whole huge pages only: what lies
-        // around the block is the heap's. Merely advice.
-        const auto start = (reinterpret_cast<uintptr_t>(block) + kHugePage - 1) & ~(kHugePage - 1);
-        const auto end = (reinterpret_cast<uintptr_t>(block) + capacity) & ~(kHugePage - 1);
-        (void)madvise(reinterpret_cast<void *>(start), end - start, MADV_HUGEPAGE);
-    }
+    if (capacity >= 2 * base::kHugePage) base::AdviseHugePages(block, capacity);
     return true;
 }
 

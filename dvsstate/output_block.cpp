@@ -5,7 +5,7 @@
 
 #include <cstdlib>
 
-#include <sys/mman.h>
+#include "base/huge_page.h"
 
 namespace dvs::state {
 
@@ -33,15 +33,8 @@ void OutputBlock::HandOver() {
 }
 
 void *StateAlloc(uint64_t size) {
-    constexpr uint64_t kHugePage = 2u << 20;
     void *block = std::malloc(size);
-    if (block && size >= 2 * kHugePage) {
-        // Only whole huge pages inside the block: what lies around it is the heap's. Merely advice, so a
-        // refusal is no failure.
-        const uint64_t start = (reinterpret_cast<uintptr_t>(block) + kHugePage - 1) & ~(kHugePage - 1);
-        const uint64_t end = (reinterpret_cast<uintptr_t>(block) + size) & ~(kHugePage - 1);
-        (void)madvise(reinterpret_cast<void *>(start), end - start, MADV_HUGEPAGE);
-    }
+    if (block && size >= 2 * base::kHugePage) base::AdviseHugePages(block, size);
     return block;
 }
 

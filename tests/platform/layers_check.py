@@ -16,12 +16,13 @@ LAYERS = {
     # folder: folders below it
     "include/dvs": [],
     "platform/include": [],
-    "dvsdata": [],
-    "dvsstate": ["dvsdata", "platform"],
-    "dvsfile": ["dvsdata", "platform"],
-    "kernel": ["dvsdata", "dvsstate", "dvsfile", "platform"],
-    "configstore": ["dvsdata", "dvsstate", "dvsfile", "kernel", "platform"],
-    "platform/embedded": ["platform"],
+    "base": [],
+    "dvsdata": ["base"],
+    "dvsstate": ["base", "dvsdata", "platform"],
+    "dvsfile": ["base", "dvsdata", "platform"],
+    "kernel": ["base", "dvsdata", "dvsstate", "dvsfile", "platform"],
+    "configstore": ["base", "dvsdata", "dvsstate", "dvsfile", "kernel", "platform"],
+    "platform/embedded": ["base", "platform"],
 }
 INCLUDE = re.compile(r'^\s*#\s*include\s+"([^"]+)"', re.M)
 

@@ -8,6 +8,8 @@
 
 #include <fmt/format.h>
 
+#include "base/utf8.h"
+
 namespace dvs::ctl {
 
 namespace {
@@ -128,24 +130,13 @@ bool MatchOne(std::string_view pattern, std::size_t *at, char c) {
 } // namespace
 
 std::optional<char32_t> DecodeUtf8(std::string_view text, std::size_t *at) {
-    const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(text[*at + i]); };
-    const std::size_t left = text.size() - *at;
-    if (left == 0) return std::nullopt;
-    const unsigned char lead = byte(0);
-    if (lead < 0x80) {
-        ++*at;
-        return lead;
-    }
-    const std::size_t length = lead >= 0xf0 ? 4 : lead >= 0xe0 ? 3 : 2;
-    if (lead < 0xc2 || lead > 0xf4 || left < length) return std::nullopt;
-    char32_t value = lead & (0x7fu >> length);
-    for (std::size_t i = 1; i < length; ++i) {
-        if ((byte(i) & 0xc0) != 0x80) return std::nullopt;
+    const char *const start = text.data() + *at;
+    const std::size_t length = base::Utf8Length(start, text.data() + text.size());
+    if (length == 0) return std::nullopt;
+    const auto byte = [start](std::size_t i) { return static_cast<unsigned char>(start[i]); };
+    char32_t value = length == 1 ? byte(0) : byte(0) & (0x7fu >> length);
+    for (std::size_t i = 1; i < length; ++i)
         value = (value << 6) | (byte(i) & 0x3fu);
-    }
-    constexpr char32_t kLeast[] = {0, 0, 0x80, 0x800, 0x10000};
-    if (value < kLeast[length] || value > 0x10ffff || (value >= 0xd800 && value <= 0xdfff))
-        return std::nullopt;
     *at += length;
     return value;
 }

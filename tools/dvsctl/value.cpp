@@ -5,6 +5,7 @@
 
 #include <fmt/format.h>
 
+#include "base/base64.h"
 #include "tools/dvsctl/model.h"
 
 namespace dvs::ctl {
@@ -20,7 +21,6 @@ constexpr std::size_t kShownCharacters = 120;
 constexpr std::size_t kSlots[] = {48, 81};
 
 constexpr std::string_view kDigits = "0123456789abcdef";
-constexpr std::string_view kBase64 = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
 
 int DigitValue(char c) {
     if (c >= '0' && c <= '9') return c - '0';
@@ -123,18 +123,8 @@ std::string ToHexDigits(Bytes bytes) {
 }
 
 std::string ToBase64(Bytes bytes) {
-    std::string out;
-    out.reserve((bytes.size() + 2) / 3 * 4);
-    for (std::size_t i = 0; i < bytes.size(); i += 3) {
-        const std::size_t left = bytes.size() - i;
-        const unsigned group = static_cast<unsigned>(bytes[i]) << 16 |
-                               (left > 1 ? static_cast<unsigned>(bytes[i + 1]) << 8 : 0u) |
-                               (left > 2 ? static_cast<unsigned>(bytes[i + 2]) : 0u);
-        out += kBase64[group >> 18];
-        out += kBase64[group >> 12 & 63];
-        out += left > 1 ? kBase64[group >> 6 & 63] : '=';
-        out += left > 2 ? kBase64[group & 63] : '=';
-    }
+    std::string out(base::Base64Size(bytes.size()), '\0');
+    base::EncodeBase64(out.data(), bytes.data(), bytes.size());
     return out;
 }
 
@@ -153,28 +143,10 @@ std::optional<std::vector<std::uint8_t>> FromHexDigits(std::string_view text) {
 }
 
 std::optional<std::vector<std::uint8_t>> FromBase64(std::string_view text) {
-    if (text.size() % 4 != 0) return std::nullopt;
-    std::vector<std::uint8_t> out;
-    out.reserve(text.size() / 4 * 3);
-    for (std::size_t i = 0; i < text.size(); i += 4) {
-        unsigned group = 0;
-        std::size_t letters = 0;
-        for (; letters < 4; ++letters) {
-            const std::size_t value = kBase64.find(text[i + letters]);
-            if (value == std::string_view::npos) break;
-            group = group << 6 | static_cast<unsigned>(value);
-        }
-        const bool last = i + 4 == text.size();
-        const bool padded =
-            last && letters >= 2 &&
-            text.substr(i + letters, 4 - letters).find_first_not_of('=') == std::string_view::npos;
-        if (letters != 4 && !padded) return std::nullopt;
-        group <<= 6 * (4 - letters);
-        const std::size_t bytes = letters - 1;
-        for (std::size_t b = 0; b < bytes; ++b)
-            out.push_back(static_cast<std::uint8_t>(group >> (16 - 8 * b)));
-        if ((group & ((1u << (24 - 8 * bytes)) - 1)) != 0) return std::nullopt; // bits that no byte carries
-    }
+    std::vector<std::uint8_t> out(base::DecodedBase64Size(text.size()));
+    std::size_t size = 0;
+    if (!base::DecodeBase64(text, out.data(), &size)) return std::nullopt;
+    out.resize(size);
     return out;
 }
 

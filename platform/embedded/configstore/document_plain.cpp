@@ -14,6 +14,7 @@
 #include <string>
 #include <vector>
 
+#include "base/base64.h"
 #include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/document_parts.h"
 #include "platform/embedded/configstore/document_skim.h"
@@ -221,7 +222,7 @@ private:
 
     bool DecodeBase64Into(std::string_view text, std::size_t *size, Object *node) {
         auto *const bytes = static_cast<char *>(tree_->arena.Allocate(text.size() / 4 * 3 + 1));
-        if (!DecodeBase64(text, bytes, size)) return false;
+        if (!dvs::base::DecodeBase64(text, bytes, size)) return false;
         node->kind = Kind::Binary;
         node->span = {bytes, *size};
         return true;

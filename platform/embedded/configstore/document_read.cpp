@@ -8,6 +8,7 @@
 #include <boost/json/basic_parser_impl.hpp>
 #include <charconv>
 
+#include "base/base64.h"
 #include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/document_plain.h"
 #include "platform/embedded/configstore/text_code.h"
@@ -330,7 +331,7 @@ private:
         if (TypeOf(node) == FieldType::Binary) {
             auto *const bytes = static_cast<char *>(tree_->arena.Allocate(text.size() / 4 * 3 + 1));
             std::size_t size = 0;
-            if (DecodeBase64(text, bytes, &size)) {
+            if (dvs::base::DecodeBase64(text, bytes, &size)) {
                 node->kind = Kind::Binary;
                 node->span = {bytes, size};
                 return;

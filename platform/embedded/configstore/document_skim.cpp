@@ -11,6 +11,7 @@
 #include <string>
 #include <vector>
 
+#include "base/base64.h"
 #include "platform/embedded/configstore/document_parts.h"
 #include "platform/embedded/configstore/node.h"
 #include "platform/embedded/configstore/text_code.h"
@@ -147,7 +148,7 @@ private:
         std::size_t size = 0;
         if (!Text(&text)) return false;
         decoded_.resize(text.size() / 4 * 3 + 1);
-        return DecodeBase64(text, decoded_.data(), &size);
+        return dvs::base::DecodeBase64(text, decoded_.data(), &size);
     }
 
     /// A text that is as it is written. Names, ids and base64 mostly are.

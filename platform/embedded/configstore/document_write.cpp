@@ -7,6 +7,7 @@
 #include <cmath>
 #include <new>
 
+#include "base/base64.h"
 #include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/text_code.h"
 
@@ -183,9 +184,9 @@ void WriteNode(const Object &node, Buffer *out) {
         WriteText({node.span.data, node.span.size}, false, out);
         break;
     case Kind::Binary: {
-        char *at = out->Room(Base64Size(node.span.size) + 2);
+        char *at = out->Room(dvs::base::Base64Size(node.span.size) + 2);
         *at++ = '"';
-        at = PutBase64(at, node.span.data, node.span.size);
+        at = dvs::base::EncodeBase64(at, node.span.data, node.span.size);
         *at++ = '"';
         out->Used(at);
         break;

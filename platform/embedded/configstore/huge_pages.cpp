@@ -63,7 +63,7 @@ char *MapHugePages(std::size_t *size) {
         (void)munmap(block + before + *size, kHugePage - before);
         block += before;
     }
-    if (block) (void)madvise(block, *size, MADV_HUGEPAGE);
+    if (block) dvs::base::AdviseHugePages(block, *size);
     return block;
 }
 

@@ -8,9 +8,11 @@
 
 #include <cstddef>
 
+#include "base/huge_page.h"
+
 namespace configstore {
 
-inline constexpr std::size_t kHugePage = std::size_t{1} << 21;
+using dvs::base::kHugePage;
 
 /// A block of at least *size bytes, which is rounded up to whole huge pages. Nothing is promised of what it
 /// holds. Null when there is no memory.

@@ -7,8 +7,7 @@
 // A text is kept as it is while it is UTF-8. A byte that is not part of a well-formed sequence becomes the
 // private character U+10FE00 + byte (U+10FE80 to U+10FEFF). Should a text hold one of those very characters,
 // its four bytes are written like four such bytes: whatever a document holds in that range stands for a byte,
-// so that each text has one form and each form one text. Binary values are base64 (RFC 4648, padded, no
-// unused bits set).
+// so that each text has one form and each form one text. Binary values are base64 (base/base64.h).
 
 #include <cstddef>
 #include <cstdint>
@@ -40,13 +39,6 @@ char *PutEncodedByte(char *out, unsigned char byte);
 [[nodiscard]] bool HasEncodedBytes(std::string_view text);
 /// Writes the bytes that a document's text stands for; no more than it has. Returns the end.
 char *DecodeText(char *out, std::string_view text);
-
-[[nodiscard]] inline std::size_t Base64Size(std::size_t size) {
-    return (size + 2) / 3 * 4;
-}
-char *PutBase64(char *out, const char *data, std::size_t size);
-/// Decodes into `out` (three quarters of the text's size). False when the text is not base64.
-[[nodiscard]] bool DecodeBase64(std::string_view text, char *out, std::size_t *size);
 
 } // namespace configstore
 

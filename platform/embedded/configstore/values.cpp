@@ -6,6 +6,7 @@
 #include <cstring>
 #include <limits>
 
+#include "base/base64.h"
 #include "platform/embedded/configstore/node.h"
 #include "platform/embedded/configstore/text_code.h"
 
@@ -81,7 +82,7 @@ char *CopyOut(const char *data, std::size_t size) {
 int32_t DecodeOut(Span text, void **data, uint32_t *len) {
     char *const bytes = CopyOut(text.data, text.size);
     std::size_t size = 0;
-    if (!DecodeBase64({text.data, text.size}, bytes, &size) || size > UINT32_MAX) {
+    if (!dvs::base::DecodeBase64({text.data, text.size}, bytes, &size) || size > UINT32_MAX) {
         std::free(bytes);
         return SCHEMA_VIOLATION;
     }
