@@ -9,60 +9,16 @@
 #include <limits>
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
+#include "configstore/layouts/filters.h"
 #include "platform/runtime.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Field kParameterFields[] = {
-    // name    offset width kind             domain   meaning
-    {"ordinal",     0,    4, Kind::kUnsigned, nullptr, "number of the parameter, from 0"},
-    {"text",        4,  256, Kind::kText,     nullptr, "what the agent is given"},
-};
-constexpr Record kParameter = {"filter parameter", 260, kParameterFields, {}};
-static_assert(IsSound(kParameter));
-
-constexpr const char *kOnFailureTexts[] = {"FAIL_CLOSED", "FAIL_OPEN"};
-constexpr Domain kOnFailure = {"what becomes of traffic without the agent", kOnFailureTexts, 2, {}};
-
-constexpr Field kFilterFields[] = {
-    // name            offset width kind             domain       meaning
-    {"slot_number",         0,    4, Kind::kUnsigned, nullptr,     "place in the chain of filters"},
-    {"agent_name",          4,   40, Kind::kText,     nullptr,     "agent that filters"},
-    {"parameter_count",    44,    4, Kind::kCount,    nullptr,     "number of parameters"},
-    {"on_failure",         48,    4, Kind::kEnum,     &kOnFailure, "1 lets traffic pass without the agent, all else stops it"},
-};
-constexpr Part kFilterParts[] = {
-    {"parameters", &kParameter, CountBy::kField, 0, "parameter_count", nullptr, 0, "what the agent is given"},
-};
-constexpr Record kFilter = {"filter", 52, kFilterFields, kFilterParts};
-static_assert(IsSound(kFilter));
-
-constexpr Field kConfigFields[] = {
-    // name         offset width kind          domain   meaning
-    {"filter_count",     0,    4, Kind::kCount, nullptr, "number of filters"},
-};
-constexpr Part kConfigParts[] = {
-    {"filters", &kFilter, CountBy::kField, 0, "filter_count", nullptr, 0, "the filters, each with its parameters"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kFilterConfig = {"filter configuration", 4, kConfigFields, kConfigParts};
-static_assert(IsSound(kFilterConfig));
-
-} // namespace dvs::layout
 
 namespace dvs::convert {
 namespace {
 
 using layout::AreaOf;
 using layout::At;
-using layout::kFilter;
-using layout::kParameter;
+using layout::filters::kFilter;
+using layout::filters::kParameter;
 
 constexpr auto kFilterCount = At<uint32_t>(layout::kFilterConfig, "filter_count");
 constexpr auto kSlotNumber = At<uint32_t>(kFilter, "slot_number");

@@ -5,25 +5,7 @@
 #include "configstore/converters/health_check.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Field kHealthCheckFields[] = {
-    // name     offset width kind             domain   meaning
-    {"enabled",      0,    1, Kind::kBool,     nullptr, "whether the check is made"},
-    {"interval",     1,    4, Kind::kUnsigned, nullptr, "time between two checks"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kHealthCheck = {"health check deployment", 5, kHealthCheckFields, {}};
-static_assert(IsSound(kHealthCheck));
-
-} // namespace dvs::layout
+#include "configstore/layouts/health_check.h"
 
 namespace dvs::convert {
 namespace {

@@ -5,7 +5,7 @@
 #include "configstore/converters/lacp_groups.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
+#include "configstore/layouts/lacp.h"
 
 const char *LACP_MODE_2_CAHRS[] = {"NONE", "ACTIVE", "PASSIVE", nullptr};
 const char *LACP_LB_POLICY_SCHEMA[] = {
@@ -33,49 +33,15 @@ const char *LACP_LB_POLICY_SCHEMA[] = {
     nullptr,
 };
 
-namespace dvs::layout {
-
-constexpr Domain kLacpModes = {"LACP_MODE_2_CAHRS", LACP_MODE_2_CAHRS, std::size(LACP_MODE_2_CAHRS), {}};
-
-namespace {
-
-constexpr Domain kAlgorithms = {
-    "LACP_LB_POLICY_SCHEMA", LACP_LB_POLICY_SCHEMA, std::size(LACP_LB_POLICY_SCHEMA), {}};
-
-// clang-format off
-constexpr Field kGroupFields[] = {
-    // name                   offset width kind             domain        meaning
-    {"name",                       0,   65, Kind::kText,     nullptr,      "name of the group"},
-    {"key",                       65,   16, Kind::kText,     nullptr,      "key of the group"},
-    {"mode",                      81,    4, Kind::kEnum,     &kLacpModes,  "whether the group speaks first, answers only, or neither"},
-    {"load_balance_algorithm",    85,    4, Kind::kEnum,     &kAlgorithms, "what decides over which uplink a frame goes"},
-    {"uplink_num",                89,    4, Kind::kUnsigned, nullptr,      "number of uplinks"},
-};
-constexpr Record kGroup = {"LACP group", 93, kGroupFields, {}};
-static_assert(IsSound(kGroup));
-
-constexpr Field kTableFields[] = {
-    // name  offset width kind          domain   meaning
-    {"count",     0,    4, Kind::kCount, nullptr, "number of groups"},
-};
-constexpr Part kTableParts[] = {
-    {"groups", &kGroup, CountBy::kField, 0, "count", nullptr, 0, "the groups"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kLacpTable = {"LACP group table", 4, kTableFields, kTableParts};
-static_assert(IsSound(kLacpTable));
-
-} // namespace dvs::layout
-
 namespace dvs::convert {
 namespace {
 
+static_assert(std::size(LACP_MODE_2_CAHRS) == layout::lacp::kModes.textCount);
+static_assert(std::size(LACP_LB_POLICY_SCHEMA) == layout::lacp::kAlgorithms.textCount);
+
 using layout::AreaOf;
 using layout::At;
-using layout::kGroup;
+using layout::lacp::kGroup;
 
 constexpr auto kCount = At<uint32_t>(layout::kLacpTable, "count");
 constexpr auto kName = AreaOf(kGroup, "name");

@@ -4,37 +4,18 @@
 #include "configstore/converters/link_discovery.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
+#include "configstore/layouts/link_discovery.h"
 
 const char *CDP_MODE_2_CHARS[] = {"CDP", "LLDP", nullptr};
 const char *CDP_OPERATION_2_CHARS[] = {"NONE", "LISTEN", "ADVERTISE", "BOTH", nullptr};
 int32_t CHARS_2_CDP_MODE[] = {0, 1, 2};
 int32_t CHARS_2_CDP_OPERATION[] = {0, 1, 2, 3, 4};
 
-namespace dvs::layout {
-namespace {
-
-constexpr Domain kModes = {"CDP_MODE_2_CHARS", CDP_MODE_2_CHARS, std::size(CDP_MODE_2_CHARS), {}};
-constexpr Domain kOperations = {
-    "CDP_OPERATION_2_CHARS", CDP_OPERATION_2_CHARS, std::size(CDP_OPERATION_2_CHARS), {}};
-
-// clang-format off
-constexpr Field kLinkDiscoveryFields[] = {
-    // name      offset width kind         domain        meaning
-    {"protocol",      0,    1, Kind::kEnum, &kModes,      "protocol spoken"},
-    {"operation",     1,    1, Kind::kEnum, &kOperations, "whether the switch listens, speaks, or both"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kLinkDiscovery = {"link discovery", 2, kLinkDiscoveryFields, {}};
-static_assert(IsSound(kLinkDiscovery));
-
-} // namespace dvs::layout
-
 namespace dvs::convert {
 namespace {
+
+static_assert(std::size(CDP_MODE_2_CHARS) == layout::kCdpModes.textCount);
+static_assert(std::size(CDP_OPERATION_2_CHARS) == layout::kCdpOperations.textCount);
 
 constexpr auto kProtocol = layout::At<uint8_t>(layout::kLinkDiscovery, "protocol");
 constexpr auto kOperation = layout::At<uint8_t>(layout::kLinkDiscovery, "operation");

@@ -5,31 +5,7 @@
 #include "configstore/converters/mac_security.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Flag kRejectBits[] = {
-    {0x1, "promiscuous",     "promiscuous mode is rejected"},
-    {0x2, "mac_change",      "changes of the MAC address are rejected"},
-    {0x4, "forged_transmit", "frames with another source address are rejected"},
-};
-constexpr Domain kRejectFlags = {"reject flags", nullptr, 0, kRejectBits};
-
-constexpr Field kSecurityFields[] = {
-    // name   offset width kind          domain         meaning
-    {"reject",     0,    4, Kind::kFlags, &kRejectFlags, "what the port rejects"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kMacSecurity = {"MAC security", 4, kSecurityFields, {}};
-static_assert(IsSound(kMacSecurity));
-
-} // namespace dvs::layout
+#include "configstore/layouts/mac_security.h"
 
 namespace dvs::convert {
 namespace {

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Mirror sessions: one table (mirror_record.h) <-> the instances of "vspans", keyed by the session key. The
+// Mirror sessions: one table (layouts/mirror.h) <-> the instances of "vspans", keyed by the session key. The
 // port records at the table's end are mirror_ports.cpp's. Called through the converter table for the rows of
 // switches and of ports.
 
@@ -9,7 +9,7 @@
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/mirror_ports.h"
-#include "configstore/converters/mirror_record.h"
+#include "configstore/layouts/mirror.h"
 #include "configstore/converters/switch_version.h"
 
 const char *SESSION_TYPE_LOCAL_ENUM_2_SCHEMA[VSPAN_SESSION_TYPE_NUM] = {
@@ -21,16 +21,6 @@ const char *SESSION_TYPE_LOCAL_ENUM_2_SCHEMA[VSPAN_SESSION_TYPE_NUM] = {
     nullptr,
 };
 const char *ENCAP_TYPE_LOCAL_ENUM_2SCHEMA[VSPAN_ENCAP_TYPE_NUM] = {"GRE", "ERSPAN2", "ERSPAN3"};
-
-namespace dvs::layout {
-
-constexpr Record kMirrorTableNarrow = {"mirror session table", mirror::kHeadSize, mirror::kHeadFields,
-                                       mirror::kNarrowParts};
-constexpr Record kMirrorTableWide = {"mirror session table, wide port records", mirror::kHeadSize,
-                                     mirror::kHeadFields, mirror::kWideParts};
-static_assert(IsSound(kMirrorTableNarrow) && IsSound(kMirrorTableWide));
-
-} // namespace dvs::layout
 
 namespace dvs::convert {
 namespace {

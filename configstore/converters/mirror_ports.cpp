@@ -1,12 +1,12 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The ports of mirror sessions (mirror_ports.h), whose records mirror_record.h describes. What a group's
+// The ports of mirror sessions (mirror_ports.h), whose records layouts/mirror.h describes. What a group's
 // records are, and where they go, depends on the session's type and on the direction of the group.
 
 #include "configstore/converters/mirror_ports.h"
 
 #include "configstore/converters/address.h"
 #include "configstore/converters/common.h"
-#include "configstore/converters/mirror_record.h"
+#include "configstore/layouts/mirror.h"
 
 namespace dvs::convert {
 namespace {

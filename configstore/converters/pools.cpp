@@ -6,60 +6,15 @@
 #include "configstore/converters/pools.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Field kPoolFields[] = {
-    // name         offset width kind             domain   meaning
-    {"key",              0,  128, Kind::kText,     nullptr, "key of the pool"},
-    {"unused_1",       128,    1, Kind::kReserved, nullptr, "0"},
-    {"reservation",    129,    4, Kind::kUnsigned, nullptr, "bandwidth kept for the pool"},
-    {"unused_2",       133,   67, Kind::kReserved, nullptr, "0"},
-    {"shares",         200,    4, Kind::kUnsigned, nullptr, "weight against the other pools"},
-    {"limit",          204,    4, Kind::kSigned,   nullptr, "most bandwidth the pool gets; -1: no limit"},
-    {"unused_3",       208,    4, Kind::kReserved, nullptr, "0"},
-};
-constexpr Record kPool = {"resource pool", 212, kPoolFields, {}};
-static_assert(IsSound(kPool));
-
-constexpr Field kKeyFields[] = {
-    // name   offset width kind             domain   meaning
-    {"key",        0,  128, Kind::kText,     nullptr, "key of the pool"},
-    {"unused",   128,   72, Kind::kReserved, nullptr, "0"},
-};
-constexpr Record kPoolKey = {"resource pool key", 200, kKeyFields, {}};
-static_assert(IsSound(kPoolKey));
-
-constexpr Field kCountFields[] = {
-    // name  offset width kind          domain   meaning
-    {"count",     0,    4, Kind::kCount, nullptr, "number of pools"},
-};
-constexpr Part kPoolParts[] = {
-    {"pools", &kPool, CountBy::kField, 0, "count", nullptr, 0, "the pools"},
-};
-constexpr Part kKeyParts[] = {
-    {"pools", &kPoolKey, CountBy::kField, 0, "count", nullptr, 0, "the pools' keys"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kPoolConfig = {"resource pool configuration", 4, kCountFields, kPoolParts};
-constexpr Record kPoolList = {"resource pool list", 4, kCountFields, kKeyParts};
-static_assert(IsSound(kPoolConfig) && IsSound(kPoolList));
-
-} // namespace dvs::layout
+#include "configstore/layouts/pools.h"
 
 namespace dvs::convert {
 namespace {
 
 using layout::AreaOf;
 using layout::At;
-using layout::kPool;
-using layout::kPoolKey;
+using layout::pools::kPool;
+using layout::pools::kPoolKey;
 
 constexpr auto kCount = At<uint32_t>(layout::kPoolConfig, "count");
 constexpr auto kKey = AreaOf(kPool, "key");

@@ -5,26 +5,7 @@
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/lacp_groups.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Field kPortLacpFields[] = {
-    // name    offset width kind             domain       meaning
-    {"enabled",     0,    1, Kind::kBool,     nullptr,     "whether the port takes part in link aggregation"},
-    {"padding",     1,    3, Kind::kReserved, nullptr,     "0"},
-    {"mode",        4,    4, Kind::kEnum,     &kLacpModes, "whether it speaks first, answers only, or neither"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kPortLacp = {"port LACP policy", 8, kPortLacpFields, {}};
-static_assert(IsSound(kPortLacp));
-
-} // namespace dvs::layout
+#include "configstore/layouts/lacp.h"
 
 namespace dvs::convert {
 namespace {
@@ -42,7 +23,7 @@ int32_t SavePortLacp(const SaveArgs &args) {
     status = configstore::SetValueBool(policy, "enabled", Get(args.value, kEnabled) != 0);
     if (status) return status;
     return configstore::SetValueStr(policy, "mode",
-                                    EnumText(Texts(layout::kLacpModes), Get(args.value, kMode)));
+                                    EnumText(Texts(layout::lacp::kModes), Get(args.value, kMode)));
 }
 
 int32_t LoadPortLacp(const LoadArgs &args) {

@@ -5,44 +5,7 @@
 #include "configstore/converters/port_vlan.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Flag kVlanBits[] = {
-    {0x1, "trunk",        "the port carries the VLANs of the ranges"},
-    {0x2, "private_vlan", "the id is that of a private VLAN"},
-};
-constexpr Domain kVlanFlags = {"VLAN flags", nullptr, 0, kVlanBits};
-
-constexpr Field kRangeFields[] = {
-    // name  offset width kind             domain   meaning
-    {"start",     0,    2, Kind::kUnsigned, nullptr, "first VLAN id"},
-    {"end",       2,    2, Kind::kUnsigned, nullptr, "last VLAN id"},
-};
-constexpr Record kRange = {"VLAN range", 4, kRangeFields, {}};
-static_assert(IsSound(kRange));
-
-constexpr Field kVlanFields[] = {
-    // name        offset width kind             domain       meaning
-    {"flags",           0,    2, Kind::kFlags,    &kVlanFlags, "kind of the port"},
-    {"vlan_id",         2,    2, Kind::kUnsigned, nullptr,     "VLAN id or private VLAN id; unused for a trunk"},
-    {"reserved",        4,    2, Kind::kReserved, nullptr,     "0"},
-    {"range_count",     6,    2, Kind::kCount,    nullptr,     "number of ranges of a trunk"},
-};
-constexpr Part kVlanParts[] = {
-    {"ranges", &kRange, CountBy::kField, 0, "range_count", "flags", 0x1, "VLANs of the trunk"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kPortVlan = {"port VLAN policy", 8, kVlanFields, kVlanParts};
-static_assert(IsSound(kPortVlan));
-
-} // namespace dvs::layout
+#include "configstore/layouts/port_vlan.h"
 
 namespace dvs::convert {
 namespace {
@@ -53,9 +16,9 @@ using layout::kPortVlan;
 constexpr auto kFlags = At<uint16_t>(kPortVlan, "flags");
 constexpr auto kVlanId = At<uint16_t>(kPortVlan, "vlan_id");
 constexpr auto kRangeCount = At<uint16_t>(kPortVlan, "range_count");
-constexpr auto kStart = At<uint16_t>(layout::kRange, "start");
-constexpr auto kEnd = At<uint16_t>(layout::kRange, "end");
-constexpr std::size_t kRangeSize = layout::kRange.size;
+constexpr auto kStart = At<uint16_t>(layout::vlan::kRange, "start");
+constexpr auto kEnd = At<uint16_t>(layout::vlan::kRange, "end");
+constexpr std::size_t kRangeSize = layout::vlan::kRange.size;
 
 constexpr uint16_t kTrunk = 0x1;
 constexpr uint16_t kPrivate = 0x2;

@@ -6,44 +6,18 @@
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/switch_version.h"
-#include "configstore/layouts/records.h"
+#include "configstore/layouts/private_vlan.h"
 
 const char *PVLAN_2_CHARS[] = {nullptr, "PROMISCUOUS", "ISOLATED", "COMMUNITY", nullptr};
 int32_t CHARS_2_PVLAN[] = {-1, 1, 2, 3, -1};
 
-namespace dvs::layout {
-namespace {
-
-constexpr Domain kPvlanTypes = {"PVLAN_2_CHARS", PVLAN_2_CHARS, std::size(PVLAN_2_CHARS), {}};
-
-// clang-format off
-constexpr Field kEntryFields[] = {
-    // name         offset width kind             domain        meaning
-    {"primary_id",       0,    2, Kind::kUnsigned, nullptr,      "primary VLAN id"},
-    {"secondary_id",     2,    2, Kind::kUnsigned, nullptr,      "secondary VLAN id"},
-    {"type",             4,    1, Kind::kEnum,     &kPvlanTypes, "whom ports of the secondary VLAN can reach"},
-    {"padding",          5,    3, Kind::kReserved, nullptr,      "0"},
-};
-constexpr Record kEntry = {"private VLAN", 8, kEntryFields, {}};
-static_assert(IsSound(kEntry));
-
-constexpr Part kMapParts[] = {
-    {"entries", &kEntry, CountBy::kRest, 0, nullptr, nullptr, 0, "the pairs; bytes behind the last whole one are ignored"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kPrivateVlanMap = {"private VLAN map", 0, {}, kMapParts};
-static_assert(IsSound(kPrivateVlanMap));
-
-} // namespace dvs::layout
-
 namespace dvs::convert {
 namespace {
 
+static_assert(std::size(PVLAN_2_CHARS) == layout::pvlan::kPvlanTypes.textCount);
+
 using layout::At;
-using layout::kEntry;
+using layout::pvlan::kEntry;
 
 constexpr auto kPrimaryId = At<uint16_t>(kEntry, "primary_id");
 constexpr auto kSecondaryId = At<uint16_t>(kEntry, "secondary_id");

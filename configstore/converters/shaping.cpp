@@ -5,26 +5,7 @@
 #include "configstore/converters/shaping.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-// clang-format off
-constexpr Field kShapingFields[] = {
-    // name              offset width kind             domain   meaning
-    {"average_bandwidth",     0,    8, Kind::kUnsigned, nullptr, "bytes per second"},
-    {"peak_bandwidth",        8,    8, Kind::kUnsigned, nullptr, "bytes per second"},
-    {"burst_size",           16,    8, Kind::kUnsigned, nullptr, "bytes"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kShapingPolicy = {"shaping policy", 24, kShapingFields, {}};
-static_assert(IsSound(kShapingPolicy));
-
-} // namespace dvs::layout
+#include "configstore/layouts/shaping.h"
 
 namespace dvs::convert {
 namespace {

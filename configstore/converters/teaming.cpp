@@ -7,7 +7,7 @@
 #include <algorithm>
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
+#include "configstore/layouts/teaming.h"
 
 const char *TEAMING_POLICY_SCHEMA[] = {
     nullptr,
@@ -32,65 +32,6 @@ const char *NIC_TEAMING_POLICY_MODE_2_CHARS[] = {
     "LOADBALANCE_LOADBASED",
 };
 
-namespace dvs::layout {
-namespace {
-
-constexpr Domain kPolicies = {"NIC_TEAMING_POLICY_MODE_2_CHARS",
-                              NIC_TEAMING_POLICY_MODE_2_CHARS,
-                              std::size(NIC_TEAMING_POLICY_MODE_2_CHARS),
-                              {}};
-
-// clang-format off
-constexpr Flag kFailureBits[] = {
-    {0x20,  "check_beacon",  "beacon probing decides about a link"},
-    {0x80,  "lc_link_state", "the link state alone decides"},
-    {0x200, "from_store",    "set by every load that finds failure criteria"},
-};
-constexpr Flag kBehaviourBits[] = {
-    {0x02, "reverse_policy",  "return traffic follows the policy too"},
-    {0x04, "best_effort",     "use what uplinks there are"},
-    {0x08, "rolling_order",   "a recovered uplink does not take its traffic back"},
-    {0x10, "shotgun",         "send on every uplink"},
-    {0x20, "notify_switches", "tell the physical switches about a failover"},
-};
-// clang-format on
-constexpr Domain kFailureFlags = {"failure flags", nullptr, 0, kFailureBits};
-constexpr Domain kBehaviourFlags = {"behaviour flags", nullptr, 0, kBehaviourBits};
-
-constexpr uint32_t kNameSlots = 32;
-
-// clang-format off
-constexpr Field kNameFields[] = {
-    // name  offset width  kind         domain   meaning
-    {"name",      0,   81, Kind::kText, nullptr, "uplink name"},
-};
-constexpr Record kName = {"uplink name", 81, kNameFields, {}};
-static_assert(IsSound(kName));
-
-constexpr Field kTeamingFields[] = {
-    // name            offset width kind             domain            meaning
-    {"policy",              0,    4, Kind::kEnum,     &kPolicies,       "how traffic is spread over the uplinks"},
-    {"failure_flags",       4,    4, Kind::kFlags,    &kFailureFlags,   "what makes an uplink count as failed"},
-    {"percentage",          8,    1, Kind::kUnsigned, nullptr,          "error percentage at which an uplink counts as failed"},
-    {"full_duplex",         9,    1, Kind::kBool,     nullptr,          "an uplink that is not full duplex counts as failed"},
-    {"speed",              10,    2, Kind::kUnsigned, nullptr,          "an uplink below this speed counts as failed"},
-    {"behaviour_flags",    12,    4, Kind::kFlags,    &kBehaviourFlags, "how a failover is done"},
-    {"active_count",       16,    4, Kind::kCount,    nullptr,          "how many of the names, from the first on, are active uplinks"},
-    {"standby_count",      20,    4, Kind::kCount,    nullptr,          "how many of the names behind those are standby uplinks"},
-};
-constexpr Part kTeamingParts[] = {
-    {"names", &kName, CountBy::kFixed, kNameSlots, nullptr, nullptr, 0, "the active uplinks' names, then the standby uplinks'"},
-};
-// clang-format on
-constexpr uint32_t kHeadSize = 24;
-
-} // namespace
-
-constexpr Record kTeamingPolicy = {"teaming policy", kHeadSize, kTeamingFields, kTeamingParts};
-static_assert(IsSound(kTeamingPolicy) && kHeadSize + kNameSlots * kName.size == 2616);
-
-} // namespace dvs::layout
-
 int32_t TeamingPolicyFromSchema(const char *text, int32_t *value) {
     const auto slot = text ? dvs::convert::EnumIndex(TEAMING_POLICY_SCHEMA, text) : std::nullopt;
     *value = slot && *slot < std::size(TEAMING_POLICY_ENUM) ? TEAMING_POLICY_ENUM[*slot] : 0;
@@ -99,6 +40,8 @@ int32_t TeamingPolicyFromSchema(const char *text, int32_t *value) {
 
 namespace dvs::convert {
 namespace {
+
+static_assert(std::size(NIC_TEAMING_POLICY_MODE_2_CHARS) == layout::teaming::kPolicies.textCount);
 
 using layout::At;
 using layout::kTeamingPolicy;
@@ -113,8 +56,8 @@ constexpr auto kActiveCount = At<uint32_t>(kTeamingPolicy, "active_count");
 constexpr auto kStandbyCount = At<uint32_t>(kTeamingPolicy, "standby_count");
 
 constexpr std::size_t kNamesOffset = kTeamingPolicy.size;
-constexpr std::size_t kNameSize = layout::kName.size;
-constexpr std::size_t kNameSlots = layout::kNameSlots;
+constexpr std::size_t kNameSize = layout::teaming::kName.size;
+constexpr std::size_t kNameSlots = layout::teaming::kNameSlots;
 constexpr std::size_t kRecordSize = kNamesOffset + kNameSlots * kNameSize;
 
 constexpr uint32_t kCheckBeacon = 0x20;

@@ -5,27 +5,7 @@
 #include "configstore/converters/tx_uplink.h"
 
 #include "configstore/converters/common.h"
-#include "configstore/layouts/records.h"
-
-namespace dvs::layout {
-namespace {
-
-constexpr const char *kModeTexts[] = {"always", "normal"};
-constexpr Domain kModes = {"transmit-uplink modes", kModeTexts, 2, {}};
-
-// clang-format off
-constexpr Field kTxUplinkFields[] = {
-    // name offset width kind           domain   meaning
-    {"mode",     0,    7, Kind::kLiteral, &kModes, "\"always\" or \"normal\", with its NUL"},
-};
-// clang-format on
-
-} // namespace
-
-constexpr Record kTxUplink = {"transmit-uplink mode", 7, kTxUplinkFields, {}};
-static_assert(IsSound(kTxUplink));
-
-} // namespace dvs::layout
+#include "configstore/layouts/tx_uplink.h"
 
 namespace dvs::convert {
 

@@ -4,13 +4,14 @@
 #include "configstore/converters/uplink_lists.h"
 
 #include "configstore/converters/common.h"
+#include "configstore/layouts/scalars.h"
 
 namespace dvs::convert {
 namespace {
 
 constexpr std::size_t kCountSize = sizeof(uint32_t);
-constexpr std::size_t kKeySlotSize = 48;
-constexpr std::size_t kNameSlotSize = 81;
+constexpr std::size_t kKeySlotSize = layout::scalar::kKey.size;
+constexpr std::size_t kNameSlotSize = layout::scalar::kName.size;
 
 int32_t AppendSlots(const SaveArgs &args, uint32_t count, std::size_t slotSize) {
     for (uint32_t slot = 0; slot < count; ++slot) {

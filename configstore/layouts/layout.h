@@ -49,6 +49,11 @@ struct Domain {
     std::span<const Flag> flags;
 };
 
+/// The slots of an enumeration table, as they are now: the tables are exported data.
+inline std::span<const char *const> Texts(const Domain &domain) {
+    return {domain.texts, domain.textCount};
+}
+
 struct Field {
     const char *name;
     uint32_t offset; // bytes from the start of the record

@@ -5,20 +5,12 @@
 
 #include <iterator>
 
-#include "configstore/converters/mirror_record.h"
 #include "configstore/layouts/forms.h"
+#include "configstore/layouts/records.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout {
 namespace {
-
-constexpr Domain kTeamingPolicies = {
-    "NIC_TEAMING_POLICY_MODE_2_CHARS", NIC_TEAMING_POLICY_MODE_2_CHARS, 6, {}};
-constexpr Domain kPvlanTypes = {"PVLAN_2_CHARS", PVLAN_2_CHARS, 5, {}};
-constexpr Domain kCdpModes = {"CDP_MODE_2_CHARS", CDP_MODE_2_CHARS, 3, {}};
-constexpr Domain kCdpOperations = {"CDP_OPERATION_2_CHARS", CDP_OPERATION_2_CHARS, 5, {}};
-constexpr Domain kLbPolicies = {"LACP_LB_POLICY_SCHEMA", LACP_LB_POLICY_SCHEMA, 22, {}};
-constexpr Domain kLacpModeTexts = {"LACP_MODE_2_CAHRS", LACP_MODE_2_CAHRS, 4, {}};
 
 constexpr const char *kOnFailureTexts[] = {"FAIL_OPEN", "FAIL_CLOSED"};
 constexpr Domain kOnFailure = {"on failure", kOnFailureTexts, 2, {}};
@@ -45,7 +37,7 @@ constexpr StoreField kUplinkOrder[] = {
     {"standby_uplink_ports", Form::kTexts, "", kUplinkNameMax, nullptr, nullptr, {}, "standby uplinks, in order"},
 };
 constexpr StoreField kTeaming[] = {
-    {"policy",            Form::kText,   "", 0, &kTeamingPolicies, nullptr, {}, "how traffic is spread over the uplinks"},
+    {"policy",            Form::kText,   "", 0, &teaming::kPolicies, nullptr, {}, "how traffic is spread over the uplinks"},
     {"reverse_policy",    Form::kBool,   "", 0, nullptr, nullptr, {}, "return traffic follows the policy too"},
     {"rolling_order",     Form::kBool,   "", 0, nullptr, nullptr, {}, "a recovered uplink does not take its traffic back"},
     {"notify_switches",   Form::kBool,   "", 0, nullptr, nullptr, {}, "tell the physical switches about a failover"},
@@ -85,12 +77,12 @@ constexpr StoreField kFilterPolicy[] = {
 };
 constexpr StoreField kPortLacpMembers[] = {
     {"enabled", Form::kBool, "", 0, nullptr,         nullptr, {}, "whether the port takes part in link aggregation", Rule::kNone, true},
-    {"mode",    Form::kText, "", 0, &kLacpModeTexts, nullptr, {}, "whether it speaks first, answers only, or neither", Rule::kNone, true},
+    {"mode",    Form::kText, "", 0, &lacp::kModes, nullptr, {}, "whether it speaks first, answers only, or neither", Rule::kNone, true},
 };
 constexpr StoreField kPvlan[] = {
     {"primary_id",   Form::kUint16, "", 0, nullptr,      nullptr, {}, "primary VLAN id", Rule::kVlan, true},
     {"secondary_id", Form::kUint16, "", 0, nullptr,      nullptr, {}, "secondary VLAN id", Rule::kVlan, true},
-    {"type",         Form::kText,   "", 0, &kPvlanTypes, nullptr, {}, "whom ports of the secondary VLAN can reach", Rule::kNone, true},
+    {"type",         Form::kText,   "", 0, &pvlan::kPvlanTypes, nullptr, {}, "whom ports of the secondary VLAN can reach", Rule::kNone, true},
 };
 constexpr StoreField kSourcePort[] = {
     {"wildcard_port_connectee_types", Form::kTexts, "", 0,           &kConnectees, nullptr, {}, "ports that are sources by their kind"},
@@ -124,8 +116,8 @@ constexpr StoreField kVspan[] = {
 constexpr StoreField kLacpGroup[] = {
     {"key",                    Form::kText,   "", 15, nullptr,         nullptr, {}, "key of the group"},
     {"name",                   Form::kText,   "", 64, nullptr,         nullptr, {}, "name of the group"},
-    {"mode",                   Form::kText,   "", 0,  &kLacpModeTexts, nullptr, {}, "whether the group speaks first, answers only, or neither"},
-    {"load_balance_algorithm", Form::kText,   "", 0,  &kLbPolicies,    nullptr, {}, "what decides over which uplink a frame goes"},
+    {"mode",                   Form::kText,   "", 0,  &lacp::kModes, nullptr, {}, "whether the group speaks first, answers only, or neither"},
+    {"load_balance_algorithm", Form::kText,   "", 0,  &lacp::kAlgorithms,    nullptr, {}, "what decides over which uplink a frame goes"},
     {"uplink_num",             Form::kUint32, "", 0,  nullptr,         nullptr, {}, "number of uplinks", Rule::kNone, true},
 };
 constexpr StoreField kLinkDiscoveryMembers[] = {

@@ -7,7 +7,7 @@
 
 #include "configstore/converters/address.h"
 #include "configstore/converters/common.h"
-#include "configstore/converters/mirror_record.h"
+#include "configstore/layouts/mirror.h"
 #include "configstore/typed/own_form.h"
 
 namespace dvs::typed {

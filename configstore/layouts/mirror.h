@@ -1,14 +1,12 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-#ifndef CONFIGSTORE_CONVERTERS_MIRROR_RECORD_H
-#define CONFIGSTORE_CONVERTERS_MIRROR_RECORD_H
+#ifndef CONFIGSTORE_LAYOUTS_MIRROR_H
+#define CONFIGSTORE_LAYOUTS_MIRROR_H
 
 // The binary record of mirror sessions: a head, the sessions, and the port records of all sessions one behind
 // the other. For each session in order come its destinations, its receive sources and its transmit sources.
-// Switches of a version above 99 have wide port records. For mirror sessions' own files only.
+// Switches of a version above 99 have wide port records.
 
-#include <iterator>
-
-#include "configstore/layouts/records.h"
+#include "configstore/layouts/layout.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout::mirror {
@@ -143,5 +141,15 @@ inline constexpr Part kWideParts[] = {
 inline constexpr uint32_t kHeadSize = 20;
 
 } // namespace dvs::layout::mirror
+
+namespace dvs::layout {
+
+inline constexpr Record kMirrorTableNarrow = {"mirror session table", mirror::kHeadSize, mirror::kHeadFields,
+                                              mirror::kNarrowParts};
+inline constexpr Record kMirrorTableWide = {"mirror session table, wide port records", mirror::kHeadSize,
+                                            mirror::kHeadFields, mirror::kWideParts};
+static_assert(IsSound(kMirrorTableNarrow) && IsSound(kMirrorTableWide));
+
+} // namespace dvs::layout
 
 #endif

@@ -1,0 +1,30 @@
+/* SPDX-License-Identifier: Apache-2.0 */
+#ifndef CONFIGSTORE_LAYOUTS_IPFIX_H
+#define CONFIGSTORE_LAYOUTS_IPFIX_H
+
+// The record of IPFIX flow export.
+
+#include "configstore/layouts/layout.h"
+
+namespace dvs::layout {
+
+// clang-format off
+inline constexpr Field kIpfixFields[] = {
+    // name                  offset width kind             domain   meaning
+    {"idle_flow_timeout",         0,    4, Kind::kUnsigned, nullptr, "seconds until a flow without traffic is reported"},
+    {"active_flow_timeout",       4,    4, Kind::kUnsigned, nullptr, "seconds until a flow with traffic is reported"},
+    {"collector_address",         8,   16, Kind::kAddress,  nullptr, "whom flows are reported to"},
+    {"collector_port",           24,    2, Kind::kUnsigned, nullptr, "UDP port of the collector"},
+    {"sampling_rate",            26,    4, Kind::kUnsigned, nullptr, "one frame in so many is looked at; 0: all"},
+    {"internal_flows_only",      30,    1, Kind::kBool,     nullptr, "only flows between ports of this host"},
+    {"is_ipv6",                  31,    1, Kind::kBool,     nullptr, "the address is IPv6"},
+    {"observation_domain_id",    32,    4, Kind::kUnsigned, nullptr, "what the collector knows the switch by"},
+};
+// clang-format on
+
+inline constexpr Record kIpfix = {"IPFIX settings", 36, kIpfixFields, {}};
+static_assert(IsSound(kIpfix));
+
+} // namespace dvs::layout
+
+#endif
