@@ -7,6 +7,13 @@ if(CCACHE_PROGRAM)
   set(CMAKE_CXX_COMPILER_LAUNCHER ${CCACHE_PROGRAM})
 endif()
 
+# Builds for testing link dozens of programs with debug information: mold takes a third of the default linker's time.
+# What is installed is linked by the default one.
+find_program(MOLD_PROGRAM mold)
+if(MOLD_PROGRAM AND CMAKE_BUILD_TYPE STREQUAL "Debug")
+  add_link_options(-fuse-ld=mold)
+endif()
+
 add_library(dvs_flags INTERFACE)
 target_compile_options(dvs_flags INTERFACE -Wall -Wextra -Wpedantic -Wconversion -Wshadow)
 if(DVS_WERROR)
