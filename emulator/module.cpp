@@ -4,6 +4,7 @@
 
 #include "emulator/module.h"
 
+#include <algorithm>
 #include <array>
 #include <cerrno>
 #include <cstring>
@@ -13,59 +14,57 @@
 #include "dvsstate/port_table.h"
 #include "dvsstate/switch_table.h"
 #include "emulator/give.h"
-#include "kernel/request.h"
 
 namespace dvs::emulator {
 
-using dvs::hyp::Command;
+using device::Command;
+using device::Transfer;
 
-/// What the dispatcher needs to know of a command.
+/// The handler of each command; the rows are those of device::kCommands, in the same order.
 struct CommandTable {
     using Handler = HYP_ReturnStatus (Module::*)(const Call &, Answer *);
     struct Row {
         Command command;
-        bool changes; // the state, when it succeeds
         Handler handler;
     };
     static constexpr std::array kRows = {
-        Row{Command::StateInit, true, &Module::StateInit},
-        Row{Command::StateCleanup, true, &Module::StateCleanup},
-        Row{Command::StateSanitize, true, &Module::StateSanitize},
-        Row{Command::StateGet, false, &Module::StateGet},
-        Row{Command::SwitchAdd, true, &Module::SwitchAdd},
-        Row{Command::SwitchRemove, true, &Module::SwitchRemove},
-        Row{Command::SwitchAssociate, false, &Module::SwitchAssociate},
-        Row{Command::SwitchDissociate, false, &Module::SwitchDissociate},
-        Row{Command::GlobalPropGet, false, &Module::GlobalPropGet},
-        Row{Command::GlobalPropSet, true, &Module::GlobalPropSet},
-        Row{Command::GlobalPropClear, true, &Module::GlobalPropClear},
-        Row{Command::HostPropGet, false, &Module::HostPropGet},
-        Row{Command::HostPropSet, true, &Module::HostPropSet},
-        Row{Command::HostPropClear, true, &Module::HostPropClear},
-        Row{Command::PortAdd, true, &Module::PortAdd},
-        Row{Command::PortRemove, true, &Module::PortRemove},
-        Row{Command::PortDataGet, false, &Module::PortDataGet},
-        Row{Command::PortDataSet, true, &Module::PortDataSet},
-        Row{Command::PortDataClear, true, &Module::PortDataClear},
-        Row{Command::PortStateGet, false, &Module::PortStateGet},
-        Row{Command::PortFind, false, &Module::PortFind},
-        Row{Command::SwitchSetMaxPorts, true, &Module::SwitchSetMaxPorts},
-        Row{Command::SwitchSetVersion, true, &Module::SwitchSetVersion},
-        Row{Command::UplinkDataSet, false, &Module::UplinkDataSet},
-        Row{Command::UplinkDataGet, false, &Module::UplinkDataGet},
-        Row{Command::CmdExec, false, &Module::CmdExec},
-        Row{Command::SmartNICGlobalPropGet, false, &Module::GlobalPropGet},
-        Row{Command::SmartNICHostPropGet, false, &Module::HostPropGet},
-        Row{Command::SmartNICPortDataGet, false, &Module::PortDataGet},
+        Row{Command::StateInit, &Module::StateInit},
+        Row{Command::StateCleanup, &Module::StateCleanup},
+        Row{Command::StateSanitize, &Module::StateSanitize},
+        Row{Command::StateGet, &Module::StateGet},
+        Row{Command::SwitchAdd, &Module::SwitchAdd},
+        Row{Command::SwitchRemove, &Module::SwitchRemove},
+        Row{Command::SwitchAssociate, &Module::SwitchAssociate},
+        Row{Command::SwitchDissociate, &Module::SwitchDissociate},
+        Row{Command::GlobalPropGet, &Module::GlobalPropGet},
+        Row{Command::GlobalPropSet, &Module::GlobalPropSet},
+        Row{Command::GlobalPropClear, &Module::GlobalPropClear},
+        Row{Command::HostPropGet, &Module::HostPropGet},
+        Row{Command::HostPropSet, &Module::HostPropSet},
+        Row{Command::HostPropClear, &Module::HostPropClear},
+        Row{Command::PortAdd, &Module::PortAdd},
+        Row{Command::PortRemove, &Module::PortRemove},
+        Row{Command::PortDataGet, &Module::PortDataGet},
+        Row{Command::PortDataSet, &Module::PortDataSet},
+        Row{Command::PortDataClear, &Module::PortDataClear},
+        Row{Command::PortStateGet, &Module::PortStateGet},
+        Row{Command::PortFind, &Module::PortFind},
+        Row{Command::SwitchSetMaxPorts, &Module::SwitchSetMaxPorts},
+        Row{Command::SwitchSetVersion, &Module::SwitchSetVersion},
+        Row{Command::UplinkDataSet, &Module::UplinkDataSet},
+        Row{Command::UplinkDataGet, &Module::UplinkDataGet},
+        Row{Command::CmdExec, &Module::CmdExec},
+        Row{Command::SmartNICGlobalPropGet, &Module::GlobalPropGet},
+        Row{Command::SmartNICHostPropGet, &Module::HostPropGet},
+        Row{Command::SmartNICPortDataGet, &Module::PortDataGet},
     };
 
-    static const Row *Find(int32_t request) {
-        for (const Row &row : kRows) {
-            if (static_cast<int32_t>(row.command) == request) return &row;
-        }
-        return nullptr;
+    static Handler HandlerOf(const device::CommandRow *row) {
+        return kRows[row - device::kCommands.data()].handler;
     }
 };
+static_assert(std::ranges::equal(CommandTable::kRows, device::kCommands, {}, &CommandTable::Row::command,
+                                 &device::CommandRow::command));
 
 namespace {
 
@@ -85,14 +84,14 @@ bool HasTexts(const DVSHYPRequest &record) {
 
 /// A length without a buffer behind it: what copying from or to user space would fault on.
 bool LacksBuffer(const Call &call) {
-    switch (wire::TransferOf(call.request)) {
-    case wire::Transfer::ValueIn:
-    case wire::Transfer::ValueOut:
+    switch (device::TransferOf(call.request)) {
+    case Transfer::ValueIn:
+    case Transfer::ValueOut:
         return call.record.dataLen != 0 && !call.Has(wire::HasData);
-    case wire::Transfer::Execute:
+    case Transfer::Execute:
         return (call.record.cmdInLen != 0 && !call.Has(wire::HasCmdIn)) ||
                (call.record.cmdOutLen != 0 && !call.Has(wire::HasCmdOut));
-    case wire::Transfer::None:
+    case Transfer::None:
         return false;
     }
     return false;
@@ -227,7 +226,7 @@ Answer Module::Execute(const Call &call) {
 }
 
 HYP_ReturnStatus Module::Dispatch(const Call &call, Answer *answer) {
-    const CommandTable::Row *row = CommandTable::Find(call.request);
+    const device::CommandRow *row = device::FindCommand(call.request);
     if (!row) return HYP_NOT_SUPPORTED;
     counters_.calls[static_cast<std::size_t>(call.request)]++;
     if (LacksBuffer(call)) {
@@ -236,10 +235,10 @@ HYP_ReturnStatus Module::Dispatch(const Call &call, Answer *answer) {
         return call.record.status == HYP_OK ? static_cast<HYP_ReturnStatus>(HYP_FAILURE) : call.record.status;
     }
     if (!HasTexts(call.record)) return HYP_BAD_PARAM;
-    const HYP_ReturnStatus status = (this->*row->handler)(call, answer);
-    if (row->changes) fetchedState_.reset();
-    if (status == HYP_OK && row->changes && sync_) return SaveState();
-    return status;
+    const HYP_ReturnStatus status = (this->*CommandTable::HandlerOf(row))(call, answer);
+    if (row->effect != device::Effect::ChangesState) return status;
+    fetchedState_.reset();
+    return status == HYP_OK && sync_ ? SaveState() : status;
 }
 
 HYP_ReturnStatus Module::CheckValue(uint64_t size) {

@@ -11,6 +11,7 @@
 #include "emulator/call.h"
 #include "emulator/extras.h"
 #include "emulator/faults.h"
+#include "platform/device_commands.h"
 
 namespace dvs::emulator {
 
@@ -18,10 +19,8 @@ namespace dvs::emulator {
 inline constexpr uint32_t kMaxValueSize = 16U << 20;
 inline constexpr uint32_t kMaxStateSize = wire::kMaxTransfer;
 
-inline constexpr std::size_t kCommandNum = 32;
-
 struct Counters {
-    std::array<uint64_t, kCommandNum> calls{};
+    std::array<uint64_t, device::kCommandEnd> calls{}; // by command number
     uint64_t refused = 0;
     uint64_t saves = 0;
 };

@@ -13,7 +13,6 @@
 #include <unistd.h>
 
 #include "emulator/listen.h"
-#include "kernel/request.h"
 
 namespace dvs::emulator {
 
@@ -26,7 +25,6 @@ constexpr int kSendBuffer = 2 << 20;
 constexpr uint64_t kWaitingBytes = 1ULL << 30;
 constexpr std::chrono::seconds kStall{60};
 constexpr std::chrono::seconds kFarewell{5};
-constexpr int32_t kCmdExec = static_cast<int32_t>(dvs::hyp::Command::CmdExec);
 
 /// As many clients as descriptors allow, raising the soft limit where that helps.
 std::size_t RoomForClients() {
@@ -187,7 +185,7 @@ bool Server::ServeRequests(Connection *client) {
         }
         const Call call = client->Request();
         // Whoever set faults must be able to look at them and take them back.
-        const bool exempt = call.request == kCmdExec && std::string_view(call.record.cmd, 5) == "fault";
+        const bool exempt = call.request == NumberOf(device::Command::CmdExec) && std::string_view(call.record.cmd, 5) == "fault";
         const auto fault = exempt ? std::nullopt : module_->FaultTable().Next(call.request);
         if (fault && fault->delay.count() > 0 && !stopping_) {
             client->delayed = {Clock::now() + fault->delay, *fault};

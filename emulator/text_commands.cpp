@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Command 28: text commands, for people and scripts that watch and steer the module. One table of them;
-// replies are lines of text. Switch and port names from outside are escaped before they become part of a
-// line.
+// Text commands, for people and scripts that watch and control the module: one table of them. Replies are lines of
+// text; switch and port names are escaped before they become part of a line.
 
 #include <algorithm>
 #include <array>
@@ -13,7 +12,6 @@
 
 #include "emulator/give.h"
 #include "emulator/module.h"
-#include "kernel/request.h"
 
 namespace dvs::emulator {
 
@@ -193,9 +191,9 @@ HYP_ReturnStatus Module::TextStats(const TextArguments &, std::string *reply) {
     *reply += "switches " + std::to_string(counts.first) + "\nports " + std::to_string(counts.second) +
               "\nport-limit " + std::to_string(uwMaxNumActivePortsSystemWide) + "\nrefused " +
               std::to_string(counters_.refused) + "\nsaves " + std::to_string(counters_.saves) + "\n";
-    for (std::size_t i = 0; i < kCommandNum; i++) {
-        if (counters_.calls[i])
-            *reply += "command " + std::to_string(i) + ' ' + std::to_string(counters_.calls[i]) + '\n';
+    for (std::size_t number = 0; number < counters_.calls.size(); number++) {
+        const uint64_t calls = counters_.calls[number];
+        if (calls) *reply += "command " + std::to_string(number) + ' ' + std::to_string(calls) + '\n';
     }
     Listing listing{&extras_, reply};
     DVSState_SwitchForEach(ListSwitch, &listing);

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The numbered commands: each fills the record's fields it uses and sends it, one line a command. Leans on
-// the device channel; the module's answers pass through unchanged.
+// The commands: each fills the fields of the record that it uses and sends it through the device channel. The module's
+// status is returned unchanged.
 
 #include <cstdio>
 
@@ -37,7 +37,7 @@ public:
         return Value(value, size);
     }
 
-    HYP_ReturnStatus Call() { return DVSHYP_Ioctl(static_cast<int>(command_), &record_); }
+    HYP_ReturnStatus Call() { return DVSHYP_Ioctl(NumberOf(command_), &record_); }
     HYP_ReturnStatus Fetch(void **out, uint32_t *outLen) {
         return dvs::hyp::Fetch(command_, &record_, out, outLen);
     }

@@ -69,9 +69,7 @@ public:
     bool IsOpen() const { return fd_ != kNoDescriptor; }
 
     /// False when the call failed.
-    bool Send(Command command, DVSHYPRequest *req) const {
-        return SendRequest(fd_, static_cast<int>(command), req);
-    }
+    bool Send(Command command, DVSHYPRequest *req) const { return SendRequest(fd_, NumberOf(command), req); }
 
 private:
     int fd_;

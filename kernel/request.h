@@ -10,6 +10,7 @@
 #include <cstring>
 
 #include "dvs/hyp.h"
+#include "platform/device_commands.h"
 
 namespace dvs::hyp {
 
@@ -33,38 +34,7 @@ static_assert(sizeof(DVSHYPExternalIdResult) == 176);
 static_assert(sizeof(DVSHYPPortListEntry) == 52);
 static_assert(sizeof(DVSHYPPortList) == 8);
 
-/// The module's command numbers; 23 to 25 are not this library's to send.
-enum class Command : int {
-    StateInit = 0,
-    StateCleanup = 1,
-    StateSanitize = 2,
-    StateGet = 3,
-    SwitchAdd = 4,
-    SwitchRemove = 5,
-    SwitchAssociate = 6,
-    SwitchDissociate = 7,
-    GlobalPropGet = 8,
-    GlobalPropSet = 9,
-    GlobalPropClear = 10,
-    HostPropGet = 11,
-    HostPropSet = 12,
-    HostPropClear = 13,
-    PortAdd = 14,
-    PortRemove = 15,
-    PortDataGet = 16,
-    PortDataSet = 17,
-    PortDataClear = 18,
-    PortStateGet = 19,
-    PortFind = 20,
-    SwitchSetMaxPorts = 21,
-    SwitchSetVersion = 22,
-    UplinkDataSet = 26,
-    UplinkDataGet = 27,
-    CmdExec = 28,
-    SmartNICGlobalPropGet = 29,
-    SmartNICHostPropGet = 30,
-    SmartNICPortDataGet = 31,
-};
+using device::Command;
 
 /// What a fetch and a command execution offer the module first.
 inline constexpr uint32_t kFirstBufferSize = 32768;

@@ -14,36 +14,36 @@ extern "C" {
 #endif
 
 /*
- * The kernel interface: numbered commands to the hypervisor kernel's switching module, sent through its
- * character device in one fixed record; the fetch of whole states; filters and queries over what comes back.
+ * The kernel interface: commands to the hypervisor kernel's switching module, sent through its character device in one
+ * fixed record; fetching whole states; filters and queries over the result.
  *
- * What holds for every function here:
+ * For every function here:
  *
  * Arguments  Texts end in NUL and are cut to their field: switch name 63 characters, port id 47, property
- *            and class name 127, command text 127. Lengths are bytes. None of the pointers may be null
- *            unless it is said.
+ *            and class name 127, command text 127. Lengths are bytes. Pointers must not be null
+ *            unless a comment allows it.
  * Outputs    `out` receives a buffer, `outLen` its size in bytes. Buffers are released with DVSHYP_DataFree,
  *            property lists with DVSData_Free. Commands that fetch a reply set *out to null when they do not
  *            succeed, and *outLen to the length the module last named (untouched when the device cannot be
- *            opened; 0 when the module claims more bytes than the buffer holds). Other functions leave their
- *            outputs alone on failure.
+ *            opened; 0 when the module claims more bytes than the buffer holds). Other functions do not change
+ *            their outputs on failure.
  * Statuses   HYP_FAILURE: the device cannot be opened, or the module failed the command without giving a
  *            status, or it claimed more bytes than the buffer holds. HYP_NO_MEMORY: a buffer could not be
- *            allocated. Anything else is the module's own answer: HYP_NOT_FOUND for an absent switch, port
- *            or property, HYP_EXISTS for a duplicate, HYP_LIMIT_EXCEEDED, HYP_BAD_PARAM, HYP_NOT_SUPPORTED
- *            for a version or command it does not know.
+ *            allocated. Any other status comes from the module: HYP_NOT_FOUND for an absent switch, port or
+ *            property, HYP_EXISTS for a duplicate, HYP_LIMIT_EXCEEDED, HYP_BAD_PARAM, HYP_NOT_SUPPORTED for
+ *            an unknown version or command.
  * Messages   Go to standard error, whatever the debug levels: "failed to open dvsdev device %s\n" when the
  *            device cannot be opened; "ioctl failed: %s\n" when a plain call fails with another errno than
  *            ENOENT.
- * Locks      Plain commands take none and may be called from several threads. Functions that use the switch
- *            table as scratch say so: they hold "dvshyp" (DVSwitchHYPLock) from loading the table to
+ * Locks      Plain commands take no lock and may be called from several threads. Functions that load state
+ *            into the switch table say so: they hold "dvshyp" (DVSwitchHYPLock) from loading the table to
  *            resetting it, and leave the table empty on every path. "dvshyp" is taken before the
  *            switch-state lock.
  */
 
 /*
- * The request record, packed, host byte order. A sender zeroes it and fills what its command uses; the
- * request number of the ioctl is the command's number.
+ * The request record, packed, host byte order. A sender zeroes it and fills the fields that its command uses. The
+ * request number of the ioctl is the command's number; docs/emulator.md lists them.
  */
 typedef struct __attribute__((packed)) DVSHYPRequest {
     char switchName[64]; /*   0 switch name */
@@ -54,13 +54,13 @@ typedef struct __attribute__((packed)) DVSHYPRequest {
     uint32_t propType;   /* 248 type word of a value being set */
     uint32_t reserved;   /* 252 always 0 */
     uint32_t status;     /* 256 HYP_FAILURE going in; written by the module when it fails the call */
-    uint32_t dataLen;    /* 260 size of the value at `data`; fetch: capacity in, size needed or got out */
-    uint64_t data;       /* 264 address of the value or of the receive buffer */
-    char cmd[128];       /* 272 command text (DVSHYP_CmdExec) */
-    uint32_t cmdInLen;   /* 400 size of the command's input */
-    uint64_t cmdIn;      /* 404 address of the command's input; the one field off its natural boundary */
-    uint32_t cmdOutLen;  /* 412 capacity of the reply buffer in, size needed or returned out */
-    uint64_t cmdOut;     /* 416 address of the reply buffer */
+    uint32_t dataLen;   /* 260 size of the value at `data`; fetch: capacity in, size needed or returned out */
+    uint64_t data;      /* 264 address of the value or of the receive buffer */
+    char cmd[128];      /* 272 command text (DVSHYP_CmdExec) */
+    uint32_t cmdInLen;  /* 400 size of the command's input */
+    uint64_t cmdIn;     /* 404 address of the command's input; the one field off its natural boundary */
+    uint32_t cmdOutLen; /* 412 capacity of the reply buffer in, size needed or returned out */
+    uint64_t cmdOut;    /* 416 address of the reply buffer */
 } DVSHYPRequest;
 
 /* What DVSHYP_PortGetByExternalId finds; 176 bytes. */
@@ -89,15 +89,15 @@ typedef struct {
 /* ---- The channel ---- */
 
 /*
- * Sends one command over the process's cached device descriptor, which the first successful call opens and
- * nothing closes. The record's status is preset to HYP_FAILURE; it is returned when the call fails, and not
- * looked at when the call succeeds. After a failed open the next call tries again.
+ * Sends one command, `request`, over the process's cached device descriptor, which the first successful call opens and
+ * nothing closes. The record's status is preset to HYP_FAILURE; it is returned when the call fails and ignored when the
+ * call succeeds. After a failed open the next call tries again.
  */
 HYP_ReturnStatus DVSHYP_Ioctl(int request, DVSHYPRequest *req);
 
 /*
- * Executes a text command of the module (command 28) and fetches its reply, in a buffer that is offered anew
- * for as long as the module answers HYP_LIMIT_EXCEEDED, whether or not it asked for more. `in`: the command's
+ * Executes a text command of the module and fetches its reply. Repeats the call with a buffer of the size that the
+ * module names for as long as the module returns HYP_LIMIT_EXCEEDED, whether or not that size is larger. `in`: the command's
  * input, inLen bytes, null when inLen is 0. A buffer that cannot be allocated is reported with "failed to
  * alloc buffer memory" on standard error.
  */
@@ -109,58 +109,60 @@ void DVSHYP_DataFree(void *buf);
 
 /*
  * Takes the recursive lock "dvshyp", created on first use, and returns its handle for DVSwitchHYPUnlock
- * (where null does nothing). Hold it around a sequence that must not meet another thread's use of the switch
- * table as scratch.
+ * (where null does nothing). Hold it around a sequence during which no other thread may load state into the switch table.
  */
 MXUserRecLock *DVSwitchHYPLock(void);
 void DVSwitchHYPUnlock(MXUserRecLock *lock);
 
 /* ---- Whole states ---- */
 
-/* 0: replaces the module's state by a serialized one of `len` bytes. 1: empties it. 2: tidies it up. */
+/* Replaces the module's state by a serialized one of `len` bytes. */
 HYP_ReturnStatus DVSHYP_StateInit(const void *state, uint32_t len);
+
+/* Empties the module's state. */
 HYP_ReturnStatus DVSHYP_StateCleanup(void);
+
+/* Makes the module clean up its state. */
 HYP_ReturnStatus DVSHYP_StateSanitize(void);
 
-/* 3: fetches the module's whole state, serialized as DVSState_ConfigSerialize does. */
+/* Fetches the module's whole state, serialized as DVSState_ConfigSerialize does. */
 HYP_ReturnStatus DVSHYP_StateGet(void **out, uint32_t *outLen);
 
 /* ---- Switches ---- */
 
-/* 4, 5: adds and removes a switch. HYP_EXISTS, HYP_LIMIT_EXCEEDED; HYP_NOT_FOUND. */
+/* Add and remove a switch. Add: HYP_EXISTS, HYP_LIMIT_EXCEEDED. Remove: HYP_NOT_FOUND. */
 HYP_ReturnStatus DVSHYP_SwitchAdd(const char *switchName, const char *className, uint32_t maxPorts,
                                   uint32_t version);
 HYP_ReturnStatus DVSHYP_SwitchRemove(const char *switchName);
 
-/* 6, 7: associates the switch with the host's networking, and takes that back. */
+/* Associate the switch with the host's networking, and dissociate it. */
 HYP_ReturnStatus DVSHYP_SwitchAssociate(const char *switchName);
 HYP_ReturnStatus DVSHYP_SwitchDissociate(const char *switchName);
 
-/* 21, 22: sets the port limit and the version number. */
+/* Set the port limit and the version number. */
 HYP_ReturnStatus DVSHYP_SwitchSetMaxPorts(const char *switchName, uint32_t maxPorts);
 HYP_ReturnStatus DVSHYP_SwitchSetVersion(const char *switchName, uint32_t version);
 
 /* ---- Switch properties ---- */
 
-/* 8, 9, 10: fetches, sets and clears a global property. `propType` is the property type word (see
- * dvs/data.h). */
+/* Fetch, set and clear a global property. `propType` is the property type word (see dvs/data.h). */
 HYP_ReturnStatus DVSHYP_GlobalPropGet(const char *switchName, const char *propName, void **out,
                                       uint32_t *outLen);
 HYP_ReturnStatus DVSHYP_GlobalPropSet(const char *switchName, const char *propName, const void *value,
                                       uint32_t len, uint32_t propType);
 HYP_ReturnStatus DVSHYP_GlobalPropClear(const char *switchName, const char *propName);
 
-/* 11, 12, 13: the same for a host property. */
+/* The same for a host property. */
 HYP_ReturnStatus DVSHYP_HostPropGet(const char *switchName, const char *propName, void **out,
                                     uint32_t *outLen);
 HYP_ReturnStatus DVSHYP_HostPropSet(const char *switchName, const char *propName, const void *value,
                                     uint32_t len, uint32_t propType);
 HYP_ReturnStatus DVSHYP_HostPropClear(const char *switchName, const char *propName);
 
-/* The clears' common worker: `command` is 10 or 13. */
+/* Clears a property; the worker of both clears. `command` is 10 (global property clear) or 13 (host property clear). */
 HYP_ReturnStatus DVSHYPSwitchPropClear(const char *switchName, const char *propName, uint32_t command);
 
-/* 29, 30: as the fetches above, asked of the SmartNIC. */
+/* The fetches above, from the SmartNIC. */
 HYP_ReturnStatus DVSHYP_SmartNICGlobalPropGet(const char *switchName, const char *propName, void **out,
                                               uint32_t *outLen);
 HYP_ReturnStatus DVSHYP_SmartNICHostPropGet(const char *switchName, const char *propName, void **out,
@@ -168,40 +170,41 @@ HYP_ReturnStatus DVSHYP_SmartNICHostPropGet(const char *switchName, const char *
 
 /* ---- Ports ---- */
 
-/* 14: adds a port; `portData` is its serialized property list of `len` bytes. 15: removes it. */
+/* Add and remove a port. `portData` is its serialized property list of `len` bytes. */
 HYP_ReturnStatus DVSHYP_PortAdd(const char *switchName, const char *portId, const void *portData,
                                 uint32_t len);
 HYP_ReturnStatus DVSHYP_PortRemove(const char *switchName, const char *portId);
 
-/* 20: HYP_OK when the module has the port. 19: fetches its serialized property list. */
+/* HYP_OK when the module has the port. */
 HYP_ReturnStatus DVSHYP_PortFind(const char *switchName, const char *portId);
+
+/* Fetches the port's serialized property list. */
 HYP_ReturnStatus DVSHYP_PortStateGet(const char *switchName, const char *portId, void **out,
                                      uint32_t *outLen);
 
-/* 16, 17, 18: fetches, sets and clears one entry of the port's data. */
+/* Fetch, set and clear one entry of the port's data. */
 HYP_ReturnStatus DVSHYP_PortDataGet(const char *switchName, const char *portId, const char *propName,
                                     void **out, uint32_t *outLen);
 HYP_ReturnStatus DVSHYP_PortDataSet(const char *switchName, const char *portId, const char *propName,
                                     const void *value, uint32_t len, uint32_t propType);
 HYP_ReturnStatus DVSHYP_PortDataClear(const char *switchName, const char *portId, const char *propName);
 
-/* 26, 27: sets and fetches the data that a port keeps for one uplink, by the uplink's number. */
+/* Set and fetch the data that a port keeps for one uplink, by the uplink's number. */
 HYP_ReturnStatus DVSHYP_UplinkDataSet(const char *switchName, const char *portId, int uplink,
                                       const void *value, uint32_t len, uint32_t propType);
 HYP_ReturnStatus DVSHYP_UplinkDataGet(const char *switchName, const char *portId, int uplink, void **out,
                                       uint32_t *outLen);
 
-/* 31: as DVSHYP_PortDataGet, asked of the SmartNIC. */
+/* DVSHYP_PortDataGet, from the SmartNIC. */
 HYP_ReturnStatus DVSHYP_SmartNICPortDataGet(const char *switchName, const char *portId, const char *propName,
                                             void **out, uint32_t *outLen);
 
 /*
  * Finds the port of a switch by its external id ("com.orbeno.port.extraConfig.vnic.external.id", else
- * "com.orbeno.port.extraConfig.hypnic.external.id"), the first in slot order whose stored id is a leading
- * part of the one asked for; an empty stored id matches everything. *out receives a new result, released with
- * DVSHYP_DataFree, also when no port matched (its port id is empty then). HYP_BAD_PARAM: externalId has more
- * than 127 characters; the device is not touched. HYP_NOT_FOUND: no such switch. Uses the switch table as
- * scratch.
+ * "com.orbeno.port.extraConfig.hypnic.external.id"), the first in slot order whose stored id is a prefix of
+ * `externalId`; an empty stored id matches everything. *out receives a new result, released with DVSHYP_DataFree; if no
+ * port matches, its port id is empty. HYP_BAD_PARAM: externalId has more than 127 characters; the device is not opened.
+ * HYP_NOT_FOUND: no such switch. Loads the module's state into the switch table.
  */
 HYP_ReturnStatus DVSHYP_PortGetByExternalId(const char *switchName, const char *externalId,
                                             DVSHYPExternalIdResult **out);
@@ -209,28 +212,28 @@ HYP_ReturnStatus DVSHYP_PortGetByExternalId(const char *switchName, const char *
 /* ---- Persistent state ---- */
 
 /*
- * Fetches the module's state and serializes what of it is worth keeping: without switches marked
+ * Fetches the module's state and serializes the part of it that persists: without switches marked
  * "com.orbeno.common.volatile.nopersist", without entries whose name contains ".volatile.", without ports
  * other than active ones, without ports marked "com.orbeno.common.port.volatile.persist", and, of a switch
  * whose host property "com.orbeno.common.portset.opaque" begins with "true", without ports whose id is a
  * number above 999.
  *
- * out, outLen  as the lists' serialization has them: *out is null and receives a new buffer, or a buffer of
- *              *outLen bytes that is filled. Left as they were on failure.
- * stateFile    may be null. Otherwise switches marked "nopersist" are replaced by their versions in this
- *              state file.
+ * out, outLen  as in DVSData_Serialize: *out is null and receives a new buffer, or a buffer of *outLen bytes
+ *              that is filled. Unchanged on failure.
+ * stateFile    may be null. If it is given, switches marked "nopersist" are replaced by their versions in
+ *              this state file.
  *
  * Statuses of the fetch, of loading a state (HYP_BAD_PARAM, HYP_BAD_CHECKSUM, …), of DVSFile_Read and of the
  * serialization (HYP_EXISTS; HYP_LIMIT_EXCEEDED for a buffer too small). A state file whose contents cannot
  * be loaded is reported on standard error, "DVSState_ConfigDeserialize failed: %s\n", and its buffer stays
- * allocated. Uses the switch table as scratch.
+ * allocated. Loads the module's state into the switch table.
  */
 HYP_ReturnStatus DVSHYP_PersistentStateGet(void **out, uint32_t *outLen);
 HYP_ReturnStatus DVSHYP_PersistentStateGetWithFile(void **out, uint32_t *outLen, const char *stateFile);
 
 /*
  * Fetches one port's property list without the entries whose name contains ".volatile.", serialized for the
- * switch version `dvsVersion`. Outputs as above. Takes no lock and does not use the switch table.
+ * switch version `dvsVersion`. Outputs as above. Takes no lock and does not touch the switch table.
  */
 HYP_ReturnStatus DVSHYP_PersistentPortStateGet(const char *switchName, const char *portId,
                                                uint32_t dvsVersion, void **out, uint32_t *outLen);
@@ -238,9 +241,9 @@ HYP_ReturnStatus DVSHYP_PersistentPortStateGet(const char *switchName, const cha
 /* ---- Filters over property lists ---- */
 
 /*
- * Each walks `list` and removes entries, judging every entry by itself, namesakes included. An entry is of a
- * type when DVSData_IsSamePropType says so. They return the status that ended the walk: HYP_NOT_FOUND at the
- * end of the list. The list belongs to the caller, no lock is taken.
+ * Each walks `list` and removes entries, deciding for every entry separately, even for entries of the same name.
+ * DVSData_IsSamePropType tells whether an entry is of a type. They return the status that ended the walk: HYP_NOT_FOUND
+ * at the end of the list. The caller owns the list; no lock is taken.
  */
 
 /* Removes every entry whose name contains `needle`. */
@@ -259,21 +262,21 @@ HYP_ReturnStatus DVSHYPExtractNamedPropForType(DVSData *list, const char *needle
 /* ---- Queries ---- */
 
 /*
- * Each fetches state, narrows one list of it to entries of `propType` and hands that list over
- * (DVSData_Free). A switch without the list gives an empty one. HYP_NOT_FOUND: no such switch. The
- * switch-level queries use the switch table as scratch, the port-level ones take no lock.
+ * Each fetches state, reduces one list of it to entries of `propType` and hands that list over (DVSData_Free). If the
+ * switch has no such list, an empty one is returned. HYP_NOT_FOUND: no such switch. The switch-level queries load the
+ * module's state into the switch table; the port-level ones take no lock.
  */
 
 /*
  * A switch's properties that are not the platform's own. The module is asked for "com.orbeno.common.version":
- * above 106 the list also loses "com.orbeno.vswitch.teaming" and "com.orbeno.ovl.vdr.dvptracking". A failed
+ * above 106 the list also lacks "com.orbeno.vswitch.teaming" and "com.orbeno.ovl.vdr.dvptracking". A failed
  * version query is ignored. `host` selects the host list.
  */
 HYP_ReturnStatus DVSHYPVendorPropList(const char *switchName, DVSData **out, uint32_t propType, bool host);
 HYP_ReturnStatus DVSHYP_VendorGlobalPropList(const char *switchName, DVSData **out, uint32_t propType);
 HYP_ReturnStatus DVSHYP_VendorHostPropList(const char *switchName, DVSData **out, uint32_t propType);
 
-/* The same of one port. */
+/* The same for one port. */
 HYP_ReturnStatus DVSHYP_VendorPortPropList(const char *switchName, const char *portId, DVSData **out,
                                            uint32_t propType);
 
@@ -283,8 +286,8 @@ HYP_ReturnStatus DVSHYP_ExtraConfigPortPropList(const char *switchName, const ch
                                                 uint32_t propType);
 
 /*
- * The overlay network's properties of a switch. `global` selects the global list: the opposite sense of
- * DVSHYPVendorPropList's flag. Asked for type 16, entries named "com.orbeno.net.portset.fc.…" of any type are
+ * The overlay network's properties of a switch. `global` selects the global list: the opposite of
+ * DVSHYPVendorPropList's flag. For type 16, entries named "com.orbeno.net.portset.fc.…" of any type are
  * kept.
  */
 HYP_ReturnStatus DVSHYP_OvlPropList(const char *switchName, uint32_t propType, bool global, DVSData **out);
@@ -294,7 +297,8 @@ bool IsOvlProp(const char *name);
 
 /*
  * The switch's ports of one kind (a DVSPortType), in slot order, with their connection ids. *out receives a
- * new list, released with DVSHYP_DataFree. HYP_NOT_FOUND: no such switch. Uses the switch table as scratch.
+ * new list, released with DVSHYP_DataFree. HYP_NOT_FOUND: no such switch. Loads the module's state
+ * into the switch table.
  */
 HYP_ReturnStatus DVSHYP_SwitchPortList(const char *switchName, DVSHYPPortList **out, uint32_t portType);
 

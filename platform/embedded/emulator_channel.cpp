@@ -12,12 +12,13 @@
 #include <pthread.h>
 #include <unistd.h>
 
+#include "platform/device_commands.h"
 #include "platform/embedded/emulator_client.h"
 
 namespace {
 
 using dvs::embedded::Channel;
-using dvs::wire::Transfer;
+using dvs::device::Transfer;
 
 /// A receiving command whose buffer is refused more often than this in a row is answered by a peer that leads
 /// its client round in circles.
@@ -120,7 +121,7 @@ bool Channel::Reconnect() {
 int Channel::Call(int request, DVSHYPRequest *record) {
     const std::lock_guard guard(mutex_);
     if (!IsStillOurs()) return Fail(EBADF);
-    if (wire::TransferOf(request) == Transfer::ValueIn && record->dataLen > wire::kMaxTransfer) {
+    if (device::TransferOf(request) == Transfer::ValueIn && record->dataLen > wire::kMaxTransfer) {
         record->status = HYP_LIMIT_EXCEEDED;
         return Fail(ENOSPC);
     }
@@ -140,7 +141,7 @@ int Channel::Call(int request, DVSHYPRequest *record) {
 }
 
 Channel::Outcome Channel::Exchange(int request, DVSHYPRequest *record, wire::ReplyHeader *reply) const {
-    const Transfer transfer = wire::TransferOf(request);
+    const Transfer transfer = device::TransferOf(request);
     const bool receives = transfer == Transfer::ValueOut || transfer == Transfer::Execute;
     wire::RequestHeader header{};
     header.magic = wire::kMagic;
@@ -169,7 +170,7 @@ Channel::Outcome Channel::Exchange(int request, DVSHYPRequest *record, wire::Rep
 
 /// Judges a reply by what the module may answer, and writes the record's outputs.
 int Channel::Finish(int request, const wire::ReplyHeader &reply, DVSHYPRequest *record) {
-    const Transfer transfer = wire::TransferOf(request);
+    const Transfer transfer = device::TransferOf(request);
     const bool receives = transfer == Transfer::ValueOut || transfer == Transfer::Execute;
     const uint32_t size = transfer == Transfer::Execute ? reply.cmdOutLen : reply.dataLen;
     const bool refused = reply.error != 0 && reply.status == HYP_LIMIT_EXCEEDED && receives;

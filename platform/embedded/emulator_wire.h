@@ -62,35 +62,6 @@ struct ReplyHeader {
 };
 static_assert(sizeof(ReplyHeader) == 32 && offsetof(ReplyHeader, payloadSize) == 24);
 
-/// Which buffers a command's record carries: known by its number, as in the module itself.
-enum class Transfer { None, ValueIn, ValueOut, Execute };
-
-constexpr Transfer TransferOf(int32_t request) {
-    switch (request) {
-    case 0:  // state init
-    case 9:  // global property set
-    case 12: // host property set
-    case 14: // port add
-    case 17: // port data set
-    case 26: // uplink data set
-        return Transfer::ValueIn;
-    case 3:  // state get
-    case 8:  // global property get
-    case 11: // host property get
-    case 16: // port data get
-    case 19: // port state get
-    case 27: // uplink data get
-    case 29: // the SmartNIC's gets
-    case 30:
-    case 31:
-        return Transfer::ValueOut;
-    case 28:
-        return Transfer::Execute;
-    default:
-        return Transfer::None;
-    }
-}
-
 } // namespace dvs::wire
 
 #endif

@@ -59,7 +59,7 @@ TEST(EmbeddedDeviceAlone, AFileThatIsThereIsTheDevice) {
     ASSERT_GE(fd, 0);
     EXPECT_NE(fcntl(fd, F_GETFD) & FD_CLOEXEC, 0);
     DVSHYPRequest request{};
-    EXPECT_EQ(HostDevice_Ioctl(fd, 20, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::PortFind), &request), -1);
     EXPECT_EQ(errno, ENOTTY);
     EXPECT_EQ(HostDevice_Close(fd), 0);
     EXPECT_EQ(HostDevice_Close(fd), -1);
@@ -81,13 +81,14 @@ TEST_F(EmbeddedDevice, TheLimitsAreAskedWithoutADevice) {
 TEST_F(EmbeddedDevice, ALengthWithoutABufferIsEfault) {
     ASSERT_EQ(DVSHYP_SwitchAdd("s", "vswitch", 0, 110), HYP_OK);
     const int fd = HostDevice_Open(kPath);
-    for (const int command : {0, 3, 9, 14, 27, 28}) {
+    for (const device::CommandRow &row : device::kCommands) {
+        if (row.transfer == device::Transfer::None) continue;
         DVSHYPRequest request{};
         request.status = HYP_FAILURE;
         request.dataLen = 10;
         request.cmdOutLen = 10;
-        EXPECT_EQ(HostDevice_Ioctl(fd, command, &request), -1);
-        EXPECT_EQ(errno, EFAULT) << command;
+        EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(row.command), &request), -1);
+        EXPECT_EQ(errno, EFAULT) << row.name;
         EXPECT_EQ(request.status, HYP_FAILURE);
     }
     HostDevice_Close(fd);
@@ -96,7 +97,7 @@ TEST_F(EmbeddedDevice, ALengthWithoutABufferIsEfault) {
 TEST_F(EmbeddedDevice, ASizeMayBeAskedForWithoutABuffer) {
     const int fd = HostDevice_Open(kPath);
     DVSHYPRequest request{};
-    EXPECT_EQ(HostDevice_Ioctl(fd, 3, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::StateGet), &request), -1);
     EXPECT_EQ(errno, ENOSPC);
     EXPECT_EQ(request.status, HYP_LIMIT_EXCEEDED);
     EXPECT_EQ(request.dataLen, 16U);
@@ -108,7 +109,7 @@ TEST_F(EmbeddedDevice, StatesOfMoreThan256MebibytesAreRefusedUnsent) {
     DVSHYPRequest request{};
     request.data = 4096; // never read
     request.dataLen = (256U << 20) + 1;
-    EXPECT_EQ(HostDevice_Ioctl(fd, 0, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::StateInit), &request), -1);
     EXPECT_EQ(errno, ENOSPC);
     EXPECT_EQ(request.status, HYP_LIMIT_EXCEEDED);
     HostDevice_Close(fd);
@@ -134,17 +135,17 @@ TEST_F(EmbeddedDevice, WhileTheEmulatorIsAwayCallsFailAndThenGoOn) {
 }
 
 TEST_F(EmbeddedDevice, AnAnswerThatIsLostIsEioAndNeverAskedForAgain) {
-    ASSERT_EQ(Exec("fault command=4,nth=1,drop=after").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,drop=after")).status, HYP_OK);
     const int fd = HostDevice_Open(kPath);
     DVSHYPRequest request{};
     request.status = HYP_FAILURE;
     std::strcpy(request.switchName, "s");
     std::strcpy(request.propName, "vswitch");
-    EXPECT_EQ(HostDevice_Ioctl(fd, 4, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::SwitchAdd), &request), -1);
     EXPECT_EQ(errno, EIO);
     EXPECT_EQ(request.status, HYP_FAILURE);
     EXPECT_EQ(CallsOf(4), 1U);
-    EXPECT_EQ(HostDevice_Ioctl(fd, 4, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::SwitchAdd), &request), -1);
     EXPECT_EQ(errno, EEXIST);
     HostDevice_Close(fd);
 }
@@ -175,7 +176,7 @@ TEST_F(EmbeddedDevice, AChildGetsAConnectionOfItsOwn) {
 }
 
 TEST_F(EmbeddedDevice, AChildOfABusyThreadIsNotHeldUp) {
-    ASSERT_EQ(Exec("fault command=20,nth=1,delay=400").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "nth=1,delay=400")).status, HYP_OK);
     ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     std::thread busy([] { EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND); });
     usleep(100 * 1000);
@@ -196,7 +197,7 @@ TEST_F(EmbeddedDevice, ADescriptorThatTheProgramReusedIsLeftAlone) {
     const int other = open((directory / "file").c_str(), O_RDWR | O_CREAT, 0600);
     ASSERT_EQ(dup2(other, fd), fd); // as an agent that becomes a daemon may end up
     DVSHYPRequest request{};
-    EXPECT_EQ(HostDevice_Ioctl(fd, 20, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::PortFind), &request), -1);
     EXPECT_EQ(errno, EBADF);
     EXPECT_EQ(lseek(other, 0, SEEK_END), 0);
     close(other);
@@ -222,7 +223,7 @@ TEST_F(EmbeddedDevice, AtLeast128ConnectionsAreServedAtOnce) {
     }
     for (const int fd : descriptors) {
         DVSHYPRequest request{};
-        EXPECT_EQ(HostDevice_Ioctl(fd, 2, &request), 0) << fd;
+        EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::StateSanitize), &request), 0) << fd;
     }
     for (const int fd : descriptors)
         HostDevice_Close(fd);
@@ -304,7 +305,7 @@ TEST(EmulatorRestarts, NoAddHappensTwiceAndNoLostAnswerIsASuccess) {
 }
 
 TEST_F(EmbeddedDevice, TerminationFinishesTheRequestsInHand) {
-    ASSERT_EQ(Exec("fault command=4,nth=1,delay=60s").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,delay=60s")).status, HYP_OK);
     ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     HYP_ReturnStatus status = HYP_FAILURE;
     std::thread asking([&] { status = DVSHYP_SwitchAdd("s", "vswitch", 0, 110); });

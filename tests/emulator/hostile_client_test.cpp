@@ -67,17 +67,18 @@ struct Parts {
     }
 };
 
-Parts ValidRequest(int command, const std::string &value = {}) {
+Parts ValidRequest(Command command, const std::string &value = {}) {
     Parts parts;
     parts.header.magic = wire::kMagic;
     parts.header.version = wire::kVersion;
     parts.header.kind = static_cast<uint16_t>(wire::Kind::Ioctl);
-    parts.header.request = command;
+    parts.header.request = NumberOf(command);
     parts.header.flags = wire::HasData | wire::HasCmdIn | wire::HasCmdOut;
     parts.header.dataSize = static_cast<uint32_t>(value.size());
     std::strcpy(parts.record.switchName, "s");
     std::strcpy(parts.record.portId, "p");
-    std::strcpy(parts.record.propName, command == 26 || command == 27 ? "1" : "name");
+    std::strcpy(parts.record.propName,
+                command == Command::UplinkDataSet || command == Command::UplinkDataGet ? "1" : "name");
     std::strcpy(parts.record.cmd, "ports s");
     parts.record.status = HYP_FAILURE;
     parts.record.dataLen = value.empty() ? 32768 : static_cast<uint32_t>(value.size());
@@ -105,7 +106,7 @@ TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
     for (unsigned i = 0; i < count; i++) {
         std::string value;
         if (below(2)) value = PortData({{"a", std::string(below(100), 'v')}}, below(6));
-        Parts parts = ValidRequest(static_cast<int>(below(34)), value);
+        Parts parts = ValidRequest(Command{static_cast<int>(below(34))}, value);
         if (below(3) == 0) parts.record.dataLen = static_cast<uint32_t>(random());
         if (below(3) == 0) parts.header.flags = static_cast<uint32_t>(random());
         std::string bytes = parts.Bytes();
@@ -135,7 +136,7 @@ TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
 TEST_F(HostileClients, FieldsWithoutNulAreBadParameters) {
     const struct { std::size_t offset, size; } fields[] = {{0, 64}, {64, 48}, {112, 128}, {272, 128}};
     for (const auto &field : fields) {
-        Parts parts = ValidRequest(20);
+        Parts parts = ValidRequest(Command::PortFind);
         std::memset(reinterpret_cast<char *>(&parts.record) + field.offset, 'x', field.size);
         const int fd = embedded::ConnectEmulator(emulator_.Socket().c_str());
         std::string bytes = parts.Bytes();
@@ -150,7 +151,8 @@ TEST_F(HostileClients, FieldsWithoutNulAreBadParameters) {
 }
 
 TEST_F(HostileClients, WhatIsNoRequestEndsTheConnection) {
-    Parts wrong[4] = {ValidRequest(20), ValidRequest(20), ValidRequest(20), ValidRequest(0)};
+    Parts wrong[4] = {ValidRequest(Command::PortFind), ValidRequest(Command::PortFind),
+                      ValidRequest(Command::PortFind), ValidRequest(Command::StateInit)};
     wrong[0].header.magic++;
     wrong[1].header.version++;
     wrong[2].header.kind = 7;
@@ -165,7 +167,7 @@ TEST_F(HostileClients, WhatIsNoRequestEndsTheConnection) {
 }
 
 TEST_F(HostileClients, AnnouncedSizesCostNothingUntilTheyArrive) {
-    Parts parts = ValidRequest(0);
+    Parts parts = ValidRequest(Command::StateInit);
     parts.header.dataSize = parts.record.dataLen = 256U << 20;
     std::vector<std::unique_ptr<RawClient>> clients;
     for (int i = 0; i < 100; i++) {
@@ -195,7 +197,7 @@ TEST_F(HostileClients, ALargeRequestIsNotCopiedWithEachPieceOfIt) {
 }
 
 TEST_F(HostileClients, ARequestCutOffIsNotCarriedOut) {
-    const std::string whole = ValidRequest(5).Bytes(); // switch remove
+    const std::string whole = ValidRequest(Command::SwitchRemove).Bytes();
     for (const std::size_t size : {std::size_t{1}, std::size_t{24}, whole.size() - 1}) {
         RawClient client(emulator_.Socket());
         client.Send(whole.substr(0, size));
@@ -209,7 +211,7 @@ TEST_F(HostileClients, ARequestCutOffIsNotCarriedOut) {
 
 TEST_F(HostileClients, ByteByByteIsStillARequest) {
     RawClient client(emulator_.Socket());
-    for (const char byte : ValidRequest(5).Bytes())
+    for (const char byte : ValidRequest(Command::SwitchRemove).Bytes())
         client.Send(std::string(1, byte));
     EXPECT_TRUE(client.Answered(5000));
     EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
@@ -219,8 +221,8 @@ TEST_F(HostileClients, RequestsSentAheadAreAnsweredInOrder) {
     RawClient client(emulator_.Socket());
     std::string bytes;
     for (int i = 0; i < 50; i++)
-        bytes += ValidRequest(20).Bytes();
-    client.Send(bytes + ValidRequest(5).Bytes());
+        bytes += ValidRequest(Command::PortFind).Bytes();
+    client.Send(bytes + ValidRequest(Command::SwitchRemove).Bytes());
     for (int i = 0; i < 100 && DVSHYP_PortFind("s", "p") == HYP_OK; i++)
         usleep(10000);
     EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
@@ -233,7 +235,7 @@ TEST_F(HostileClients, AClientThatTakesNoAnswersHoldsUpNobody) {
     std::vector<std::unique_ptr<RawClient>> clients;
     for (int i = 0; i < 20; i++) {
         clients.push_back(std::make_unique<RawClient>(emulator_.Socket()));
-        Parts parts = ValidRequest(8);
+        Parts parts = ValidRequest(Command::GlobalPropGet);
         parts.record.dataLen = 64 << 20;
         clients.back()->Send(parts.Bytes());
     }
@@ -251,7 +253,7 @@ TEST(ClientsTogether, WaitForNoMoreThanTheirBudget) {
     emulator::MemoryBudget budget(kBudget);
     {
         emulator::Connection connection(ends[0], getpid(), &budget);
-        Parts parts = ValidRequest(0);
+        Parts parts = ValidRequest(Command::StateInit);
         parts.header.dataSize = parts.record.dataLen = 64U << 20;
         std::string bytes = parts.Bytes() + std::string(32 << 10, 'v');
         std::size_t sent = 0;

@@ -12,8 +12,11 @@
 #include <vector>
 
 #include "dvs/dvs.h"
+#include "platform/device_commands.h"
 
 namespace dvs::test {
+
+using device::Command;
 
 struct Bytes {
     HYP_ReturnStatus status;
@@ -44,6 +47,11 @@ inline Bytes FetchUplink(const char *sw, const char *port, int uplink) {
 
 inline Bytes Exec(const std::string &command, const char *sw = "") {
     return Fetch(DVSHYP_CmdExec, sw, command.c_str(), nullptr, 0U);
+}
+
+/// A fault of the emulator that hits one command.
+inline std::string FaultOf(Command command, const std::string &fields) {
+    return "command=" + std::to_string(NumberOf(command)) + "," + fields;
 }
 
 inline void *HeapAlloc(uint64_t size) {

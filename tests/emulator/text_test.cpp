@@ -18,6 +18,11 @@
 namespace dvs::test {
 namespace {
 
+/// A line of `stats`.
+std::string CountOf(Command command, unsigned count) {
+    return "command " + std::to_string(NumberOf(command)) + ' ' + std::to_string(count) + '\n';
+}
+
 class TextCommands : public testing::Test {
 protected:
     TextCommands() { EXPECT_EQ(DVSHYP_SwitchAdd(kSwitch, "vswitch", 0, 110), HYP_OK); }
@@ -52,8 +57,11 @@ TEST_F(TextCommands, UnknownOnesAreNotSupported) {
 TEST_F(TextCommands, StatsCountWhatWasAsked) {
     (void)Fetch(DVSHYP_GlobalPropGet, kSwitch, "none");
     const std::string stats = Exec("stats").text;
-    for (const char *line : {"switches 1\n", "ports 0\n", "port-limit 65536\n", "refused 1\n",
-                             "command 4 1\n", "command 8 1\n", "command 28 1\n"})
+    const std::string fixed[] = {"switches 1\n", "ports 0\n", "port-limit 65536\n", "refused 1\n"};
+    for (const std::string &line : fixed)
+        EXPECT_NE(stats.find(line), std::string::npos) << line << stats;
+    for (const std::string &line :
+         {CountOf(Command::SwitchAdd, 1), CountOf(Command::GlobalPropGet, 1), CountOf(Command::CmdExec, 1)})
         EXPECT_NE(stats.find(line), std::string::npos) << line << stats;
 }
 
@@ -129,8 +137,8 @@ protected:
 };
 
 TEST_F(InjectedFaults, HitTheNthMatchingCommandOnce) {
-    ASSERT_EQ(Exec("fault command=20,nth=3,status=0x0bad0014").status, HYP_OK);
-    EXPECT_EQ(Exec("fault list").text, "command=20,nth=3,status=0x0bad0014 seen 0\n");
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "nth=3,status=0x0bad0014")).status, HYP_OK);
+    EXPECT_EQ(Exec("fault list").text, FaultOf(Command::PortFind, "nth=3,status=0x0bad0014 seen 0\n"));
     EXPECT_EQ(Find(), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYP_SwitchAssociate(kSwitch), HYP_OK);
     EXPECT_EQ(Find(), HYP_NOT_FOUND);
@@ -149,11 +157,11 @@ TEST_F(InjectedFaults, WithoutANumberHitUntilTheyAreCleared) {
 }
 
 TEST_F(InjectedFaults, SetTheErrnoAlone) {
-    ASSERT_EQ(Exec("fault command=20,errno=EBUSY").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "errno=EBUSY")).status, HYP_OK);
     const int fd = HostDevice_Open("/pelo/devices/char/hypdriver/dvsdev");
     DVSHYPRequest request{};
     request.status = HYP_FAILURE;
-    EXPECT_EQ(HostDevice_Ioctl(fd, 20, &request), -1);
+    EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::PortFind), &request), -1);
     EXPECT_EQ(errno, EBUSY);
     EXPECT_EQ(request.status, HYP_FAILURE);
     HostDevice_Close(fd);
@@ -161,7 +169,7 @@ TEST_F(InjectedFaults, SetTheErrnoAlone) {
 
 TEST_F(InjectedFaults, DelayOneClientAndNoOther) {
     using namespace std::chrono;
-    ASSERT_EQ(Exec("fault command=20,nth=1,delay=300").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "nth=1,delay=300")).status, HYP_OK);
     ASSERT_EQ(DVSHYP_StateSanitize(), HYP_OK); // the plain calls' connection is made
     const auto start = steady_clock::now();
     const pid_t child = fork();
@@ -176,21 +184,21 @@ TEST_F(InjectedFaults, DelayOneClientAndNoOther) {
 }
 
 TEST_F(InjectedFaults, DroppedRequestsAreNotCarriedOut) {
-    ASSERT_EQ(Exec("fault command=4,nth=1,drop").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,drop")).status, HYP_OK);
     EXPECT_EQ(DVSHYP_SwitchAdd("new", "vswitch", 0, 110), HYP_FAILURE);
     EXPECT_EQ(DVSHYP_SwitchAssociate("new"), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYP_SwitchAdd("new", "vswitch", 0, 110), HYP_OK);
 }
 
 TEST_F(InjectedFaults, DroppedAnswersAreNoSuccessAndNotSentAgain) {
-    ASSERT_EQ(Exec("fault command=4,nth=1,drop=after").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,drop=after")).status, HYP_OK);
     EXPECT_EQ(DVSHYP_SwitchAdd("new", "vswitch", 0, 110), HYP_FAILURE);
     EXPECT_EQ(DVSHYP_SwitchAssociate("new"), HYP_OK);
-    EXPECT_NE(Exec("stats").text.find("command 4 2\n"), std::string::npos);
+    EXPECT_NE(Exec("stats").text.find(CountOf(Command::SwitchAdd, 2)), std::string::npos);
 }
 
 TEST_F(InjectedFaults, HitTheExecutionOfTextCommandsButTheirOwn) {
-    ASSERT_EQ(Exec("fault command=28,errno=EIO,status=0x0bad0001").status, HYP_OK);
+    ASSERT_EQ(Exec("fault " + FaultOf(Command::CmdExec, "errno=EIO,status=0x0bad0001")).status, HYP_OK);
     EXPECT_EQ(Exec("help").status, HYP_FAILURE);
     EXPECT_EQ(Exec("fault clear").status, HYP_OK);
     EXPECT_EQ(Exec("help").status, HYP_OK);

@@ -18,7 +18,7 @@ const char kValue[] = "value";
 
 struct CommandRow {
     const char *name;
-    int number;
+    int number; // as the module knows it: written out, so that a renumbered command shows
     std::function<HYP_ReturnStatus()> call;
     std::string record; // without the addresses and length of a receive buffer
     bool fetches;
@@ -108,7 +108,7 @@ TEST_F(Commands, EachSendsItsNumberAndEveryByteOfItsRecord) {
     for (const CommandRow &row : Rows()) {
         device.Reset();
         device.replies.clear();
-        if (row.fetches) device.replies[row.number] = "reply";
+        if (row.fetches) device.replies[Command{row.number}] = "reply";
         EXPECT_EQ(row.call(), HYP_OK) << row.name;
         ASSERT_EQ(device.calls.size(), 1U) << row.name;
         const DeviceCall &call = device.calls[0];
@@ -130,7 +130,7 @@ TEST_F(Commands, SwitchAddSendsTheFirst127CharactersOfALongClassName) {
 }
 
 TEST_F(Commands, UplinkDataGetSendsANegativeNumberAsText) {
-    device.replies[27] = "reply";
+    device.replies[Command::UplinkDataGet] = "reply";
     EXPECT_EQ(FetchUplink("s", "p", -1).text, "reply");
     EXPECT_STREQ(device.calls.at(0).record.data() + 112, "-1");
 }
@@ -145,7 +145,7 @@ protected:
         state.Switch("s1");
         for (const auto &[id, pairs] : ports)
             state.Port("s1", id, pairs);
-        device.replies[3] = state.Serialize();
+        device.replies[Command::StateGet] = state.Serialize();
     }
 
     /// The matching port's id, or the status as text.
@@ -210,9 +210,9 @@ TEST_F(ExternalId, AnUnknownSwitchIsNotFound) {
 }
 
 TEST_F(ExternalId, FailuresOfFetchAndLoadPassThrough) {
-    device.always[3] = {EPERM, 0x0bad0042, -1, {}};
+    device.always[Command::StateGet] = {EPERM, 0x0bad0042, -1, {}};
     EXPECT_EQ(Find("abc"), "status " + std::to_string(0x0bad0042));
-    device.replies[3] = "no state at all, but more than sixteen bytes";
+    device.replies[Command::StateGet] = "no state at all, but more than sixteen bytes";
     EXPECT_EQ(Find("abc"), "status " + std::to_string(HYP_BAD_PARAM));
 }
 

@@ -85,8 +85,8 @@ TEST_F(DeviceChannel, ConcurrentFirstCallsKeepOneDescriptor) {
 }
 
 TEST_F(DeviceChannel, FetchesAndExecutionsOpenAndCloseTheirOwn) {
-    device.replies[3] = "state";
-    device.replies[28] = "reply";
+    device.replies[Command::StateGet] = "state";
+    device.replies[Command::CmdExec] = "reply";
     EXPECT_EQ(Fetch(DVSHYP_StateGet).text, "state");
     EXPECT_EQ(Exec("help").text, "reply");
     EXPECT_EQ(device.opened, 2U);
@@ -124,7 +124,7 @@ TEST_F(DeviceChannel, ReceivingCallsPrintNothingWhenTheyFail) {
 }
 
 TEST_F(DeviceChannel, AFetchOf100000BytesTakesTwoCalls) {
-    device.replies[3] = std::string(100000, 'v');
+    device.replies[Command::StateGet] = std::string(100000, 'v');
     void *out = nullptr;
     uint32_t outLen = 0;
     EXPECT_EQ(DVSHYP_StateGet(&out, &outLen), HYP_OK);
@@ -186,7 +186,7 @@ TEST_F(DeviceChannel, AFailedReceiveNeverPassesForASuccess) {
 
 TEST_F(DeviceChannel, CmdExecFillsItsOwnFields) {
     const char in[] = "input";
-    device.replies[28] = "out";
+    device.replies[Command::CmdExec] = "out";
     EXPECT_EQ(Fetch(DVSHYP_CmdExec, "s", std::string(200, 'c').c_str(), in, uint32_t{5}).text, "out");
     RecordBytes expected;
     expected.Text(0, "s").Text(272, std::string(127, 'c')).Word(400, 5).Address(404, in).Word(412, 32768);

@@ -10,7 +10,6 @@
 
 #include "dvs/log.h"
 #include "platform/device.h"
-#include "platform/embedded/emulator_wire.h"
 
 namespace dvs::test {
 
@@ -19,7 +18,7 @@ namespace {
 std::recursive_mutex g_mutex;
 
 bool Executes(int request) {
-    return wire::TransferOf(request) == wire::Transfer::Execute;
+    return device::TransferOf(request) == device::Transfer::Execute;
 }
 
 void Sink(int level, const char *text, void *arg) {
@@ -67,7 +66,7 @@ int FakeDevice::Close(int fd) {
 int FakeDevice::Ioctl(int fd, int request, DVSHYPRequest *record) {
     const std::lock_guard guard(g_mutex);
     DeviceCall call{fd, request, std::string(reinterpret_cast<const char *>(record), sizeof *record), {}};
-    if (wire::TransferOf(request) == wire::Transfer::ValueIn && record->data)
+    if (device::TransferOf(request) == device::Transfer::ValueIn && record->data)
         call.value.assign(reinterpret_cast<const char *>(record->data), record->dataLen);
     calls.push_back(std::move(call));
     if (!script.empty()) {
@@ -75,13 +74,13 @@ int FakeDevice::Ioctl(int fd, int request, DVSHYPRequest *record) {
         script.pop_front();
         return Answer(request, record, step);
     }
-    if (const auto reply = replies.find(request); reply != replies.end()) {
+    if (const auto reply = replies.find(Command{request}); reply != replies.end()) {
         const auto size = static_cast<int64_t>(reply->second.size());
         const uint32_t capacity = Executes(request) ? record->cmdOutLen : record->dataLen;
         if (size > capacity) return Answer(request, record, {ENOSPC, HYP_LIMIT_EXCEEDED, size, {}});
         return Answer(request, record, {0, -1, size, reply->second});
     }
-    if (const auto step = always.find(request); step != always.end())
+    if (const auto step = always.find(Command{request}); step != always.end())
         return Answer(request, record, step->second);
     return 0;
 }

@@ -15,8 +15,11 @@
 #include <vector>
 
 #include "dvs/hyp.h"
+#include "platform/device_commands.h"
 
 namespace dvs::test {
+
+using device::Command;
 
 /// One ioctl as the module saw it going in.
 struct DeviceCall {
@@ -41,11 +44,11 @@ public:
     void Reset();
 
     bool present = true;
-    int openError = ENOENT; // while not present
+    int openError = ENOENT;  // while not present
     std::deque<Step> script; // consumed first
-    std::map<int, std::string>
-        replies;                // then: what a fetch of this command yields, with a module's growing sizes
-    std::map<int, Step> always; // then: what this command is answered every time
+    std::map<Command, std::string>
+        replies;                    // then: the value this command returns, with a module's growing sizes
+    std::map<Command, Step> always; // then: the answer to each of this command
 
     std::vector<DeviceCall> calls;
     std::set<int> open;

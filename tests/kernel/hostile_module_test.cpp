@@ -20,7 +20,7 @@ namespace {
 
 struct Receiver {
     const char *name;
-    int command; // what the module is asked first
+    Command command; // what the module is asked first
     std::function<HYP_ReturnStatus(void **)> call;
     bool givesList;
 };
@@ -30,39 +30,47 @@ uint32_t g_size = 0;
 std::vector<Receiver> Receivers() {
     const auto list = [](void **out) { return reinterpret_cast<DVSData **>(out); };
     return {
-        {"StateGet", 3, [](void **out) { return DVSHYP_StateGet(out, &g_size); }, false},
-        {"GlobalPropGet", 8, [](void **out) { return DVSHYP_GlobalPropGet("s", "k", out, &g_size); }, false},
-        {"HostPropGet", 11, [](void **out) { return DVSHYP_HostPropGet("s", "k", out, &g_size); }, false},
-        {"PortDataGet", 16, [](void **out) { return DVSHYP_PortDataGet("s", "p", "k", out, &g_size); },
-         false},
-        {"PortStateGet", 19, [](void **out) { return DVSHYP_PortStateGet("s", "p", out, &g_size); }, false},
-        {"UplinkDataGet", 27, [](void **out) { return DVSHYP_UplinkDataGet("s", "p", 1, out, &g_size); },
-         false},
-        {"CmdExec", 28, [](void **out) { return DVSHYP_CmdExec("s", "c", nullptr, 0, out, &g_size); }, false},
-        {"SmartNICGlobal", 29,
+        {"StateGet", Command::StateGet, [](void **out) { return DVSHYP_StateGet(out, &g_size); }, false},
+        {"GlobalPropGet", Command::GlobalPropGet,
+         [](void **out) { return DVSHYP_GlobalPropGet("s", "k", out, &g_size); }, false},
+        {"HostPropGet", Command::HostPropGet,
+         [](void **out) { return DVSHYP_HostPropGet("s", "k", out, &g_size); }, false},
+        {"PortDataGet", Command::PortDataGet,
+         [](void **out) { return DVSHYP_PortDataGet("s", "p", "k", out, &g_size); }, false},
+        {"PortStateGet", Command::PortStateGet,
+         [](void **out) { return DVSHYP_PortStateGet("s", "p", out, &g_size); }, false},
+        {"UplinkDataGet", Command::UplinkDataGet,
+         [](void **out) { return DVSHYP_UplinkDataGet("s", "p", 1, out, &g_size); }, false},
+        {"CmdExec", Command::CmdExec,
+         [](void **out) { return DVSHYP_CmdExec("s", "c", nullptr, 0, out, &g_size); }, false},
+        {"SmartNICGlobal", Command::SmartNICGlobalPropGet,
          [](void **out) { return DVSHYP_SmartNICGlobalPropGet("s", "k", out, &g_size); }, false},
-        {"SmartNICHost", 30, [](void **out) { return DVSHYP_SmartNICHostPropGet("s", "k", out, &g_size); },
-         false},
-        {"SmartNICPort", 31,
+        {"SmartNICHost", Command::SmartNICHostPropGet,
+         [](void **out) { return DVSHYP_SmartNICHostPropGet("s", "k", out, &g_size); }, false},
+        {"SmartNICPort", Command::SmartNICPortDataGet,
          [](void **out) { return DVSHYP_SmartNICPortDataGet("s", "p", "k", out, &g_size); }, false},
-        {"ExternalId", 3,
+        {"ExternalId", Command::StateGet,
          [](void **out) {
              return DVSHYP_PortGetByExternalId("s", "i", reinterpret_cast<DVSHYPExternalIdResult **>(out));
          },
          false},
-        {"PersistentState", 3, [](void **out) { return DVSHYP_PersistentStateGet(out, &g_size); }, false},
-        {"PersistentPort", 19,
+        {"PersistentState", Command::StateGet,
+         [](void **out) { return DVSHYP_PersistentStateGet(out, &g_size); }, false},
+        {"PersistentPort", Command::PortStateGet,
          [](void **out) { return DVSHYP_PersistentPortStateGet("s", "p", 9, out, &g_size); }, false},
-        {"VendorGlobal", 3, [=](void **out) { return DVSHYP_VendorGlobalPropList("s", list(out), 16); },
-         true},
-        {"VendorHost", 3, [=](void **out) { return DVSHYP_VendorHostPropList("s", list(out), 16); }, true},
-        {"VendorPort", 19, [=](void **out) { return DVSHYP_VendorPortPropList("s", "p", list(out), 16); },
-         true},
-        {"ExtraConfig", 3, [=](void **out) { return DVSHYP_ExtraConfigPropList("s", list(out), 16); }, true},
-        {"ExtraConfigPort", 19,
+        {"VendorGlobal", Command::StateGet,
+         [=](void **out) { return DVSHYP_VendorGlobalPropList("s", list(out), 16); }, true},
+        {"VendorHost", Command::StateGet,
+         [=](void **out) { return DVSHYP_VendorHostPropList("s", list(out), 16); }, true},
+        {"VendorPort", Command::PortStateGet,
+         [=](void **out) { return DVSHYP_VendorPortPropList("s", "p", list(out), 16); }, true},
+        {"ExtraConfig", Command::StateGet,
+         [=](void **out) { return DVSHYP_ExtraConfigPropList("s", list(out), 16); }, true},
+        {"ExtraConfigPort", Command::PortStateGet,
          [=](void **out) { return DVSHYP_ExtraConfigPortPropList("s", "p", list(out), 16); }, true},
-        {"Overlay", 3, [=](void **out) { return DVSHYP_OvlPropList("s", 16, true, list(out)); }, true},
-        {"PortList", 3,
+        {"Overlay", Command::StateGet,
+         [=](void **out) { return DVSHYP_OvlPropList("s", 16, true, list(out)); }, true},
+        {"PortList", Command::StateGet,
          [](void **out) { return DVSHYP_SwitchPortList("s", reinterpret_cast<DVSHYPPortList **>(out), 1); },
          false},
     };
@@ -71,7 +79,7 @@ std::vector<Receiver> Receivers() {
 /// A call that hands nothing out: the module has a status to give, and all that it writes is refused.
 struct Sender {
     const char *name;
-    int command;
+    Command command;
     std::function<HYP_ReturnStatus()> call;
 };
 
@@ -82,25 +90,28 @@ std::vector<Sender> Senders() {
     const auto *value = g_value;
     const uint32_t size = sizeof g_value;
     return {
-        {"StateInit", 0, [=] { return DVSHYP_StateInit(value, size); }},
-        {"StateCleanup", 1, [] { return DVSHYP_StateCleanup(); }},
-        {"StateSanitize", 2, [] { return DVSHYP_StateSanitize(); }},
-        {"SwitchAdd", 4, [] { return DVSHYP_SwitchAdd("s", "c", 8, 9); }},
-        {"SwitchRemove", 5, [] { return DVSHYP_SwitchRemove("s"); }},
-        {"SwitchAssociate", 6, [] { return DVSHYP_SwitchAssociate("s"); }},
-        {"SwitchDissociate", 7, [] { return DVSHYP_SwitchDissociate("s"); }},
-        {"GlobalPropSet", 9, [=] { return DVSHYP_GlobalPropSet("s", "k", value, size, 16); }},
-        {"GlobalPropClear", 10, [] { return DVSHYP_GlobalPropClear("s", "k"); }},
-        {"HostPropSet", 12, [=] { return DVSHYP_HostPropSet("s", "k", value, size, 16); }},
-        {"HostPropClear", 13, [] { return DVSHYP_HostPropClear("s", "k"); }},
-        {"PortAdd", 14, [=] { return DVSHYP_PortAdd("s", "p", value, size); }},
-        {"PortRemove", 15, [] { return DVSHYP_PortRemove("s", "p"); }},
-        {"PortDataSet", 17, [=] { return DVSHYP_PortDataSet("s", "p", "k", value, size, 16); }},
-        {"PortDataClear", 18, [] { return DVSHYP_PortDataClear("s", "p", "k"); }},
-        {"PortFind", 20, [] { return DVSHYP_PortFind("s", "p"); }},
-        {"SwitchSetMaxPorts", 21, [] { return DVSHYP_SwitchSetMaxPorts("s", 8); }},
-        {"SwitchSetVersion", 22, [] { return DVSHYP_SwitchSetVersion("s", 9); }},
-        {"UplinkDataSet", 26, [=] { return DVSHYP_UplinkDataSet("s", "p", 1, value, size, 16); }},
+        {"StateInit", Command::StateInit, [=] { return DVSHYP_StateInit(value, size); }},
+        {"StateCleanup", Command::StateCleanup, [] { return DVSHYP_StateCleanup(); }},
+        {"StateSanitize", Command::StateSanitize, [] { return DVSHYP_StateSanitize(); }},
+        {"SwitchAdd", Command::SwitchAdd, [] { return DVSHYP_SwitchAdd("s", "c", 8, 9); }},
+        {"SwitchRemove", Command::SwitchRemove, [] { return DVSHYP_SwitchRemove("s"); }},
+        {"SwitchAssociate", Command::SwitchAssociate, [] { return DVSHYP_SwitchAssociate("s"); }},
+        {"SwitchDissociate", Command::SwitchDissociate, [] { return DVSHYP_SwitchDissociate("s"); }},
+        {"GlobalPropSet", Command::GlobalPropSet,
+         [=] { return DVSHYP_GlobalPropSet("s", "k", value, size, 16); }},
+        {"GlobalPropClear", Command::GlobalPropClear, [] { return DVSHYP_GlobalPropClear("s", "k"); }},
+        {"HostPropSet", Command::HostPropSet, [=] { return DVSHYP_HostPropSet("s", "k", value, size, 16); }},
+        {"HostPropClear", Command::HostPropClear, [] { return DVSHYP_HostPropClear("s", "k"); }},
+        {"PortAdd", Command::PortAdd, [=] { return DVSHYP_PortAdd("s", "p", value, size); }},
+        {"PortRemove", Command::PortRemove, [] { return DVSHYP_PortRemove("s", "p"); }},
+        {"PortDataSet", Command::PortDataSet,
+         [=] { return DVSHYP_PortDataSet("s", "p", "k", value, size, 16); }},
+        {"PortDataClear", Command::PortDataClear, [] { return DVSHYP_PortDataClear("s", "p", "k"); }},
+        {"PortFind", Command::PortFind, [] { return DVSHYP_PortFind("s", "p"); }},
+        {"SwitchSetMaxPorts", Command::SwitchSetMaxPorts, [] { return DVSHYP_SwitchSetMaxPorts("s", 8); }},
+        {"SwitchSetVersion", Command::SwitchSetVersion, [] { return DVSHYP_SwitchSetVersion("s", 9); }},
+        {"UplinkDataSet", Command::UplinkDataSet,
+         [=] { return DVSHYP_UplinkDataSet("s", "p", 1, value, size, 16); }},
     };
 }
 
@@ -179,7 +190,8 @@ protected:
         device.Reset();
         device.script = steps;
         // Whatever else is asked meanwhile, a version say, is answered with a lie as well.
-        for (const int command : {3, 8, 19, 28})
+        for (const Command command :
+             {Command::StateGet, Command::GlobalPropGet, Command::PortStateGet, Command::CmdExec})
             device.always[command] = {EIO, HYP_BAD_PARAM, 0, {}};
         void *out = nullptr;
         const HYP_ReturnStatus status = receiver.call(&out);
@@ -220,15 +232,15 @@ TEST_F(HostileModule, EverySenderSurvivesEveryKindOfAnswerAndGivesItsStatus) {
 }
 
 TEST_F(HostileModule, EveryCommandIsAmongTheReceiversOrTheSenders) {
-    std::set<int> expected, asked;
-    for (int command = 0; command <= 31; command++)
-        if (command < 23 || command > 25) expected.insert(command);
-    const auto note = [&](const char *name, int command, const auto &call) {
+    std::set<Command> expected, asked;
+    for (const device::CommandRow &row : device::kCommands)
+        expected.insert(row.command);
+    const auto note = [&](const char *name, Command command, const auto &call) {
         device.Reset();
         device.always[command] = {EIO, HYP_BAD_PARAM, 0, {}};
         call();
         ASSERT_FALSE(device.calls.empty()) << name;
-        EXPECT_EQ(device.calls.front().request, command) << name;
+        EXPECT_EQ(device.calls.front().request, NumberOf(command)) << name;
         asked.insert(command);
     };
     for (const Sender &sender : Senders())
@@ -255,7 +267,7 @@ TEST_F(HostileModule, MutatedStatesAndPortsAreTakenOrRefused) {
     const std::vector<Receiver> receivers = Receivers();
     for (unsigned i = 0; i < count; i++) {
         const Receiver &receiver = receivers[random() % receivers.size()];
-        std::string reply = sources[receiver.command == 19 ? 1 : 0];
+        std::string reply = sources[receiver.command == Command::PortStateGet ? 1 : 0];
         for (unsigned change = 1 + random() % 4; change > 0; change--)
             reply[random() % reply.size()] = static_cast<char>(random());
         if (random() % 4 == 0) reply.resize(random() % reply.size());

@@ -64,8 +64,8 @@ protected:
         StateBuilder state;
         state.Switch("s").Global("s", "com.vendor.a", "v").Port("s", "p", {{"a", "1"}}).Switch("t");
         state.Global("t", "com.orbeno.common.volatile.nopersist", "x");
-        device.replies[3] = state.Serialize();
-        device.replies[19] = PortData({{"com.vendor.a", "v"}});
+        device.replies[Command::StateGet] = state.Serialize();
+        device.replies[Command::PortStateGet] = PortData({{"com.vendor.a", "v"}});
     }
 
     Strings EventsOf(const std::function<HYP_ReturnStatus()> &call, HYP_ReturnStatus expected) {
@@ -142,15 +142,15 @@ TEST_F(LockSpan, OfARetrievalIsTheSameOnEveryPath) {
 }
 
 TEST_F(LockSpan, EndsAlsoWhereTheStateDoesNotLoad) {
-    device.replies[3] = std::string(64, '\x7f');
+    device.replies[Command::StateGet] = std::string(64, '\x7f');
     for (const Row &row : Rows())
         EXPECT_EQ(EventsOf([&] { return row.call("s"); }, HYP_BAD_PARAM), Span()) << row.name;
     EXPECT_EQ(EventsOf([&] { return Persist(nullptr); }, HYP_BAD_PARAM), Span());
 }
 
 TEST_F(LockSpan, DoesNotBeginWithoutAState) {
-    device.always[3] = {EPERM, 0x0bad0042, -1, {}};
-    device.replies.erase(3);
+    device.always[Command::StateGet] = {EPERM, 0x0bad0042, -1, {}};
+    device.replies.erase(Command::StateGet);
     for (const Row &row : Rows())
         EXPECT_EQ(EventsOf([&] { return row.call("s"); }, 0x0bad0042), Strings{}) << row.name;
     EXPECT_EQ(EventsOf([&] { return Persist(nullptr); }, 0x0bad0042), Strings{});

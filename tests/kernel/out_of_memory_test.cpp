@@ -16,12 +16,15 @@
 #include "kernel/failure.h"
 #include "kernel/state_support.h"
 #include "platform/device.h"
+#include "platform/device_commands.h"
 
 namespace dvs::test {
 namespace {
 
+using device::Command;
+
 /// What the module answers, by command; it allocates nothing while faults are armed.
-std::map<int, std::string> g_replies;
+std::map<Command, std::string> g_replies;
 
 struct Row {
     const char *name;
@@ -79,10 +82,10 @@ void Serve() {
     DVSwitch *bare = DVSState_SwitchFind("bare");
     DVSData_Free(bare->globalPropList);
     bare->globalPropList = nullptr;
-    g_replies[3] = state.Serialize();
-    g_replies[8] = std::string("\x6e\0\0\0", 4);
-    g_replies[19] = PortData({{"com.vendor.a", "v"}, {"b.volatile.c", "v"}});
-    g_replies[28] = "reply";
+    g_replies[Command::StateGet] = state.Serialize();
+    g_replies[Command::GlobalPropGet] = std::string("\x6e\0\0\0", 4);
+    g_replies[Command::PortStateGet] = PortData({{"com.vendor.a", "v"}, {"b.volatile.c", "v"}});
+    g_replies[Command::CmdExec] = "reply";
 }
 
 void CheckLocks(fault::Child &child) {
@@ -236,10 +239,10 @@ extern "C" int HostDevice_Close(int) {
 
 extern "C" int HostDevice_Ioctl(int, int request, void *record) {
     auto *req = static_cast<DVSHYPRequest *>(record);
-    const auto found = dvs::test::g_replies.find(request);
+    const auto found = dvs::test::g_replies.find(dvs::device::Command{request});
     if (found == dvs::test::g_replies.end()) return 0;
     const auto size = static_cast<uint32_t>(found->second.size());
-    const bool executes = request == 28;
+    const bool executes = dvs::device::TransferOf(request) == dvs::device::Transfer::Execute;
     const uint32_t capacity = executes ? req->cmdOutLen : req->dataLen;
     if (executes)
         req->cmdOutLen = size;

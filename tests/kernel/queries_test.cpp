@@ -55,7 +55,7 @@ protected:
         state.Switch("s");
         for (const char *name : kVendorNames)
             state.Global("s", name, "v", type).Host("s", name, "v", type);
-        device.replies[3] = state.Serialize();
+        device.replies[Command::StateGet] = state.Serialize();
     }
 
     static constexpr const char *kVendorNames[] = {
@@ -70,7 +70,7 @@ protected:
 
 TEST_F(Queries, VendorListsOfASwitchKeepWhatIsNotThePlatforms) {
     ServeVendorNames();
-    device.always[8] = {ENOENT, HYP_NOT_FOUND, -1, {}};
+    device.always[Command::GlobalPropGet] = {ENOENT, HYP_NOT_FOUND, -1, {}};
     EXPECT_EQ(VendorGlobal(), (Strings{"com.orbeno.common", "com.orbeno.vswitch.disabled",
                                        "com.orbeno.ovl.vdr.dvptracking", "com.vendor.own"}));
     EXPECT_EQ(VendorHost(),
@@ -80,10 +80,10 @@ TEST_F(Queries, VendorListsOfASwitchKeepWhatIsNotThePlatforms) {
 
 TEST_F(Queries, VendorListsAskTheModuleForTheVersion) {
     ServeVendorNames();
-    device.replies[8] = Word(110);
+    device.replies[Command::GlobalPropGet] = Word(110);
     (void)VendorGlobal();
     ASSERT_EQ(device.calls.size(), 2U);
-    EXPECT_EQ(device.calls[1].request, 8);
+    EXPECT_EQ(device.calls[1].request, NumberOf(Command::GlobalPropGet));
     EXPECT_STREQ(device.calls[1].record.data(), "s");
     EXPECT_STREQ(device.calls[1].record.data() + 112, "com.orbeno.common.version");
 }
@@ -96,14 +96,14 @@ TEST_F(Queries, NamesThatGoAboveVersion106StayAt106) {
     for (const char *name :
          {"com.orbeno.vswitch.teaming", "x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"})
         state.Global("s", name, "v", 32).Host("s", name, "v", 32);
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     for (const uint32_t version : {0u, 106u}) {
-        device.replies[8] = Word(version);
+        device.replies[Command::GlobalPropGet] = Word(version);
         EXPECT_EQ(VendorGlobal(), (Strings{"x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"}));
         EXPECT_EQ(VendorHost(), (Strings{"x.com.orbeno.ovl.vdr.dvptracking.y", "com.vendor.own"}));
     }
     for (const uint32_t version : {107u, 0xffffffffu}) {
-        device.replies[8] = Word(version);
+        device.replies[Command::GlobalPropGet] = Word(version);
         EXPECT_EQ(VendorGlobal(), Strings{"com.vendor.own"});
         EXPECT_EQ(VendorHost(), Strings{"com.vendor.own"});
     }
@@ -112,10 +112,10 @@ TEST_F(Queries, NamesThatGoAboveVersion106StayAt106) {
 TEST_F(Queries, AVersionReplyShorterThanAWordIsAFailedQuery) {
     ServeVendorNames();
     for (const std::string &reply : {std::string("\xff\xff\xff", 3), std::string()}) {
-        device.replies[8] = reply;
+        device.replies[Command::GlobalPropGet] = reply;
         EXPECT_EQ(VendorGlobal().size(), 4U);
     }
-    device.replies[8] = Word(200) + "more";
+    device.replies[Command::GlobalPropGet] = Word(200) + "more";
     EXPECT_EQ(VendorGlobal().size(), 3U);
 }
 
@@ -123,7 +123,7 @@ TEST_F(Queries, DisabledSurvivesTheVendorFilterOfItsType) {
     StateBuilder state;
     state.Switch("s").Global("s", "com.orbeno.vswitch.disabled", "v", 32);
     state.Global("s", "com.orbeno.vswitch.disabled.more", "v", 32);
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     EXPECT_EQ(VendorGlobal(32), Strings{"com.orbeno.vswitch.disabled"});
     EXPECT_EQ(VendorGlobal(16), Strings{});
 }
@@ -132,7 +132,7 @@ TEST_F(Queries, EntriesOfAnotherTypeAreInNoVendorList) {
     StateBuilder state;
     state.Switch("s").Global("s", "com.vendor.a", "v", 16).Global("s", "com.vendor.b", "v", 32);
     state.Host("s", "com.vendor.a", "v", 16).Host("s", "com.vendor.b", "v", 32);
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     EXPECT_EQ(VendorGlobal(16), Strings{"com.vendor.a"});
     EXPECT_EQ(VendorGlobal(32), Strings{"com.vendor.b"});
     EXPECT_EQ(VendorHost(16), Strings{"com.vendor.a"});
@@ -148,10 +148,10 @@ TEST_F(Queries, VendorListOfAPort) {
                       {"dvfilter-generic-1", "v"},
                       {"com.orbeno.net.x", "v"},
                       {"com.vendor.own", "v"}};
-    device.replies[19] = PortData(pairs);
+    device.replies[Command::PortStateGet] = PortData(pairs);
     EXPECT_EQ(VendorPort(16), (Strings{"com.orbeno.net.x", "com.vendor.own"}));
     EXPECT_EQ(VendorPort(32), Strings{});
-    EXPECT_EQ(device.calls.at(0).request, 19);
+    EXPECT_EQ(device.calls.at(0).request, NumberOf(Command::PortStateGet));
 }
 
 TEST_F(Queries, VendorListOfAPortOfTheDefaultTypeLosesNetToo) {
@@ -162,7 +162,7 @@ TEST_F(Queries, VendorListOfAPortOfTheDefaultTypeLosesNetToo) {
     void *data = nullptr;
     uint32_t size = 0;
     ASSERT_EQ(DVSData_Serialize(list, &data, &size, 9), HYP_OK);
-    device.replies[19].assign(static_cast<const char *>(data), size);
+    device.replies[Command::PortStateGet].assign(static_cast<const char *>(data), size);
     DVSData_FreeAssocData(list, data);
     DVSData_Free(list);
     EXPECT_EQ(VendorPort(32), Strings{"com.vendor.own"});
@@ -174,13 +174,14 @@ TEST_F(Queries, ExtraConfigurationOfASwitchIsOfTheGlobalList) {
         .Global("s", "com.orbeno.extraconfig.a", "v", 16)
         .Global("s", "com.orbeno.extraconfig.b", "v", 32);
     state.Global("s", "other", "v", 16).Host("s", "com.orbeno.extraconfig.c", "v", 16);
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     EXPECT_EQ(Names([](DVSData **out) { return DVSHYP_ExtraConfigPropList("s", out, 16); }),
               Strings{"com.orbeno.extraconfig.a"});
 }
 
 TEST_F(Queries, ExtraConfigurationOfAPort) {
-    device.replies[19] = PortData({{"com.orbeno.port.extraConfig.a", "v"}, {"com.orbeno.port.alias", "v"}});
+    device.replies[Command::PortStateGet] =
+        PortData({{"com.orbeno.port.extraConfig.a", "v"}, {"com.orbeno.port.alias", "v"}});
     EXPECT_EQ(Names([](DVSData **out) { return DVSHYP_ExtraConfigPortPropList("s", "p", out, 16); }),
               Strings{"com.orbeno.port.extraConfig.a"});
     EXPECT_EQ(Names([](DVSData **out) { return DVSHYP_ExtraConfigPortPropList("s", "p", out, 32); }),
@@ -206,7 +207,7 @@ TEST_F(Queries, PortsetEntriesOfAnyTypeAreInTheOverlayListOfType16) {
         .Global("s", "com.orbeno.ovl.a", "v", 32);
     state.Global("s", "com.orbeno.ovl.b", "v", 16).Global("s", "com.orbeno.net.portset.fc.y", "v", 16);
     state.Global("s", "com.vendor.own", "v", 16).Host("s", "com.orbeno.ovl.host", "v", 16);
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     EXPECT_EQ(Overlay(16, true),
               (Strings{"com.orbeno.net.portset.fc.x", "com.orbeno.ovl.b", "com.orbeno.net.portset.fc.y"}));
     EXPECT_EQ(Overlay(32, true), (Strings{"com.orbeno.net.portset.fc.x", "com.orbeno.ovl.a"}));
@@ -221,7 +222,7 @@ TEST_F(Queries, ASwitchWithoutAListGivesAnEmptyOne) {
     DVSData_Free(sw->globalPropList);
     DVSData_Free(sw->hostPropList);
     sw->globalPropList = sw->hostPropList = nullptr;
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     EXPECT_EQ(VendorGlobal(), Strings{});
     EXPECT_EQ(VendorHost(), Strings{});
     EXPECT_EQ(Overlay(16, true), Strings{});
@@ -243,7 +244,7 @@ protected:
 };
 
 TEST_F(PortLists, ASwitchWithoutPortsYieldsCountZero) {
-    device.replies[3] = StateBuilder().Switch("s").Serialize();
+    device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     const PortList list = Ports(1);
     EXPECT_EQ(list->numEntries, 0U);
     EXPECT_EQ(list->portType, 1U);
@@ -256,7 +257,7 @@ TEST_F(PortLists, PortsOfTheTypeInSlotOrderWithTheirConnectionIds) {
     state.Switch("s").Port("s", "p1", {{kId, Word(11)}}).Port("s", "shadow", {{kId, Word(12)}}, 2);
     state.Port("s", std::string(47, 'p'), {{kId, Word(13) + "more"}}).Port("s", "short", {{kId, "abc"}});
     state.Port("s", "none").Port("s", "empty", {{kId, ""}});
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     const PortList list = Ports(1);
     ASSERT_EQ(list->numEntries, 5U);
     const std::pair<std::string, uint32_t> expected[] = {
@@ -271,7 +272,7 @@ TEST_F(PortLists, PortsOfTheTypeInSlotOrderWithTheirConnectionIds) {
 }
 
 TEST_F(PortLists, AnUnknownSwitchIsNotFound) {
-    device.replies[3] = StateBuilder().Switch("s").Serialize();
+    device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     EXPECT_EQ(Ports(1, "t", HYP_NOT_FOUND), nullptr);
 }
 
@@ -284,11 +285,11 @@ TEST_F(Queries, UnknownSwitchesAndFailuresHandNothingOut) {
         [](DVSData **out) { return DVSHYP_VendorPortPropList("t", "p", out, 16); },
         [](DVSData **out) { return DVSHYP_ExtraConfigPortPropList("t", "p", out, 16); },
     };
-    device.replies[3] = StateBuilder().Switch("s").Serialize();
-    device.always[19] = {ENOENT, HYP_NOT_FOUND, -1, {}};
+    device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
+    device.always[Command::PortStateGet] = {ENOENT, HYP_NOT_FOUND, -1, {}};
     for (const Query &query : queries)
         EXPECT_EQ(Names(query), Strings{"status " + std::to_string(HYP_NOT_FOUND)});
-    device.replies[3] = device.replies[19] = std::string(64, '\x7f');
+    device.replies[Command::StateGet] = device.replies[Command::PortStateGet] = std::string(64, '\x7f');
     for (const Query &query : queries)
         EXPECT_EQ(Names(query), Strings{"status " + std::to_string(HYP_BAD_PARAM)});
 }

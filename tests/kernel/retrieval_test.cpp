@@ -42,7 +42,7 @@ protected:
         for (const char *id :
              {"1000", "01000", "999", "01000x", "", "0", "000999", "2147483648000", "x1000", "+1000"})
             state.Port("s", id);
-        device.replies[3] = state.Serialize();
+        device.replies[Command::StateGet] = state.Serialize();
         const LoadedState kept(Persist());
         return kept.Ports("s");
     }
@@ -66,7 +66,7 @@ TEST_F(Retrieval, OnlyActivePortsArePersistent) {
     StateBuilder state;
     state.Switch("s").Port("s", "active").Port("s", "shadow", {}, 2).Port("s", "zombie", {}, 3);
     state.Port("s", "cache", {}, 4).Port("s", "same", {}, 3).Port("s", "same", {}, 3).Port("s", "same");
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     const LoadedState kept(Persist());
     EXPECT_EQ(kept.Ports("s"), (Strings{"active", "same"}));
 }
@@ -75,7 +75,7 @@ TEST_F(Retrieval, PortsMarkedByThePersistEntryAreLeftOutOthersLoseVolatileEntrie
     StateBuilder state;
     state.Switch("s").Port("s", "marked", {{kPersist, "x"}});
     state.Port("s", "kept", {{"a", "1"}, {"com.orbeno.port.volatile.b", "2"}, {"c.volatile", "3"}});
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     const LoadedState kept(Persist());
     EXPECT_EQ(kept.Ports("s"), Strings{"kept"});
     EXPECT_EQ(kept.PortDataNames("s", "kept"), (Strings{"a", "c.volatile"}));
@@ -85,7 +85,7 @@ TEST_F(Retrieval, VolatilePropertiesOfSwitchesAreRemoved) {
     StateBuilder state;
     state.Switch("s").Global("s", "a.volatile.b", "1").Global("s", "a", "2");
     state.Host("s", "h", "3").Host("s", "h.volatile.i", "4");
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     const LoadedState kept(Persist());
     EXPECT_EQ(kept.GlobalNames("s"), Strings{"a"});
     EXPECT_EQ(kept.HostNames("s"), Strings{"h"});
@@ -96,13 +96,13 @@ TEST_F(Retrieval, WithoutAFileUnpersistedSwitchesAreAbsent) {
     state.Switch("s1").Switch("s2").Switch("s3").Switch("s4");
     state.Global("s2", kNoPersist, std::string(1, '\1')).Global("s3", kNoPersist, std::string(4, '\0'));
     state.Global("s4", kNoPersist, "");
-    device.replies[3] = state.Serialize();
+    device.replies[Command::StateGet] = state.Serialize();
     const LoadedState kept(Persist());
     EXPECT_EQ(kept.Switches(), (Strings{"s1", "s3", "s4"}));
 }
 
 TEST_F(Retrieval, PersistentStateGetIsTheSameWithoutAFile) {
-    device.replies[3] = StateBuilder().Switch("s1").Port("s1", "p", {{"a", "1"}}).Serialize();
+    device.replies[Command::StateGet] = StateBuilder().Switch("s1").Port("s1", "p", {{"a", "1"}}).Serialize();
     EXPECT_EQ(Fetch(DVSHYP_PersistentStateGet).text, Persist());
 }
 
@@ -118,7 +118,7 @@ protected:
         StateBuilder state;
         state.Switch("live1").Global("live1", "from", "module").Switch("tmp");
         state.Global("tmp", "from", "module").Global("tmp", kNoPersist, std::string(1, '\1')).Switch("live2");
-        device.replies[3] = state.Serialize();
+        device.replies[Command::StateGet] = state.Serialize();
     }
 };
 
@@ -143,7 +143,7 @@ TEST_F(RetrievalWithFile, ASwitchThatTheFileLacksIsAbsent) {
 }
 
 TEST_F(RetrievalWithFile, WithoutUnpersistedSwitchesTheFileIsNotRead) {
-    device.replies[3] = StateBuilder().Switch("s").Serialize();
+    device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     const LoadedState kept(Persist((directory_ / "absent").c_str()));
     EXPECT_EQ(kept.Switches(), Strings{"s"});
 }
@@ -160,9 +160,9 @@ TEST_F(Retrieval, FailuresOfFetchAndLoadLeaveTheOutputs) {
         void *out = &marker;
         uint32_t outLen = 77;
         if (round == 0)
-            device.always[3] = {EPERM, 0x0bad0042, -1, {}};
+            device.always[Command::StateGet] = {EPERM, 0x0bad0042, -1, {}};
         else
-            device.replies[3] = std::string(40, '\1');
+            device.replies[Command::StateGet] = std::string(40, '\1');
         EXPECT_NE(DVSHYP_PersistentStateGet(&out, &outLen), HYP_OK);
         EXPECT_EQ(out, &marker);
         EXPECT_EQ(outLen, 77U);
@@ -173,7 +173,7 @@ TEST_F(Retrieval, FailuresOfFetchAndLoadLeaveTheOutputs) {
 }
 
 TEST_F(Retrieval, AGivenBufferIsFilledOrRefused) {
-    device.replies[3] = StateBuilder().Switch("s").Serialize();
+    device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     const std::string expected = Persist();
     std::string buffer(expected.size(), 'x');
     void *out = buffer.data();
@@ -200,7 +200,7 @@ TEST_F(Retrieval, ASwitchThatFailsToLoadLeavesTheTableEmpty) {
         sum += word;
     }
     std::memcpy(serialized.data() + 4, &sum, 4);
-    device.replies[3] = serialized;
+    device.replies[Command::StateGet] = serialized;
     void *out = nullptr;
     uint32_t outLen = 0;
     EXPECT_NE(DVSHYP_PersistentStateGet(&out, &outLen), HYP_OK);
@@ -208,17 +208,17 @@ TEST_F(Retrieval, ASwitchThatFailsToLoadLeavesTheTableEmpty) {
 }
 
 TEST_F(Retrieval, PersistentPortStateLosesVolatileEntriesOnly) {
-    device.replies[19] = PortData({{"a", "1"}, {"b.volatile.c", "2"}, {kPersist, "3"}});
+    device.replies[Command::PortStateGet] = PortData({{"a", "1"}, {"b.volatile.c", "2"}, {kPersist, "3"}});
     EXPECT_EQ(Fetch(DVSHYP_PersistentPortStateGet, "s", "p", uint32_t{9}).text, PortData({{"a", "1"}}));
-    EXPECT_EQ(device.calls.at(0).request, 19);
-    device.replies[19] = "no list, but long enough for a header";
+    EXPECT_EQ(device.calls.at(0).request, NumberOf(Command::PortStateGet));
+    device.replies[Command::PortStateGet] = "no list, but long enough for a header";
     EXPECT_EQ(Fetch(DVSHYP_PersistentPortStateGet, "s", "p", uint32_t{9}).status, HYP_BAD_PARAM);
 }
 
 TEST_F(Retrieval, TheLockIsFreeAfterwards) {
-    device.replies[3] = StateBuilder().Switch("s").Serialize();
+    device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     (void)Persist();
-    device.replies[3] = "damaged state of more than sixteen bytes";
+    device.replies[Command::StateGet] = "damaged state of more than sixteen bytes";
     (void)Persist(nullptr, HYP_BAD_PARAM);
     std::thread([] { DVSwitchHYPUnlock(DVSwitchHYPLock()); }).join();
 }
