@@ -3,13 +3,6 @@
 
 #include "platform/embedded/configstore/admin.h"
 
-#include <cerrno>
-#include <cstring>
-#include <fcntl.h>
-#include <unistd.h>
-
-#include "platform/embedded/configstore/document.h"
-#include "platform/embedded/configstore/log.h"
 #include "platform/embedded/configstore/oracle.h"
 #include "platform/embedded/configstore/store.h"
 
@@ -17,30 +10,16 @@ namespace configstore::admin {
 
 namespace {
 
-FilterSpec SpecOf(const Address &address) {
-    return {address.key, address.group, address.component, address.instance};
-}
-
-constexpr const char *kListSql =
-    "SELECT layer, key, grp, component, instance, o.revision, saved_ms, length(CAST(d.text AS BLOB)) "
-    "FROM object_row o JOIN document d ON d.id = o.document JOIN revision r ON r.revision = o.revision "
-    "ORDER BY layer, key, grp, component, instance";
-
-std::string Where(const Address &address) {
-    return std::string(LayerName(address.layer)) + ' ' + address.key + '/' + address.group + '/' +
-           address.component + '[' + address.instance + ']';
-}
-
-/// The compiled check, which is cheap, comes first: the general validator sees sound documents only.
+/// The compiled check is cheap and comes first, so that the general validator sees sound documents only.
 int32_t CheckCompiled(const std::string &key, const std::string &group, std::string_view json,
                       std::vector<Problem> *problems) {
-    Tree tree(key, group, "", "");
+    Tree tree({Layer::Current, key, group, {}, {}});
     if (!tree.shape) {
         problems->push_back({key + '/' + group, "there is no schema for such objects"});
         return BAD_PARAMETER;
     }
     std::string why, where;
-    if (!ReadDocument(json, Reading::Strict, &tree, &why, &where)) {
+    if (!configstore::ReadDocument(json, Reading::Strict, &tree, &why, &where)) {
         problems->push_back({where, why});
         return BAD_PARAMETER;
     }
@@ -49,11 +28,20 @@ int32_t CheckCompiled(const std::string &key, const std::string &group, std::str
     return bad ? SCHEMA_VIOLATION : OK;
 }
 
-} // namespace
-
-const char *LayerName(Layer layer) {
-    return layer == Layer::Current ? kCurrentLayer : kDesiredLayer;
+/// The record of a refused import has the first problem.
+int32_t FailImport(Store *store, const Address &address, int32_t status,
+                   const std::vector<Problem> &problems) {
+    if (problems.empty()) return status;
+    const Problem &first = problems.front();
+    Failure failure(status, std::string("import of ") + LayerName(address.layer) + ' ' +
+                                AddressText(address) + ": " + first.where +
+                                (first.where.empty() ? "" : ": ") + first.what);
+    failure.address = address;
+    failure.field = first.where;
+    return store->failures.Fail(std::move(failure));
 }
+
+} // namespace
 
 const char *StatusText(int32_t status) {
     switch (status) {
@@ -80,14 +68,21 @@ const char *StatusText(int32_t status) {
     }
 }
 
-int32_t Open(const std::string &path, bool readOnly, Store **store) {
+int32_t Open(const std::string &path, bool readOnly, Store **store, Failure *failure) {
     if (!store) return BAD_PARAMETER;
     return Guarded([&] {
-        std::unique_ptr<Store> opened;
-        const int32_t status = OpenStore(path.empty() ? StorePath() : path,
-                                         readOnly ? Access::ReadOnly : Access::ReadWrite, &opened);
-        if (status == OK) *store = opened.release();
-        return status;
+        return OpenStore(path.empty() ? StorePath() : path, readOnly ? Access::ReadOnly : Access::ReadWrite,
+                         FailureKeeper::Log::No, store, failure);
+    });
+}
+
+int32_t OpenInMemory(Store **store) {
+    if (!store) return BAD_PARAMETER;
+    return Guarded([&] {
+        auto opened = std::make_unique<Store>("in memory", FailureKeeper::Log::No);
+        opened->backend = OpenMemory(NewMemoryDatabase(), &opened->failures);
+        *store = opened.release();
+        return OK;
     });
 }
 
@@ -96,41 +91,32 @@ std::string DefaultPath() {
 }
 
 void SetBusyTimeout(Store *store, int milliseconds) {
-    sqlite3_busy_timeout(store->db.get(), milliseconds);
+    store->backend->SetBusyTimeout(milliseconds);
+}
+
+const Failure *LastFailure(const Store *store) {
+    return store->failures.Last();
 }
 
 int32_t List(Store *store, std::vector<Entry> *entries) {
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] {
-        Statement statement(store, kListSql);
+    return Call(store, [&] {
         std::vector<Entry> found;
-        while (statement.Step()) {
-            Entry entry{};
-            entry.address = {statement.Text(0) == kDesiredLayer ? Layer::Desired : Layer::Current,
-                             std::string(statement.Text(1)), std::string(statement.Text(2)),
-                             std::string(statement.Text(3)), std::string(statement.Text(4))};
-            entry.revision = statement.Integer(5);
-            entry.savedMs = statement.Integer(6);
-            entry.bytes = static_cast<uint64_t>(statement.Integer(7));
-            found.push_back(std::move(entry));
-        }
-        if (statement.Status() == OK) *entries = std::move(found);
-        return statement.Status();
+        const int32_t status = store->backend->List(&found);
+        if (status == OK) *entries = std::move(found);
+        return status;
     });
 }
 
 int32_t Export(Store *store, const Address &address, std::string *json) {
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] {
-        Statement statement(store,
-                            "SELECT text FROM object_row o JOIN document d ON d.id = o.document "
-                            "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND instance = ?");
-        statement.Bind(LayerName(address.layer)).Bind(address.key).Bind(address.group);
-        statement.Bind(address.component).Bind(address.instance);
-        if (!statement.Step())
-            return statement.Status() == OK ? static_cast<int32_t>(NOT_FOUND) : statement.Status();
-        *json = statement.Text(0);
-        return static_cast<int32_t>(OK);
+    return Call(store, [&] {
+        bool isThere = false;
+        const int32_t status = store->backend->Visit(address, Select::One,
+                                                     [&](const Row &, std::optional<std::string_view> text) {
+                                                         isThere = true;
+                                                         *json = *text;
+                                                         return OK;
+                                                     });
+        return status == OK && !isThere ? static_cast<int32_t>(NOT_FOUND) : status;
     });
 }
 
@@ -149,79 +135,42 @@ int32_t CheckDocument(const std::string &key, const std::string &group, std::str
 }
 
 int32_t Import(Store *store, const Address &address, std::string_view json, std::vector<Problem> *problems) {
-    if (const int32_t status = Ready(store); status != OK) return status;
-    const int32_t checked = CheckDocument(address.key, address.group, json, problems);
-    if (checked != OK) {
-        for (const Problem &problem : *problems)
-            Log("config store %s: import of %s: %s%s%s", store->path.c_str(), Where(address).c_str(),
-                problem.where.c_str(), problem.where.empty() ? "" : ": ", problem.what.c_str());
-        return checked;
-    }
-    return Guarded([&] {
-        const FilterSpec spec = SpecOf(address);
+    return Call(store, [&] {
+        const int32_t checked = CheckDocument(address.key, address.group, json, problems);
+        if (checked != OK) return FailImport(store, address, checked, *problems);
         std::unique_ptr<Tree> tree;
-        const int32_t status = LoadTree(store, spec, json, &tree);
-        return status == OK ? SaveTree(store, LayerName(address.layer), tree.get()) : status;
+        const int32_t status = LoadTree(store, address, json, &tree);
+        return status == OK ? SaveTree(store, address.layer, tree.get()) : status;
     });
 }
 
 int32_t Delete(Store *store, const Address &address) {
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] {
+    return Call(store, [&] {
         OwnTransaction transaction(store);
         int32_t status = transaction.Status();
-        if (status == OK) status = DeleteRow(store, LayerName(address.layer), SpecOf(address));
+        if (status == OK) status = store->backend->Delete(address);
         return status == OK ? transaction.Commit() : status;
     });
 }
 
-namespace {
-
-/// Copies all pages in one step: it takes a read transaction, so that writers do not disturb it.
-int32_t CopyInto(Store *store, const std::string &path) {
-    sqlite3 *raw = nullptr;
-    const int opened = sqlite3_open_v2(path.c_str(), &raw, SQLITE_OPEN_READWRITE, nullptr);
-    const Database target(raw);
-    if (opened != SQLITE_OK) return StatusOf(opened);
-    sqlite3_backup *const backup = sqlite3_backup_init(raw, "main", store->db.get(), "main");
-    if (!backup) return StatusOf(sqlite3_errcode(raw));
-    const int stepped = sqlite3_backup_step(backup, -1);
-    const int finished = sqlite3_backup_finish(backup);
-    if (stepped != SQLITE_DONE && finished == SQLITE_OK) return StatusOf(stepped);
-    if (finished != SQLITE_OK)
-        Log("config store %s: backup to %s: %s", store->path.c_str(), path.c_str(), sqlite3_errmsg(raw));
-    return StatusOf(finished);
+int32_t CopyPresent(Store *from, Store *to) {
+    std::vector<Entry> entries;
+    if (const int32_t status = List(from, &entries); status != OK) return status;
+    return Call(to, [&] {
+        OwnTransaction transaction(to);
+        int32_t status = transaction.Status();
+        for (std::size_t i = 0; status == OK && i < entries.size(); i++) {
+            std::string text;
+            int64_t document = 0;
+            status = Export(from, entries[i].address, &text);
+            if (status == OK) status = to->backend->Put(entries[i].address, text, &document);
+        }
+        return status == OK ? transaction.Commit() : status;
+    });
 }
-
-int32_t SyncFile(const std::string &path) {
-    const int fd = open(path.c_str(), O_RDONLY | O_CLOEXEC);
-    if (fd < 0) return IO_ERROR;
-    const int32_t status = fsync(fd) == 0 ? static_cast<int32_t>(OK) : static_cast<int32_t>(IO_ERROR);
-    close(fd);
-    return status;
-}
-
-} // namespace
 
 int32_t Backup(Store *store, const std::string &path) {
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&]() -> int32_t {
-        const int fd = open(path.c_str(), O_RDWR | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
-        if (fd < 0) {
-            const int error = errno;
-            Log("config store %s: backup to %s: %s", store->path.c_str(), path.c_str(), std::strerror(error));
-            return error == EEXIST ? EXISTS : IO_ERROR;
-        }
-        close(fd);
-        const std::string name = path.front() == '/' ? path : "./" + path;
-        int32_t status = CopyInto(store, name);
-        if (status == OK) status = SyncFile(path);
-        if (status != OK) {
-            (void)unlink(path.c_str());
-            (void)unlink((path + "-journal").c_str());
-        }
-        return status;
-    });
+    return Call(store, [&] { return store->backend->Backup(path); });
 }
 
 std::string_view Schema(std::string_view key, std::string_view group) {

@@ -72,13 +72,11 @@ void BuildIndex(InstanceTable *table) {
 
 } // namespace
 
-Tree::Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent,
-           std::string_view newInstance)
-    : shape(FindSchema(newKey, newGroup)), key(newKey), group(newGroup), component(newComponent),
-      instance(newInstance) {
+Tree::Tree(Address newAddress)
+    : shape(FindSchema(newAddress.key, newAddress.group)), address(std::move(newAddress)) {
     root.parent = nullptr;
     root.next = nullptr;
-    root.name = NewName(arena, newInstance);
+    root.name = NewName(arena, address.instance);
     root.described = false;
     root.bad = false;
     root.isRoot = true;

@@ -18,6 +18,7 @@
 #include <vector>
 
 #include "platform/configstore.h"
+#include "platform/embedded/configstore/address.h"
 #include "platform/embedded/configstore/arena.h"
 #include "platform/embedded/configstore/schema.h"
 
@@ -110,10 +111,9 @@ struct Tree {
     bool suspect = false;               // some node was bad once
     bool hasUnknown = false;            // some object had a member without a field once
     std::shared_ptr<const Buffer> text; // that its Later nodes are in
-    std::string key, group, component, instance;
+    Address address;
 
-    Tree(std::string_view newKey, std::string_view newGroup, std::string_view newComponent,
-         std::string_view newInstance);
+    explicit Tree(Address newAddress);
     ~Tree();
     Tree(const Tree &) = delete;
     Tree &operator=(const Tree &) = delete;
@@ -127,7 +127,7 @@ struct Tree {
     return list->kind == Kind::Instances && list->described ? list->field->shape : nullptr;
 }
 
-/// What a filter spec selects by; also the address of a store object.
+/// What a filter spec selects by.
 struct FilterSpec {
     std::string key, group, component, instance;
     /// A shape below which no field has the key's name, found by a search before: searches of one load ask

@@ -198,11 +198,11 @@ int32_t CreateObject(const char *key, const char *group, const char *component, 
                      const char *json, Object **object) {
     if (!key || !group || !component || !json || !object) return BAD_PARAMETER;
     return Guarded([&]() -> int32_t {
-        auto tree = std::make_unique<Tree>(key, group, component, IdOf(instanceId));
+        auto tree = std::make_unique<Tree>(
+            Address{Layer::Current, key, group, component, std::string(IdOf(instanceId))});
         std::string why;
         if (!ReadDocument(json, Reading::Tolerant, tree.get(), &why)) {
-            Log("config store: document given for %s/%s/%s[%s]: %s", key, group, component,
-                tree->instance.c_str(), why.c_str());
+            Log("config store: document given for %s: %s", AddressText(tree->address).c_str(), why.c_str());
             return BAD_PARAMETER;
         }
         *object = &tree.release()->root;

@@ -1,13 +1,11 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Stores and transactions of the client interface (platform/configstore.h), on the rows of store.h.
+// Stores, transactions and objects of the client interface (platform/configstore.h), on a backend.
 
 #include "platform/embedded/configstore/store.h"
 
 #include <cstdlib>
 #include <cstring>
 #include <vector>
-
-#include "platform/embedded/configstore/log.h"
 
 namespace configstore {
 
@@ -30,78 +28,67 @@ int32_t HandOut(Trees *trees, Object ***objects, int32_t *count) {
     return OK;
 }
 
-/// An object of a listing by one who means to write: mostly to replace its content, hence as little of it as
-/// will do, and its text for when it is fetched. Null for a document that is read in the ordinary way.
-std::unique_ptr<Tree> ReadForRewrite(Store *store, const FilterSpec &address, int64_t document,
-                                     std::string_view text) {
-    auto tree = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
+/// An object of a listing in a transaction. The caller mostly replaces its content, so as little of it as
+/// possible is read, and its text is kept for when it is fetched. Null for a document that has to be read in
+/// the ordinary way.
+std::unique_ptr<Tree> ReadForRewrite(Store *store, const Row &row, std::string_view text) {
+    auto tree = std::make_unique<Tree>(row.address);
     const auto kept = std::make_shared<Buffer>();
     kept->Put(text);
     Outline outline;
     if (!ReadOutline(kept, tree.get(), &outline)) return nullptr;
-    if (outline.field) store->readBefore[document] = {kept, outline};
+    if (outline.field) store->readBefore[row.document] = {kept, outline};
     return tree;
 }
 
-int32_t List(Store *store, const char *layer, const FilterSpec &spec, Object ***objects, int32_t *count) {
-    // The primary key has this order already.
-    Statement statement(
-        store, "SELECT instance, text, o.document FROM object_row o JOIN document d ON d.id = o.document "
-               "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND (?5 = '' OR instance = ?5) "
-               "ORDER BY instance");
-    statement.Bind(layer).Bind(spec.key).Bind(spec.group).Bind(spec.component).Bind(spec.instance);
+int32_t List(Store *store, const Address &address, Object ***objects, int32_t *count) {
     Trees trees;
-    while (statement.Step()) {
-        const FilterSpec address{spec.key, spec.group, spec.component, std::string(statement.Text(0))};
-        std::unique_ptr<Tree> tree =
-            store->inTransaction ? ReadForRewrite(store, address, statement.Integer(2), statement.Text(1))
-                                 : nullptr;
-        if (!tree) {
-            const int32_t status = LoadTree(store, address, statement.Text(1), &tree);
-            if (status != OK) return status;
-        }
-        trees.push_back(std::move(tree));
-    }
-    return statement.Status() == OK ? HandOut(&trees, objects, count) : statement.Status();
+    const int32_t status = store->backend->Visit(
+        address, Select::Instances, [&](const Row &row, std::optional<std::string_view> text) {
+            std::unique_ptr<Tree> tree;
+            if (store->inTransaction) tree = ReadForRewrite(store, row, *text);
+            const int32_t loaded =
+                tree ? static_cast<int32_t>(OK) : LoadTree(store, row.address, *text, &tree);
+            if (loaded == OK) trees.push_back(std::move(tree));
+            return loaded;
+        });
+    return status == OK ? HandOut(&trees, objects, count) : status;
 }
 
-/// The object from what the transaction remembers of it. Whatever goes wrong is for the ordinary way to find.
-bool FetchAgain(Store *store, const FilterSpec &address, Object **object) {
+/// The object from what the transaction remembers of it. On any failure, the ordinary way finds it again.
+bool FetchAgain(Store *store, const Address &address, std::unique_ptr<Tree> *tree) {
     if (store->readBefore.empty()) return false;
     std::optional<Row> row;
-    if (FindRow(store, kCurrentLayer, address, &row) != OK || !row) return false;
+    if (store->backend->Find(address, &row) != OK || !row) return false;
     const auto known = store->readBefore.find(row->document);
     if (known == store->readBefore.end()) return false;
-    auto tree = std::make_unique<Tree>(address.key, address.group, address.component, address.instance);
-    if (!ReadAgain(known->second.text, known->second.outline, tree.get())) return false;
-    *object = &tree.release()->root;
+    auto again = std::make_unique<Tree>(address);
+    if (!ReadAgain(known->second.text, known->second.outline, again.get())) return false;
+    *tree = std::move(again);
     return true;
 }
 
-int32_t RefuseReadOnly(const Store *store) {
-    Log("config store %s: the file cannot be written to", store->path.c_str());
-    return IO_ERROR;
+int32_t Fetch(Store *store, const Address &address, std::unique_ptr<Tree> *tree) {
+    if (FetchAgain(store, address, tree)) return OK;
+    const int32_t status =
+        store->backend->Visit(address, Select::One, [&](const Row &, std::optional<std::string_view> text) {
+            return LoadTree(store, address, *text, tree);
+        });
+    return status == OK && !*tree ? static_cast<int32_t>(NOT_FOUND) : status;
 }
 
-int32_t EndTransaction(Store *store, const char *sql) {
-    const int32_t status = Execute(store, sql);
-    if (status != OK) return status;
+void EndTransaction(Store *store) {
     store->readBefore.clear();
     store->inTransaction = false;
-    store->revision = 0;
-    return OK;
+    store->refusal = OK;
 }
 
 } // namespace
 
 int32_t GetStore(Store **store) {
     if (!store) return BAD_PARAMETER;
-    return Guarded([&] {
-        std::unique_ptr<Store> opened;
-        const int32_t status = OpenStore(StorePath(), Access::ReadWrite, &opened);
-        if (status == OK) *store = opened.release();
-        return status;
-    });
+    return Guarded(
+        [&] { return OpenStore(StorePath(), Access::ReadWrite, FailureKeeper::Log::Yes, store, nullptr); });
 }
 
 void DestroyStore(Store *store) {
@@ -111,66 +98,59 @@ void DestroyStore(Store *store) {
 int32_t BeginTransaction(Store *store) {
     if (!store || store->inTransaction) return BAD_PARAMETER;
     return Guarded([&]() -> int32_t {
-        // A caller whose begin fails leaves its lock held. So a begin always succeeds, and what kept it from
-        // doing so is the answer of every call until the caller cancels, which it then does in its ordinary
-        // way.
-        store->refusal = store->readOnly ? RefuseReadOnly(store) : Execute(store, "BEGIN IMMEDIATE");
+        // Callers whose begin fails leave their lock held. So a begin always succeeds, and the reason why it
+        // could not is the result of every call until the caller cancels in its ordinary way.
+        store->failures.Clear();
+        store->refusal = store->backend->IsReadOnly()
+                             ? store->failures.Fail(IO_ERROR, "the file cannot be written to")
+                             : store->backend->Begin();
         store->inTransaction = true;
-        store->revision = 0;
         return OK;
     });
 }
 
 int32_t CommitTransaction(Store *store) {
     if (!store || !store->inTransaction) return BAD_PARAMETER;
-    if (store->refusal != OK) return store->refusal;
-    return Guarded([&] { return EndTransaction(store, "COMMIT"); });
+    return Call(store, [&] {
+        const int32_t status = store->backend->Commit();
+        if (status == OK) EndTransaction(store);
+        return status;
+    });
 }
 
 int32_t CancelTransaction(Store *store) {
     if (!store || !store->inTransaction) return BAD_PARAMETER;
     return Guarded([&] {
         store->refusal = OK;
-        if (!sqlite3_get_autocommit(store->db.get())) return EndTransaction(store, "ROLLBACK");
-        store->readBefore.clear();
-        store->inTransaction = false;
-        store->revision = 0;
-        return static_cast<int32_t>(OK);
+        const int32_t status = store->backend->Cancel();
+        if (status == OK) EndTransaction(store);
+        return status;
     });
 }
 
 int32_t GetInstances(Store *store, const FilterSpec *spec, Object ***objects, int32_t *count) {
     if (!spec || !objects || !count) return BAD_PARAMETER;
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] { return List(store, kCurrentLayer, *spec, objects, count); });
+    return Call(store, [&] {
+        return List(store, {Layer::Current, spec->key, spec->group, spec->component, spec->instance}, objects,
+                    count);
+    });
 }
 
 int32_t GetDesiredUserConfigInstances(Store *store, const char *key, const char *group, const char *component,
                                       Object ***objects, int32_t *count) {
     if (!key || !group || !component || !objects || !count) return BAD_PARAMETER;
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] { return List(store, kDesiredLayer, {key, group, component, {}}, objects, count); });
+    return Call(store, [&] {
+        return List(store, {Layer::Desired, key, group, component, {}}, objects, count);
+    });
 }
 
 int32_t Get(Store *store, const char *key, const char *group, const char *component, const char *instanceId,
             Object **object) {
     if (!key || !group || !component || !object) return BAD_PARAMETER;
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&]() -> int32_t {
-        const FilterSpec address{key, group, component, instanceId ? instanceId : ""};
-        if (FetchAgain(store, address, object)) return OK;
-        Statement statement(store,
-                            "SELECT text FROM object_row o JOIN document d ON d.id = o.document "
-                            "WHERE layer = ? AND key = ? AND grp = ? AND component = ? AND instance = ?");
-        statement.Bind(kCurrentLayer)
-            .Bind(address.key)
-            .Bind(address.group)
-            .Bind(address.component)
-            .Bind(address.instance);
-        if (!statement.Step())
-            return statement.Status() == OK ? static_cast<int32_t>(NOT_FOUND) : statement.Status();
+    return Call(store, [&] {
         std::unique_ptr<Tree> tree;
-        const int32_t status = LoadTree(store, address, statement.Text(0), &tree);
+        const Address address{Layer::Current, key, group, component, instanceId ? instanceId : ""};
+        const int32_t status = Fetch(store, address, &tree);
         if (status == OK) *object = &tree.release()->root;
         return status;
     });
@@ -178,23 +158,21 @@ int32_t Get(Store *store, const char *key, const char *group, const char *compon
 
 int32_t Set(Store *store, Object *object, const char *source) {
     if (!object || !object->isRoot || object->kind != Kind::Object || !source) return BAD_PARAMETER;
-    const char *const layer = std::strcmp(source, "EXTERNAL") == 0 ? kCurrentLayer
-                              : std::strcmp(source, "USER") == 0   ? kDesiredLayer
-                                                                   : nullptr;
-    if (!layer) return BAD_PARAMETER;
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] { return SaveTree(store, layer, TreeOf(object)); });
+    const bool isCurrent = std::strcmp(source, "EXTERNAL") == 0;
+    if (!isCurrent && std::strcmp(source, "USER") != 0) return BAD_PARAMETER;
+    return Call(store,
+                [&] { return SaveTree(store, isCurrent ? Layer::Current : Layer::Desired, TreeOf(object)); });
 }
 
 int32_t Delete(Store *store, const char *key, const char *group, const char *component,
                const char *instanceId) {
     if (!key || !group || !component) return BAD_PARAMETER;
-    if (const int32_t status = Ready(store); status != OK) return status;
-    return Guarded([&] {
+    return Call(store, [&] {
         OwnTransaction transaction(store);
         int32_t status = transaction.Status();
         if (status == OK)
-            status = DeleteRow(store, kCurrentLayer, {key, group, component, instanceId ? instanceId : ""});
+            status =
+                store->backend->Delete({Layer::Current, key, group, component, instanceId ? instanceId : ""});
         return status == OK ? transaction.Commit() : status;
     });
 }

@@ -2,23 +2,60 @@
 #ifndef PLATFORM_EMBEDDED_CONFIGSTORE_STORE_H
 #define PLATFORM_EMBEDDED_CONFIGSTORE_STORE_H
 
-// What the client interface and the operators' functions share: changes of rows with their history, in a
-// transaction.
+// An open store: a backend, its transaction as the client interface has it, and the record of the last
+// failure. Shared by the client interface (store.cpp) and the operators' functions (admin*.cpp).
 
-#include <optional>
+#include <map>
+#include <memory>
 #include <string_view>
 
-#include "platform/embedded/configstore/database.h"
+#include "platform/embedded/configstore/backend/backend.h"
+#include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/node.h"
 
 namespace configstore {
 
-struct Row {
-    int64_t revision;
-    int64_t document;
+/// A document that this transaction has read.
+struct ReadBefore {
+    std::shared_ptr<const Buffer> text;
+    Outline outline;
 };
 
-/// A transaction of this call's own where the caller has none open; rolled back unless committed.
+struct Store {
+    Store(std::string path, FailureKeeper::Log log) : failures(std::move(path), log) {}
+
+    FailureKeeper failures;
+    std::unique_ptr<Backend> backend;
+    bool inTransaction = false; // as the caller sees it
+    int32_t refusal = OK;       // the result of every call in a transaction that could not begin or is lost
+    /// By number. A save lists all objects and then fetches each, mostly to replace what is in it.
+    std::map<int64_t, ReadBefore> readBefore;
+};
+
+/// The path that GetStore opens: DVS_CONFIGSTORE or the default.
+[[nodiscard]] std::string StorePath();
+/// Opens the store at the path; ":memory:" is one store for the whole process. `failures` receives the record
+/// of a failure, unless it is null.
+[[nodiscard]] int32_t OpenStore(const std::string &path, Access access, FailureKeeper::Log log, Store **out,
+                                Failure *failure);
+
+/// Runs one call on a store. In a refused transaction the call does not run. A failure that ended the backend's
+/// transaction makes the rest of it refused: what came later would be saved on its own.
+template <typename Work> int32_t Call(Store *store, Work &&work) {
+    if (!store) return BAD_PARAMETER;
+    if (store->refusal != OK) return store->refusal;
+    store->failures.Clear();
+    int32_t status = Guarded(work);
+    if (store->inTransaction && !store->backend->InTransaction()) {
+        const Failure *const failure = store->failures.Last();
+        if (status == OK) status = failure ? failure->status : static_cast<int32_t>(FAILED);
+        store->refusal = status;
+    }
+    if (status == OK) store->failures.Clear();
+    return status;
+}
+
+/// A transaction of one call's own if the caller has none open; cancelled unless committed.
 class OwnTransaction {
 public:
     explicit OwnTransaction(Store *store);
@@ -34,25 +71,12 @@ private:
     int32_t status_;
 };
 
-/// What a call answers before it does anything: a transaction that could not begin, or is lost.
-[[nodiscard]] inline int32_t Ready(const Store *store) {
-    return store ? store->refusal : BAD_PARAMETER;
-}
-
-[[nodiscard]] int32_t FindRow(Store *store, const char *layer, const FilterSpec &address,
-                              std::optional<Row> *row);
-/// Adds a document text.
-[[nodiscard]] int32_t AddDocument(Store *store, std::string_view text, int64_t *id);
-/// Makes `document` the object's; what it had goes into history. Within a transaction.
-[[nodiscard]] int32_t PutRow(Store *store, const char *layer, const FilterSpec &address, int64_t document);
-/// Deletes the object; its document goes into history. NOT_FOUND where there is none. Within a transaction.
-[[nodiscard]] int32_t DeleteRow(Store *store, const char *layer, const FilterSpec &address);
-/// A tree from a document's text; CORRUPT, with a message, when it is not one.
-[[nodiscard]] int32_t LoadTree(const Store *store, const FilterSpec &address, std::string_view text,
+/// A tree from a document's text; CORRUPT, with a record, if it is not a document.
+[[nodiscard]] int32_t LoadTree(Store *store, const Address &address, std::string_view text,
                                std::unique_ptr<Tree> *tree);
-/// Writes the tree's document as the object's. SCHEMA_VIOLATION, with the field's path, when it is not
-/// allowed.
-[[nodiscard]] int32_t SaveTree(Store *store, const char *layer, Tree *tree);
+/// Writes the tree's document as the object's. SCHEMA_VIOLATION, with the field in the record, if the schema
+/// does not allow it.
+[[nodiscard]] int32_t SaveTree(Store *store, Layer layer, Tree *tree);
 
 } // namespace configstore
 

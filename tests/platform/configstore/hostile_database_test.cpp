@@ -10,9 +10,6 @@
 #include <sqlite3.h>
 #include <sys/stat.h>
 
-#include "platform/embedded/configstore/admin.h"
-#include "platform/embedded/configstore/log.h"
-
 using namespace configstore;
 using namespace store_test;
 
@@ -29,16 +26,17 @@ void WriteFile(const std::string &path, const std::string &bytes) {
 
 class StoreHostileDatabase : public StoreTest {
 protected:
-    /// GetStore gives the status and names the file; the file's bytes stay.
+    /// Opening gives the status and names the file; the file's bytes stay.
     void ExpectRefused(int32_t wanted, const std::string &why) {
         const bool file = std::filesystem::is_regular_file(path_);
         const std::string before = file ? ReadFile(path_) : "";
-        const MessageCollector messages;
         Store *store = nullptr;
-        EXPECT_EQ(GetStore(&store), wanted);
+        Failure failure;
+        EXPECT_EQ(admin::Open(path_, false, &store, &failure), wanted);
         EXPECT_EQ(store, nullptr);
-        EXPECT_NE(messages.Text().find("config store " + path_ + ": "), std::string::npos) << messages.Text();
-        EXPECT_NE(messages.Text().find(why), std::string::npos) << messages.Text();
+        EXPECT_EQ(failure.status, wanted);
+        EXPECT_EQ(failure.path, path_);
+        EXPECT_NE(failure.what.find(why), std::string::npos) << failure.what;
         if (file) {
             EXPECT_TRUE(ReadFile(path_) == before);
         }
@@ -61,36 +59,36 @@ protected:
         return ReadFile(path_);
     }
 
-    /// Does all there is to do with whatever the file is; everything may be refused, with the file's name.
+    /// Uses every function on whatever the file is. Everything may be refused, with the file's name.
     void Exercise() {
-        const MessageCollector messages;
         Store *store = nullptr;
-        bool failed = GetStore(&store) != OK;
-        const StorePtr owner(store);
-        if (store) {
-            FilterSpec *spec = nullptr;
-            ASSERT_EQ(CreateFilterSpecObject(kKey, kGroup, kComponent, "", &spec), OK);
-            const SpecPtr specOwner(spec);
-            Object **objects = nullptr;
-            int32_t count = 0;
-            if (GetInstances(store, spec, &objects, &count) == OK)
-                DestroyObjects(objects, count);
-            else
-                failed = true;
-            std::vector<admin::Problem> problems;
-            failed |= admin::Check(store, &problems) != OK;
-            const ObjectPtr object = NewSwitch(R"({"name":"new"})", "b");
-            EXPECT_EQ(BeginTransaction(store), OK);
-            int32_t status = Set(store, object.get(), "EXTERNAL");
-            if (status == OK) status = Delete(store, kKey, kGroup, kComponent, "a");
-            if (status == OK || status == NOT_FOUND) status = CommitTransaction(store);
-            if (status != OK) {
-                failed = true;
-                EXPECT_EQ(CancelTransaction(store), OK);
-            }
+        Failure failure;
+        if (admin::Open(path_, false, &store, &failure) != OK) {
+            EXPECT_EQ(failure.path, path_);
+            return;
         }
-        if (failed) {
-            EXPECT_NE(messages.Text().find(path_), std::string::npos) << messages.Text();
+        const StorePtr owner(store);
+        const auto expectRecord = [&](int32_t status) {
+            if (status == OK || status == NOT_FOUND) return true;
+            const Failure *const record = admin::LastFailure(store);
+            EXPECT_TRUE(record && record->path == path_ && record->status == status) << status;
+            return false;
+        };
+        FilterSpec *spec = nullptr;
+        ASSERT_EQ(CreateFilterSpecObject(kKey, kGroup, kComponent, "", &spec), OK);
+        const SpecPtr specOwner(spec);
+        Object **objects = nullptr;
+        int32_t count = 0;
+        if (expectRecord(GetInstances(store, spec, &objects, &count))) DestroyObjects(objects, count);
+        std::vector<admin::Problem> problems;
+        expectRecord(admin::Check(store, &problems));
+        const ObjectPtr object = NewSwitch(R"({"name":"new"})", "b");
+        EXPECT_EQ(BeginTransaction(store), OK);
+        const bool changed = expectRecord(Set(store, object.get(), "EXTERNAL")) &&
+                             expectRecord(Delete(store, kKey, kGroup, kComponent, "a")) &&
+                             expectRecord(CommitTransaction(store));
+        if (!changed) {
+            EXPECT_EQ(CancelTransaction(store), OK);
         }
     }
 };
@@ -129,12 +127,14 @@ TEST_F(StoreHostileDatabase, DamagedDocumentIsCorruptAndNamed) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"a"})");
     Run("UPDATE document SET text = '{\"name\":'");
-    const MessageCollector messages;
     Object *object = nullptr;
     EXPECT_EQ(Get(store.get(), kKey, kGroup, kComponent, "sw1", &object), CORRUPT);
     EXPECT_EQ(object, nullptr);
-    EXPECT_NE(messages.Text().find(path_), std::string::npos);
-    EXPECT_NE(messages.Text().find("switches/network_vds/qel[sw1]"), std::string::npos);
+    EXPECT_EQ(
+        LastFailure(store.get())
+            .find("config store " + path_ + ": the document of switches/network_vds/qel[sw1] is damaged: "),
+        0U)
+        << LastFailure(store.get());
 }
 
 TEST_F(StoreHostileDatabase, NewerVersionIsRefusedUntouched) {
@@ -199,7 +199,6 @@ TEST_F(StoreHostileDatabase, DirectoryAndFifoAreRefused) {
 
 TEST_F(StoreHostileDatabase, MissingDirectoryAboveIsRefused) {
     path_ = directory_ + "/no/such/store.db";
-    setenv("DVS_CONFIGSTORE", path_.c_str(), 1);
     ExpectRefused(IO_ERROR, "directory");
 }
 
@@ -219,7 +218,7 @@ TEST_F(StoreHostileDatabase, WideModesAreTakenBack) {
 
 TEST_F(StoreHostileDatabase, PathThatLooksLikeAUriIsAFileName) {
     ASSERT_EQ(chdir(directory_.c_str()), 0);
-    setenv("DVS_CONFIGSTORE", "file:x.db?mode=memory", 1);
+    path_ = "file:x.db?mode=memory";
     Save(Open().get(), "{}");
     EXPECT_TRUE(std::filesystem::exists(directory_ + "/file:x.db?mode=memory"));
     ASSERT_EQ(chdir("/"), 0);

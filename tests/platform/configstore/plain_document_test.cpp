@@ -7,7 +7,6 @@
 #include "platform/configstore/support.h"
 
 #include "platform/embedded/configstore/document.h"
-#include "platform/embedded/configstore/log.h"
 
 using namespace configstore;
 using namespace store_test;
@@ -25,7 +24,6 @@ void PrintTo(const Outcome &outcome, std::ostream *out) {
 }
 
 Outcome Read(const std::string &json) {
-    const MessageCollector quiet;
     Outcome outcome;
     Object *object = nullptr;
     outcome.status = CreateObject(kKey, kGroup, kComponent, "sw1", json.c_str(), &object);
@@ -72,7 +70,7 @@ std::shared_ptr<const Buffer> Kept(const std::string &text) {
 
 /// What the look at a document for a rewrite finds: nothing, or the document with its lists read after all.
 std::optional<std::string> ReadOutlined(const std::string &json) {
-    Tree tree(kKey, kGroup, kComponent, "sw1");
+    Tree tree({Layer::Current, kKey, kGroup, kComponent, "sw1"});
     Outline outline;
     if (!ReadOutline(Kept(json), &tree, &outline)) return std::nullopt;
     for (Object *member = tree.root.members.first; member; member = member->next) {
@@ -105,7 +103,7 @@ TEST(PlainDocument, OutlineOfASoundDocumentLeavesItsLongestListText) {
     const std::string json = kPorts;
     ASSERT_EQ(Read(json).status, OK);
     EXPECT_EQ(ReadOutlined(json), Read(json).document);
-    Tree tree(kKey, kGroup, kComponent, "sw1");
+    Tree tree({Layer::Current, kKey, kGroup, kComponent, "sw1"});
     Outline outline;
     ASSERT_TRUE(ReadOutline(Kept(json), &tree, &outline));
     EXPECT_EQ(json.substr(outline.begin, outline.end - outline.begin).substr(0, 8), R"({"1":{"n)");

@@ -10,7 +10,6 @@
 #include <random>
 
 #include "platform/embedded/configstore/document.h"
-#include "platform/embedded/configstore/log.h"
 #include "platform/embedded/configstore/oracle.h"
 
 using namespace configstore;
@@ -165,12 +164,11 @@ void ForEachField(const Visit &visit) {
         FindSchema(kKey, kGroup), "", [](const std::string &value) { return value; }, visit);
 }
 
-/// Set's verdict on a document and what it logged.
+/// Set's verdict on a document and the record of it.
 int32_t Verdict(Store *store, const std::string &document, std::string *why) {
     const ObjectPtr object = NewSwitch(document);
-    const MessageCollector messages;
     const int32_t status = Set(store, object.get(), "EXTERNAL");
-    *why = messages.Text();
+    *why = LastFailure(store);
     return status;
 }
 
@@ -288,7 +286,6 @@ TEST_F(StoreSchema, LimitsOfUplinkNamesPortKeysAgentsAndParametersAreTheLoadersO
 TEST_F(StoreSchema, VerdictIsGivenAtSetAndMendedValuesPass) {
     const StorePtr store = Open();
     const ObjectPtr object = NewSwitch();
-    const MessageCollector quiet;
     EXPECT_EQ(SetValueUint32(object.get(), "name", 1), OK);
     EXPECT_EQ(AppendValueString(object.get(), "uplink_port_names", std::string(81, 'x').c_str()), OK);
     EXPECT_EQ(Set(store.get(), object.get(), "EXTERNAL"), SCHEMA_VIOLATION);
@@ -304,7 +301,6 @@ TEST_F(StoreSchema, SingletonAndListOfInstancesAreNotMixedUp) {
     Sub(one.get(), "ports");
     const ObjectPtr other = NewSwitch();
     Sub(other.get(), "settings", "id");
-    const MessageCollector quiet;
     EXPECT_EQ(Set(store.get(), one.get(), "EXTERNAL"), SCHEMA_VIOLATION);
     EXPECT_EQ(Set(store.get(), other.get(), "EXTERNAL"), SCHEMA_VIOLATION);
 }

@@ -1,17 +1,38 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Stores and transactions: what is committed is there, what is cancelled is not, and every status once.
+// Stores and transactions, over every backend: a commit is visible, a cancelled change is not, and every status
+// once.
 
 #include "platform/configstore/support.h"
 
+#include <filesystem>
 #include <sys/stat.h>
 
 using namespace configstore;
 using namespace store_test;
 
-using StoreRows = StoreTest;
-using StoreTransactions = StoreTest;
+namespace {
 
-TEST_F(StoreRows, EmptyStoreListsNothingWithSuccess) {
+class StoreRows : public AnyStoreTest {
+protected:
+    static std::vector<admin::Entry> History(Store *store) {
+        std::vector<admin::Entry> entries;
+        EXPECT_EQ(admin::History(store, &entries), OK);
+        return entries;
+    }
+    /// The revision that brought the object's present document.
+    static int64_t RevisionOf(Store *store, const std::string &id) {
+        std::vector<admin::Entry> entries;
+        EXPECT_EQ(admin::List(store, &entries), OK);
+        for (const admin::Entry &entry : entries)
+            if (entry.address.instance == id) return entry.revision;
+        return -1;
+    }
+};
+RUN_OVER_EVERY_BACKEND(StoreRows);
+
+using StoreFile = StoreTest;
+
+TEST_P(StoreRows, EmptyStoreListsNothingWithSuccess) {
     const StorePtr store = Open();
     EXPECT_TRUE(StoredIds(store.get()).empty());
     Object **objects = nullptr;
@@ -20,7 +41,7 @@ TEST_F(StoreRows, EmptyStoreListsNothingWithSuccess) {
     EXPECT_EQ(count, 0);
 }
 
-TEST_F(StoreRows, ObjectReadsBackFromAnotherConnection) {
+TEST_P(StoreRows, ObjectReadsBackFromAnotherConnection) {
     {
         const StorePtr store = Open();
         Save(store.get(), R"({"name":"one","max_ports":8})");
@@ -29,7 +50,7 @@ TEST_F(StoreRows, ObjectReadsBackFromAnotherConnection) {
     EXPECT_EQ(Stored(store.get()), R"({"name":"one","max_ports":8})");
 }
 
-TEST_F(StoreRows, AbsentObjectIsNotFound) {
+TEST_P(StoreRows, AbsentObjectIsNotFound) {
     const StorePtr store = Open();
     Object *object = nullptr;
     EXPECT_EQ(Get(store.get(), kKey, kGroup, kComponent, "x", &object), NOT_FOUND);
@@ -37,14 +58,14 @@ TEST_F(StoreRows, AbsentObjectIsNotFound) {
     EXPECT_EQ(Delete(store.get(), kKey, kGroup, kComponent, "x"), NOT_FOUND);
 }
 
-TEST_F(StoreRows, ListsInAscendingInstanceId) {
+TEST_P(StoreRows, ListsInAscendingInstanceId) {
     const StorePtr store = Open();
     for (const char *id : {"b", "a", "c"})
         Save(store.get(), "{}", id);
     EXPECT_EQ(StoredIds(store.get()), (std::vector<std::string>{"a", "b", "c"}));
 }
 
-TEST_F(StoreRows, DesiredLayerIsApartFromTheCurrentOne) {
+TEST_P(StoreRows, DesiredLayerIsApartFromTheCurrentOne) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"wanted"})", "sw1", "USER");
     EXPECT_EQ(Stored(store.get()), "");
@@ -56,16 +77,19 @@ TEST_F(StoreRows, DesiredLayerIsApartFromTheCurrentOne) {
     DestroyObjects(objects, count);
 }
 
-TEST_F(StoreRows, DeleteRemovesTheCurrentObjectOnly) {
+TEST_P(StoreRows, DeleteRemovesTheCurrentObjectOnly) {
     const StorePtr store = Open();
     Save(store.get(), "{}", "sw1", "USER");
     Save(store.get(), "{}", "sw1", "EXTERNAL");
     EXPECT_EQ(Delete(store.get(), kKey, kGroup, kComponent, "sw1"), OK);
     EXPECT_EQ(Stored(store.get()), "");
-    EXPECT_EQ(Number("SELECT count(*) FROM object WHERE layer = 'desired'"), 1);
+    std::vector<admin::Entry> entries;
+    ASSERT_EQ(admin::List(store.get(), &entries), OK);
+    ASSERT_EQ(entries.size(), 1U);
+    EXPECT_EQ(entries[0].address.layer, Layer::Desired);
 }
 
-TEST_F(StoreRows, SingletonObjectHasNoInstanceId) {
+TEST_P(StoreRows, SingletonObjectHasNoInstanceId) {
     const StorePtr store = Open();
     Object *raw = nullptr;
     ASSERT_EQ(CreateObject("k", "g", "c", nullptr, "{}", &raw), OK);
@@ -75,7 +99,7 @@ TEST_F(StoreRows, SingletonObjectHasNoInstanceId) {
     DestroyObject(raw);
 }
 
-TEST_F(StoreRows, UnknownSourceIsABadParameter) {
+TEST_P(StoreRows, UnknownSourceIsABadParameter) {
     const StorePtr store = Open();
     const ObjectPtr object = NewSwitch();
     EXPECT_EQ(Set(store.get(), object.get(), "external"), BAD_PARAMETER);
@@ -87,10 +111,41 @@ TEST_F(StoreRows, UnknownSourceIsABadParameter) {
     DestroyStore(nullptr);
 }
 
-TEST_F(StoreRows, EveryReplacedAndDeletedDocumentIsInHistory) {
+TEST_P(StoreRows, EveryReplacedAndDeletedDocumentIsInHistory) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"1"})");
     Save(store.get(), R"({"name":"2"})");
+    ASSERT_EQ(Delete(store.get(), kKey, kGroup, kComponent, "sw1"), OK);
+    const std::vector<admin::Entry> past = History(store.get());
+    ASSERT_EQ(past.size(), 2U);
+    EXPECT_TRUE(past[0].deleted);
+    EXPECT_FALSE(past[1].deleted);
+    std::string first;
+    ASSERT_EQ(admin::ExportAsOf(store.get(), past[1].address, 1, &first), OK);
+    EXPECT_EQ(first, R"({"name":"1"})");
+    EXPECT_TRUE(StoredIds(store.get()).empty());
+}
+
+TEST_P(StoreRows, DocumentReplacedWithinItsOwnTransactionLeavesNoHistory) {
+    const StorePtr store = Open();
+    Save(store.get(), R"({"name":"before"})");
+    ASSERT_EQ(BeginTransaction(store.get()), OK);
+    for (const char *json : {R"({"name":"between"})", R"({"name":"after"})"})
+        ASSERT_EQ(Set(store.get(), NewSwitch(json).get(), "EXTERNAL"), OK);
+    ASSERT_EQ(CommitTransaction(store.get()), OK);
+    EXPECT_EQ(Stored(store.get()), R"({"name":"after"})");
+    const std::vector<admin::Entry> past = History(store.get());
+    ASSERT_EQ(past.size(), 1U);
+    std::string text;
+    ASSERT_EQ(admin::ExportAsOf(store.get(), past[0].address, 1, &text), OK);
+    EXPECT_EQ(text, R"({"name":"before"})");
+}
+
+TEST_F(StoreFile, ViewsForPeopleHaveTheDocuments) {
+    const StorePtr store = Open();
+    Save(store.get(), R"({"name":"1"})");
+    Save(store.get(), R"({"name":"2"})");
+    EXPECT_EQ(Number("SELECT document ->> '$.name' FROM object"), 2);
     ASSERT_EQ(Delete(store.get(), kKey, kGroup, kComponent, "sw1"), OK);
     EXPECT_EQ(Number("SELECT count(*) FROM history"), 2);
     EXPECT_EQ(Number("SELECT document ->> '$.name' FROM history ORDER BY ended LIMIT 1"), 1);
@@ -98,21 +153,20 @@ TEST_F(StoreRows, EveryReplacedAndDeletedDocumentIsInHistory) {
     EXPECT_EQ(Number("SELECT count(*) FROM object"), 0);
 }
 
-TEST_F(StoreRows, TransactionTakesOneRevision) {
+TEST_P(StoreRows, TransactionTakesOneRevision) {
     const StorePtr store = Open();
     ASSERT_EQ(BeginTransaction(store.get()), OK);
     for (const char *id : {"a", "b"})
         ASSERT_EQ(Set(store.get(), NewSwitch("{}", id).get(), "EXTERNAL"), OK);
     ASSERT_EQ(CommitTransaction(store.get()), OK);
     Save(store.get(), R"({"name":"x"})", "a");
-    EXPECT_EQ(Number("SELECT revision FROM object WHERE instance = 'a'"), 2);
-    EXPECT_EQ(Number("SELECT revision FROM object WHERE instance = 'b'"), 1);
+    EXPECT_EQ(RevisionOf(store.get(), "a"), 2);
+    EXPECT_EQ(RevisionOf(store.get(), "b"), 1);
 }
 
-TEST_F(StoreRows, FileAndDirectoryAreForTheOwnerOnly) {
+TEST_F(StoreFile, FileAndDirectoryAreForTheOwnerOnly) {
     const mode_t before = umask(0);
     path_ = directory_ + "/sub/store.db";
-    setenv("DVS_CONFIGSTORE", path_.c_str(), 1);
     const StorePtr store = Open();
     Save(store.get(), "{}");
     umask(before);
@@ -125,19 +179,51 @@ TEST_F(StoreRows, FileAndDirectoryAreForTheOwnerOnly) {
     }
 }
 
-TEST_F(StoreRows, MemoryDatabaseIsOnePerProcess) {
-    setenv("DVS_CONFIGSTORE", ":memory:", 1);
-    Save(Open().get(), R"({"name":"kept"})");
-    EXPECT_EQ(Stored(Open().get()), R"({"name":"kept"})");
+/// The store that GetStore opens, which the environment names.
+StorePtr OpenHosts(const std::string &path) {
+    setenv("DVS_CONFIGSTORE", path.c_str(), 1);
+    Store *store = nullptr;
+    EXPECT_EQ(GetStore(&store), OK);
+    return StorePtr(store);
 }
 
-TEST_F(StoreRows, PathIsReadWithEachStore) {
-    Save(Open().get(), "{}");
-    setenv("DVS_CONFIGSTORE", (directory_ + "/other.db").c_str(), 1);
-    EXPECT_TRUE(StoredIds(Open().get()).empty());
+TEST_F(StoreFile, MemoryDatabaseIsOnePerProcess) {
+    Save(OpenHosts(":memory:").get(), R"({"name":"kept"})");
+    EXPECT_EQ(Stored(OpenHosts(":memory:").get()), R"({"name":"kept"})");
+    EXPECT_FALSE(std::filesystem::exists(":memory:"));
+    Store *other = nullptr;
+    ASSERT_EQ(admin::OpenInMemory(&other), OK);
+    EXPECT_EQ(Stored(StorePtr(other).get()), ""); // a store of its own
 }
 
-TEST_F(StoreTransactions, CancelLeavesTheStoreAsItWas) {
+TEST_F(StoreFile, PathIsReadWithEachStore) {
+    Save(OpenHosts(path_).get(), "{}");
+    EXPECT_TRUE(StoredIds(OpenHosts(directory_ + "/other.db").get()).empty());
+    EXPECT_EQ(admin::DefaultPath(), directory_ + "/other.db");
+}
+
+TEST_F(StoreFile, FailuresOfTheHostsStoreAreLoggedAndThoseOfToolsAreRecordsOnly) {
+    const ObjectPtr bad = NewSwitch(R"({"name":7})");
+    const StorePtr store = OpenHosts(path_);
+    (void)TakeHostLog();
+    EXPECT_EQ(Set(store.get(), bad.get(), "EXTERNAL"), SCHEMA_VIOLATION);
+    EXPECT_EQ(TakeHostLog(),
+              "config store " + path_ + ": switches/network_vds/qel[sw1]: name: it must be a text");
+    const StorePtr tools = Open();
+    EXPECT_EQ(Set(tools.get(), bad.get(), "USER"), SCHEMA_VIOLATION);
+    EXPECT_EQ(TakeHostLog(), "");
+    const Failure *const failure = admin::LastFailure(tools.get());
+    ASSERT_NE(failure, nullptr);
+    EXPECT_EQ(failure->status, SCHEMA_VIOLATION);
+    EXPECT_EQ(failure->path, path_);
+    EXPECT_EQ(failure->address, (Address{Layer::Desired, kKey, kGroup, kComponent, "sw1"}));
+    EXPECT_EQ(failure->field, "name");
+    EXPECT_EQ(failure->what, "switches/network_vds/qel[sw1]: name: it must be a text");
+    EXPECT_TRUE(StoredIds(tools.get()).empty());
+    EXPECT_EQ(admin::LastFailure(tools.get()), nullptr); // a call that succeeds has no failure
+}
+
+TEST_P(StoreRows, CancelLeavesTheStoreAsItWas) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"old"})");
     ASSERT_EQ(BeginTransaction(store.get()), OK);
@@ -145,11 +231,13 @@ TEST_F(StoreTransactions, CancelLeavesTheStoreAsItWas) {
     EXPECT_EQ(Stored(store.get()), R"({"name":"new"})");
     ASSERT_EQ(CancelTransaction(store.get()), OK);
     EXPECT_EQ(Stored(store.get()), R"({"name":"old"})");
-    EXPECT_EQ(Number("SELECT count(*) FROM history"), 0);
-    EXPECT_EQ(Number("SELECT count(*) FROM revision"), 1);
+    EXPECT_TRUE(History(store.get()).empty());
+    int64_t revision = 0;
+    ASSERT_EQ(admin::LatestRevision(store.get(), &revision), OK);
+    EXPECT_EQ(revision, 1);
 }
 
-TEST_F(StoreTransactions, DestroyCancels) {
+TEST_P(StoreRows, DestroyCancels) {
     {
         const StorePtr store = Open();
         ASSERT_EQ(BeginTransaction(store.get()), OK);
@@ -158,7 +246,7 @@ TEST_F(StoreTransactions, DestroyCancels) {
     EXPECT_TRUE(StoredIds(Open().get()).empty());
 }
 
-TEST_F(StoreTransactions, MisuseIsABadParameter) {
+TEST_P(StoreRows, MisuseIsABadParameter) {
     const StorePtr store = Open();
     EXPECT_EQ(CommitTransaction(store.get()), BAD_PARAMETER);
     EXPECT_EQ(CancelTransaction(store.get()), BAD_PARAMETER);
@@ -166,3 +254,5 @@ TEST_F(StoreTransactions, MisuseIsABadParameter) {
     EXPECT_EQ(BeginTransaction(store.get()), BAD_PARAMETER);
     EXPECT_EQ(CancelTransaction(store.get()), OK);
 }
+
+} // namespace

@@ -3,15 +3,44 @@
 
 #include "platform/configstore/support.h"
 
+#include <algorithm>
+#include <cstdarg>
+#include <cstdio>
 #include <cstdlib>
 #include <filesystem>
 #include <sqlite3.h>
+#include <utility>
 
 #include "platform/embedded/configstore/document.h"
+#include "platform/embedded/configstore/store.h"
+#include "platform/runtime.h"
+
+namespace {
+
+// In place of the host's log. Without allocations, which some tests count.
+char g_hostLog[1 << 14];
+std::size_t g_hostLogSize = 0;
+
+} // namespace
+
+extern "C" void LogV(uint32_t, const char *format, va_list args) {
+    const std::size_t left = sizeof g_hostLog - g_hostLogSize;
+    const int size = std::vsnprintf(g_hostLog + g_hostLogSize, left, format, args);
+    if (size > 0) g_hostLogSize += std::min(static_cast<std::size_t>(size), left - 1);
+}
 
 namespace store_test {
 
 using namespace configstore;
+
+std::string TakeHostLog() {
+    return std::string(g_hostLog, std::exchange(g_hostLogSize, 0));
+}
+
+std::string LastFailure(const Store *store) {
+    const Failure *const failure = admin::LastFailure(store);
+    return failure ? configstore::Text(*failure) : "";
+}
 
 ObjectPtr NewSwitch(const std::string &json, const char *id) {
     Object *object = nullptr;
@@ -89,7 +118,6 @@ void StoreTest::SetUp() {
     ASSERT_NE(mkdtemp(name), nullptr);
     directory_ = name;
     path_ = directory_ + "/store.db";
-    setenv("DVS_CONFIGSTORE", path_.c_str(), 1);
 }
 
 void StoreTest::TearDown() {
@@ -98,8 +126,24 @@ void StoreTest::TearDown() {
 
 StorePtr StoreTest::Open() {
     Store *store = nullptr;
-    EXPECT_EQ(GetStore(&store), OK);
+    Failure failure;
+    EXPECT_EQ(admin::Open(path_, false, &store, &failure), OK) << configstore::Text(failure);
     return StorePtr(store);
+}
+
+StorePtr AnyStoreTest::Open() {
+    if (GetParam() == In::File) return StoreTest::Open();
+    auto store = std::make_unique<Store>("in memory", FailureKeeper::Log::No);
+    store->backend = OpenMemory(memory_, &store->failures);
+    return StorePtr(store.release());
+}
+
+void PrintTo(In in, std::ostream *out) {
+    *out << (in == In::File ? "File" : "Memory");
+}
+
+std::string NameOf(const testing::TestParamInfo<In> &info) {
+    return testing::PrintToString(info.param);
 }
 
 void StoreTest::Save(Store *store, const std::string &json, const char *id, const char *source) {

@@ -2,10 +2,11 @@
 #ifndef TESTS_PLATFORM_CONFIGSTORE_SUPPORT_H
 #define TESTS_PLATFORM_CONFIGSTORE_SUPPORT_H
 
-// What the config store's tests share: owners for the client interface's handles, a directory of one's own,
-// and a store in it.
+// What the config store's tests share: owners for the client interface's handles, a store in a directory of
+// the test's own or in memory, and the host's log.
 
 #include <cstdint>
+#include <iosfwd>
 #include <memory>
 #include <string>
 #include <vector>
@@ -13,6 +14,7 @@
 #include <gtest/gtest.h>
 
 #include "platform/configstore.h"
+#include "platform/embedded/configstore/admin.h"
 
 namespace store_test {
 
@@ -51,13 +53,19 @@ std::vector<std::string> Ids(configstore::Object *object, const char *key, int32
 /// The current objects' ids, in the order of the listing.
 std::vector<std::string> StoredIds(configstore::Store *store);
 
-/// A directory of the test's own, removed with what is in it, and DVS_CONFIGSTORE pointing into it.
+/// What went to the host's log since the last call.
+std::string TakeHostLog();
+
+/// The text of the store's last failure; empty if there is none.
+std::string LastFailure(const configstore::Store *store);
+
+/// A store in a file of a directory of the test's own, which is removed with everything in it.
 class StoreTest : public testing::Test {
 protected:
     void SetUp() override;
     void TearDown() override;
-    /// Opens the store, expecting that it can be.
-    StorePtr Open();
+    /// Opens the store once more, expecting that it can be.
+    virtual StorePtr Open();
     /// Stores a switch in a transaction of its own, expecting that it can be.
     void Save(configstore::Store *store, const std::string &json, const char *id = "sw1",
               const char *source = "EXTERNAL");
@@ -71,6 +79,25 @@ protected:
     std::string path_;
 };
 
+enum class In { File, Memory };
+void PrintTo(In in, std::ostream *out);
+
+/// For what holds of every backend: a store in a file, or in memory.
+class AnyStoreTest : public StoreTest, public testing::WithParamInterface<In> {
+protected:
+    StorePtr Open() override;
+
+private:
+    std::shared_ptr<configstore::MemoryDatabase> memory_ = configstore::NewMemoryDatabase();
+};
+
+std::string NameOf(const testing::TestParamInfo<In> &info);
+
 } // namespace store_test
+
+/// Runs the tests of a suite, which is an AnyStoreTest, over every backend.
+#define RUN_OVER_EVERY_BACKEND(suite)                                                                        \
+    INSTANTIATE_TEST_SUITE_P(, suite, testing::Values(store_test::In::File, store_test::In::Memory),         \
+                             store_test::NameOf)
 
 #endif

@@ -80,6 +80,11 @@ Error StoreError(std::int32_t status, std::string title, const std::string &path
     return error;
 }
 
+Error StoreError(std::int32_t status, std::string title, const std::string &path,
+                 const configstore::Failure *failure) {
+    return StoreError(status, std::move(title), path, failure ? configstore::Text(*failure) : std::string());
+}
+
 Error NoStoreError(const std::string &path) {
     return Error(Exit::Store, "there is no config store")
         .In(StoreName(path))
@@ -96,7 +101,10 @@ Error NoSwitchError(const std::string &path, std::string_view name, admin::Layer
 
 OpenStore::OpenStore(Context &context, const std::string &path, bool readOnly) : path_(path) {
     if (readOnly && !FileExists(path)) throw Error(NoStoreError(path));
-    Require(admin::Open(path, readOnly, &store_), "cannot open the config store");
+    configstore::Failure failure;
+    if (const std::int32_t status = admin::Open(path, readOnly, &store_, &failure); status != configstore::OK)
+        throw Error(StoreError(status, "cannot open the config store", path_,
+                               failure.status != 0 ? &failure : nullptr));
     if (readOnly) Relieve();
     admin::SetBusyTimeout(store_, context.deadline.MillisecondsLeft());
 }
@@ -111,7 +119,7 @@ void OpenStore::Relieve() {
 }
 
 void OpenStore::Require(std::int32_t status, const char *title) const {
-    if (status != configstore::OK) throw Error(StoreError(status, title, path_, messages_.Text()));
+    if (status != configstore::OK) throw Error(StoreError(status, title, path_, admin::LastFailure(store_)));
 }
 
 void AwaitTurn(Context &context, const std::string &path, const char *title) {
@@ -130,8 +138,8 @@ std::vector<admin::Entry> OpenStore::List() const {
     return entries;
 }
 
-std::vector<admin::PastEntry> OpenStore::History() const {
-    std::vector<admin::PastEntry> entries;
+std::vector<admin::Entry> OpenStore::History() const {
+    std::vector<admin::Entry> entries;
     Require(admin::History(store_, &entries), "cannot read the config store's history");
     return entries;
 }
@@ -176,19 +184,17 @@ admin::Address FindObject(const OpenStore &store, admin::Layer layer, const std:
     for (const admin::Entry &entry : entries)
         if (entry.address.layer == layer && entry.address.instance == text) return entry.address;
     if (withPast)
-        for (const admin::PastEntry &past : store.History())
-            if (past.entry.address.layer == layer && past.entry.address.instance == text)
-                return past.entry.address;
+        for (const admin::Entry &past : store.History())
+            if (past.address.layer == layer && past.address.instance == text) return past.address;
     for (const admin::Entry &entry : entries)
         if (entry.address.layer == layer &&
             NameInDocument(store.Document(entry.address).value_or("")) == text)
             return entry.address;
     if (withPast)
-        for (const admin::PastEntry &past : store.History())
-            if (past.entry.address.layer == layer &&
-                NameInDocument(store.DocumentAsOf(past.entry.address, past.entry.revision).value_or("")) ==
-                    text)
-                return past.entry.address;
+        for (const admin::Entry &past : store.History())
+            if (past.address.layer == layer &&
+                NameInDocument(store.DocumentAsOf(past.address, past.revision).value_or("")) == text)
+                return past.address;
     throw Error(NoSwitchError(store.Path(), text, layer));
 }
 

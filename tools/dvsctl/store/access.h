@@ -35,6 +35,9 @@ Exit StoreExit(std::int32_t status);
 
 /// The error for a store status other than 0; `cause` is what the store said meanwhile, or empty.
 Error StoreError(std::int32_t status, std::string title, const std::string &path, const std::string &cause);
+/// The same; `failure` is the store's record of it, or null.
+Error StoreError(std::int32_t status, std::string title, const std::string &path,
+                 const configstore::Failure *failure);
 
 /// The error of those who need a store where there is none.
 Error NoStoreError(const std::string &path);
@@ -58,7 +61,7 @@ public:
     void Require(std::int32_t status, const char *title) const;
 
     [[nodiscard]] std::vector<admin::Entry> List() const;
-    [[nodiscard]] std::vector<admin::PastEntry> History() const;
+    [[nodiscard]] std::vector<admin::Entry> History() const;
     [[nodiscard]] std::int64_t LatestRevision() const;
     /// The object's document; nothing where there is none.
     [[nodiscard]] std::optional<std::string> Document(const admin::Address &address) const;
@@ -69,7 +72,6 @@ public:
 private:
     void Relieve();
 
-    configstore::MessageCollector messages_;
     configstore::Store *store_ = nullptr;
     std::string path_;
 };

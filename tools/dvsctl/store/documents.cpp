@@ -72,7 +72,6 @@ void CheckInput(const admin::Address &address, const std::string &file, const st
         throw;
     }
     std::vector<admin::Problem> problems;
-    const configstore::MessageCollector messages;
     const std::int32_t status = admin::CheckDocument(address.key, address.group, text, &problems);
     if (status != configstore::OK) throw Error(RefusedDocument(status, file, problems));
 }

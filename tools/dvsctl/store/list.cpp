@@ -2,6 +2,8 @@
 // `dvsctl store list` and `dvsctl store history`: what a store holds, and what it held.
 
 #include <algorithm>
+#include <map>
+#include <unordered_set>
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
@@ -53,30 +55,23 @@ struct Event {
     bool present = false;
 };
 
-bool IsSame(const admin::Address &a, const admin::Address &b) {
-    return a.layer == b.layer && a.key == b.key && a.group == b.group && a.component == b.component &&
-           a.instance == b.instance;
-}
-
-// A document that came in the revision that ended another of the same object replaced that one.
-const char *HowItCame(const admin::Entry &entry, const std::vector<admin::PastEntry> &past) {
-    const bool replaced = std::any_of(past.begin(), past.end(), [&](const admin::PastEntry &other) {
-        return other.ended == entry.revision && !other.deleted && IsSame(other.entry.address, entry.address);
-    });
-    return replaced ? "changed" : "added";
-}
-
 std::vector<Event> EventsOf(const OpenStore &store) {
-    const std::vector<admin::PastEntry> past = store.History();
+    const std::vector<admin::Entry> past = store.History();
+    std::map<admin::Address, std::unordered_set<std::int64_t>> replacements; // revisions, by object
+    for (const admin::Entry &entry : past)
+        if (!entry.deleted) replacements[entry.address].insert(entry.ended);
+    const auto came = [&](const admin::Entry &entry) {
+        const auto object = replacements.find(entry.address);
+        const bool replaced = object != replacements.end() && object->second.contains(entry.revision);
+        return Event{entry.revision, entry.savedMs, replaced ? "changed" : "added",
+                     entry.address,  entry.bytes,   entry.ended == 0};
+    };
     std::vector<Event> events;
     for (const admin::Entry &entry : store.List())
-        events.push_back(
-            {entry.revision, entry.savedMs, HowItCame(entry, past), entry.address, entry.bytes, true});
-    for (const admin::PastEntry &old : past) {
-        const admin::Entry &entry = old.entry;
-        events.push_back(
-            {entry.revision, entry.savedMs, HowItCame(entry, past), entry.address, entry.bytes, false});
-        if (old.deleted) events.push_back({old.ended, old.endedMs, "deleted", entry.address, 0, false});
+        events.push_back(came(entry));
+    for (const admin::Entry &entry : past) {
+        events.push_back(came(entry));
+        if (entry.deleted) events.push_back({entry.ended, entry.endedMs, "deleted", entry.address, 0, false});
     }
     std::stable_sort(events.begin(), events.end(),
                      [](const Event &a, const Event &b) { return a.revision > b.revision; });
@@ -157,7 +152,7 @@ Exit RunStoreHistory(Context &context) {
     if (wanted) only = FindObject(store, LayerOf(options), *wanted, true);
     json::array events;
     for (const Event &event : EventsOf(store)) {
-        if (only ? !IsSame(*only, event.address) : !IsWanted(options, event.address)) continue;
+        if (only ? *only != event.address : !IsWanted(options, event.address)) continue;
         table.Add({{std::to_string(event.revision)},
                    {ShowTime(event.timeMs), Style::Dim},
                    {event.what},

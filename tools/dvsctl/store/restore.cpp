@@ -2,7 +2,7 @@
 // `dvsctl store restore`: one switch, or the whole store, as of a revision.
 
 #include <algorithm>
-#include <tuple>
+#include <set>
 
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
@@ -17,20 +17,12 @@ namespace dvs::ctl {
 
 namespace {
 
-std::vector<admin::Address> AllAddresses(const OpenStore &store) {
-    std::vector<admin::Address> addresses;
+std::set<admin::Address> AllAddresses(const OpenStore &store) {
+    std::set<admin::Address> addresses;
     for (const admin::Entry &entry : store.List())
-        addresses.push_back(entry.address);
-    for (const admin::PastEntry &past : store.History())
-        addresses.push_back(past.entry.address);
-    const auto order = [](const admin::Address &a) {
-        return std::tie(a.layer, a.key, a.group, a.component, a.instance);
-    };
-    std::sort(addresses.begin(), addresses.end(),
-              [&](const auto &a, const auto &b) { return order(a) < order(b); });
-    addresses.erase(std::unique(addresses.begin(), addresses.end(),
-                                [&](const auto &a, const auto &b) { return order(a) == order(b); }),
-                    addresses.end());
+        addresses.insert(entry.address);
+    for (const admin::Entry &past : store.History())
+        addresses.insert(past.address);
     return addresses;
 }
 

@@ -1,15 +1,19 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The database's tables and versions (migrations.h). Each step brings a database from one user_version to the
-// next and is never changed once released; a new version is a new step.
+// The database's tables and versions (sqlite_tables.h). Each step brings a database from one user_version to
+// the next. A released step never changes; a new version gets a new step.
 
-#include "platform/embedded/configstore/migrations.h"
+#include "platform/embedded/configstore/backend/sqlite_tables.h"
 
-#include "platform/embedded/configstore/log.h"
+#include <iterator>
+
+#include "platform/configstore.h"
 
 namespace configstore {
 
 namespace {
 
+constexpr int kSchemaVersion = 1;          // user_version of the databases that this code writes
+constexpr int kApplicationId = 0x44565343; // "DVSC"
 constexpr const char *kPageSize = "PRAGMA page_size=32768"; // of new databases; others keep theirs
 
 struct Definition {
@@ -41,8 +45,8 @@ constexpr Definition kDefinitions[] = {
                 "JOIN document d ON d.id = h.document JOIN revision r ON r.revision = h.ended"},
 };
 
-int32_t ReadNumber(Store *store, const char *sql, int64_t *value) {
-    Statement statement(store, sql);
+int32_t ReadNumber(const Connection &connection, const char *sql, int64_t *value) {
+    Statement statement(connection, sql);
     if (statement.Step()) *value = statement.Integer(0);
     return statement.Status();
 }
@@ -53,41 +57,41 @@ struct Identity {
     int64_t definitions = 0;
 };
 
-int32_t ReadIdentity(Store *store, Identity *identity) {
-    int32_t status = ReadNumber(store, "PRAGMA user_version", &identity->version);
-    if (status == OK) status = ReadNumber(store, "PRAGMA application_id", &identity->application);
+int32_t ReadIdentity(const Connection &connection, Identity *identity) {
+    int32_t status = ReadNumber(connection, "PRAGMA user_version", &identity->version);
+    if (status == OK) status = ReadNumber(connection, "PRAGMA application_id", &identity->application);
     if (status == OK)
-        status = ReadNumber(store, "SELECT count(*) FROM sqlite_schema", &identity->definitions);
+        status = ReadNumber(connection, "SELECT count(*) FROM sqlite_schema", &identity->definitions);
     return status;
 }
 
-int32_t CreateTables(Store *store) {
+int32_t CreateTables(const Connection &connection) {
     for (const Definition &definition : kDefinitions) {
-        const int32_t status = Execute(store, definition.sql);
+        const int32_t status = Execute(connection, definition.sql);
         if (status != OK) return status;
     }
     const std::string marks = "PRAGMA application_id=" + std::to_string(kApplicationId);
     const std::string version = "PRAGMA user_version=" + std::to_string(kSchemaVersion);
-    const int32_t status = Execute(store, marks.c_str());
-    return status == OK ? Execute(store, version.c_str()) : status;
+    const int32_t status = Execute(connection, marks.c_str());
+    return status == OK ? Execute(connection, version.c_str()) : status;
 }
 
 /// Two processes may find the same empty file: the second one finds the tables made once it has its turn.
-int32_t MakeStore(Store *store) {
-    int32_t status = Execute(store, "BEGIN IMMEDIATE");
+int32_t MakeStore(const Connection &connection) {
+    int32_t status = Execute(connection, "BEGIN IMMEDIATE");
     if (status != OK) return status;
     Identity identity;
-    status = ReadIdentity(store, &identity);
-    if (status == OK && identity.definitions == 0) status = CreateTables(store);
-    if (status == OK) return Execute(store, "COMMIT");
-    (void)Execute(store, "ROLLBACK");
+    status = ReadIdentity(connection, &identity);
+    if (status == OK && identity.definitions == 0) status = CreateTables(connection);
+    if (status == OK) return Execute(connection, "COMMIT");
+    (void)Execute(connection, "ROLLBACK");
     return status;
 }
 
 /// Whether the tables are the ones that this code made. Others could turn a plain statement into something
 /// else.
-int32_t CheckDefinitions(Store *store) {
-    Statement statement(store, "SELECT name, sql FROM sqlite_schema WHERE sql IS NOT NULL");
+int32_t CheckDefinitions(const Connection &connection) {
+    Statement statement(connection, "SELECT name, sql FROM sqlite_schema WHERE sql IS NOT NULL");
     std::size_t known = 0;
     while (statement.Step()) {
         const std::string_view name = statement.Text(0);
@@ -98,49 +102,41 @@ int32_t CheckDefinitions(Store *store) {
     }
     if (statement.Status() != OK) return statement.Status();
     if (known == std::size(kDefinitions)) return OK;
-    Log("config store %s: its tables are not those of a config store", store->path.c_str());
-    return CORRUPT;
+    return connection.failures->Fail(CORRUPT, "its tables are not those of a config store");
 }
 
-int32_t UseWal(Store *store) {
-    Statement statement(store, "PRAGMA journal_mode=WAL");
+int32_t UseWal(const Connection &connection) {
+    Statement statement(connection, "PRAGMA journal_mode=WAL");
     const bool wal = statement.Step() && statement.Text(0) == "wal";
     if (statement.Status() != OK) return statement.Status();
-    if (wal || store->readOnly || store->path == kMemoryPath) return OK;
-    Log("config store %s: the file system cannot hold a write-ahead log", store->path.c_str());
-    return IO_ERROR;
+    if (wal || connection.isReadOnly) return OK;
+    return connection.failures->Fail(IO_ERROR, "the file system cannot hold a write-ahead log");
 }
 
 } // namespace
 
-int32_t Migrate(Store *store) {
+int32_t Migrate(const Connection &connection) {
     static_assert(kSchemaVersion == 1, "a database of version 1 needs a step to the present one");
     Identity identity;
-    int32_t status = ReadIdentity(store, &identity);
+    int32_t status = ReadIdentity(connection, &identity);
     if (status != OK) return status;
     const bool fresh = identity.version == 0 && identity.application == 0 && identity.definitions == 0;
-    if (!fresh && identity.application != kApplicationId) {
-        Log("config store %s: this SQLite database is not a config store; it has been left as it is",
-            store->path.c_str());
-        return CORRUPT;
-    }
-    if (identity.version > kSchemaVersion) {
-        Log("config store %s: written by a newer release (version %lld, this one knows up to %d); it has "
-            "been left as "
-            "it is",
-            store->path.c_str(), static_cast<long long>(identity.version), kSchemaVersion);
-        return FAILED;
-    }
-    if (fresh && store->readOnly) {
-        Log("config store %s: there is no store in it, and it cannot be written to", store->path.c_str());
-        return IO_ERROR;
-    }
+    if (!fresh && identity.application != kApplicationId)
+        return connection.failures->Fail(
+            CORRUPT, "this SQLite database is not a config store; it has been left as it is");
+    if (identity.version > kSchemaVersion)
+        return connection.failures->Fail(FAILED,
+                                         "written by a newer release (version " +
+                                             std::to_string(identity.version) + ", this one knows up to " +
+                                             std::to_string(kSchemaVersion) + "); it has been left as it is");
+    if (fresh && connection.isReadOnly)
+        return connection.failures->Fail(IO_ERROR, "there is no store in it, and it cannot be written to");
     // Documents run to megabytes: large pages write and read them in fewer calls.
-    if (fresh) status = Execute(store, kPageSize);
-    if (status == OK) status = UseWal(store);
-    if (status == OK) status = Execute(store, "PRAGMA synchronous=FULL");
-    if (status == OK && fresh) status = MakeStore(store);
-    if (status == OK) status = CheckDefinitions(store);
+    if (fresh) status = Execute(connection, kPageSize);
+    if (status == OK) status = UseWal(connection);
+    if (status == OK) status = Execute(connection, "PRAGMA synchronous=FULL");
+    if (status == OK && fresh) status = MakeStore(connection);
+    if (status == OK) status = CheckDefinitions(connection);
     return status;
 }
 
