@@ -16,6 +16,7 @@
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/switch_version.h"
+#include "configstore/layouts/switch_version.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
 #include "configstore/maps/prop_loader.h"
@@ -245,7 +246,7 @@ int32_t LoadSwitch(configstore::Object *object, const Target &state) {
     dvsSwitchClass = SwitchClassOf(fields.forwardingClass.get());
     if (const int32_t status = dvs::convert::ReadSwitchVersion(object, &fields.version))
         return FailedSwitch(fields, static_cast<uint32_t>(status));
-    dvsWidePortRecords = fields.version > dvs::convert::kLastNarrowPortVersion;
+    dvsWidePortRecords = fields.version > dvs::layout::kLastNarrowVersion;
     if (const HYP_ReturnStatus status = AppendFields(target, fields)) return FailedSwitch(fields, status);
     if (const int32_t status = LoadProperties(object, target, fields.version)) return status;
     if (state.image) {

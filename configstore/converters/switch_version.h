@@ -11,9 +11,6 @@
 
 namespace dvs::convert {
 
-/// Above this number a mirror session's port records are the wide ones.
-inline constexpr uint32_t kLastNarrowPortVersion = 99;
-
 /// Reads the version of the switch whose root object is `switchObject`. Returns 0 with *version set, the
 /// store's status for a missing "product" or "version", or -1 for a text that names no version; all three
 /// after a message.

@@ -30,7 +30,7 @@ namespace dvs::convert {
 namespace {
 
 // clang-format off
-constexpr std::array<Converter, kLastType + 1> kConverters = {{
+constexpr std::array<Converter, static_cast<std::size_t>(ConverterType::kEnd)> kConverters = {{
     // save                     load                          // type, what it carries
     {SaveUint32,                LoadUint32},                  //  0 unsigned number
     {SaveText,                  LoadText},                    //  1 text
@@ -74,9 +74,10 @@ constexpr std::array<Converter, kLastType + 1> kConverters = {{
 
 } // namespace
 
-const Converter *ConverterFor(uint32_t type) {
-    if (type >= kConverters.size() || !kConverters[type].save) return nullptr;
-    return &kConverters[type];
+const Converter *ConverterFor(ConverterType type) {
+    const auto index = static_cast<std::size_t>(type);
+    if (index >= kConverters.size() || !kConverters[index].save) return nullptr;
+    return &kConverters[index];
 }
 
 } // namespace dvs::convert

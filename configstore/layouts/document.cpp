@@ -85,9 +85,13 @@ const char *RuleText(Rule rule) {
     return "";
 }
 
+std::string NumberText(ConverterType type) {
+    return std::to_string(static_cast<uint32_t>(type));
+}
+
 // The heading's anchor as renderers make it.
-std::string TypeLink(uint32_t type) {
-    const std::string number = std::to_string(type);
+std::string TypeLink(ConverterType type) {
+    const std::string number = NumberText(type);
     return "[" + number + "](#type-" + number + ")";
 }
 
@@ -101,7 +105,7 @@ std::string Keys() {
             if (!seen.insert(row->key).second) continue;
             const char *meaning = IsDefault(*row) ? "Every other key." : MeaningOf(each.propClass, row->key);
             text += std::string("| `") + row->key + "` | `" + PathOf(*row) + "` | " +
-                    TypeLink(row->converterType) + " | " + (meaning ? meaning : "") + " |\n";
+                    TypeLink(ConverterTypeOf(*row)) + " | " + (meaning ? meaning : "") + " |\n";
         }
     }
     return text;
@@ -147,12 +151,13 @@ std::string FormRows(const StoreField &field, const std::vector<std::string> &na
 }
 
 // The last path names of the type's rows, each once.
-std::vector<std::string> LeavesOf(uint32_t type) {
+std::vector<std::string> LeavesOf(ConverterType type) {
     std::vector<std::string> leaves;
     for (const ClassName &each : kClasses) {
         for (const auto *row = GetConfigMap(static_cast<int>(each.propClass)); row->key; ++row) {
             const std::string leaf = row->path[row->depth - 1];
-            if (row->converterType == type && std::find(leaves.begin(), leaves.end(), leaf) == leaves.end())
+            if (ConverterTypeOf(*row) == type &&
+                std::find(leaves.begin(), leaves.end(), leaf) == leaves.end())
                 leaves.push_back(leaf);
         }
     }
@@ -162,11 +167,11 @@ std::vector<std::string> LeavesOf(uint32_t type) {
 std::string Types() {
     std::string text = "\n## Types\n";
     std::set<const Record *> described;
-    for (uint32_t type = 0; type <= 36; ++type) {
+    for (ConverterType type{}; type < ConverterType::kEnd; type = Next(type)) {
         const TypeInfo *info = FindType(type);
         if (!info) continue;
-        text += "\n### Type " + std::to_string(type) + "\n\n" + info->name + "." +
-                (*info->quirks ? " " : "") + info->quirks + "\n";
+        text += "\n### Type " + NumberText(type) + "\n\n" + info->name + "." + (*info->quirks ? " " : "") +
+                info->quirks + "\n";
         const std::string layout = RecordText(*info->record, &described);
         text += layout.empty() ? std::string("\nThe value is a *") + info->record->name + "* as above.\n"
                                : layout;

@@ -5,6 +5,7 @@
 // The record of a port's traffic filters: a count and filters of variable size, each with its parameters.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout::filters {
 
@@ -49,6 +50,32 @@ namespace dvs::layout {
 inline constexpr Record kFilterConfig = {"filter configuration", 4, filters::kConfigFields,
                                          filters::kConfigParts};
 static_assert(IsSound(kFilterConfig));
+
+} // namespace dvs::layout
+
+namespace dvs::layout::filters {
+
+// clang-format off
+inline constexpr const char *kOnFailureWords[] = {"FAIL_OPEN", "FAIL_CLOSED"};
+inline constexpr Domain kOnFailureDomain = {"on failure", kOnFailureWords, 2, {}};
+inline constexpr StoreField kFilterMembers[] = {
+    // name         form          place                                              unit max domain id members meaning
+    {"slot_number", Form::kText,  Decimal(kFilter, "slot_number"),                  "", 0,   nullptr,           nullptr, {}, "place in the chain of filters, as decimal text", Rule::kSlot},
+    {"agent_name",  Form::kText,  In(kFilter, "agent_name"),                        "", 39,  nullptr,           nullptr, {}, "agent that filters"},
+    {"on_failure",  Form::kText,  In(kFilter, "on_failure", Unnamed::kFirst),       "", 0,   &kOnFailureDomain, nullptr, {}, "what becomes of traffic without the agent"},
+    {"parameters",  Form::kTexts, Elements(kFilter, "parameters", "text", "ordinal"), "", 255, nullptr,         nullptr, {}, "what the agent is given"},
+};
+inline constexpr StoreField kMembers[] = {
+    {"network_filters", Form::kInstances, Elements(kFilterConfig, "filters"), "", 0, nullptr, "slot_number", kFilterMembers, "the filters"},
+};
+// clang-format on
+
+} // namespace dvs::layout::filters
+
+namespace dvs::layout {
+
+inline constexpr StoreField kFiltersForm = {
+    nullptr, Form::kObject, {}, "", 0, nullptr, nullptr, filters::kMembers, "filters of the port"};
 
 } // namespace dvs::layout
 

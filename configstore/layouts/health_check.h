@@ -5,6 +5,7 @@
 // The record of a health check deployment.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout {
 
@@ -18,6 +19,19 @@ inline constexpr Field kHealthCheckFields[] = {
 
 inline constexpr Record kHealthCheck = {"health check deployment", 5, kHealthCheckFields, {}};
 static_assert(IsSound(kHealthCheck));
+
+} // namespace dvs::layout
+
+namespace dvs::layout {
+
+// clang-format off
+inline constexpr StoreField kHealthCheckMembers[] = {
+    // name      form           place                         unit max domain id members meaning
+    {"enabled",  Form::kBool,   In(kHealthCheck, "enabled"),  "", 0, nullptr, nullptr, {}, "whether the check is made; a save to a store calls it \"enable\", a load looks for \"enabled\""},
+    {"interval", Form::kUint32, In(kHealthCheck, "interval"), "", 0, nullptr, nullptr, {}, "time between two checks"},
+};
+inline constexpr StoreField kHealthCheckForm = {nullptr, Form::kObject, {}, "", 0, nullptr, nullptr, kHealthCheckMembers, "one check"};
+// clang-format on
 
 } // namespace dvs::layout
 

@@ -5,6 +5,7 @@
 // The records of link aggregation: a switch's groups, and the policy of a port.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout::lacp {
@@ -47,6 +48,35 @@ namespace dvs::layout {
 inline constexpr Record kLacpTable = {"LACP group table", 4, lacp::kTableFields, lacp::kTableParts};
 inline constexpr Record kPortLacp = {"port LACP policy", 8, lacp::kPortLacpFields, {}};
 static_assert(IsSound(kLacpTable) && IsSound(kPortLacp));
+
+} // namespace dvs::layout
+
+namespace dvs::layout::lacp {
+
+// clang-format off
+inline constexpr StoreField kGroupMembers[] = {
+    // name                    form           place                                  unit max domain id members meaning
+    {"key",                    Form::kText,   In(kGroup, "key"),                     "", 15, nullptr,      nullptr, {}, "key of the group"},
+    {"name",                   Form::kText,   In(kGroup, "name"),                    "", 64, nullptr,      nullptr, {}, "name of the group"},
+    {"mode",                   Form::kText,   In(kGroup, "mode"),                    "", 0,  &kModes,      nullptr, {}, "whether the group speaks first, answers only, or neither"},
+    {"load_balance_algorithm", Form::kText,   In(kGroup, "load_balance_algorithm"),  "", 0,  &kAlgorithms, nullptr, {}, "what decides over which uplink a frame goes"},
+    {"uplink_num",             Form::kUint32, In(kGroup, "uplink_num"),              "", 0,  nullptr,      nullptr, {}, "number of uplinks", Rule::kNone, true},
+};
+inline constexpr StoreField kPortMembers[] = {
+    {"enabled", Form::kBool, In(kPortLacp, "enabled"), "", 0, nullptr, nullptr, {}, "whether the port takes part in link aggregation", Rule::kNone, true},
+    {"mode",    Form::kText, In(kPortLacp, "mode"),    "", 0, &kModes, nullptr, {}, "whether it speaks first, answers only, or neither", Rule::kNone, true},
+};
+// clang-format on
+
+} // namespace dvs::layout::lacp
+
+namespace dvs::layout {
+
+inline constexpr StoreField kLacpGroupsForm = {
+    nullptr, Form::kInstances,    Elements(kLacpTable, "groups"), "", 0, nullptr,
+    "key",   lacp::kGroupMembers, "one instance a group"};
+inline constexpr StoreField kPortLacpForm = {
+    nullptr, Form::kObject, {}, "", 0, nullptr, nullptr, lacp::kPortMembers, "link aggregation of the port"};
 
 } // namespace dvs::layout
 

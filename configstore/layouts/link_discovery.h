@@ -5,6 +5,7 @@
 // The record of link discovery.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout {
@@ -22,6 +23,19 @@ inline constexpr Field kLinkDiscoveryFields[] = {
 
 inline constexpr Record kLinkDiscovery = {"link discovery", 2, kLinkDiscoveryFields, {}};
 static_assert(IsSound(kLinkDiscovery));
+
+} // namespace dvs::layout
+
+namespace dvs::layout {
+
+// clang-format off
+inline constexpr StoreField kLinkDiscoveryMembers[] = {
+    // name       form         place                            unit max domain id members meaning
+    {"protocol",  Form::kText, In(kLinkDiscovery, "protocol"),  "", 0, &kCdpModes,      nullptr, {}, "protocol spoken", Rule::kNone, true},
+    {"operation", Form::kText, In(kLinkDiscovery, "operation"), "", 0, &kCdpOperations, nullptr, {}, "whether the switch listens, speaks, or both", Rule::kNone, true},
+};
+inline constexpr StoreField kLinkDiscoveryForm = {nullptr, Form::kObject, {}, "", 0, nullptr, nullptr, kLinkDiscoveryMembers, "protocol and operation"};
+// clang-format on
 
 } // namespace dvs::layout
 

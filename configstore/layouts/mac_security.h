@@ -5,6 +5,7 @@
 // The record of a port's MAC security.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout {
 
@@ -24,6 +25,20 @@ inline constexpr Field kSecurityFields[] = {
 
 inline constexpr Record kMacSecurity = {"MAC security", 4, kSecurityFields, {}};
 static_assert(IsSound(kMacSecurity));
+
+} // namespace dvs::layout
+
+namespace dvs::layout {
+
+// clang-format off
+inline constexpr StoreField kSecurityMembers[] = {
+    // name                   form         place                                              unit max domain id members meaning
+    {"allow_promiscuous",     Form::kBool, NotBits(kMacSecurity, "reject", "promiscuous"),     "", 0, nullptr, nullptr, {}, "promiscuous mode is accepted"},
+    {"allow_mac_change",      Form::kBool, NotBits(kMacSecurity, "reject", "mac_change"),      "", 0, nullptr, nullptr, {}, "changes of the MAC address are accepted"},
+    {"allow_forged_transmit", Form::kBool, NotBits(kMacSecurity, "reject", "forged_transmit"), "", 0, nullptr, nullptr, {}, "frames with another source address are accepted"},
+};
+inline constexpr StoreField kSecurityForm = {nullptr, Form::kObject, {}, "", 0, nullptr, nullptr, kSecurityMembers, "what is allowed"};
+// clang-format on
 
 } // namespace dvs::layout
 

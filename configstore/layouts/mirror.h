@@ -7,6 +7,7 @@
 // Switches of a version above 99 have wide port records.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout::mirror {
@@ -149,6 +150,62 @@ inline constexpr Record kMirrorTableNarrow = {"mirror session table", mirror::kH
 inline constexpr Record kMirrorTableWide = {"mirror session table, wide port records", mirror::kHeadSize,
                                             mirror::kHeadFields, mirror::kWideParts};
 static_assert(IsSound(kMirrorTableNarrow) && IsSound(kMirrorTableWide));
+
+} // namespace dvs::layout
+
+namespace dvs::layout::mirror {
+
+inline constexpr const char *kConnecteeTexts[] = {"VM_VNIC", "PNIC", "HOST_HYP_VNIC"};
+inline constexpr Domain kConnectees = {"connectee types", kConnecteeTexts, 3, {}};
+inline constexpr uint32_t kPortKeyMax = 47; // of the wide records
+
+consteval Place Ports(std::string_view count, std::string_view connectees = "") {
+    return {.keep = Keep::kPorts,
+            .field = connectees.empty() ? nullptr : FieldOf(kSession, connectees),
+            .count = FieldOf(kSession, count)};
+}
+
+// clang-format off
+// The lists of a group of ports have their places in the port records behind the sessions.
+inline constexpr StoreField kSourceMembers[] = {
+    // name                           form          place unit max          domain        id members meaning
+    {"wildcard_port_connectee_types", Form::kTexts, {}, "", 0,           &kConnectees, nullptr, {}, "ports that are sources by their kind"},
+    {"port_keys",                     Form::kTexts, {}, "", kPortKeyMax, nullptr,      nullptr, {}, "keys of source ports, of all but a REMOTE_MIRROR_DEST"},
+    {"vlans",                         Form::kInts,  {}, "", 0,           nullptr,      nullptr, {}, "source VLANs of a REMOTE_MIRROR_DEST; not loaded from a store", Rule::kVlan},
+};
+inline constexpr StoreField kDestinationMembers[] = {
+    {"port_keys",         Form::kTexts, {}, "", kPortKeyMax, nullptr, nullptr, {}, "keys of destination ports, of a MIXED_DEST_MIRROR, DVPORT_MIRROR or REMOTE_MIRROR_DEST"},
+    {"uplink_port_names", Form::kTexts, {}, "", kPortKeyMax, nullptr, nullptr, {}, "names of destination uplinks, of a REMOTE_MIRROR_SOURCE or MIXED_DEST_MIRROR"},
+    {"addresses",         Form::kTexts, {}, "", 0,           nullptr, nullptr, {}, "addresses that an ENCAPSULATED_REMOTE_MIRROR_SOURCE sends to; a store keeps the last one, and loads none", Rule::kAddress},
+};
+inline constexpr StoreField kSessionMembers[] = {
+    // name                    form           place                                                          unit max domain       id members meaning
+    {"key",                    Form::kText,   In(kSession, "key"),                                              "",      31, nullptr,        nullptr, {}, "session key"},
+    {"name",                   Form::kText,   In(kSession, "name"),                                             "",      80, nullptr,        nullptr, {}, "session name"},
+    {"session_type",           Form::kText,   In(kSession, "session_type"),                                     "",      0,  &kSessionTypes, nullptr, {}, "what is mirrored, and where to"},
+    {"enabled",                Form::kBool,   NotBits(kSession, "flags", "disabled"),                           "",      0,  nullptr,        nullptr, {}, "the session is switched on"},
+    {"strip_original_vlan",    Form::kBool,   NotBits(kSession, "flags", "keep_original_vlan"),                 "",      0,  nullptr,        nullptr, {}, "the original VLAN tag is stripped"},
+    {"normal_traffic_allowed", Form::kBool,   NotBits(kSession, "flags", "normal_traffic_not_allowed", 0x03),   "",      0,  nullptr,        nullptr, {}, "the destination carries other traffic too"},
+    {"legacy_mode",            Form::kBool,   Bits(kSession, "flags", "legacy_mode"),                           "",      0,  nullptr,        nullptr, {}, "legacy mode; a store loads it inverted"},
+    {"mirrored_packet_length", Form::kUint32, In(kSession, "mirrored_packet_length"),                           "bytes", 0,  nullptr,        nullptr, {}, "bytes mirrored of a frame; 4294967295 or left out: not set; a store keeps no other length", Rule::kUnset},
+    {"encapsulation_vlan_id",  Form::kUint32, In(kSession, "encapsulation_vlan_id"),                            "",      0,  nullptr,        nullptr, {}, "VLAN of the mirrored frames", Rule::kVlan},
+    {"sampling_rate",          Form::kUint32, In(kSession, "sampling_rate"),                                    "",      0,  nullptr,        nullptr, {}, "one frame in so many is mirrored"},
+    {"encap_type",             Form::kText,   In(kSession, "encap_type"),                                       "",      0,  &kEncapTypes,   nullptr, {}, "how mirrored frames are wrapped"},
+    {"erspan_id",              Form::kUint16, In(kSession, "erspan_id"),                                        "",      0,  nullptr,        nullptr, {}, "ERSPAN session id"},
+    {"erspan_COS",             Form::kUint16, In(kSession, "erspan_COS"),                                       "",      0,  nullptr,        nullptr, {}, "ERSPAN class of service"},
+    {"erspan_gra_nanosec",     Form::kBool,   In(kSession, "erspan_gra_nanosec"),                               "",      0,  nullptr,        nullptr, {}, "ERSPAN time stamps in nanoseconds"},
+    {"destination_port",       Form::kObject, Ports("destination_count"),                                           "",      0,  nullptr,        nullptr, kDestinationMembers, "where mirrored frames go"},
+    {"source_recv_port",       Form::kObject, Ports("receive_count", "receive_connectee_types"),                    "",      0,  nullptr,        nullptr, kSourceMembers, "whose received frames are mirrored"},
+    {"source_transmit_port",   Form::kObject, Ports("transmit_count", "transmit_connectee_types"),                  "",      0,  nullptr,        nullptr, kSourceMembers, "whose transmitted frames are mirrored"},
+};
+// clang-format on
+
+} // namespace dvs::layout::mirror
+
+namespace dvs::layout {
+
+inline constexpr StoreField kMirrorForm = {
+    nullptr, Form::kInstances, {}, "", 0, nullptr, "key", mirror::kSessionMembers, "one instance a session"};
 
 } // namespace dvs::layout
 

@@ -5,6 +5,7 @@
 // The records of network resource pools: their configuration, and the list of their keys.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout::pools {
 
@@ -50,6 +51,37 @@ inline constexpr Record kPoolConfig = {"resource pool configuration", 4, pools::
                                        pools::kPoolParts};
 inline constexpr Record kPoolList = {"resource pool list", 4, pools::kCountFields, pools::kKeyParts};
 static_assert(IsSound(kPoolConfig) && IsSound(kPoolList));
+
+} // namespace dvs::layout
+
+namespace dvs::layout::pools {
+
+// clang-format off
+inline constexpr StoreField kSharesMembers[] = {
+    // name    form           place                unit max domain id members meaning
+    {"shares", Form::kUint32, In(kPool, "shares"), "", 0, nullptr, nullptr, {}, "weight against the other pools"},
+};
+inline constexpr StoreField kAllocationMembers[] = {
+    {"reservation", Form::kUint32, In(kPool, "reservation"), "", 0, nullptr, nullptr, {}, "bandwidth kept for the pool"},
+    {"limit",       Form::kInt,    In(kPool, "limit"),       "", 0, nullptr, nullptr, {}, "most bandwidth the pool gets; -1: no limit"},
+    {"shares",      Form::kObject, {},                           "", 0, nullptr, nullptr, kSharesMembers, "weight against the other pools"},
+};
+inline constexpr StoreField kPoolMembers[] = {
+    {"key",        Form::kText,   In(kPool, "key"), "", 127, nullptr, nullptr, {}, "key of the pool"},
+    {"allocation", Form::kObject, {},                   "", 0,   nullptr, nullptr, kAllocationMembers, "its part of the bandwidth"},
+};
+// clang-format on
+
+} // namespace dvs::layout::pools
+
+namespace dvs::layout {
+
+inline constexpr StoreField kPoolsForm = {
+    nullptr, Form::kInstances,    Elements(kPoolConfig, "pools"), "", 0, nullptr,
+    "key",   pools::kPoolMembers, "one instance a pool"};
+inline constexpr StoreField kPoolKeysForm = {nullptr, Form::kTexts, Elements(kPoolList, "pools", "key"),
+                                             "",      127,          nullptr,
+                                             nullptr, {},           "keys of pools"};
 
 } // namespace dvs::layout
 

@@ -5,6 +5,7 @@
 // The record of a port's VLAN policy: a head and the ranges of a trunk.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout::vlan {
 
@@ -41,6 +42,32 @@ namespace dvs::layout {
 
 inline constexpr Record kPortVlan = {"port VLAN policy", 8, vlan::kVlanFields, vlan::kVlanParts};
 static_assert(IsSound(kPortVlan));
+
+} // namespace dvs::layout
+
+namespace dvs::layout::vlan {
+
+// clang-format off
+inline constexpr StoreField kRangeMembers[] = {
+    // name   form           place                unit max domain id members meaning
+    {"start", Form::kUint16, In(kRange, "start"), "", 0, nullptr, nullptr, {}, "first VLAN id", Rule::kVlan, true},
+    {"end",   Form::kUint16, In(kRange, "end"),   "", 0, nullptr, nullptr, {}, "last VLAN id", Rule::kVlan, true},
+};
+inline constexpr uint32_t kTrunk = 0x1;
+inline constexpr uint32_t kPrivate = 0x2;
+inline constexpr StoreField kMembers[] = {
+    {"vlan_id",        Form::kUint16,    While(In(kPortVlan, "vlan_id"),      kPortVlan, "flags", kTrunk | kPrivate, 0),        "", 0, nullptr, nullptr, {}, "VLAN id of an access port", Rule::kVlan},
+    {"pvlan_id",       Form::kUint16,    While(In(kPortVlan, "vlan_id"),      kPortVlan, "flags", kTrunk | kPrivate, kPrivate), "", 0, nullptr, nullptr, {}, "private VLAN id", Rule::kVlan},
+    {"trunk_vlan_ids", Form::kInstances, While(Elements(kPortVlan, "ranges"), kPortVlan, "flags", kTrunk, kTrunk),              "", 0, nullptr, nullptr, kRangeMembers, "ranges of a trunk"},
+};
+// clang-format on
+
+} // namespace dvs::layout::vlan
+
+namespace dvs::layout {
+
+inline constexpr StoreField kVlanForm = {
+    nullptr, Form::kObject, {}, "", 0, nullptr, nullptr, vlan::kMembers, "VLAN, trunk or private VLAN"};
 
 } // namespace dvs::layout
 

@@ -5,6 +5,7 @@
 // The record of a switch's private VLAN map.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout::pvlan {
@@ -33,6 +34,27 @@ namespace dvs::layout {
 
 inline constexpr Record kPrivateVlanMap = {"private VLAN map", 0, {}, pvlan::kMapParts};
 static_assert(IsSound(kPrivateVlanMap));
+
+} // namespace dvs::layout
+
+namespace dvs::layout::pvlan {
+
+// clang-format off
+inline constexpr StoreField kEntryMembers[] = {
+    // name          form           place                       unit max domain id members meaning
+    {"primary_id",   Form::kUint16, In(kEntry, "primary_id"),   "", 0, nullptr,      nullptr, {}, "primary VLAN id", Rule::kVlan, true},
+    {"secondary_id", Form::kUint16, In(kEntry, "secondary_id"), "", 0, nullptr,      nullptr, {}, "secondary VLAN id", Rule::kVlan, true},
+    {"type",         Form::kText,   In(kEntry, "type"),         "", 0, &kPvlanTypes, nullptr, {}, "whom ports of the secondary VLAN can reach", Rule::kNone, true},
+};
+// clang-format on
+
+} // namespace dvs::layout::pvlan
+
+namespace dvs::layout {
+
+inline constexpr StoreField kPrivateVlansForm = {
+    nullptr, Form::kInstances,     Elements(kPrivateVlanMap, "entries"), "", 0, nullptr,
+    nullptr, pvlan::kEntryMembers, "one instance a pair of VLANs"};
 
 } // namespace dvs::layout
 

@@ -16,6 +16,7 @@
 #include "configstore/layouts/private_vlan.h"
 #include "configstore/layouts/scalars.h"
 #include "configstore/layouts/shaping.h"
+#include "configstore/layouts/switch_version.h"
 #include "configstore/layouts/teaming.h"
 #include "configstore/layouts/tx_uplink.h"
 

@@ -3,52 +3,48 @@
 
 #include "configstore/layouts/registry.h"
 
-#include <cstring>
-
-#include "configstore/layouts/forms.h"
-
 namespace dvs::layout {
 namespace {
 
 // clang-format off
 constexpr TypeInfo kTypes[] = {
     // type, what it carries, record, wide record, store form, quirks
-    {0,  "number",                       &kNumber,            &kNumber,          &kFormUint32,        ""},
-    {1,  "text",                         &kTextValue,             &kTextValue,           &kFormText,          "Of the two multicast filter keys a load fills the one of the switch's family."},
-    {2,  "beacon timeout",               &kSignedNumber,      &kSignedNumber,    &kFormBeacon,        ""},
-    {3,  "one-byte boolean",             &kBoolByte,          &kBoolByte,        &kFormBool,          ""},
-    {4,  "boolean as text",              &kBoolText,          &kBoolText,        &kFormBool,          "Loads as 6 bytes for true (\"true\", NUL, 'f') and as 5 without NUL for false."},
-    {5,  "switch address",               &kIpv4Value,         &kIpv4Value,       &kFormAddress,       "A text that is no address fails the load without a message."},
-    {6,  "private VLAN map",             &kPrivateVlanMap,    &kPrivateVlanMap,  &kFormPvlans,        "Loads unless the class is \"cswitch\" or the version is above 106; bytes behind the last whole entry are ignored."},
-    {7,  "private VLAN map",             &kPrivateVlanMap,    &kPrivateVlanMap,  &kFormPvlans,        "Loads only for the class \"cswitch\" or a version above 106; bytes behind the last whole entry are ignored."},
-    {8,  "link discovery",               &kLinkDiscovery,     &kLinkDiscovery,   &kFormLinkDiscovery, "An unknown protocol loads as 2, an unknown operation as 4."},
-    {9,  "mirror sessions",              &kMirrorTableNarrow, &kMirrorTableWide, &kFormVspans,        "The packet length is saved only when it is not set. Legacy mode loads inverted, \"normal traffic not allowed\" as 0x03. Of several addresses the last is saved; VLANs and addresses do not load. All groups store their count as the destinations', and transmit sources take the receive sources' place. Any wildcard text sets 0x4. Of the two keys a load fills the one of the switch's family."},
-    {10, "IPFIX settings",               &kIpfix,             &kIpfix,           &kFormIpfix,         "IPv6 is saved as eight full groups. A text that is no address loads as none."},
-    {11, "health check",                 &kHealthCheck,       &kHealthCheck,     &kFormHealthCheck,   "A save writes \"enable\", a load reads \"enabled\"."},
-    {12, "resource pools",               &kPoolConfig,        &kPoolConfig,      &kFormPools,         "A count of 0 saves nothing."},
-    {13, "resource pool keys",           &kPoolList,          &kPoolList,        &kFormPoolKeys,      "A count of 0 saves nothing: an earlier list stays."},
-    {14, "uplink port keys",             &kUplinkKeys,        &kUplinkKeys,      &kFormUplinkKeys,    "A count of 0 is saved as an empty list and loads as no property."},
-    {15, "switch version",               &kSwitchVersion,     &kSwitchVersion,   &kFormVersion,       "107 to 112 are saved as 7 to 12; the overlay flag makes the difference on load."},
-    {16, "LACP groups",                  &kLacpTable,         &kLacpTable,       &kFormLacpGroups,    "Unknown texts load as 0xFFFFFFFF; a count of 0 saves nothing."},
-    {17, "etherswitch teaming policy",   &kTeamingPolicy,     &kTeamingPolicy,   &kFormTeaming,       "The two explicit policies 4 and 5 come back swapped. Percentage, full duplex and speed are looked for beside the failure criteria, so they come back as 0; of the speed only the low byte is read. Failure criteria come back with 0x200 set. Loads on a switch that is neither vswitch nor cswitch."},
-    {18, "vswitch teaming policy",       &kTeamingPolicy,     &kTeamingPolicy,   &kFormTeaming,       "The two explicit policies 4 and 5 come back swapped. Percentage, full duplex and speed are looked for beside the failure criteria, so they come back as 0; of the speed only the low byte is read. Failure criteria come back with 0x200 set. A switch that is neither vswitch nor cswitch saves and loads nothing."},
-    {19, "overlay flag",                 &kBoolText,          &kBoolText,        &kFormBool,          "Loads as 5 bytes, with NUL for true and without for false."},
-    {20, "uplink port names",            &kUplinkNames,       &kUplinkNames,     &kFormUplinkNames,   "A count of 0 saves nothing: an earlier list stays."},
-    {21, "MTU",                          &kNumber,            &kNumber,          &kFormUint32,        "Three keys share one field: the last saved wins. A load fills the common key and the one of the switch's family; a cswitch gets the common key alone."},
-    {22, "unmapped property",            &kOpaqueValue,       &kOpaqueValue,     &kFormUnmapped,      "Takes every key without a row of its own."},
-    {23, "transmit-uplink mode",         &kTxUplink,          &kTxUplink,        &kFormBool,          "Anything but \"always\" is saved as false. Of the two keys a load fills the one of the switch's family."},
-    {24, "etherswitch port VLAN",        &kPortVlan,          &kPortVlan,        &kFormVlan,          "A load without memory skips the property. Loads on a switch that is neither vswitch nor cswitch."},
-    {25, "vswitch port VLAN",            &kPortVlan,          &kPortVlan,        &kFormVlan,          "Whether the id could be written is not told; a load without memory fails. A switch that is neither vswitch nor cswitch saves and loads nothing."},
-    {26, "traffic shaping",              &kShapingPolicy,     &kShapingPolicy,   &kFormShaping,       "The store holds bits where the record holds bytes. \"enabled\" is always written true and never read."},
-    {27, "etherswitch MAC security",     &kMacSecurity,       &kMacSecurity,     &kFormSecurity,      "Fields that cannot be read count as allowed. Loads on a switch that is neither vswitch nor cswitch."},
-    {28, "vswitch MAC security",         &kMacSecurity,       &kMacSecurity,     &kFormSecurity,      "Fields that cannot be read count as allowed. Loads on vswitches and cswitches only."},
-    {29, "traffic filters",              &kFilterConfig,      &kFilterConfig,    &kFormFilters,       "A load places each filter behind the fixed part of the one before, over its parameters, and numbers parameters from 0. The instance id is the slot as signed, \"slot_number\" as unsigned decimal."},
-    {31, "port blocked",                 &kBoolText,          &kBoolText,        &kFormBool,          "Loads as 6 bytes for true (\"true\", NUL, 'f') and as 5 without NUL for false."},
-    {32, "passthrough allowed",          &kPassthrough,       &kPassthrough,     &kFormBool,          "Any number but 2 is saved as false and comes back as 0."},
-    {33, "unmapped port property",       &kOpaqueValue,       &kOpaqueValue,     &kFormUnmapped,      "Takes every key without a row of its own; what goes to \"other_data\" does not come back."},
-    {34, "port IPFIX enabled",           &kEnabledText,       &kEnabledText,     &kFormBool,          "False loads as no property."},
-    {35, "port LACP policy",             &kPortLacp,          &kPortLacp,        &kFormPortLacp,      "A load needs both fields. An unknown mode loads as 0xFFFFFFFF."},
-    {36, "port resource pools",          &kPoolConfig,        &kPoolConfig,      &kFormPools,         "Saved nowhere. A load gives every uplink port the switch's own resource pools."},
+    {ConverterType::kNumber,                  "number",                       &kNumber,            &kNumber,          &kNumberForm,        ""},
+    {ConverterType::kText,                    "text",                         &kTextValue,             &kTextValue,           &kTextForm,          "Of the two multicast filter keys a load fills the one of the switch's family."},
+    {ConverterType::kBeaconTimeout,           "beacon timeout",               &kSignedNumber,      &kSignedNumber,    &kSignedNumberForm,        ""},
+    {ConverterType::kBoolByte,                "one-byte boolean",             &kBoolByte,          &kBoolByte,        &kBoolByteForm,          ""},
+    {ConverterType::kBoolText,                "boolean as text",              &kBoolText,          &kBoolText,        &kBoolTextForm,          "Loads as 6 bytes for true (\"true\", NUL, 'f') and as 5 without NUL for false."},
+    {ConverterType::kSwitchAddress,           "switch address",               &kIpv4Value,         &kIpv4Value,       &kIpv4Form,       "A text that is no address fails the load without a message."},
+    {ConverterType::kEtherswitchPrivateVlans, "private VLAN map",             &kPrivateVlanMap,    &kPrivateVlanMap,  &kPrivateVlansForm,        "Loads unless the class is \"cswitch\" or the version is above 106; bytes behind the last whole entry are ignored."},
+    {ConverterType::kVswitchPrivateVlans,     "private VLAN map",             &kPrivateVlanMap,    &kPrivateVlanMap,  &kPrivateVlansForm,        "Loads only for the class \"cswitch\" or a version above 106; bytes behind the last whole entry are ignored."},
+    {ConverterType::kLinkDiscovery,           "link discovery",               &kLinkDiscovery,     &kLinkDiscovery,   &kLinkDiscoveryForm, "An unknown protocol loads as 2, an unknown operation as 4."},
+    {ConverterType::kMirrorSessions,          "mirror sessions",              &kMirrorTableNarrow, &kMirrorTableWide, &kMirrorForm,        "The packet length is saved only when it is not set. Legacy mode loads inverted, \"normal traffic not allowed\" as 0x03. Of several addresses the last is saved; VLANs and addresses do not load. All groups store their count as the destinations', and transmit sources take the receive sources' place. Any wildcard text sets 0x4. Of the two keys a load fills the one of the switch's family."},
+    {ConverterType::kIpfix,                   "IPFIX settings",               &kIpfix,             &kIpfix,           &kIpfixForm,         "IPv6 is saved as eight full groups. A text that is no address loads as none."},
+    {ConverterType::kHealthCheck,             "health check",                 &kHealthCheck,       &kHealthCheck,     &kHealthCheckForm,   "A save writes \"enable\", a load reads \"enabled\"."},
+    {ConverterType::kTrafficResources,        "resource pools",               &kPoolConfig,        &kPoolConfig,      &kPoolsForm,         "A count of 0 saves nothing."},
+    {ConverterType::kPoolKeys,                "resource pool keys",           &kPoolList,          &kPoolList,        &kPoolKeysForm,      "A count of 0 saves nothing: an earlier list stays."},
+    {ConverterType::kUplinkKeys,              "uplink port keys",             &kUplinkKeys,        &kUplinkKeys,      &kUplinkKeysForm,    "A count of 0 is saved as an empty list and loads as no property."},
+    {ConverterType::kSwitchVersion,           "switch version",               &kSwitchVersion,     &kSwitchVersion,   &kVersionForm,       "107 to 112 are saved as 7 to 12; the overlay flag makes the difference on load."},
+    {ConverterType::kLacpGroups,              "LACP groups",                  &kLacpTable,         &kLacpTable,       &kLacpGroupsForm,    "Unknown texts load as 0xFFFFFFFF; a count of 0 saves nothing."},
+    {ConverterType::kEtherswitchTeaming,      "etherswitch teaming policy",   &kTeamingPolicy,     &kTeamingPolicy,   &kTeamingForm,       "The two explicit policies 4 and 5 come back swapped. Percentage, full duplex and speed are looked for beside the failure criteria, so they come back as 0; of the speed only the low byte is read. Failure criteria come back with 0x200 set. Loads on a switch that is neither vswitch nor cswitch."},
+    {ConverterType::kVswitchTeaming,          "vswitch teaming policy",       &kTeamingPolicy,     &kTeamingPolicy,   &kTeamingForm,       "The two explicit policies 4 and 5 come back swapped. Percentage, full duplex and speed are looked for beside the failure criteria, so they come back as 0; of the speed only the low byte is read. Failure criteria come back with 0x200 set. A switch that is neither vswitch nor cswitch saves and loads nothing."},
+    {ConverterType::kOverlayFlag,             "overlay flag",                 &kBoolText,          &kBoolText,        &kOverlayForm,          "Loads as 5 bytes, with NUL for true and without for false."},
+    {ConverterType::kUplinkNames,             "uplink port names",            &kUplinkNames,       &kUplinkNames,     &kUplinkNamesForm,   "A count of 0 saves nothing: an earlier list stays."},
+    {ConverterType::kMtu,                     "MTU",                          &kNumber,            &kNumber,          &kNumberForm,        "Three keys share one field: the last saved wins. A load fills the common key and the one of the switch's family; a cswitch gets the common key alone."},
+    {ConverterType::kSwitchDefault,           "unmapped property",            &kOpaqueValue,       &kOpaqueValue,     &kUnmappedForm,      "Takes every key without a row of its own."},
+    {ConverterType::kTxUplink,                "transmit-uplink mode",         &kTxUplink,          &kTxUplink,        &kTxUplinkForm,          "Anything but \"always\" is saved as false. Of the two keys a load fills the one of the switch's family."},
+    {ConverterType::kEtherswitchPortVlan,     "etherswitch port VLAN",        &kPortVlan,          &kPortVlan,        &kVlanForm,          "A load without memory skips the property. Loads on a switch that is neither vswitch nor cswitch."},
+    {ConverterType::kVswitchPortVlan,         "vswitch port VLAN",            &kPortVlan,          &kPortVlan,        &kVlanForm,          "Whether the id could be written is not told; a load without memory fails. A switch that is neither vswitch nor cswitch saves and loads nothing."},
+    {ConverterType::kShaping,                 "traffic shaping",              &kShapingPolicy,     &kShapingPolicy,   &kShapingForm,       "The store holds bits where the record holds bytes. \"enabled\" is always written true and never read."},
+    {ConverterType::kEtherswitchMacSecurity,  "etherswitch MAC security",     &kMacSecurity,       &kMacSecurity,     &kSecurityForm,      "Fields that cannot be read count as allowed. Loads on a switch that is neither vswitch nor cswitch."},
+    {ConverterType::kVswitchMacSecurity,      "vswitch MAC security",         &kMacSecurity,       &kMacSecurity,     &kSecurityForm,      "Fields that cannot be read count as allowed. Loads on vswitches and cswitches only."},
+    {ConverterType::kFilters,                 "traffic filters",              &kFilterConfig,      &kFilterConfig,    &kFiltersForm,       "A load places each filter behind the fixed part of the one before, over its parameters, and numbers parameters from 0. The instance id is the slot as signed, \"slot_number\" as unsigned decimal."},
+    {ConverterType::kPortBlocked,             "port blocked",                 &kBoolText,          &kBoolText,        &kBoolTextForm,          "Loads as 6 bytes for true (\"true\", NUL, 'f') and as 5 without NUL for false."},
+    {ConverterType::kPassthrough,             "passthrough allowed",          &kPassthrough,       &kPassthrough,     &kPassthroughForm,          "Any number but 2 is saved as false and comes back as 0."},
+    {ConverterType::kPortDefault,             "unmapped port property",       &kOpaqueValue,       &kOpaqueValue,     &kUnmappedForm,      "Takes every key without a row of its own; what goes to \"other_data\" does not come back."},
+    {ConverterType::kPortIpfix,               "port IPFIX enabled",           &kEnabledText,       &kEnabledText,     &kEnabledForm,          "False loads as no property."},
+    {ConverterType::kPortLacp,                "port LACP policy",             &kPortLacp,          &kPortLacp,        &kPortLacpForm,      "A load needs both fields. An unknown mode loads as 0xFFFFFFFF."},
+    {ConverterType::kPortPools,               "port resource pools",          &kPoolConfig,        &kPoolConfig,      &kPoolsForm,         "Saved nowhere. A load gives every uplink port the switch's own resource pools."},
 };
 
 struct Meaning {
@@ -116,7 +112,7 @@ constexpr std::string_view kDefaultKey = "DEFAULT";
 
 } // namespace
 
-const TypeInfo *FindType(uint32_t type) {
+const TypeInfo *FindType(ConverterType type) {
     for (const TypeInfo &info : kTypes) {
         if (info.type == type) return &info;
     }
@@ -140,7 +136,7 @@ const char *MeaningOf(uint32_t propClass, std::string_view key) {
 
 const Record *RecordOf(uint32_t propClass, std::string_view key, bool wide) {
     const DVSProp2ConfigEntry *row = FindProperty(propClass, key);
-    const TypeInfo *info = row ? FindType(row->converterType) : nullptr;
+    const TypeInfo *info = row ? FindType(ConverterTypeOf(*row)) : nullptr;
     if (!info) return nullptr;
     return wide ? info->wide : info->record;
 }

@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <string_view>
 
+#include "configstore/layouts/converter_type.h"
 #include "configstore/layouts/records.h"
 #include "configstore/layouts/store_form.h"
 #include "dvs/configstore.h"
@@ -16,7 +17,7 @@ namespace dvs::layout {
 
 /// One converter type.
 struct TypeInfo {
-    uint32_t type;
+    ConverterType type;
     const char *name;     // what it carries
     const Record *record; // the value's layout
     const Record *wide;   // the same for switches of a version above 99; mostly the same record
@@ -25,7 +26,7 @@ struct TypeInfo {
 };
 
 /// Null for a type that no converter has.
-const TypeInfo *FindType(uint32_t type);
+const TypeInfo *FindType(ConverterType type);
 
 /// The row of a mapping table that belongs to this very key; null where only a DEFAULT row would take it.
 const DVSProp2ConfigEntry *FindProperty(uint32_t propClass, std::string_view key);

@@ -5,6 +5,7 @@
 // The records of single values and of plain lists of texts.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout::scalar {
 
@@ -38,9 +39,6 @@ inline constexpr Field kPassthroughFields[] = {
 };
 inline constexpr Field kIpv4Fields[] = {
     {"address",    0,    4, Kind::kIpv4,     nullptr, "the address, network order"},
-};
-inline constexpr Field kVersionFields[] = {
-    {"version",    0,    4, Kind::kUnsigned, nullptr, "number of the switch's version"},
 };
 inline constexpr Field kOpaqueFields[] = {
     {"bytes",      0,    0, Kind::kOpaque,   nullptr, "not looked into"},
@@ -77,14 +75,31 @@ inline constexpr Record kBoolText = {"boolean as text", 0, scalar::kBoolTextFiel
 inline constexpr Record kEnabledText = {"enabled as text", 0, scalar::kEnabledFields, {}};
 inline constexpr Record kPassthrough = {"passthrough flag", 4, scalar::kPassthroughFields, {}};
 inline constexpr Record kIpv4Value = {"IPv4 address", 4, scalar::kIpv4Fields, {}};
-inline constexpr Record kSwitchVersion = {"switch version", 4, scalar::kVersionFields, {}};
 inline constexpr Record kOpaqueValue = {"opaque value", 0, scalar::kOpaqueFields, {}};
 inline constexpr Record kUplinkKeys = {"uplink port keys", 4, scalar::kCountFields, scalar::kKeyParts};
 inline constexpr Record kUplinkNames = {"uplink port names", 4, scalar::kCountFields, scalar::kNameParts};
 static_assert(IsSound(kNumber) && IsSound(kSignedNumber) && IsSound(kTextValue) && IsSound(kBoolByte));
 static_assert(IsSound(kBoolText) && IsSound(kEnabledText) && IsSound(kPassthrough) && IsSound(kIpv4Value));
-static_assert(IsSound(kSwitchVersion) && IsSound(kOpaqueValue) && IsSound(kUplinkKeys) &&
-              IsSound(kUplinkNames));
+static_assert(IsSound(kOpaqueValue) && IsSound(kUplinkKeys) && IsSound(kUplinkNames));
+
+} // namespace dvs::layout
+
+namespace dvs::layout {
+
+// clang-format off
+inline constexpr StoreField kNumberForm       = {nullptr, Form::kUint32, In(kNumber, "value"),                             "", 0, nullptr, nullptr, {}, "the number"};
+inline constexpr StoreField kSignedNumberForm = {nullptr, Form::kInt,    In(kSignedNumber, "value"),                       "", 0, nullptr, nullptr, {}, "the number"};
+inline constexpr StoreField kTextForm         = {nullptr, Form::kText,   In(kTextValue, "text"),                           "", 0, nullptr, nullptr, {}, "the text"};
+inline constexpr StoreField kBoolByteForm     = {nullptr, Form::kBool,   In(kBoolByte, "value"),                           "", 0, nullptr, nullptr, {}, "the flag"};
+inline constexpr StoreField kBoolTextForm     = {nullptr, Form::kBool,   Literal(kBoolText, {"true\0f", 6}, "false"),      "", 0, nullptr, nullptr, {}, "the flag"};
+inline constexpr StoreField kOverlayForm      = {nullptr, Form::kBool,   Literal(kBoolText, {"true", 5}, "false"),         "", 0, nullptr, nullptr, {}, "the flag"};
+inline constexpr StoreField kEnabledForm      = {nullptr, Form::kBool,   Literal(kEnabledText, {"enabled", 8}, {}),        "", 0, nullptr, nullptr, {}, "the flag"};
+inline constexpr StoreField kPassthroughForm  = {nullptr, Form::kBool,   Exactly(kPassthrough, "value", 2),               "", 0, nullptr, nullptr, {}, "the flag"};
+inline constexpr StoreField kIpv4Form         = {nullptr, Form::kText,   In(kIpv4Value, "address"),                        "", 0, nullptr, nullptr, {}, "dotted IPv4 address", Rule::kIpv4};
+inline constexpr StoreField kUplinkKeysForm   = {nullptr, Form::kTexts,  Elements(kUplinkKeys, "keys", "key"),             "", 47, nullptr, nullptr, {}, "keys of uplink ports"};
+inline constexpr StoreField kUplinkNamesForm  = {nullptr, Form::kTexts,  Elements(kUplinkNames, "names", "name"),          "", 80, nullptr, nullptr, {}, "names of uplink ports"};
+inline constexpr StoreField kUnmappedForm     = {nullptr, Form::kNone,   {},                                               "", 0, nullptr, nullptr, {}, "lists below \"data\", by kind of property"};
+// clang-format on
 
 } // namespace dvs::layout
 

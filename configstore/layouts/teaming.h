@@ -5,6 +5,7 @@
 // The record of a teaming policy.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 #include "dvs/configstore.h"
 
 namespace dvs::layout::teaming {
@@ -64,6 +65,43 @@ inline constexpr Record kTeamingPolicy = {"teaming policy", teaming::kHeadSize, 
                                           teaming::kTeamingParts};
 static_assert(IsSound(kTeamingPolicy) &&
               teaming::kHeadSize + teaming::kNameSlots * teaming::kName.size == 2616);
+
+} // namespace dvs::layout
+
+namespace dvs::layout::teaming {
+
+// clang-format off
+inline constexpr uint32_t kNameMax = 80;
+inline constexpr StoreField kCriteriaMembers[] = {
+    // name            form           place                                                      unit max domain id members meaning
+    {"check_beacon",  Form::kBool,   Bits(kTeamingPolicy, "failure_flags", "check_beacon"),  "",  0, nullptr, nullptr, {}, "beacon probing decides about a link"},
+    {"lc_link_state", Form::kBool,   Bits(kTeamingPolicy, "failure_flags", "lc_link_state"), "",  0, nullptr, nullptr, {}, "the link state alone decides"},
+    {"full_duplex",   Form::kBool,   In(kTeamingPolicy, "full_duplex"),                      "",  0, nullptr, nullptr, {}, "an uplink that is not full duplex counts as failed; not loaded from a store"},
+    {"percentage",    Form::kUint16, In(kTeamingPolicy, "percentage"),                       "%", 0, nullptr, nullptr, {}, "error percentage of a failed uplink; not loaded from a store"},
+    {"speed",         Form::kUint16, In(kTeamingPolicy, "speed"),                            "",  0, nullptr, nullptr, {}, "least speed of a sound uplink; not loaded from a store"},
+};
+inline constexpr StoreField kOrderMembers[] = {
+    {"active_uplink_ports",  Form::kTexts, Slots(kTeamingPolicy, "names", "name", "active_count"),                  "", kNameMax, nullptr, nullptr, {}, "active uplinks, in order"},
+    {"standby_uplink_ports", Form::kTexts, Slots(kTeamingPolicy, "names", "name", "standby_count", "active_count"), "", kNameMax, nullptr, nullptr, {}, "standby uplinks, in order"},
+};
+inline constexpr StoreField kMembers[] = {
+    {"policy",            Form::kText,   In(kTeamingPolicy, "policy", Unnamed::kAbsent),                "", 0, &kPolicies, nullptr, {}, "how traffic is spread over the uplinks"},
+    {"reverse_policy",    Form::kBool,   Bits(kTeamingPolicy, "behaviour_flags", "reverse_policy"),  "", 0, nullptr, nullptr, {}, "return traffic follows the policy too"},
+    {"rolling_order",     Form::kBool,   Bits(kTeamingPolicy, "behaviour_flags", "rolling_order"),   "", 0, nullptr, nullptr, {}, "a recovered uplink does not take its traffic back"},
+    {"notify_switches",   Form::kBool,   Bits(kTeamingPolicy, "behaviour_flags", "notify_switches"), "", 0, nullptr, nullptr, {}, "tell the physical switches about a failover"},
+    {"best_effort",       Form::kBool,   Bits(kTeamingPolicy, "behaviour_flags", "best_effort"),     "", 0, nullptr, nullptr, {}, "use what uplinks there are"},
+    {"shotgun",           Form::kBool,   Bits(kTeamingPolicy, "behaviour_flags", "shotgun"),         "", 0, nullptr, nullptr, {}, "send on every uplink"},
+    {"failure_criteria",  Form::kObject, GroupIn(kTeamingPolicy, "failure_flags", "from_store"),     "", 0, nullptr, nullptr, kCriteriaMembers, "what makes an uplink count as failed"},
+    {"uplink_port_order", Form::kObject, {},                                                         "", 0, nullptr, nullptr, kOrderMembers, "which uplinks are used first"},
+};
+// clang-format on
+
+} // namespace dvs::layout::teaming
+
+namespace dvs::layout {
+
+inline constexpr StoreField kTeamingForm = {nullptr,           Form::kObject,   {}, "", 0, nullptr, nullptr,
+                                            teaming::kMembers, "teaming policy"};
 
 } // namespace dvs::layout
 

@@ -5,6 +5,7 @@
 // The record of a port's transmit-uplink mode.
 
 #include "configstore/layouts/layout.h"
+#include "configstore/layouts/store_form.h"
 
 namespace dvs::layout {
 
@@ -20,6 +21,14 @@ inline constexpr Field kTxUplinkFields[] = {
 
 inline constexpr Record kTxUplink = {"transmit-uplink mode", 7, kTxUplinkFields, {}};
 static_assert(IsSound(kTxUplink));
+
+} // namespace dvs::layout
+
+namespace dvs::layout {
+
+// clang-format off
+inline constexpr StoreField kTxUplinkForm = {nullptr, Form::kBool, Literal(kTxUplink, {"always", 7}, {"normal", 7}), "", 0, nullptr, nullptr, {}, "the flag"};
+// clang-format on
 
 } // namespace dvs::layout
 

@@ -27,6 +27,7 @@ int64_t dvsConfigStoreTimeMs = 0;
 
 namespace {
 
+using dvs::ConverterType;
 using dvs::config::LogError;
 using dvs::config::LogTrace;
 using dvs::config::Tracing;
@@ -43,9 +44,8 @@ std::span<const uint8_t> Bytes(const void *value, uint32_t len) {
     return {static_cast<const uint8_t *>(value), value ? len : 0};
 }
 
-uint32_t DefaultType(uint32_t propClass) {
-    return propClass == DVS_PROP_CLASS_PORT ? dvs::convert::kTypePortDefault
-                                            : dvs::convert::kTypeSwitchDefault;
+ConverterType DefaultType(uint32_t propClass) {
+    return propClass == DVS_PROP_CLASS_PORT ? ConverterType::kPortDefault : ConverterType::kSwitchDefault;
 }
 
 int32_t FailedToSet(const char *key, int32_t status) {
@@ -64,7 +64,7 @@ int32_t FailedToReach(const char *key, int32_t status) {
 }
 
 int32_t RunSave(const DVSProp2ConfigEntry &row, const dvs::convert::SaveArgs &args) {
-    const auto *converter = ConverterFor(row.converterType);
+    const auto *converter = ConverterFor(dvs::ConverterTypeOf(row));
     if (!converter) LogError("Unknow prop type: %d\n", static_cast<int>(row.converterType));
     const int32_t status = converter ? converter->save(args) : kFailed;
     return status ? FailedToSet(args.key, status) : 0;

@@ -30,7 +30,7 @@ PropLoader::PropLoader(uint32_t propClass)
 
 PropLoader::Row PropLoader::Prepared(const DVSProp2ConfigEntry &row) {
     const uint32_t depth = DepthOf(row);
-    const auto *converter = convert::ConverterFor(row.converterType);
+    const auto *converter = convert::ConverterFor(ConverterTypeOf(row));
     const uint32_t parent = ParentOf(row, depth);
     return {.row = &row,
             .load = converter ? converter->load : nullptr,
@@ -69,7 +69,7 @@ int32_t PropLoader::LoadRows(configstore::Object *object, DVSData *list, data::G
     args.leaf = kTrafficResourcesLeaf;
     args.key = kPortResourcePoolsKey;
     args.propType = kPropTypeState;
-    return convert::ConverterFor(convert::kTypeTrafficResources)->load(args);
+    return convert::ConverterFor(ConverterType::kTrafficResources)->load(args);
 }
 
 // As GetSubObjectByPath without creating, then the converter.

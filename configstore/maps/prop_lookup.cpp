@@ -18,14 +18,15 @@ uint32_t HashOf(const char *key, std::size_t length) {
 
 } // namespace
 
-const DVSProp2ConfigEntry *FindRow(const DVSProp2ConfigEntry *table, const char *key, uint32_t defaultType) {
+const DVSProp2ConfigEntry *FindRow(const DVSProp2ConfigEntry *table, const char *key,
+                                   ConverterType defaultType) {
     for (const auto *row = table; row->key; ++row) {
-        if (row->converterType == defaultType || std::strcmp(row->key, key) == 0) return row;
+        if (ConverterTypeOf(*row) == defaultType || std::strcmp(row->key, key) == 0) return row;
     }
     return nullptr;
 }
 
-void RowIndex::Build(const DVSProp2ConfigEntry *table, uint32_t defaultType) {
+void RowIndex::Build(const DVSProp2ConfigEntry *table, ConverterType defaultType) {
     table_ = table;
     defaultType_ = defaultType;
     rowNum_ = last_ = 0;
@@ -34,7 +35,7 @@ void RowIndex::Build(const DVSProp2ConfigEntry *table, uint32_t defaultType) {
     slots_ = {};
     for (const auto *row = table; row->key && !hasDefault_; ++row) {
         if (rowNum_ == kMaxRows) return;
-        hasDefault_ = row->converterType == defaultType_;
+        hasDefault_ = ConverterTypeOf(*row) == defaultType_;
         ways_[rowNum_] = WayOf(rowNum_);
         if (!hasDefault_) Insert(rowNum_);
         ++rowNum_;

@@ -8,13 +8,15 @@
 #include <array>
 #include <cstdint>
 
+#include "configstore/layouts/converter_type.h"
 #include "dvs/configstore.h"
 
 namespace dvs::config {
 
 /// The first row of `table` with exactly this key; where a row of type `defaultType` comes before it, that
 /// row. Null where the table ends (null key) before either.
-const DVSProp2ConfigEntry *FindRow(const DVSProp2ConfigEntry *table, const char *key, uint32_t defaultType);
+const DVSProp2ConfigEntry *FindRow(const DVSProp2ConfigEntry *table, const char *key,
+                                   ConverterType defaultType);
 
 /// FindRow for many keys of one table, as the table is when the index is built: the tables are writable, so
 /// an index is not kept for longer than nobody can have written to them.
@@ -29,7 +31,7 @@ public:
     };
 
     [[nodiscard]] bool IsBuilt() const { return table_ != nullptr; }
-    void Build(const DVSProp2ConfigEntry *table, uint32_t defaultType);
+    void Build(const DVSProp2ConfigEntry *table, ConverterType defaultType);
     /// Remembers which row came behind which: one property after the other, ports mostly have the same ones.
     [[nodiscard]] Found Find(const char *key);
 
@@ -42,7 +44,7 @@ private:
     [[nodiscard]] uint32_t Search(const char *key) const;
 
     const DVSProp2ConfigEntry *table_ = nullptr;
-    uint32_t defaultType_ = 0;
+    ConverterType defaultType_ = ConverterType::kEnd;
     uint32_t rowNum_ = 0;     // rows that can be found, the DEFAULT row included
     bool hasDefault_ = false; // the last of them is it
     bool usable_ = false;     // a table that is too large for the index is walked

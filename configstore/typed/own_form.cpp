@@ -117,17 +117,17 @@ Flaw EncodeFilters(const Record &record, const Node &tree, std::vector<uint8_t> 
 }
 
 constexpr OwnForm kOwnForms[] = {
-    {9, CompleteSessions, EncodeSessions},
-    {17, CompleteTeaming, EncodeTeaming},
-    {18, CompleteTeaming, EncodeTeaming},
-    {24, nullptr, EncodeVlan},
-    {25, nullptr, EncodeVlan},
-    {29, nullptr, EncodeFilters},
+    {ConverterType::kMirrorSessions, CompleteSessions, EncodeSessions},
+    {ConverterType::kEtherswitchTeaming, CompleteTeaming, EncodeTeaming},
+    {ConverterType::kVswitchTeaming, CompleteTeaming, EncodeTeaming},
+    {ConverterType::kEtherswitchPortVlan, nullptr, EncodeVlan},
+    {ConverterType::kVswitchPortVlan, nullptr, EncodeVlan},
+    {ConverterType::kFilters, nullptr, EncodeFilters},
 };
 
 } // namespace
 
-const OwnForm *OwnFormOf(uint32_t type) {
+const OwnForm *OwnFormOf(ConverterType type) {
     for (const OwnForm &form : kOwnForms) {
         if (form.type == type) return &form;
     }

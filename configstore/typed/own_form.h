@@ -13,13 +13,14 @@
 #include <string_view>
 #include <vector>
 
+#include "configstore/layouts/converter_type.h"
 #include "configstore/layouts/layout.h"
 #include "configstore/typed/tree.h"
 
 namespace dvs::typed {
 
 struct OwnForm {
-    uint32_t type; // of the converter
+    ConverterType type;
 
     // Adds what a save leaves out to the tree of a value that has been saved, so that its records are whole.
     // May be null.
@@ -33,7 +34,7 @@ struct OwnForm {
 };
 
 /// Null for a type that its converter loads as it was written.
-const OwnForm *OwnFormOf(uint32_t type);
+const OwnForm *OwnFormOf(ConverterType type);
 
 /// Mirror sessions (mirror_form.cpp).
 void CompleteSessions(const layout::Record &record, std::span<const uint8_t> value,

@@ -140,13 +140,20 @@ std::string SummarizeSessions(const Node &tree) {
 }
 
 struct Row {
-    uint32_t type;
+    ConverterType type;
     std::string (*summarize)(const Node &tree);
 };
 constexpr Row kRows[] = {
-    {6, SummarizePrivateVlans}, {7, SummarizePrivateVlans}, {9, SummarizeSessions}, {17, SummarizeTeaming},
-    {18, SummarizeTeaming},     {24, SummarizeVlan},        {25, SummarizeVlan},    {26, SummarizeShaping},
-    {27, SummarizeSecurity},    {28, SummarizeSecurity},
+    {ConverterType::kEtherswitchPrivateVlans, SummarizePrivateVlans},
+    {ConverterType::kVswitchPrivateVlans, SummarizePrivateVlans},
+    {ConverterType::kMirrorSessions, SummarizeSessions},
+    {ConverterType::kEtherswitchTeaming, SummarizeTeaming},
+    {ConverterType::kVswitchTeaming, SummarizeTeaming},
+    {ConverterType::kEtherswitchPortVlan, SummarizeVlan},
+    {ConverterType::kVswitchPortVlan, SummarizeVlan},
+    {ConverterType::kShaping, SummarizeShaping},
+    {ConverterType::kEtherswitchMacSecurity, SummarizeSecurity},
+    {ConverterType::kVswitchMacSecurity, SummarizeSecurity},
 };
 
 } // namespace
@@ -179,7 +186,7 @@ std::string ToLine(const Node &node) {
     return Join(parts);
 }
 
-std::string Summarize(uint32_t type, const Node &tree) {
+std::string Summarize(ConverterType type, const Node &tree) {
     for (const Row &row : kRows) {
         if (row.type == type) return row.summarize(tree);
     }

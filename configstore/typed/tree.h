@@ -7,6 +7,7 @@
 #include <string>
 #include <vector>
 
+#include "configstore/layouts/converter_type.h"
 #include "configstore/layouts/store_form.h"
 #include "configstore/typed/typed_value.h"
 #include "platform/configstore.h"
@@ -53,7 +54,7 @@ std::vector<std::string> Compare(const Node &given, const Node &found);
 std::string ToLine(const Node &node);
 
 /// One line for people, by the converter type.
-std::string Summarize(uint32_t type, const Node &tree);
+std::string Summarize(ConverterType type, const Node &tree);
 
 } // namespace dvs::typed
 

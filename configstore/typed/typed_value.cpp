@@ -10,6 +10,7 @@
 #include "configstore/converters/common.h"
 #include "configstore/converters/health_check.h"
 #include "configstore/converters/switch_version.h"
+#include "configstore/layouts/switch_version.h"
 #include "configstore/converters/table.h"
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/walk.h"
@@ -20,10 +21,6 @@
 namespace dvs::typed {
 namespace {
 
-constexpr uint32_t kTypeVersion = 15;
-constexpr uint32_t kTypeHealthCheck = 11;
-constexpr uint32_t kTypeOverlayFlag = 19;
-constexpr uint32_t kTypePortPools = 36;
 constexpr uint32_t kFirstOverlayVersion = 107;
 
 // The converters' process-wide values as the property's own key calls for, and silence. Restored at the end.
@@ -31,7 +28,7 @@ class Surroundings {
 public:
     Surroundings(std::string_view key, const Context &context) {
         dvsSwitchClass = key.find(".vswitch.") != std::string_view::npos ? 1 : 0;
-        dvsWidePortRecords = context.version > convert::kLastNarrowPortVersion;
+        dvsWidePortRecords = context.version > layout::kLastNarrowVersion;
         dvsLoadedSwitch = nullptr;
         dvsconfigstore_debug = -1;
     }
@@ -61,9 +58,9 @@ public:
         : surroundings_(key, context), propClass_(propClass), context_(context),
           row_(layout::FindProperty(propClass, key)) {
         if (!row_) return;
-        const bool isPortPools = row_->converterType == kTypePortPools;
+        const bool isPortPools = ConverterTypeOf(*row_) == ConverterType::kPortPools;
         // A port's pools have no form of their own: they are the switch's.
-        type_ = layout::FindType(isPortPools ? convert::kTypeTrafficResources : row_->converterType);
+        type_ = layout::FindType(isPortPools ? ConverterType::kTrafficResources : ConverterTypeOf(*row_));
         converter_ = type_ ? convert::ConverterFor(type_->type) : nullptr;
         own_ = type_ ? OwnFormOf(type_->type) : nullptr;
         configstore::Object *object = nullptr;
@@ -83,7 +80,8 @@ public:
     }
     [[nodiscard]] Place place() const {
         return {parent_, leaf_,
-                type_->type == kTypeHealthCheck ? convert::HealthCheckInstance(row_->key) : nullptr};
+                type_->type == ConverterType::kHealthCheck ? convert::HealthCheckInstance(row_->key)
+                                                           : nullptr};
     }
 
     int32_t Save(std::span<const uint8_t> value) {
@@ -136,7 +134,7 @@ private:
                 (void)configstore::SetValueStr(object, "policy",
                                                name); // the name for another value stays at worst
         }
-        if (type_->type == kTypeHealthCheck) {
+        if (type_->type == ConverterType::kHealthCheck) {
             (void)configstore::RemoveValue(object, "enable"); // a name that a tree does not show
             (void)configstore::SetValueBool(object, "enabled", value[0] != 0);
         }
@@ -145,10 +143,10 @@ private:
     // What the loads of some global properties ask the switch's object for.
     int32_t DescribeSwitch() {
         // The overlay flag is itself what the others ask for.
-        if (propClass_ != DVS_PROP_CLASS_GLOBAL || type_->type == kTypeOverlayFlag) return 0;
+        if (propClass_ != DVS_PROP_CLASS_GLOBAL || type_->type == ConverterType::kOverlayFlag) return 0;
         int32_t status =
             configstore::SetValueBool(root_.get(), "ovl_enabled", context_.version >= kFirstOverlayVersion);
-        if (status || type_->type == kTypeVersion) return status;
+        if (status || type_->type == ConverterType::kSwitchVersion) return status;
         configstore::Object *product = nullptr;
         status = GetOrCreateSubObject(true, root_.get(), "product", nullptr, &product);
         if (status) return status;
@@ -290,7 +288,7 @@ Built Build(uint32_t propClass, std::string_view key, const Node &tree, const Co
     if (view.state != State::kTyped) {
         built.differences.push_back("the value reads back as damaged: " + view.reason);
     } else {
-        const auto *type = layout::FindType(layout::FindProperty(propClass, key)->converterType);
+        const auto *type = layout::FindType(ConverterTypeOf(*layout::FindProperty(propClass, key)));
         built.differences = Compare(Normalized(*type->form, tree), view.tree);
     }
     return built;

@@ -51,7 +51,8 @@ DVSProp2ConfigEntry TextRow(const char *key, const char *leaf) {
 
 TEST_F(PropSaverTest, FindsTheRowsThatAWalkFinds) {
     for (int kind = 0; kind < 3; ++kind) {
-        const uint32_t defaultType = kind == DVS_PROP_CLASS_PORT ? 33 : 22;
+        using enum dvs::ConverterType;
+        const auto defaultType = kind == DVS_PROP_CLASS_PORT ? kPortDefault : kSwitchDefault;
         const auto *table = GetConfigMap(kind);
         dvs::config::RowIndex index;
         index.Build(table, defaultType);

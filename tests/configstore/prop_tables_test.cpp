@@ -61,7 +61,7 @@ TEST(PropTables, RowsAreWellFormed) {
             EXPECT_LE(row->depth, 3u);
             EXPECT_EQ(16u, row->loadPropType);
             EXPECT_EQ(0u, row->reserved);
-            EXPECT_NE(nullptr, dvs::convert::ConverterFor(row->converterType));
+            EXPECT_NE(nullptr, dvs::convert::ConverterFor(dvs::ConverterTypeOf(*row)));
             for (uint32_t slot = 0; slot < 5; ++slot) {
                 const std::string name = row->path[slot];
                 EXPECT_EQ(slot < row->depth, !name.empty());
@@ -86,10 +86,13 @@ TEST(PropTables, KeysAreUniqueButForTheRepeatedRow) {
 }
 
 TEST(PropTables, HaveAConverterForEveryTypeButOne) {
-    for (uint32_t type = 0; type <= 36; ++type)
-        EXPECT_EQ(type == 30, dvs::convert::ConverterFor(type) == nullptr) << type;
-    EXPECT_EQ(nullptr, dvs::convert::ConverterFor(37));
-    EXPECT_EQ(nullptr, dvs::convert::ConverterFor(0xffffffff));
+    using dvs::ConverterType;
+    using dvs::convert::ConverterFor;
+    for (ConverterType type{}; type < ConverterType::kEnd; type = Next(type))
+        EXPECT_EQ(type == ConverterType::kUnassigned, ConverterFor(type) == nullptr)
+            << static_cast<uint32_t>(type);
+    EXPECT_EQ(nullptr, ConverterFor(ConverterType::kEnd));
+    EXPECT_EQ(nullptr, ConverterFor(ConverterType{0xffffffff}));
 }
 
 } // namespace

@@ -55,7 +55,7 @@ void Convert(const Choice &choice, const std::uint8_t *value, std::size_t size) 
     (void)configstore::SetValueStr(product, "forwarding_class", dvsSwitchClass == 2 ? "cswitch" : "other");
     (void)configstore::SetValueStr(product, "version", choice.wide ? "OVL 1.0" : "7.0.3");
     (void)SaveProp(object, choice.row->key, value, static_cast<std::uint32_t>(size), choice.propClass, 0x20);
-    if (choice.row->converterType != 29) {
+    if (dvs::ConverterTypeOf(*choice.row) != dvs::ConverterType::kFilters) {
         DVSData *list = nullptr;
         if (DVSData_Alloc(&list, Allocate, std::free) != HYP_OK) std::abort();
         (void)LoadProps("props", object, list, choice.propClass, 9, nullptr);
@@ -90,7 +90,7 @@ extern "C" std::size_t LLVMFuzzerCustomMutator(std::uint8_t *data, std::size_t s
     if (seed % 2 || size < kHeadSize || maxSize < kHeadSize) return LLVMFuzzerMutate(data, size, maxSize);
     value_generator::Generator generator(seed);
     const Choice choice = Choose(data);
-    const auto *info = dvs::layout::FindType(choice.row->converterType);
+    const auto *info = dvs::layout::FindType(dvs::ConverterTypeOf(*choice.row));
     const auto &record = choice.wide ? *info->wide : *info->record;
     const auto value = generator.OneIn(3) ? generator.Sound(record) : generator.Lying(record);
     const std::size_t kept = std::min(value.size(), maxSize - kHeadSize);

@@ -53,7 +53,7 @@ std::vector<Known> AllKnown() {
     for (const ClassRow &each : kClasses) {
         std::set<std::string_view> seen;
         for (const auto *row = GetConfigMap(static_cast<int>(each.propClass)); row->key; ++row) {
-            const layout::TypeInfo *type = layout::FindType(row->converterType);
+            const layout::TypeInfo *type = layout::FindType(ConverterTypeOf(*row));
             if (!type || !layout::FindProperty(each.propClass, row->key) || !seen.insert(row->key).second)
                 continue;
             const char *meaning = layout::MeaningOf(each.propClass, row->key);
@@ -149,7 +149,8 @@ json::object KnownJson(const Known &known) {
     for (const Record *record : RecordsOf(*known.type))
         records.emplace_back(RecordJson(*record));
     json::object object{{"name", known.row->key}, {"list", known.list}, {"path", layout::PathOf(*known.row)}};
-    object["converter"] = json::object{{"type", known.type->type}, {"name", known.type->name}};
+    object["converter"] =
+        json::object{{"type", static_cast<std::uint32_t>(known.type->type)}, {"name", known.type->name}};
     object["meaning"] = known.meaning;
     if (*known.type->quirks) object["quirks"] = known.type->quirks;
     object["records"] = std::move(records);
@@ -179,7 +180,7 @@ void WriteTable(const std::vector<Known> &all, Context &context) {
         table.Add({{known.list},
                    {known.row->key, Style::Name},
                    {layout::PathOf(*known.row)},
-                   {std::to_string(known.type->type)},
+                   {std::to_string(static_cast<std::uint32_t>(known.type->type))},
                    {known.type->name},
                    {fmt::format("{}{}", record.size, isOpen ? "+" : "")},
                    {layout::Word(known.type->form->form)},
@@ -237,7 +238,7 @@ void Explain(const Known &known, Context &context) {
     out.Write(fmt::format("{} ({})\n", out.Paint(Style::Name, known.row->key), known.list));
     out.Write(fmt::format("  {}\n", known.meaning));
     out.Write(fmt::format("  in the store: {}\n  converter:    {}, {}\n", layout::PathOf(*known.row),
-                          known.type->type, known.type->name));
+                          static_cast<std::uint32_t>(known.type->type), known.type->name));
     if (*known.type->quirks) out.Write(fmt::format("  oddities:     {}\n", known.type->quirks));
     for (const Record *record : RecordsOf(*known.type))
         WriteRecord(*record, context);

@@ -13,6 +13,7 @@
 #include "configstore/typed/typed_value.h"
 
 using namespace converter_test;
+using dvs::ConverterType;
 using dvs::layout::Form;
 using dvs::layout::StoreField;
 
@@ -60,7 +61,7 @@ struct Hostile : ConverterTest {
         (void)dvs::typed::Describe(row.propClass, row.entry->key, value, {dvsWidePortRecords ? 100u : 9u});
         // Filters with texts too long for their fields end the process when they are loaded: the one stated
         // exception.
-        if (row.entry->converterType == 29) {
+        if (dvs::ConverterTypeOf(*row.entry) == ConverterType::kFilters) {
             (void)configstore::DeleteSubObject(Sub("settings"), "filter_policy", "");
             return;
         }
@@ -72,7 +73,7 @@ struct Hostile : ConverterTest {
 
 TEST_F(Hostile, AnyLengthOfAnyBytesIsRefusedOrBounded) {
     for (const Row &row : Rows()) {
-        const auto *record = dvs::layout::FindType(row.entry->converterType)->record;
+        const auto *record = dvs::layout::FindType(dvs::ConverterTypeOf(*row.entry))->record;
         std::vector<std::size_t> sizes;
         for (std::size_t size = 0; size <= 300; ++size)
             sizes.push_back(size);
@@ -96,7 +97,7 @@ TEST_F(Hostile, LyingValuesAreRefusedOrBounded) {
         const Row &row = rows[generator.Below(rows.size())];
         const bool wide = generator.OneIn(2);
         if (generator.OneIn(4)) Renew(kSwitches[generator.Below(3)], wide);
-        const auto *info = dvs::layout::FindType(row.entry->converterType);
+        const auto *info = dvs::layout::FindType(dvs::ConverterTypeOf(*row.entry));
         Try(row, generator.Lying(dvsWidePortRecords ? *info->wide : *info->record));
         if (HasFatalFailure()) return;
     }
@@ -106,16 +107,16 @@ TEST_F(Hostile, LyingValuesAreRefusedOrBounded) {
 
 struct HostileDocument : Hostile {
     // Longest texts by type: of filters, what does not end the process.
-    std::string Text(const StoreField &form, uint32_t type) {
+    std::string Text(const StoreField &form, ConverterType type) {
         if (form.domain && !generator.OneIn(4)) {
             const char *text = form.domain->texts[generator.Below(form.domain->textCount)];
             if (text) return text;
         }
-        const bool isFatal = type == 29 && form.maxText != 0;
+        const bool isFatal = type == ConverterType::kFilters && form.maxText != 0;
         return generator.Text(isFatal ? form.maxText : generator.OneIn(8) ? 5000 : 300);
     }
 
-    void Member(configstore::Object *parent, const StoreField &form, const char *name, uint32_t type) {
+    void Member(configstore::Object *parent, const StoreField &form, const char *name, ConverterType type) {
         if (generator.OneIn(8)) return;
         if (generator.OneIn(20)) { // something else than a reader expects
             (void)configstore::SetValueInt(parent, name, -1);
@@ -167,8 +168,10 @@ TEST_F(HostileDocument, LoadersStayInsideTheirValues) {
         Renew(kSwitches[generator.Below(3)], generator.OneIn(2));
         configstore::Object *parent = nullptr;
         ASSERT_EQ(0, GetSubObjectByPath(row.entry->path, row.entry->depth, object, &parent, true));
-        const uint32_t type = row.entry->converterType;
-        const auto *form = dvs::layout::FindType(type == 36 ? 12 : type)->form;
+        const ConverterType type = dvs::ConverterTypeOf(*row.entry);
+        const auto *form =
+            dvs::layout::FindType(type == ConverterType::kPortPools ? ConverterType::kTrafficResources : type)
+                ->form;
         Member(parent, *form, row.entry->path[row.entry->depth - 1], type);
         const Properties properties =
             Load(row.propClass, row.propClass == kPort ? Sub("resource_management") : nullptr);

@@ -81,9 +81,9 @@ TEST_F(RoundTrip, SoundValuesComeBackAsTheModelSays) {
                 ASSERT_NE(nullptr, record) << row->key;
                 for (int i = 0; i < count; ++i) {
                     auto value = generator.Sound(*record);
-                    if (row->converterType == 15)
+                    if (dvs::ConverterTypeOf(*row) == dvs::ConverterType::kSwitchVersion)
                         value = Bytes().U32(kVersions[generator.Below(std::size(kVersions))]);
-                    if (!round_trip::HasDistinctKeys(row->converterType, value)) continue;
+                    if (!round_trip::HasDistinctKeys(dvs::ConverterTypeOf(*row), value)) continue;
                     Check(sw, propClass, *row, value);
                     if (HasFatalFailure()) return;
                 }

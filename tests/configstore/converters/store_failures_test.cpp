@@ -16,87 +16,91 @@ using namespace converter_test;
 
 namespace {
 
+using dvs::ConverterType;
+using dvs::ConverterTypeOf;
+using enum ConverterType;
+
 constexpr int32_t kStaged = 777; // a status of nobody else
 
 // Calls whose failure a converter swallows, or turns into -1. Columns: type, whether it is a save, function,
 // result.
 struct Exception {
-    uint32_t type;
+    ConverterType type;
     bool isSave;
     const char *function;
     int32_t result;
 };
 constexpr Exception kExceptions[] = {
     // clang-format off
-    {8,  true,  "GetSubObject",           -1}, // an object that cannot be had is the library's own failure
-    {8,  true,  "CreateSubObject",        -1},
-    {9,  true,  "SetValueBool",            0}, // normal traffic and legacy mode
-    {9,  true,  "SetValueUint32",          0}, // sampling rate
-    {13, true,  "SetValueEmptyList",       0},
-    {17, true,  "GetSubObject",            0}, // the failure criteria
-    {17, true,  "CreateSubObject",         0},
-    {20, true,  "SetValueEmptyList",       0},
-    {25, true,  "SetValueUint16",          0},
-    {6,  false, "GetSubObject",           -1}, // of the version reader, as the next three
-    {6,  false, "GetValueStr",            -1},
-    {7,  false, "GetSubObject",           -1},
-    {7,  false, "GetValueStr",            -1},
-    {6,  false, "GetValueBool",            0}, // the overlay flag
-    {7,  false, "GetValueBool",            0},
-    {15, false, "GetValueBool",            0},
-    {9,  false, "GetValueBool",            0}, // the overlay flag, the time stamps
-    {9,  false, "GetSubObject",            0}, // the three port objects
-    {9,  false, "GetSubObjectInstances",   0}, // counts of the size pass
-    {9,  false, "CreateFilterSpecObject",  0},
-    {9,  false, "GetValueStr",             0},
-    {9,  false, "GetValueUint32",          0},
-    {9,  false, "GetValueUint16",          0},
-    {9,  false, "GetValueStringArray",     0},
-    {10, false, "GetValueUint32",          0},
-    {10, false, "GetValueUint16",          0},
-    {10, false, "GetValueBool",            0},
-    {10, false, "GetValueStr",             0},
-    {11, false, "GetValueBool",            0},
-    {11, false, "GetValueUint32",          0},
-    {12, false, "GetSubObject",            0},
-    {12, false, "GetValueStr",             0},
-    {12, false, "GetValueInt",             0},
-    {12, false, "GetValueUint32",          0},
-    {14, false, "GetValueStringArray",     0},
-    {16, false, "GetValueStr",             0},
-    {17, false, "GetSubObject",            0},
-    {17, false, "GetValueStr",             0},
-    {17, false, "GetValueBool",            0},
-    {17, false, "GetValueUint16",          0},
-    {17, false, "GetValueStringArray",     0},
-    {18, false, "GetSubObject",            0},
-    {18, false, "GetValueStr",             0},
-    {18, false, "GetValueBool",            0},
-    {18, false, "GetValueUint16",          0},
-    {18, false, "GetValueStringArray",     0},
-    {24, false, "GetSubObject",            0},
-    {24, false, "GetSubObjectInstances",   0},
-    {24, false, "GetValueUint16",          0},
-    {25, false, "GetSubObject",            0},
-    {25, false, "GetSubObjectInstances",   0},
-    {25, false, "GetValueUint16",          0},
-    {26, false, "GetSubObject",            0},
-    {26, false, "GetValueLong",            0},
-    {27, false, "GetSubObject",            0},
-    {27, false, "GetValueBool",            0},
-    {28, false, "GetSubObject",            0},
-    {28, false, "GetValueBool",            0},
-    {29, false, "CreateFilterSpecObject",  0},
-    {29, false, "GetSubObjectInstances",   0},
-    {29, false, "GetValueStr",             0},
-    {29, false, "GetValueStringArray",     0},
-    {35, false, "GetSubObject",            0},
+    {kLinkDiscovery,         true,  "GetSubObject",           -1}, // an object that cannot be had is the library's own failure
+    {kLinkDiscovery,         true,  "CreateSubObject",        -1},
+    {kMirrorSessions,        true,  "SetValueBool",            0}, // normal traffic and legacy mode
+    {kMirrorSessions,        true,  "SetValueUint32",          0}, // sampling rate
+    {kPoolKeys,              true,  "SetValueEmptyList",       0},
+    {kEtherswitchTeaming,    true,  "GetSubObject",            0}, // the failure criteria
+    {kEtherswitchTeaming,    true,  "CreateSubObject",         0},
+    {kUplinkNames,           true,  "SetValueEmptyList",       0},
+    {kVswitchPortVlan,       true,  "SetValueUint16",          0},
+    {kEtherswitchPrivateVlans,false, "GetSubObject",           -1}, // of the version reader, as the next three
+    {kEtherswitchPrivateVlans,false, "GetValueStr",            -1},
+    {kVswitchPrivateVlans,   false, "GetSubObject",           -1},
+    {kVswitchPrivateVlans,   false, "GetValueStr",            -1},
+    {kEtherswitchPrivateVlans,false, "GetValueBool",            0}, // the overlay flag
+    {kVswitchPrivateVlans,   false, "GetValueBool",            0},
+    {kSwitchVersion,         false, "GetValueBool",            0},
+    {kMirrorSessions,        false, "GetValueBool",            0}, // the overlay flag, the time stamps
+    {kMirrorSessions,        false, "GetSubObject",            0}, // the three port objects
+    {kMirrorSessions,        false, "GetSubObjectInstances",   0}, // counts of the size pass
+    {kMirrorSessions,        false, "CreateFilterSpecObject",  0},
+    {kMirrorSessions,        false, "GetValueStr",             0},
+    {kMirrorSessions,        false, "GetValueUint32",          0},
+    {kMirrorSessions,        false, "GetValueUint16",          0},
+    {kMirrorSessions,        false, "GetValueStringArray",     0},
+    {kIpfix,                 false, "GetValueUint32",          0},
+    {kIpfix,                 false, "GetValueUint16",          0},
+    {kIpfix,                 false, "GetValueBool",            0},
+    {kIpfix,                 false, "GetValueStr",             0},
+    {kHealthCheck,           false, "GetValueBool",            0},
+    {kHealthCheck,           false, "GetValueUint32",          0},
+    {kTrafficResources,      false, "GetSubObject",            0},
+    {kTrafficResources,      false, "GetValueStr",             0},
+    {kTrafficResources,      false, "GetValueInt",             0},
+    {kTrafficResources,      false, "GetValueUint32",          0},
+    {kUplinkKeys,            false, "GetValueStringArray",     0},
+    {kLacpGroups,            false, "GetValueStr",             0},
+    {kEtherswitchTeaming,    false, "GetSubObject",            0},
+    {kEtherswitchTeaming,    false, "GetValueStr",             0},
+    {kEtherswitchTeaming,    false, "GetValueBool",            0},
+    {kEtherswitchTeaming,    false, "GetValueUint16",          0},
+    {kEtherswitchTeaming,    false, "GetValueStringArray",     0},
+    {kVswitchTeaming,        false, "GetSubObject",            0},
+    {kVswitchTeaming,        false, "GetValueStr",             0},
+    {kVswitchTeaming,        false, "GetValueBool",            0},
+    {kVswitchTeaming,        false, "GetValueUint16",          0},
+    {kVswitchTeaming,        false, "GetValueStringArray",     0},
+    {kEtherswitchPortVlan,   false, "GetSubObject",            0},
+    {kEtherswitchPortVlan,   false, "GetSubObjectInstances",   0},
+    {kEtherswitchPortVlan,   false, "GetValueUint16",          0},
+    {kVswitchPortVlan,       false, "GetSubObject",            0},
+    {kVswitchPortVlan,       false, "GetSubObjectInstances",   0},
+    {kVswitchPortVlan,       false, "GetValueUint16",          0},
+    {kShaping,               false, "GetSubObject",            0},
+    {kShaping,               false, "GetValueLong",            0},
+    {kEtherswitchMacSecurity,false, "GetSubObject",            0},
+    {kEtherswitchMacSecurity,false, "GetValueBool",            0},
+    {kVswitchMacSecurity,    false, "GetSubObject",            0},
+    {kVswitchMacSecurity,    false, "GetValueBool",            0},
+    {kFilters,               false, "CreateFilterSpecObject",  0},
+    {kFilters,               false, "GetSubObjectInstances",   0},
+    {kFilters,               false, "GetValueStr",             0},
+    {kFilters,               false, "GetValueStringArray",     0},
+    {kPortLacp,              false, "GetSubObject",            0},
     // clang-format on
 };
 
 std::set<const Exception *> g_met;
 
-bool IsStated(uint32_t type, bool isSave, const std::string &function, int32_t result) {
+bool IsStated(ConverterType type, bool isSave, const std::string &function, int32_t result) {
     const auto *found =
         std::find_if(std::begin(kExceptions), std::end(kExceptions), [&](const Exception &each) {
             return each.type == type && each.isSave == isSave && function == each.function &&
@@ -115,7 +119,9 @@ struct StoreFailures : ConverterTest {
         ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "id", "{}", &object));
         const bool isVswitch = std::string(row.key).find(".vswitch.") != std::string::npos;
         // The private VLANs of the vswitch key need more than the class.
-        BecomeSwitch(row.converterType == 7 ? "cswitch" : isVswitch ? "vswitch" : "etherswitch");
+        BecomeSwitch(ConverterTypeOf(row) == kVswitchPrivateVlans ? "cswitch"
+                     : isVswitch                                  ? "vswitch"
+                                                                  : "etherswitch");
     }
 
     int32_t LoadRow(uint32_t propClass, const DVSProp2ConfigEntry &row) {
@@ -127,7 +133,7 @@ struct StoreFailures : ConverterTest {
                               &list, [](uint64_t size) { return std::malloc(size); }, std::free));
         dvs::convert::KnownFilters filters;
         const int32_t status =
-            dvs::convert::ConverterFor(row.converterType)
+            dvs::convert::ConverterFor(ConverterTypeOf(row))
                 ->load({object, parent, list, row.path[row.depth - 1], row.key, 16, propClass, &filters});
         DVSData_Free(list);
         return status;
@@ -145,7 +151,7 @@ struct StoreFailures : ConverterTest {
             if (!failed) return;
             if (status == kStaged) continue;
             const std::string function = fake_store::CallName(before + call);
-            EXPECT_TRUE(IsStated(row.converterType, isSave, function, status))
+            EXPECT_TRUE(IsStated(ConverterTypeOf(row), isSave, function, status))
                 << row.key << (isSave ? " save" : " load") << ", call " << call << " " << function << ": "
                 << status;
         }
@@ -160,8 +166,8 @@ TEST_F(StoreFailures, AreTheResultOrStatedNotToMatter) {
             if (!record) continue; // the DEFAULT rows have tests of their own
             for (int i = 0; i < 8; ++i) {
                 auto value = generator.Sound(*record);
-                if (row->converterType == 15) value = Bytes().U32(9);
-                if (!round_trip::HasDistinctKeys(row->converterType, value)) continue;
+                if (ConverterTypeOf(*row) == kSwitchVersion) value = Bytes().U32(9);
+                if (!round_trip::HasDistinctKeys(ConverterTypeOf(*row), value)) continue;
                 FailEach(*row, true, [&] { return Save(propClass, row->key, value); });
                 Renew(*row);
                 ASSERT_EQ(0, Save(propClass, row->key, value)) << row->key;
@@ -171,7 +177,7 @@ TEST_F(StoreFailures, AreTheResultOrStatedNotToMatter) {
     }
     for (const Exception &each : kExceptions) {
         EXPECT_TRUE(g_met.contains(&each))
-            << each.type << " " << each.function << " is no exception any more";
+            << static_cast<uint32_t>(each.type) << " " << each.function << " is no exception any more";
     }
 }
 

@@ -12,6 +12,7 @@
 
 #include "configstore/layouts/registry.h"
 
+using namespace dvs;
 using namespace dvs::layout;
 
 namespace {
@@ -32,43 +33,43 @@ TEST(PropertiesDocument, ExplainsEveryKey) {
     const std::string document = PropertiesDocument();
     for (uint32_t propClass = 0; propClass <= 2; ++propClass) {
         for (const auto *row = GetConfigMap(static_cast<int>(propClass)); row->key; ++row) {
-            EXPECT_NE(nullptr, FindType(row->converterType)) << row->key;
+            EXPECT_NE(nullptr, FindType(ConverterTypeOf(*row))) << row->key;
             if (std::string(row->key) == "DEFAULT") continue;
             EXPECT_NE(nullptr, MeaningOf(propClass, row->key)) << row->key;
             EXPECT_NE(nullptr, FindProperty(propClass, row->key)) << row->key;
             EXPECT_NE(std::string::npos, document.find(std::string("| `") + row->key + "` |")) << row->key;
         }
     }
-    EXPECT_EQ(nullptr, FindType(30));
+    EXPECT_EQ(nullptr, FindType(ConverterType::kUnassigned));
     EXPECT_EQ(nullptr, MeaningOf(0, "com.acme.other"));
     EXPECT_EQ(nullptr, RecordOf(0, "com.acme.other", false));
 }
 
 // The document's part about one type.
-std::string SectionOf(uint32_t type) {
+std::string SectionOf(ConverterType type) {
     const std::string document = PropertiesDocument() + "\n###";
-    const auto at = document.find("### Type " + std::to_string(type) + "\n");
+    const auto at = document.find("### Type " + std::to_string(static_cast<uint32_t>(type)) + "\n");
     if (at == std::string::npos) return "";
     return document.substr(at, document.find("\n###", at) - at);
 }
 
 TEST(PropertiesDocument, DescribesEachRecordOnceAndRefersToItElsewhere) {
-    const std::string number = SectionOf(0);
+    const std::string number = SectionOf(ConverterType::kNumber);
     EXPECT_NE(std::string::npos, number.find("*number*, 4 bytes"));
     EXPECT_EQ(std::string::npos, number.find("as above")) << number;
-    const std::string mtu = SectionOf(21);
+    const std::string mtu = SectionOf(ConverterType::kMtu);
     EXPECT_EQ(std::string::npos, mtu.find("*number*, 4 bytes"));
     const auto reference = mtu.find("The value is a *number* as above.");
     ASSERT_NE(std::string::npos, reference);
     EXPECT_EQ(std::string::npos, mtu.find("as above", reference + 30)) << mtu;
-    EXPECT_NE(std::string::npos, SectionOf(9).find("wide port record"));
+    EXPECT_NE(std::string::npos, SectionOf(ConverterType::kMirrorSessions).find("wide port record"));
 }
 
 TEST(PropertiesDocument, NamesEveryPlaceOfAType) {
     for (uint32_t propClass = 0; propClass <= 2; ++propClass) {
         for (const auto *row = GetConfigMap(static_cast<int>(propClass)); row->key; ++row) {
             const std::string leaf = std::string("`") + row->path[row->depth - 1] + "`";
-            EXPECT_NE(std::string::npos, SectionOf(row->converterType).find(leaf))
+            EXPECT_NE(std::string::npos, SectionOf(ConverterTypeOf(*row)).find(leaf))
                 << row->key << " is not under " << leaf;
         }
     }
@@ -76,7 +77,7 @@ TEST(PropertiesDocument, NamesEveryPlaceOfAType) {
 
 // `dvsctl props` shows them one at a time, by the property's name.
 TEST(Oddities, StandForThemselves) {
-    for (uint32_t type = 0; type <= 36; ++type) {
+    for (ConverterType type{}; type < ConverterType::kEnd; type = Next(type)) {
         const TypeInfo *info = FindType(type);
         if (!info) continue;
         EXPECT_FALSE(std::regex_search(info->quirks, std::regex("type [0-9]"))) << info->quirks;
@@ -84,10 +85,16 @@ TEST(Oddities, StandForThemselves) {
 }
 
 TEST(Oddities, SayWhichSwitchesATypeOfOneFamilyIsFor) {
-    for (const uint32_t type : {17u, 18u, 24u, 25u, 27u, 28u})
-        EXPECT_NE(std::string::npos, std::string(FindType(type)->quirks).find("cswitch")) << type;
-    for (const uint32_t type : {1u, 9u, 21u, 23u})
-        EXPECT_NE(std::string::npos, std::string(FindType(type)->quirks).find("family")) << type;
+    using enum ConverterType;
+    for (const ConverterType type : {kEtherswitchTeaming, kVswitchTeaming, kEtherswitchPortVlan,
+                                     kVswitchPortVlan, kEtherswitchMacSecurity, kVswitchMacSecurity}) {
+        const TypeInfo &info = *FindType(type);
+        EXPECT_NE(std::string::npos, std::string(info.quirks).find("cswitch")) << info.name;
+    }
+    for (const ConverterType type : {kText, kMirrorSessions, kMtu, kTxUplink}) {
+        const TypeInfo &info = *FindType(type);
+        EXPECT_NE(std::string::npos, std::string(info.quirks).find("family")) << info.name;
+    }
 }
 
 // Every test that docs/config-store.md names for an oddity.

@@ -10,6 +10,7 @@
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/value_generator.h"
 
+using namespace dvs;
 using namespace dvs::layout;
 
 namespace {
@@ -58,7 +59,7 @@ TEST(Walk, SaysWhereTheValueEnds) {
 
 TEST(Walk, SoundValuesHaveNoFaultAndNoByteWithoutField) {
     value_generator::Generator generator(1);
-    for (uint32_t type = 0; type <= 36; ++type) {
+    for (ConverterType type{}; type < ConverterType::kEnd; type = Next(type)) {
         const TypeInfo *info = FindType(type);
         if (!info) continue;
         for (const Record *record : {info->record, info->wide}) {
@@ -82,7 +83,7 @@ TEST(Walk, SoundValuesHaveNoFaultAndNoByteWithoutField) {
 TEST(Walk, LyingValuesStayInside) {
     value_generator::Generator generator(2);
     for (int i = 0; i < 3000; ++i) {
-        const TypeInfo *info = FindType(static_cast<uint32_t>(generator.Below(37)));
+        const TypeInfo *info = FindType(ConverterType{static_cast<uint32_t>(generator.Below(37))});
         if (!info) continue;
         const Bytes value = generator.Lying(*info->wide);
         const Bytes exact(value); // a block of just its size

@@ -8,6 +8,8 @@
 #include <cstdint>
 #include <span>
 
+#include "configstore/layouts/converter_type.h"
+
 namespace round_trip {
 
 enum class LoadsOn : uint8_t {
@@ -22,7 +24,7 @@ enum class LoadsOn : uint8_t {
 
 struct Key {
     const char *name;
-    uint32_t type;
+    dvs::ConverterType type;
     const char *place;
     LoadsOn loads;
 };

@@ -13,6 +13,7 @@
 
 namespace round_trip {
 
+using dvs::ConverterType;
 using state_builder::Prop;
 using state_builder::Props;
 
@@ -130,8 +131,9 @@ private:
     }
 
     void SaveMapped(std::size_t i, const Key &key) {
-        if (key.type == 36) return Occupy(&poolsOf_, i);
-        const bool isVswitchPolicy = key.type == 18 || key.type == 25;
+        if (key.type == ConverterType::kPortPools) return Occupy(&poolsOf_, i);
+        const bool isVswitchPolicy =
+            key.type == ConverterType::kVswitchTeaming || key.type == ConverterType::kVswitchPortVlan;
         if (isVswitchPolicy && context_.sw.IsEtherswitch()) return Gone(i, Rule::kNoVswitchPolicy);
         if (!HasDistinctKeys(key.type, before_[i].value))
             throw std::logic_error(before_[i].key + " has two elements of one key");
@@ -152,7 +154,7 @@ private:
         if (!list->comesBack) return Gone(i, Rule::kPortOtherData);
         ListFate::Kept kept{{prop.key, prop.value, list->type.value_or(prop.type)}, {i}, {}};
         if (kept.after.type != prop.type) kept.rules.insert(Rule::kTypeWord);
-        if (list->isText) (void)RunSteps(1, {}, &kept.after.value, &kept.rules);
+        if (list->isText) (void)RunSteps(ConverterType::kText, {}, &kept.after.value, &kept.rules);
         auto &stored = unmapped_[list->position];
         const auto namesake = std::find_if(stored.begin(), stored.end(),
                                            [&](const auto &each) { return each.after.key == prop.key; });

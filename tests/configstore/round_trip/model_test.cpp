@@ -39,7 +39,7 @@ TEST(RoundTripKeys, AreThoseOfTheTablesInTheirOrder) {
         std::erase_if(keysOfPath, [](const auto &each) { return each.second.empty(); });
         std::vector<std::string> known;
         for (const Key &key : KeysOf(propClass)) {
-            known.push_back(key.name + std::string(" ") + std::to_string(key.type));
+            known.push_back(key.name + std::string(" ") + std::to_string(static_cast<uint32_t>(key.type)));
             keysOfPlace[key.place].insert(key.name);
         }
         EXPECT_EQ(rows, known);

@@ -38,50 +38,51 @@ void DirtySlot(Value *value, std::size_t slot) {
 }
 
 // What a sound value may also be: bytes that mean nothing, numbers and texts without a name.
-void Dirty(uint32_t type, Value *value) {
+void Dirty(dvs::ConverterType type, Value *value) {
+    using enum dvs::ConverterType;
     switch (type) {
-    case 0:
-    case 21:
+    case kNumber:
+    case kMtu:
         return value->push_back(1);
-    case 1:
+    case kText:
         value->insert(value->end(), {'x', 0});
         return;
-    case 3:
-    case 35:
+    case kBoolByte:
+    case kPortLacp:
         return Set(value, 0, 7);
-    case 6:
-    case 7:
+    case kEtherswitchPrivateVlans:
+    case kVswitchPrivateVlans:
         return Set(value, 5, 1);
-    case 10:
+    case kIpfix:
         Set(value, 31, 0);
         return Set(value, 20, 9);
-    case 12:
+    case kTrafficResources:
         return Set(value, 4 + 210, 1);
-    case 14:
+    case kUplinkKeys:
         return DirtySlot(value, 48);
-    case 17:
-    case 18:
+    case kEtherswitchTeaming:
+    case kVswitchTeaming:
         Set(value, 0, 77);
         return Set(value, 6, 1);
-    case 19:
-    case 4:
-    case 31:
+    case kOverlayFlag:
+    case kBoolText:
+    case kPortBlocked:
         return value->assign({'n', 'o'});
-    case 20:
+    case kUplinkNames:
         return DirtySlot(value, 81);
-    case 23:
+    case kTxUplink:
         return value->assign({'o', 'd', 'd'});
-    case 24:
-    case 25:
+    case kEtherswitchPortVlan:
+    case kVswitchPortVlan:
         return Set(value, 4, 1);
-    case 27:
-    case 28:
+    case kEtherswitchMacSecurity:
+    case kVswitchMacSecurity:
         return Set(value, 1, 1);
-    case 29:
+    case kFilters:
         return Set(value, 4 + 48, 5);
-    case 32:
+    case kPassthrough:
         return Set(value, 0, 1);
-    case 34:
+    case kPortIpfix:
         return value->assign({'o', 'f', 'f', 0});
     default:
         return;

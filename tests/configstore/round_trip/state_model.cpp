@@ -73,7 +73,7 @@ private:
         isOverlay_ = overlay && TextAt(*overlay, 0, 5) == "true" && overlay->size() > 4;
         Value version = *stored;
         Rules rules;
-        (void)RunSteps(15, {isOverlay_, false, false}, &version, &rules);
+        (void)RunSteps(dvs::ConverterType::kSwitchVersion, {isOverlay_, false, false}, &version, &rules);
         after->version = NumberAt(version, 0);
         if (after->version != before.version) ledger_->Note(Rule::kVersionIsTheProperty);
         after->classField = state_builder::Text(before.className);

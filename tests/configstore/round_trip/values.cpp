@@ -9,6 +9,10 @@
 
 namespace round_trip {
 
+using dvs::ConverterType;
+using enum dvs::ConverterType;
+
+
 uint32_t NumberAt(const Value &value, std::size_t at, std::size_t width) {
     uint32_t number = 0;
     for (std::size_t i = 0; i < width; ++i)
@@ -262,7 +266,7 @@ struct Step {
     Rule rule;
     Apply apply;
 };
-const std::vector<Step> kNumber = {{Rule::kBytesBehindNumber, CutNumber}};
+const std::vector<Step> kNumberSteps = {{Rule::kBytesBehindNumber, CutNumber}};
 const std::vector<Step> kTruth = {{Rule::kBooleanText, TrueOrFalse<6>}};
 const std::vector<Step> kTeaming = {{Rule::kExplicitPolicies, SwapExplicit},
                                     {Rule::kNamelessPolicy, NamedPolicy},
@@ -279,49 +283,50 @@ const std::vector<Step> kPrivateVlans = {{Rule::kEmptyIsGone, HasPrivateVlans},
                                          {Rule::kUnusedBytes, WholePrivateVlans}};
 
 // The steps by converter type, in their order.
-const std::map<uint32_t, std::vector<Step>> kSteps = {
-    {0, kNumber},
-    {1, {{Rule::kTextEnds, CutText}}},
-    {2, kNumber},
-    {3, {{Rule::kBooleanByte, BoolAt<0>}}},
-    {4, kTruth},
-    {5, kNumber},
-    {6, kPrivateVlans},
-    {7, kPrivateVlans},
-    {8, {}},
-    {10, {{Rule::kBooleanByte, BoolAt<30, 31>}, {Rule::kAddressEnds, Ipv4Alone}}},
-    {11, {{Rule::kHealthCheckOff, ClearAt<0, 1>}}},
-    {12, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, PoolTexts}, {Rule::kUnusedBytes, PoolGaps}}},
-    {13, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, ClearSlots<200>}}},
-    {14, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, ClearSlots<48>}}},
-    {15, {{Rule::kOverlayVersion, VersionOfText}}},
-    {16, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, GroupTexts}}},
-    {17, kTeaming},
-    {18, kTeaming},
-    {19, {{Rule::kBooleanText, TrueOrFalse<5>}}},
-    {20, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, ClearSlots<81>}}},
-    {21, kNumber},
-    {23, {{Rule::kTransmitUplink, AlwaysOrNormal}}},
-    {24, kVlan},
-    {25, kVlan},
-    {26, {{Rule::kShapingRange, BitsFit}}},
-    {27, kSecurity},
-    {28, kSecurity},
-    {29,
+const std::map<ConverterType, std::vector<Step>> kSteps = {
+    {kNumber, kNumberSteps},
+    {kText, {{Rule::kTextEnds, CutText}}},
+    {kBeaconTimeout, kNumberSteps},
+    {kBoolByte, {{Rule::kBooleanByte, BoolAt<0>}}},
+    {kBoolText, kTruth},
+    {kSwitchAddress, kNumberSteps},
+    {kEtherswitchPrivateVlans, kPrivateVlans},
+    {kVswitchPrivateVlans, kPrivateVlans},
+    {kLinkDiscovery, {}},
+    {kIpfix, {{Rule::kBooleanByte, BoolAt<30, 31>}, {Rule::kAddressEnds, Ipv4Alone}}},
+    {kHealthCheck, {{Rule::kHealthCheckOff, ClearAt<0, 1>}}},
+    {kTrafficResources,
+     {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, PoolTexts}, {Rule::kUnusedBytes, PoolGaps}}},
+    {kPoolKeys, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, ClearSlots<200>}}},
+    {kUplinkKeys, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, ClearSlots<48>}}},
+    {kSwitchVersion, {{Rule::kOverlayVersion, VersionOfText}}},
+    {kLacpGroups, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, GroupTexts}}},
+    {kEtherswitchTeaming, kTeaming},
+    {kVswitchTeaming, kTeaming},
+    {kOverlayFlag, {{Rule::kBooleanText, TrueOrFalse<5>}}},
+    {kUplinkNames, {{Rule::kEmptyIsGone, HasCount}, {Rule::kSlotEnds, ClearSlots<81>}}},
+    {kMtu, kNumberSteps},
+    {kTxUplink, {{Rule::kTransmitUplink, AlwaysOrNormal}}},
+    {kEtherswitchPortVlan, kVlan},
+    {kVswitchPortVlan, kVlan},
+    {kShaping, {{Rule::kShapingRange, BitsFit}}},
+    {kEtherswitchMacSecurity, kSecurity},
+    {kVswitchMacSecurity, kSecurity},
+    {kFilters,
      {{Rule::kFilterFailure, OpenOrClosed},
       {Rule::kFilterNumbers, NumberedFromZero},
       {Rule::kSlotEnds, FilterTexts},
       {Rule::kFilterPlaces, OneBehindTheOther}}},
-    {31, kTruth},
-    {32, {{Rule::kPassthrough, OnlyTwoIsAllowed}}},
-    {34, {{Rule::kIpfixOff, IsEnabled}, {Rule::kTextEnds, EightBytes}}},
-    {35, {{Rule::kBooleanByte, BoolAt<0>}, {Rule::kUnusedBytes, ClearAt<1, 3>}}},
+    {kPortBlocked, kTruth},
+    {kPassthrough, {{Rule::kPassthrough, OnlyTwoIsAllowed}}},
+    {kPortIpfix, {{Rule::kIpfixOff, IsEnabled}, {Rule::kTextEnds, EightBytes}}},
+    {kPortLacp, {{Rule::kBooleanByte, BoolAt<0>}, {Rule::kUnusedBytes, ClearAt<1, 3>}}},
 };
 
 } // namespace
 
-bool RunSteps(uint32_t type, const Surroundings &around, Value *value, Rules *rules) {
-    if (type == 9) return MirrorSteps(around, value, rules);
+bool RunSteps(ConverterType type, const Surroundings &around, Value *value, Rules *rules) {
+    if (type == kMirrorSessions) return MirrorSteps(around, value, rules);
     for (const Step &step : kSteps.at(type)) {
         const Value before = *value;
         const bool goesOn = step.apply(value, around);
@@ -331,7 +336,7 @@ bool RunSteps(uint32_t type, const Surroundings &around, Value *value, Rules *ru
     return true;
 }
 
-bool HasDistinctKeys(uint32_t type, const Value &value) {
+bool HasDistinctKeys(ConverterType type, const Value &value) {
     std::set<std::string> keys = {""};
     std::size_t count = 1;
     const auto add = [&](const std::string &key) {
@@ -343,10 +348,10 @@ bool HasDistinctKeys(uint32_t type, const Value &value) {
         for (std::size_t i = 0; i < entries; ++i)
             add(TextAt(value, head + entry * i + key, most));
     };
-    if (type == 9) table(20, NumberAt(value, 8), 232, 0, 32);
-    if (type == 12) table(4, NumberAt(value, 0), 212, 0, 128);
-    if (type == 16) table(4, NumberAt(value, 0), 93, 65, 16);
-    if (type == 29)
+    if (type == kMirrorSessions) table(20, NumberAt(value, 8), 232, 0, 32);
+    if (type == kTrafficResources) table(4, NumberAt(value, 0), 212, 0, 128);
+    if (type == kLacpGroups) table(4, NumberAt(value, 0), 93, 65, 16);
+    if (type == kFilters)
         EachFilter(value, [&](std::size_t at, uint32_t) { add(std::to_string(NumberAt(value, at))); });
     return keys.size() == count;
 }

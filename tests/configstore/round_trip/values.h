@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "configstore/layouts/converter_type.h"
 #include "configstore/round_trip/rules.h"
 
 namespace round_trip {
@@ -26,10 +27,10 @@ struct Surroundings {
 
 /// Applies the steps of a converter type to the value and adds the rules that changed it. False where nothing
 /// of it comes back.
-bool RunSteps(uint32_t type, const Surroundings &around, Value *value, Rules *rules);
+bool RunSteps(dvs::ConverterType type, const Surroundings &around, Value *value, Rules *rules);
 
 /// Whether all elements that the store keeps by a key have one, and one of their own: what the steps need.
-bool HasDistinctKeys(uint32_t type, const Value &value);
+bool HasDistinctKeys(dvs::ConverterType type, const Value &value);
 
 /// Numbers and texts of a value, little-endian; reading past the end throws.
 uint32_t NumberAt(const Value &value, std::size_t at, std::size_t width = 4);
