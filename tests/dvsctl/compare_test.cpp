@@ -1,20 +1,20 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // What counts as a difference, and what does not.
 
-#include "tools/dvsctl/compare.h"
+#include "tools/dvsctl/verbs/changes.h"
 
 #include <gtest/gtest.h>
 
 #include <string>
 
-#include "states.h"
-#include "tools/dvsctl/options.h"
-#include "tools/dvsctl/output.h"
+#include "form/states.h"
+#include "tools/dvsctl/cli/options.h"
+#include "tools/dvsctl/cli/output.h"
 
 namespace {
 
 using namespace dvs::ctl;
-using namespace dvs::ctl::test;
+using namespace dvs::form::test;
 
 Buffer StateOf(std::vector<NewEntry> switches) {
     return EncodeList(switches);

@@ -8,8 +8,8 @@
 #include <sys/wait.h>
 
 #include "program.h"
-#include "tools/dvsctl/command.h"
-#include "tools/dvsctl/source.h"
+#include "tools/dvsctl/cli/command.h"
+#include "tools/dvsctl/sources/source.h"
 
 namespace {
 

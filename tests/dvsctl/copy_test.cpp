@@ -88,7 +88,7 @@ TEST_F(Copy, ADryRunChangesNothing) {
     EXPECT_EQ(create.out.find("would create file:" + At("b.db") + "\n+ switch alpha: "), 0u) << create.out;
     EXPECT_EQ(Files(), std::vector<std::string>{"a.db"});
 
-    PutState("b.db", dvs::ctl::EncodeList(std::vector{MakeSwitch("beta", {}, {}, {})}));
+    PutState("b.db", dvs::form::EncodeList(std::vector{MakeSwitch("beta", {}, {}, {})}));
     const std::string before = Get("b.db");
     const Result change = Dvsctl({"copy", At("a.db"), At("b.db"), "--dry-run"});
     EXPECT_NE(change.out.find("would change file:" + At("b.db") + ": 2 added, 2 changed\n"),
@@ -190,7 +190,7 @@ TEST_F(Copy, AFailedWriteLeavesTheTargetAlone) {
 }
 
 TEST_F(Copy, WritesThroughALinkAndKeepsIt) {
-    PutState("real.db", dvs::ctl::EncodeList({}));
+    PutState("real.db", dvs::form::EncodeList({}));
     ASSERT_EQ(symlink("real.db", At("link.db").c_str()), 0);
     ASSERT_EQ(Dvsctl({"copy", At("a.db"), At("link.db")}).status, 0);
     struct stat info {};

@@ -1,19 +1,19 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // The annotated dump gives every byte exactly once, of sound and of damaged states.
 
-#include "tools/dvsctl/hexdump.h"
+#include "tools/dvsctl/verbs/hexdump.h"
 
 #include <gtest/gtest.h>
 
 #include <string>
 #include <vector>
 
-#include "states.h"
+#include "form/states.h"
 
 namespace {
 
 using namespace dvs::ctl;
-using namespace dvs::ctl::test;
+using namespace dvs::form::test;
 
 struct Collector : RangeWriter {
     void Range(const ByteRange &range) override { ranges.push_back(range); }

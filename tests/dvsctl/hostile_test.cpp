@@ -83,10 +83,10 @@ TEST_F(Hostile, NamesAndValuesNeverReachTheTerminalRaw) {
     const std::string evil = "\x1b]0;owned\x07\xc2\x9b"
                              "2J\xe2\x80\xae\x7f\r";
     PutState("evil.db",
-             dvs::ctl::EncodeList(std::vector{MakeSwitch(
+             dvs::form::EncodeList(std::vector{MakeSwitch(
                  evil, {MakeProperty("com.orbeno.common.alias", Text(evil)), MakeProperty(evil, Text(evil))},
                  {}, {MakeList(evil, {MakeProperty(evil, Text("x"))})}, 8, evil)}));
-    PutState("other.db", dvs::ctl::EncodeList(std::vector{MakeSwitch(evil, {}, {}, {})}));
+    PutState("other.db", dvs::form::EncodeList(std::vector{MakeSwitch(evil, {}, {}, {})}));
     const std::string path = At("evil.db");
     for (const std::vector<std::string> &args :
          std::vector<std::vector<std::string>>{{"show", path},

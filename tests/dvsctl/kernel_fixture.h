@@ -7,8 +7,8 @@
 #include <cstdlib>
 
 #include "emulator/emulator_process.h"
+#include "form/value.h"
 #include "program.h"
-#include "tools/dvsctl/value.h"
 
 namespace dvs::ctl::test {
 

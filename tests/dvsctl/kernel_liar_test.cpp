@@ -82,7 +82,7 @@ struct Lie {
 };
 
 std::string Good() {
-    return std::string(dvs::ctl::AsText(SmallState()));
+    return std::string(dvs::form::AsText(SmallState()));
 }
 
 std::string Flipped() {
@@ -101,12 +101,12 @@ std::string WithoutNul() {
     Buffer state = SmallState();
     std::fill_n(state.begin() + 16, 128, std::uint8_t{'n'}); // the first switch's id, whole
     Mend(state);
-    return std::string(dvs::ctl::AsText(state));
+    return std::string(dvs::form::AsText(state));
 }
 
 std::string WrongIds() {
-    return std::string(dvs::ctl::AsText(dvs::ctl::EncodeList(
-        std::vector<dvs::ctl::NewEntry>{MakeSwitch("other", {}, {}, {MakeList("", {})})})));
+    return std::string(dvs::form::AsText(dvs::form::EncodeList(
+        std::vector<dvs::form::NewEntry>{MakeSwitch("other", {}, {}, {MakeList("", {})})})));
 }
 
 std::string WithMagic(std::string reply) {

@@ -194,7 +194,7 @@ TEST_F(KernelVerbs, ValuesComeInEveryForm) {
     for (const auto &row : rows) {
         EXPECT_EQ(Verb(Plus({"prop", "set", "alpha", "x.value"}, row.words)).status, 0) << row.hex;
         const Result raw = Verb({"prop", "get", "alpha", "x.value", "--raw"});
-        EXPECT_EQ(dvs::ctl::ToHexDigits(dvs::ctl::AsBytes(raw.out)), row.hex);
+        EXPECT_EQ(dvs::form::ToHexDigits(dvs::form::AsBytes(raw.out)), row.hex);
     }
     EXPECT_EQ(Verb({"prop", "set", "alpha", "x.value", "--file", "-"}, "\x07").status, 0);
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.value", "--raw"}).out, "\x07");

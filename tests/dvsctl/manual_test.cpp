@@ -7,8 +7,8 @@
 
 #include <gtest/gtest.h>
 
-#include "tools/dvsctl/command.h"
-#include "tools/dvsctl/source.h"
+#include "tools/dvsctl/cli/command.h"
+#include "tools/dvsctl/sources/source.h"
 
 namespace {
 

@@ -11,9 +11,12 @@
 #include <boost/json/value.hpp>
 #include <gtest/gtest.h>
 
-#include "states.h"
+#include "form/states.h"
 
 namespace dvs::ctl::test {
+
+using namespace form;
+using namespace form::test;
 
 struct Result {
     int status = -1; ///< exit status, or 128 plus the signal that ended it

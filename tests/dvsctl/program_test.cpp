@@ -10,7 +10,7 @@
 #include <boost/json/object.hpp>
 
 #include "program.h"
-#include "tools/dvsctl/command.h"
+#include "tools/dvsctl/cli/command.h"
 
 namespace {
 

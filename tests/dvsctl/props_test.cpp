@@ -9,7 +9,7 @@
 #include <boost/json/object.hpp>
 
 #include "dvs/configstore.h"
-#include "tools/dvsctl/typed_json.h"
+#include "form/json/typed.h"
 
 namespace {
 
@@ -54,8 +54,8 @@ TEST_F(Props, EveryExampleIsAValueOfItsProperty) {
         const std::uint32_t propClass = list == "global" ? DVS_PROP_CLASS_GLOBAL
                                         : list == "host" ? DVS_PROP_CLASS_HOST
                                                          : DVS_PROP_CLASS_PORT;
-        dvs::ctl::NodeFlaw flaw;
-        const auto node = dvs::ctl::NodeFromJson(property.at("example"), flaw);
+        dvs::form::NodeFlaw flaw;
+        const auto node = dvs::form::NodeFromJson(property.at("example"), flaw);
         ASSERT_TRUE(node) << name;
         const auto built = dvs::typed::Build(propClass, name, *node, {8});
         EXPECT_TRUE(built.ok) << name << " " << built.field << " " << built.reason;

@@ -7,8 +7,8 @@ namespace {
 
 using namespace dvs::ctl::test;
 
-using dvs::ctl::EncodeList;
-using dvs::ctl::NewEntry;
+using dvs::form::EncodeList;
+using dvs::form::NewEntry;
 
 using StoreSource = StoreProgram;
 

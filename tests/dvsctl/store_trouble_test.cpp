@@ -138,10 +138,10 @@ struct UnsoundRow {
 };
 
 std::string StateOf(int switches) {
-    std::vector<dvs::ctl::NewEntry> entries;
+    std::vector<dvs::form::NewEntry> entries;
     for (int i = 0; i < switches; ++i)
         entries.push_back(MakeSwitch("s" + std::to_string(i), {}, {}, {}));
-    return std::string(dvs::ctl::AsText(dvs::ctl::EncodeList(entries)));
+    return std::string(dvs::form::AsText(dvs::form::EncodeList(entries)));
 }
 
 const UnsoundRow kUnsound[] = {

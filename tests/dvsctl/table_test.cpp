@@ -1,12 +1,12 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Columns line up, and only those asked for are there.
 
-#include "tools/dvsctl/table.h"
+#include "tools/dvsctl/cli/table.h"
 
 #include <gtest/gtest.h>
 
-#include "tools/dvsctl/error.h"
-#include "tools/dvsctl/options.h"
+#include "tools/dvsctl/cli/error.h"
+#include "tools/dvsctl/cli/options.h"
 
 namespace {
 
@@ -54,7 +54,7 @@ TEST(Table, RefusesAnUnknownColumn) {
             Render(options);
             ADD_FAILURE() << columns;
         } catch (const Error &error) {
-            EXPECT_EQ(error.status, Exit::Usage);
+            EXPECT_EQ(error.kind, ErrorKind::Usage);
             EXPECT_EQ(error.why, "the columns are name, size, extra");
         }
         testing::internal::GetCapturedStdout();

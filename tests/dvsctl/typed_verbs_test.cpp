@@ -6,7 +6,7 @@
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
 
-#include "states.h"
+#include "form/states.h"
 
 namespace {
 
@@ -60,7 +60,7 @@ TEST_F(Typed, ShowGivesBytesOnDemand) {
 TEST_F(Typed, ShowGivesTheReasonBesideDamagedBytes) {
     PutState(
         "broken.db",
-        EncodeList(std::vector<dvs::ctl::NewEntry>{MakeSwitch(
+        EncodeList(std::vector<dvs::form::NewEntry>{MakeSwitch(
             "s", {}, {},
             {MakeList("7", {MakeProperty("com.orbeno.etherswitch.port.vlan", Raw("\x01\0\x02"s), 0x10)})})}));
     const Result text = Dvsctl({"show", At("broken.db")});
@@ -116,7 +116,7 @@ TEST_F(Typed, DiffComparesFieldByField) {
 
 TEST_F(Typed, DiffNamesTheRecordsFieldWhereTheMeaningIsTheSame) {
     for (const auto &[name, reserved] : {std::pair("a.db", "\0\0"s), std::pair("b.db", "\1\0"s)})
-        PutState(name, EncodeList(std::vector<dvs::ctl::NewEntry>{MakeSwitch(
+        PutState(name, EncodeList(std::vector<dvs::form::NewEntry>{MakeSwitch(
                            "s", {}, {},
                            {MakeList("7", {MakeProperty("com.orbeno.etherswitch.port.vlan",
                                                         Raw("\0\0\x64\0"s + reserved + "\0\0"s), 0x10)})})}));
@@ -129,7 +129,7 @@ TEST_F(Typed, DiffNamesTheRecordsFieldWhereTheMeaningIsTheSame) {
 TEST_F(Typed, DiffNamesTheSizeWhereNothingElseDiffers) {
     for (const auto &[name, value] : {std::pair("a.db", "true\0"s), std::pair("b.db", "true\0f"s)})
         PutState(name,
-                 EncodeList(std::vector<dvs::ctl::NewEntry>{MakeSwitch(
+                 EncodeList(std::vector<dvs::form::NewEntry>{MakeSwitch(
                      "s", {}, {},
                      {MakeList("7", {MakeProperty("com.orbeno.common.port.block", Raw(value), 0x10)})})}));
     const Result diff = Dvsctl({"diff", At("a.db"), At("b.db")});

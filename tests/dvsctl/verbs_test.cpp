@@ -93,7 +93,7 @@ TEST_F(Verbs, ShowAsJsonIsAnInputAgain) {
 }
 
 TEST_F(Verbs, ShowWorksOnAnEmptyState) {
-    PutState("empty.db", dvs::ctl::EncodeList({}));
+    PutState("empty.db", dvs::form::EncodeList({}));
     EXPECT_EQ(Dvsctl({"show", At("empty.db")}).out,
               "file:" + At("empty.db") + ": 0 switches, 0 ports, 0 properties\n");
     EXPECT_EQ(Json(Dvsctl({"show", At("empty.db"), "--json"})).at("switches"), boost::json::array());
@@ -112,14 +112,14 @@ TEST_F(Verbs, VerifyCountsWhatIsSound) {
 }
 
 TEST_F(Verbs, VerifyWarnsOfMoreSwitchesThanAnyTableHolds) {
-    std::vector<dvs::ctl::NewEntry> switches;
+    std::vector<dvs::form::NewEntry> switches;
     for (int i = 0; i < 32; ++i)
         switches.push_back(MakeSwitch("s" + std::to_string(i), {}, {}, {}));
     switches.push_back(MakeSwitch("s0", {}, {}, {})); // joins the first one
-    PutState("full.db", dvs::ctl::EncodeList(switches));
+    PutState("full.db", dvs::form::EncodeList(switches));
     EXPECT_EQ(Dvsctl({"verify", At("full.db")}).err, "");
     switches.push_back(MakeSwitch("one too many", {}, {}, {}));
-    PutState("over.db", dvs::ctl::EncodeList(switches));
+    PutState("over.db", dvs::form::EncodeList(switches));
     const Result result = Dvsctl({"verify", At("over.db")});
     EXPECT_EQ(result.status, 0) << "its bytes are sound";
     EXPECT_NE(result.err.find("warning: no host loads this state"), std::string::npos) << result.err;

@@ -23,6 +23,7 @@ LAYERS = {
     "kernel": ["base", "dvsdata", "dvsstate", "dvsfile", "platform"],
     "configstore": ["base", "dvsdata", "dvsstate", "dvsfile", "kernel", "platform"],
     "platform/embedded": ["base", "platform"],
+    "form": ["base", "dvsdata", "dvsstate", "dvsfile", "kernel", "configstore", "platform"],
 }
 INCLUDE = re.compile(r'^\s*#\s*include\s+"([^"]+)"', re.M)
 

@@ -13,9 +13,9 @@
 #include <fmt/format.h>
 
 #include "dvs/hyp.h"
-#include "tools/dvsctl/compare.h"
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/model.h"
+#include "form/model.h"
+#include "tools/dvsctl/cli/envelope.h"
+#include "tools/dvsctl/verbs/changes.h"
 
 namespace dvs::ctl {
 

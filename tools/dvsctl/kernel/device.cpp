@@ -131,7 +131,7 @@ public:
 
 private:
     [[noreturn]] static void Fail(int error) {
-        throw Error(Exit::Failed, "cannot call the switching module").Because(std::strerror(error));
+        throw Error(ErrorKind::Failed, "cannot call the switching module").Because(std::strerror(error));
     }
 
     pid_t pid_ = -1;
@@ -139,7 +139,7 @@ private:
 };
 
 [[noreturn]] void ThrowTimeout() {
-    throw Error(Exit::Timeout, "the switching module did not answer in time")
+    throw Error(ErrorKind::Timeout, "the switching module did not answer in time")
         .In("kernel:")
         .Because("what was asked for may still be carried out")
         .Try("look whether the module is alive (dvsctl kernel exec '' help), or wait longer: --timeout "
@@ -147,7 +147,7 @@ private:
 }
 
 [[noreturn]] void ThrowEnded(int status) {
-    throw Error(Exit::Failed, "the call to the switching module ended unexpectedly")
+    throw Error(ErrorKind::Failed, "the call to the switching module ended unexpectedly")
         .Because(WIFSIGNALED(status) ? fmt::format("its process ended by signal {}", WTERMSIG(status))
                                      : fmt::format("its process ended with status {}", WEXITSTATUS(status)))
         .Try("what was asked for may have been carried out: look before repeating it");
@@ -179,7 +179,7 @@ Answer Unpack(Bytes bytes, int status) {
 }
 
 Error AbsentDeviceError(const Answer &answer, std::string title) {
-    Error error(Exit::NoDevice, std::move(title));
+    Error error(ErrorKind::NoDevice, std::move(title));
     error.source = "kernel:";
     error.messages = answer.messages;
     const char *emulator = secure_getenv("DVS_EMULATOR");
@@ -198,23 +198,25 @@ Error AbsentDeviceError(const Answer &answer, std::string title) {
 
 struct Refusal {
     HYP_ReturnStatus status;
-    Exit exit;
+    ErrorKind kind;
     const char *why;
     const char *next;
 };
 
 // Statuses and what they mean here.
 constexpr Refusal kRefusals[] = {
-    {HYP_NOT_FOUND, Exit::NotThere, "the module does not have it", "dvsctl show kernel: lists what there is"},
-    {HYP_EXISTS, Exit::Failed, "the module has it already", "with --may-exist that is no error"},
-    {HYP_LIMIT_EXCEEDED, Exit::Failed, "it is beyond a limit of the module or of the switch",
+    {HYP_NOT_FOUND, ErrorKind::NotThere, "the module does not have it",
+     "dvsctl show kernel: lists what there is"},
+    {HYP_EXISTS, ErrorKind::Failed, "the module has it already", "with --may-exist that is no error"},
+    {HYP_LIMIT_EXCEEDED, ErrorKind::Failed, "it is beyond a limit of the module or of the switch",
      "dvsctl show kernel: shows the ports in use and max_ports"},
-    {HYP_BAD_PARAM, Exit::Failed, "the module finds something wrong with what it was given",
+    {HYP_BAD_PARAM, ErrorKind::Failed, "the module finds something wrong with what it was given",
      "check names, numbers and the value"},
-    {HYP_NO_MEMORY, Exit::Failed, "there is not enough memory", "free memory and repeat"},
-    {HYP_NOT_SUPPORTED, Exit::Failed, "the module does not know this command or this switch version",
+    {HYP_NO_MEMORY, ErrorKind::Failed, "there is not enough memory", "free memory and repeat"},
+    {HYP_NOT_SUPPORTED, ErrorKind::Failed, "the module does not know this command or this switch version",
      "use a version from 4 to 12, 100, or from 107 to 112"},
-    {HYP_BAD_CHECKSUM, Exit::Malformed, "a checksum does not match", "repeat; the module's state is damaged"},
+    {HYP_BAD_CHECKSUM, ErrorKind::Malformed, "a checksum does not match",
+     "repeat; the module's state is damaged"},
 };
 
 } // namespace
@@ -241,19 +243,19 @@ Answer FetchFromDevice(Context &context, const FetchCall &call) {
 
 Error DeviceError(const Answer &answer, std::string title) {
     if (answer.isAbsent) return AbsentDeviceError(answer, std::move(title));
-    Error error(Exit::Failed, std::move(title));
+    Error error(ErrorKind::Failed, std::move(title));
     error.source = "kernel:";
     error.messages = answer.messages;
     // The module's own errno explains more than the status does; EBUSY has an exit status of its own.
     if (Says(answer, std::string(kCallFailed) + Err_Errno2String(EBUSY))) {
-        error.status = Exit::Busy;
+        error.kind = ErrorKind::Busy;
         error.why = "the module is busy";
         error.next = "repeat later";
         return error;
     }
     for (const Refusal &refusal : kRefusals) {
         if (refusal.status != answer.status) continue;
-        error.status = refusal.exit;
+        error.kind = refusal.kind;
         error.why = fmt::format("{} ({})", refusal.why, HYP_ReturnStatusToString(answer.status));
         error.next = refusal.next;
         return error;

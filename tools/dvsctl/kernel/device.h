@@ -12,8 +12,8 @@
 #include <vector>
 
 #include "dvs/status.h"
-#include "tools/dvsctl/context.h"
-#include "tools/dvsctl/text.h"
+#include "form/text.h"
+#include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
 

@@ -11,14 +11,14 @@
 #include "dvs/hyp.h"
 #include "dvs/state.h"
 #include "dvsstate/names.h"
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/json_codec.h"
+#include "form/json/codec.h"
+#include "tools/dvsctl/cli/envelope.h"
+#include "tools/dvsctl/cli/table.h"
 #include "tools/dvsctl/kernel/change.h"
 #include "tools/dvsctl/kernel/properties.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
-#include "tools/dvsctl/show.h"
-#include "tools/dvsctl/table.h"
+#include "tools/dvsctl/verbs/show.h"
 
 namespace dvs::ctl {
 
@@ -39,7 +39,7 @@ constexpr Column kPortColumns[] = {
 std::vector<std::uint32_t> KindsOf(const Options &options) {
     if (!options.kind) return {DVS_PORT_ACTIVE, DVS_PORT_SHADOW, DVS_PORT_ZOMBIE, DVS_PORT_LOCAL_CACHE};
     if (const auto kind = KindFromName(*options.kind)) return {*kind};
-    throw Error(Exit::Usage, fmt::format("there is no kind of port \"{}\"", *options.kind))
+    throw Error(ErrorKind::Usage, fmt::format("there is no kind of port \"{}\"", *options.kind))
         .Because("the kinds are active, shadow, zombie, local-cache");
 }
 
@@ -188,7 +188,7 @@ Exit RunKernelFindExternalId(Context &context) {
     if (answer.status != HYP_NOT_FOUND) RequireOk(answer, title);
     target.portId = AsText(answer.bytes);
     if (target.portId.empty() && !options.ifExists)
-        throw Error(Exit::NotThere, title)
+        throw Error(ErrorKind::NotThere, title)
             .In("kernel:")
             .Because("no port of switch " + target.switchId + " carries it")
             .Try("dvsctl show kernel: --props '*.external.id' lists the ids there are");

@@ -10,14 +10,14 @@
 #include "configstore/typed/typed_value.h"
 #include "dvs/hyp.h"
 #include "dvs/state.h"
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/json_codec.h"
+#include "form/json/codec.h"
+#include "form/json/typed.h"
+#include "form/value.h"
+#include "tools/dvsctl/cli/envelope.h"
 #include "tools/dvsctl/kernel/change.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
-#include "tools/dvsctl/typed_json.h"
-#include "tools/dvsctl/version_warning.h"
-#include "tools/dvsctl/value.h"
+#include "tools/dvsctl/verbs/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -137,7 +137,7 @@ int UplinkOf(const Options &options) {
     const char *end = text.data() + text.size();
     const auto [stop, error] = std::from_chars(text.data(), end, uplink);
     if (error != std::errc() || stop != end)
-        throw Error(Exit::Usage, "the uplink is no number").At(text).Try("uplinks are counted from 0");
+        throw Error(ErrorKind::Usage, "the uplink is no number").At(text).Try("uplinks are counted from 0");
     return uplink;
 }
 

@@ -8,10 +8,10 @@
 #include <fmt/format.h>
 
 #include "dvsdata/buffer_view.h"
-#include "tools/dvsctl/json_codec.h"
-#include "tools/dvsctl/table.h"
-#include "tools/dvsctl/typed_fields.h"
-#include "tools/dvsctl/value.h"
+#include "form/json/codec.h"
+#include "form/value.h"
+#include "tools/dvsctl/cli/table.h"
+#include "tools/dvsctl/verbs/typed_fields.h"
 
 namespace dvs::ctl {
 
@@ -33,7 +33,7 @@ std::vector<Property> PropertiesOf(Bytes bytes, const std::string &title) {
     for (data::EntryView entry; view.Next(&entry);)
         properties.push_back({entry.Name(), entry.propType, entry.value, entry.offset});
     if (view.Ok()) return properties;
-    Error error(Exit::Malformed, title);
+    Error error(ErrorKind::Malformed, title);
     error.source = "kernel:";
     error.offset = view.FirstFault().offset;
     error.why = fmt::format("the module's reply is damaged: {}", view.FirstFault().Text());

@@ -10,8 +10,9 @@
 
 #include <boost/json/object.hpp>
 
-#include "tools/dvsctl/model.h"
-#include "tools/dvsctl/typed_json.h"
+#include "form/json/typed.h"
+#include "form/model.h"
+#include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
 

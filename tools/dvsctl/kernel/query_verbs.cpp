@@ -8,13 +8,13 @@
 #include <fmt/format.h>
 
 #include "dvs/hyp.h"
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/files.h"
-#include "tools/dvsctl/json_codec.h"
+#include "form/json/codec.h"
+#include "tools/dvsctl/cli/envelope.h"
 #include "tools/dvsctl/kernel/properties.h"
 #include "tools/dvsctl/kernel/target.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
+#include "tools/dvsctl/sources/files.h"
 
 namespace dvs::ctl {
 

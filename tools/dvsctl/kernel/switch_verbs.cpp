@@ -8,7 +8,7 @@
 #include "tools/dvsctl/kernel/change.h"
 #include "tools/dvsctl/kernel/value_arg.h"
 #include "tools/dvsctl/kernel/verbs.h"
-#include "tools/dvsctl/version_warning.h"
+#include "tools/dvsctl/verbs/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -43,7 +43,7 @@ bool SanitizeSwitch(DVSwitch *sw, void *) {
 }
 
 const std::string &Required(const std::optional<std::string> &option, const char *name) {
-    if (!option) throw Error(Exit::Usage, fmt::format("{} is missing", name));
+    if (!option) throw Error(ErrorKind::Usage, fmt::format("{} is missing", name));
     return *option;
 }
 

@@ -8,9 +8,9 @@
 #include <fmt/format.h>
 
 #include "dvs/hyp.h"
-#include "tools/dvsctl/json_codec.h"
-#include "tools/dvsctl/model.h"
-#include "tools/dvsctl/version_warning.h"
+#include "form/json/codec.h"
+#include "tools/dvsctl/sources/source.h"
+#include "tools/dvsctl/verbs/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -69,16 +69,16 @@ void AddTargetJson(boost::json::object &document, const Target &target) {
 }
 
 void CheckName(const char *what, const std::string &name, std::size_t fieldSize) {
-    if (name.empty()) throw Error(Exit::Usage, fmt::format("the {} is empty", what));
+    if (name.empty()) throw Error(ErrorKind::Usage, fmt::format("the {} is empty", what));
     if (name.size() < fieldSize) return;
-    throw Error(Exit::Usage, fmt::format("the {} is too long", what))
+    throw Error(ErrorKind::Usage, fmt::format("the {} is too long", what))
         .At(name)
         .Because(fmt::format("it has {} bytes, the module takes {}", name.size(), fieldSize - 1));
 }
 
 Target TargetOf(const Options &options) {
     if (options.global + options.host + (options.portId.has_value() ? 1 : 0) > 1)
-        throw Error(Exit::Usage, "--global, --host and --port exclude each other");
+        throw Error(ErrorKind::Usage, "--global, --host and --port exclude each other");
     Target target;
     target.switchId = options.switchName;
     CheckName("switch id", target.switchId, sizeof(DVSHYPRequest::switchName));
@@ -108,7 +108,7 @@ std::string ResolveTarget(Context &context, Target &target) {
 }
 
 Error MissingError(const Target &target, const std::string &missing, const std::string &title) {
-    Error error(Exit::NotThere, title);
+    Error error(ErrorKind::NotThere, title);
     error.source = "kernel:";
     if (!missing.empty()) {
         error.why = "there is no " + missing;

@@ -16,12 +16,12 @@
 
 #include "configstore/typed/typed_value.h"
 #include "dvsdata/buffer_view.h"
-#include "tools/dvsctl/files.h"
-#include "tools/dvsctl/json_codec.h"
-#include "tools/dvsctl/json_parse.h"
-#include "tools/dvsctl/model.h"
-#include "tools/dvsctl/typed_json.h"
-#include "tools/dvsctl/value.h"
+#include "form/json/codec.h"
+#include "form/json/parse.h"
+#include "form/json/typed.h"
+#include "form/model.h"
+#include "form/value.h"
+#include "tools/dvsctl/sources/files.h"
 
 namespace dvs::ctl {
 
@@ -89,11 +89,11 @@ public:
         if (form == "number") return NumberBytes(NumberOf(text, "value"));
         if (form == "json") return isKnown_ ? Build(ToNode(ParseJson(text))) : FromStateForm(ParseJson(text));
         if (form != "hex")
-            throw Error(Exit::Usage, fmt::format("there is no form \"{}\"", form))
+            throw Error(ErrorKind::Usage, fmt::format("there is no form \"{}\"", form))
                 .Because(fmt::format("the forms are {}", kForms));
         const auto bytes = FromHexDigits(text.starts_with("0x") ? text.substr(2) : text);
         if (!bytes)
-            throw Error(Exit::Usage, "the value is not hexadecimal digits")
+            throw Error(ErrorKind::Usage, "the value is not hexadecimal digits")
                 .Because("bytes are pairs of digits, with or without a blank between the pairs");
         return *bytes;
     }
@@ -103,7 +103,7 @@ public:
         if (isTree) return As("json", text);
         if (isKnown_) return Scalar(text);
         if (!ParseNumber(text) && !text.empty()) return TextBytes(text);
-        throw Error(Exit::Usage, fmt::format("is {} a number or a text?", Quote(text)))
+        throw Error(ErrorKind::Usage, fmt::format("is {} a number or a text?", Quote(text)))
             .Because("dvsctl does not know this property, so it cannot tell")
             .Try("say --as number (four bytes) or --as text");
     }
@@ -156,7 +156,7 @@ private:
         if (!built.ok) Refuse(built);
         if (!built.differences.empty()) {
             // Set in silence, it would be another value than the one that was asked for.
-            Error error(Exit::Malformed, "the property cannot hold this value as it is given");
+            Error error(ErrorKind::Malformed, "the property cannot hold this value as it is given");
             error.path = target_.property;
             error.why = built.differences.front();
             error.next = "write what it reads back as, or give the bytes: --as hex, --file";
@@ -166,7 +166,7 @@ private:
     }
 
     [[noreturn]] void Refuse(const typed::Built &built) {
-        Error error(Exit::Malformed, "the value does not fit the property");
+        Error error(ErrorKind::Malformed, "the value does not fit the property");
         error.path = target_.property;
         error.field = built.field;
         error.why = built.reason;
@@ -197,7 +197,7 @@ Buffer PortFromJson(json::object port) {
 Buffer SerializedList(const std::string &path, Buffer bytes) {
     const data::Fault fault = data::VerifyBuffer(bytes);
     if (fault.kind == data::FaultKind::None) return bytes;
-    Error error(Exit::Malformed, "this is no port's data");
+    Error error(ErrorKind::Malformed, "this is no port's data");
     error.source = path;
     error.offset = fault.offset;
     error.why = fault.Text();
@@ -210,7 +210,7 @@ Buffer SerializedList(const std::string &path, Buffer bytes) {
 
 std::uint32_t NumberOf(const std::string &text, const char *what) {
     if (const auto number = ParseNumber(text)) return *number;
-    throw Error(Exit::Usage, fmt::format("the {} is no number", what))
+    throw Error(ErrorKind::Usage, fmt::format("the {} is no number", what))
         .At(text)
         .Because("it is decimal or 0x and hexadecimal digits, at most 4294967295");
 }
@@ -223,7 +223,8 @@ NewValue ValueOf(Context &context, const Target &target,
                  const std::function<std::uint32_t()> &switchVersion) {
     const Options &options = context.options;
     if (options.value.has_value() == options.file.has_value())
-        throw Error(Exit::Usage, options.value ? "VALUE and --file exclude each other" : "there is no value")
+        throw Error(ErrorKind::Usage,
+                    options.value ? "VALUE and --file exclude each other" : "there is no value")
             .Try("give VALUE, @PATH or --file PATH");
     Reader reader(target, switchVersion);
     NewValue value;
@@ -231,14 +232,16 @@ NewValue ValueOf(Context &context, const Target &target,
     const bool isFile = options.file || (!options.as && options.value->starts_with("@"));
     const bool isJsonFile = isFile && options.as == "json";
     if (isFile && options.as && !isJsonFile)
-        throw Error(Exit::Usage, "a file's bytes are taken as they are").Try("leave --as out, or --as json");
+        throw Error(ErrorKind::Usage, "a file's bytes are taken as they are")
+            .Try("leave --as out, or --as json");
     if (isFile) value.bytes = FileBytes(context, options.file ? *options.file : options.value->substr(1));
     if (isJsonFile)
         value.bytes = reader.As("json", std::string(AsText(value.bytes)));
     else if (!isFile)
         value.bytes = options.as ? reader.As(*options.as, *options.value) : reader.Guess(*options.value);
     if (value.bytes.empty())
-        throw Error(Exit::Usage, "the value is empty").Try("the module keeps no empty values: use clear");
+        throw Error(ErrorKind::Usage, "the value is empty")
+            .Try("the module keeps no empty values: use clear");
     return value;
 }
 
@@ -249,7 +252,7 @@ std::vector<std::uint8_t> PortDataOf(Context &context) {
         Buffer contents = FileBytes(context, *options.file);
         if (!StartsLikeJson(contents)) {
             if (options.kind)
-                throw Error(Exit::Usage, "--kind does not go with serialized data")
+                throw Error(ErrorKind::Usage, "--kind does not go with serialized data")
                     .Try("the data carries it");
             return SerializedList(*options.file, std::move(contents));
         }

@@ -4,7 +4,7 @@
 
 // The verbs that are about the switching module alone. What they take is in the table (commands_kernel.cpp).
 
-#include "tools/dvsctl/context.h"
+#include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
 

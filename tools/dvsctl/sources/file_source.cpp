@@ -8,7 +8,7 @@
 
 #include "dvs/file.h"
 #include "platform/status_text.h"
-#include "tools/dvsctl/files.h"
+#include "tools/dvsctl/sources/files.h"
 #include "tools/dvsctl/sources/schemes.h"
 
 namespace dvs::ctl {
@@ -78,7 +78,7 @@ private:
 
     [[noreturn]] void Refuse(Context &context, HYP_ReturnStatus status) {
         const bool malformed = status == HYP_FILE_EMPTY || status == HYP_IO_ERROR || status == HYP_BAD_PARAM;
-        Error error(malformed ? Exit::Malformed : Exit::Failed, "cannot read the state file");
+        Error error(malformed ? ErrorKind::Malformed : ErrorKind::Failed, "cannot read the state file");
         error.source = Name();
         error.messages = context.log.Take();
         error.why = HYP_ReturnStatusToString(status);
@@ -99,7 +99,7 @@ private:
 
 std::unique_ptr<Source> OpenFileSource(std::string_view path) {
     if (path.empty())
-        throw Error(Exit::Usage, "file: needs a path").Try("write file:PATH, or the path alone");
+        throw Error(ErrorKind::Usage, "file: needs a path").Try("write file:PATH, or the path alone");
     return std::make_unique<FileSource>(path);
 }
 

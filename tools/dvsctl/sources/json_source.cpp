@@ -1,9 +1,9 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // json: a state as a JSON document (docs/json-form.md), in a file or on standard input and output.
 
-#include "tools/dvsctl/files.h"
-#include "tools/dvsctl/json_codec.h"
-#include "tools/dvsctl/model.h"
+#include "form/json/codec.h"
+#include "form/model.h"
+#include "tools/dvsctl/sources/files.h"
 #include "tools/dvsctl/sources/schemes.h"
 
 namespace dvs::ctl {
@@ -53,7 +53,7 @@ private:
 
 std::unique_ptr<Source> OpenJsonSource(std::string_view path) {
     if (path.empty())
-        throw Error(Exit::Usage, "json: needs a path")
+        throw Error(ErrorKind::Usage, "json: needs a path")
             .Try("write json:PATH, or json:- for standard input or output");
     return std::make_unique<JsonSource>(path);
 }

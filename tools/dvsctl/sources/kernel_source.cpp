@@ -3,8 +3,8 @@
 // whole.
 
 #include "dvs/hyp.h"
+#include "form/model.h"
 #include "tools/dvsctl/kernel/device.h"
-#include "tools/dvsctl/model.h"
 #include "tools/dvsctl/sources/schemes.h"
 
 namespace dvs::ctl {
@@ -43,7 +43,7 @@ public:
         error.source = Name();
         // Replacing a state cannot meet something missing or double outside that state.
         if (answer.status == HYP_NOT_FOUND || answer.status == HYP_EXISTS) {
-            error.status = Exit::Failed;
+            error.kind = ErrorKind::Failed;
             error.why = answer.status == HYP_EXISTS
                             ? "a switch or port of the state is there twice"
                             : "a switch of the state lacks its version, class or port limit";
@@ -53,14 +53,14 @@ public:
     }
 
     bool CountsWhenEmpty() const override { return false; }
-    Exit AbsentStatus() const override { return Exit::NoDevice; }
+    ErrorKind AbsentKind() const override { return ErrorKind::NoDevice; }
     std::string WhyAbsent() const override { return "the switching module's device is not there"; }
 
 private:
     // The module takes whole states only: a switch alone would end all others, live.
     void RefuseSingle(const Context &context) const {
         if (!context.options.switchId) return;
-        throw Error(Exit::Usage, "a copy into the switching module is of the whole state")
+        throw Error(ErrorKind::Usage, "a copy into the switching module is of the whole state")
             .In(Name())
             .Because("with --switch the module would lose all its other switches")
             .Try("dvsctl kernel switch and kernel prop change single things");
@@ -81,7 +81,7 @@ private:
 
 std::unique_ptr<Source> OpenKernelSource(std::string_view rest) {
     if (!rest.empty())
-        throw Error(Exit::Usage, "kernel: stands alone, there is one switching module")
+        throw Error(ErrorKind::Usage, "kernel: stands alone, there is one switching module")
             .In("kernel:" + std::string(rest))
             .Try("write kernel:, and --switch ID for one of its switches");
     return std::make_unique<KernelSource>();

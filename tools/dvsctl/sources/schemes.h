@@ -7,7 +7,7 @@
 #include <memory>
 #include <string_view>
 
-#include "tools/dvsctl/source.h"
+#include "tools/dvsctl/sources/source.h"
 
 namespace dvs::ctl {
 

@@ -10,16 +10,16 @@
 
 #include "dvs/configstore.h"
 #include "dvs/status.h"
+#include "form/encode.h"
+#include "form/model.h"
 #include "platform/status_text.h"
-#include "tools/dvsctl/encode.h"
-#include "tools/dvsctl/files.h"
-#include "tools/dvsctl/model.h"
-#include "tools/dvsctl/show.h"
+#include "tools/dvsctl/sources/files.h"
 #include "tools/dvsctl/sources/schemes.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/progress.h"
 #include "tools/dvsctl/store/scratch.h"
-#include "tools/dvsctl/version_warning.h"
+#include "tools/dvsctl/verbs/show.h"
+#include "tools/dvsctl/verbs/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -78,7 +78,7 @@ public:
             return StateBytes{Load(context), {}};
         } catch (Error &error) {
             // For looks at what would be replaced, switches that do not load are damage like any other.
-            if (mode == ReadMode::Tolerant && error.status == Exit::Store) error.isDamage = true;
+            if (mode == ReadMode::Tolerant && error.kind == ErrorKind::Store) error.isDamage = true;
             throw;
         }
     }
@@ -107,7 +107,7 @@ public:
         std::vector<admin::Problem> problems;
         store.Require(admin::Check(store.get(), &problems), "cannot check the config store");
         if (problems.empty()) return;
-        Error error(Exit::Store, "the config store is damaged");
+        Error error(ErrorKind::Store, "the config store is damaged");
         error.source = Name();
         error.why = problems.front().where + ": " + problems.front().what;
         if (problems.size() > 1)
@@ -116,13 +116,13 @@ public:
         throw Error(error);
     }
 
-    Exit AbsentStatus() const override { return Exit::Store; }
+    ErrorKind AbsentKind() const override { return ErrorKind::Store; }
     std::string WhyAbsent() const override { return "there is no database file"; }
 
 private:
     void RefuseDesired() const {
         if (desired_)
-            throw Error(Exit::Usage, "store-desired: can only be read")
+            throw Error(ErrorKind::Usage, "store-desired: can only be read")
                 .In(Name())
                 .Because("saves write the current configuration; the desired one is its users' own")
                 .Try("dvsctl store import --layer desired FILE puts a document there");
@@ -132,7 +132,7 @@ private:
         const std::size_t desired = CountLayer(store, admin::Layer::Desired);
         const std::size_t current = CountLayer(store, admin::Layer::Current);
         if (desired != current)
-            throw Error(Exit::Store, "cannot load the desired switches")
+            throw Error(ErrorKind::Store, "cannot load the desired switches")
                 .In(Name())
                 .Because(fmt::format("the desired layer has {}, the current one {}: a load matches them by "
                                      "position and wants as many of both",
@@ -152,7 +152,7 @@ private:
         try {
             return LoadHere(context);
         } catch (const Error &error) {
-            if (error.status != Exit::Busy) context.out.Warn(UnloadableWarning(ParseState(state), error));
+            if (error.kind != ErrorKind::Busy) context.out.Warn(UnloadableWarning(ParseState(state), error));
             return std::nullopt;
         }
     }
@@ -167,8 +167,9 @@ private:
         if (status == 0 && out) return loaded;
         Error error = Failure(context, status, "cannot load the switches of the config store", messages);
         if (status == 0) error.why = "the load ended at a switch that it could not load, and gave nothing";
-        if (error.status == Exit::Malformed || error.status == Exit::NotThere || error.status == Exit::Failed)
-            error.status = Exit::Store; // what is wrong here lies in the store
+        if (error.kind == ErrorKind::Malformed || error.kind == ErrorKind::NotThere ||
+            error.kind == ErrorKind::Failed)
+            error.kind = ErrorKind::Store; // what is wrong here lies in the store
         error.next = "dvsctl store check looks for damage; dvsctl store export shows a switch's document";
         throw Error(error);
     }
@@ -193,16 +194,16 @@ private:
         Error error = StoreError(status, std::move(title), path_, messages.Text());
         error.source = Name();
         if (status < 0 && !messages.Text().empty()) {
-            error.status =
-                Exit::Store; // the library has one status of its own for a store that does not open
+            error.kind =
+                ErrorKind::Store; // the library has one status of its own for a store that does not open
             error.why = "the config store cannot be opened";
         } else if (status < 0) {
-            error.status = Exit::Malformed;
+            error.kind = ErrorKind::Malformed;
             error.why = "a value is not one that the config store can express";
         } else if (status >= kFirstLibraryStatus) {
             const auto library = static_cast<HYP_ReturnStatus>(status);
-            error.status =
-                library == HYP_LIMIT_EXCEEDED || library == HYP_NO_MEMORY ? Exit::Failed : Exit::Malformed;
+            error.kind = library == HYP_LIMIT_EXCEEDED || library == HYP_NO_MEMORY ? ErrorKind::Failed
+                                                                                   : ErrorKind::Malformed;
             error.why = HYP_ReturnStatusToString(library);
         }
         for (std::string &message : context.log.Take())

@@ -12,7 +12,7 @@
 #include <fmt/format.h>
 #include <unistd.h>
 
-#include "tools/dvsctl/files.h"
+#include "tools/dvsctl/sources/files.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/progress.h"
 
@@ -27,19 +27,20 @@ constexpr const char *kComponent = "qel";
 
 struct StatusRow {
     std::int32_t status;
-    Exit exit;
+    ErrorKind kind;
     const char *next;
 };
 
 constexpr StatusRow kStatuses[] = {
-    {configstore::BUSY, Exit::Busy, "try again, or wait longer with --timeout"},
-    {configstore::BAD_PARAMETER, Exit::Malformed, ""},
-    {configstore::SCHEMA_VIOLATION, Exit::Malformed, "dvsctl schema FIELD explains a field"},
-    {configstore::EXISTS, Exit::Failed, "name another file, or give --may-exist"},
-    {configstore::NOT_FOUND, Exit::NotThere, "dvsctl store list and dvsctl store history show what there is"},
-    {configstore::CORRUPT, Exit::Store,
+    {configstore::BUSY, ErrorKind::Busy, "try again, or wait longer with --timeout"},
+    {configstore::BAD_PARAMETER, ErrorKind::Malformed, ""},
+    {configstore::SCHEMA_VIOLATION, ErrorKind::Malformed, "dvsctl schema FIELD explains a field"},
+    {configstore::EXISTS, ErrorKind::Failed, "name another file, or give --may-exist"},
+    {configstore::NOT_FOUND, ErrorKind::NotThere,
+     "dvsctl store list and dvsctl store history show what there is"},
+    {configstore::CORRUPT, ErrorKind::Store,
      "dvsctl store check says more; bring back a copy that dvsctl store backup made"},
-    {configstore::IO_ERROR, Exit::Store, "check the path, its owner and mode, and the room on the disk"},
+    {configstore::IO_ERROR, ErrorKind::Store, "check the path, its owner and mode, and the room on the disk"},
 };
 
 const StatusRow *RowOf(std::int32_t status) {
@@ -53,7 +54,7 @@ const StatusRow *RowOf(std::int32_t status) {
 std::string StorePathOf(std::string_view given) {
     std::string path = given.empty() ? admin::DefaultPath() : std::string(given);
     if (path == ":memory:")
-        throw Error(Exit::Usage, "a store in memory ends with the program that has it")
+        throw Error(ErrorKind::Usage, "a store in memory ends with the program that has it")
             .Try("name a database file: store:PATH, --store PATH, or DVS_CONFIGSTORE");
     return path;
 }
@@ -66,13 +67,13 @@ void PointLibraryAt(const std::string &path) {
     if (setenv("DVS_CONFIGSTORE", path.c_str(), 1) != 0) throw std::bad_alloc();
 }
 
-Exit StoreExit(std::int32_t status) {
+ErrorKind StoreErrorKind(std::int32_t status) {
     const StatusRow *row = RowOf(status);
-    return row ? row->exit : Exit::Store;
+    return row ? row->kind : ErrorKind::Store;
 }
 
 Error StoreError(std::int32_t status, std::string title, const std::string &path, const std::string &cause) {
-    Error error(StoreExit(status), std::move(title));
+    Error error(StoreErrorKind(status), std::move(title));
     error.source = StoreName(path);
     error.why = admin::StatusText(status);
     if (!cause.empty()) error.messages.push_back(cause);
@@ -86,14 +87,14 @@ Error StoreError(std::int32_t status, std::string title, const std::string &path
 }
 
 Error NoStoreError(const std::string &path) {
-    return Error(Exit::Store, "there is no config store")
+    return Error(ErrorKind::Store, "there is no config store")
         .In(StoreName(path))
         .Because("the database file does not exist")
         .Try("check the path (store:PATH, --store PATH or DVS_CONFIGSTORE); the first save makes a store");
 }
 
 Error NoSwitchError(const std::string &path, std::string_view name, admin::Layer layer) {
-    return Error(Exit::NotThere, "there is no switch \"" + std::string(name) + "\"")
+    return Error(ErrorKind::NotThere, "there is no switch \"" + std::string(name) + "\"")
         .In(StoreName(path))
         .Because(fmt::format("the {} layer has no object of that id or name", admin::LayerName(layer)))
         .Try("dvsctl store list shows what there is");
@@ -170,7 +171,7 @@ std::optional<std::string> OpenStore::DocumentAsOf(const admin::Address &address
 admin::Layer LayerOf(const Options &options) {
     if (!options.layer || *options.layer == "current") return admin::Layer::Current;
     if (*options.layer == "desired") return admin::Layer::Desired;
-    throw Error(Exit::Usage, "there is no layer \"" + *options.layer + "\"")
+    throw Error(ErrorKind::Usage, "there is no layer \"" + *options.layer + "\"")
         .Because("the layers are current and desired");
 }
 
@@ -200,7 +201,7 @@ admin::Address FindObject(const OpenStore &store, admin::Layer layer, const std:
 
 std::optional<std::string> OnlySwitchOf(const Options &options) {
     if (options.name && options.switchId && *options.name != *options.switchId)
-        throw Error(Exit::Usage, "SWITCH and --switch name two switches")
+        throw Error(ErrorKind::Usage, "SWITCH and --switch name two switches")
             .Because("both mean the only switch to look at")
             .Try("leave one of them out");
     return options.name ? options.name : options.switchId;
@@ -228,7 +229,7 @@ std::optional<std::int64_t> RevisionOf(const Options &options) {
     std::int64_t revision = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), revision);
     if (error != std::errc() || end != text.data() + text.size() || revision < 0)
-        throw Error(Exit::Usage, "--revision wants a number that is not negative")
+        throw Error(ErrorKind::Usage, "--revision wants a number that is not negative")
             .Because("dvsctl store history lists them");
     return revision;
 }

@@ -14,7 +14,7 @@
 
 #include "platform/embedded/configstore/admin.h"
 #include "platform/embedded/configstore/log.h"
-#include "tools/dvsctl/context.h"
+#include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
 
@@ -31,7 +31,7 @@ std::string StoreName(const std::string &path);
 void PointLibraryAt(const std::string &path);
 
 /// The exit status for a store status other than 0.
-Exit StoreExit(std::int32_t status);
+ErrorKind StoreErrorKind(std::int32_t status);
 
 /// The error for a store status other than 0; `cause` is what the store said meanwhile, or empty.
 Error StoreError(std::int32_t status, std::string title, const std::string &path, const std::string &cause);

@@ -9,7 +9,7 @@
 #include <boost/json/serialize.hpp>
 #include <fmt/format.h>
 
-#include "tools/dvsctl/text.h"
+#include "form/text.h"
 
 namespace dvs::ctl {
 

@@ -11,7 +11,7 @@
 
 #include <boost/json/value.hpp>
 
-#include "tools/dvsctl/output.h"
+#include "tools/dvsctl/cli/output.h"
 
 namespace dvs::ctl {
 

@@ -5,17 +5,18 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
-#include "tools/dvsctl/commands.h"
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/files.h"
-#include "tools/dvsctl/json_parse.h"
-#include "tools/dvsctl/model.h"
-#include "tools/dvsctl/source.h"
+#include "form/json/parse.h"
+#include "form/json/pretty.h"
+#include "form/model.h"
+#include "form/text.h"
+#include "tools/dvsctl/cli/commands.h"
+#include "tools/dvsctl/cli/envelope.h"
+#include "tools/dvsctl/sources/files.h"
+#include "tools/dvsctl/sources/source.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/verbs.h"
-#include "tools/dvsctl/text.h"
-#include "tools/dvsctl/version_warning.h"
+#include "tools/dvsctl/verbs/version_warning.h"
 
 namespace dvs::ctl {
 
@@ -26,7 +27,7 @@ namespace json = boost::json;
 std::string ReadInput(Context &context, const std::string &file) {
     if (file == "-") return ReadStandardInput(context, "-");
     if (!FileExists(file))
-        throw Error(Exit::Failed, "cannot read the document").In(file).Because("it does not exist");
+        throw Error(ErrorKind::Failed, "cannot read the document").In(file).Because("it does not exist");
     return ReadWholeFile(context, file, file, Accept::Pipes);
 }
 
@@ -40,7 +41,7 @@ std::string UuidOf(const json::value &document) {
 std::string InstanceOf(const Options &options, const std::string &file, const json::value &document) {
     if (options.switchId) return *options.switchId;
     if (std::string uuid = UuidOf(document); !uuid.empty()) return uuid;
-    throw Error(Exit::Malformed, "the document does not say whose it is")
+    throw Error(ErrorKind::Malformed, "the document does not say whose it is")
         .In(file)
         .Field("uuid")
         .Because("a switch's document has its id there")
@@ -49,7 +50,7 @@ std::string InstanceOf(const Options &options, const std::string &file, const js
 
 Error RefusedDocument(std::int32_t status, const std::string &file,
                       const std::vector<admin::Problem> &problems) {
-    Error error(StoreExit(status), "the document is refused, and nothing was stored");
+    Error error(StoreErrorKind(status), "the document is refused, and nothing was stored");
     error.source = file;
     error.why = admin::StatusText(status);
     error.next = "dvsctl schema FIELD explains a field";
@@ -66,7 +67,7 @@ Error RefusedDocument(std::int32_t status, const std::string &file,
 // document of it, for it may be anything.
 void CheckInput(const admin::Address &address, const std::string &file, const std::string &text) {
     try {
-        if (!IsJsonObject(text)) throw Error(Exit::Malformed, "a switch's document is a JSON object");
+        if (!IsJsonObject(text)) throw Error(ErrorKind::Malformed, "a switch's document is a JSON object");
     } catch (Error &error) {
         if (error.source.empty()) error.source = file;
         throw;
@@ -81,12 +82,12 @@ void WarnOfAnotherUuid(Context &context, const std::string &file, const std::str
                        const json::value &document) {
     const std::string uuid = UuidOf(document);
     if (uuid.empty() || uuid == instance) return;
-    context.out.Warn(
-        Error(Exit::Done, fmt::format("the document of switch {} says that it is switch {}", instance, uuid))
-            .In(file)
-            .Field("uuid")
-            .Because("a load takes it for that one, and a save of all switches fails at it")
-            .Try("write the switch's own id there and import the document again"));
+    context.out.Warn(Error(ErrorKind::Warning,
+                           fmt::format("the document of switch {} says that it is switch {}", instance, uuid))
+                         .In(file)
+                         .Field("uuid")
+                         .Because("a load takes it for that one, and a save of all switches fails at it")
+                         .Try("write the switch's own id there and import the document again"));
 }
 
 // Nothing is required of a document, but the loads require some of it. One switch that does not load keeps all
@@ -95,7 +96,7 @@ void WarnIfUnloadable(Context &context, const std::string &path) {
     try {
         (void)LoadState(context, *OpenSource("store:" + path));
     } catch (const Error &error) {
-        if (error.status != Exit::Busy) context.out.Warn(UnloadableWarning({}, error));
+        if (error.kind != ErrorKind::Busy) context.out.Warn(UnloadableWarning({}, error));
     }
 }
 
@@ -109,7 +110,7 @@ Exit RunStoreExport(Context &context) {
     const admin::Address address = FindObject(store, LayerOf(options), options.source, revision.has_value());
     const auto text = revision ? store.DocumentAsOf(address, *revision) : store.Document(address);
     if (!text)
-        throw Error(Exit::NotThere,
+        throw Error(ErrorKind::NotThere,
                     revision ? fmt::format("the store held no such switch as of revision {}", *revision)
                              : std::string("the switch is gone"))
             .In(StoreName(path))
@@ -149,7 +150,7 @@ Exit RunStoreImport(Context &context) {
         if (const auto held = store.Document(address)) before = ReadDocument(*held);
     }
     if (before && options.noReplace)
-        throw Error(Exit::Failed, "the store holds that switch already")
+        throw Error(ErrorKind::Failed, "the store holds that switch already")
             .In(StoreName(path))
             .Because("--no-replace was given");
     if (!options.dryRun) {
@@ -181,7 +182,7 @@ Exit RunStoreDelete(Context &context) {
         address = FindObject(store, layer, options.source, false);
         before = ReadDocument(store.Document(address).value_or("null"));
     } catch (const Error &error) {
-        if (error.status != Exit::NotThere || !options.ifExists) throw;
+        if (error.kind != ErrorKind::NotThere || !options.ifExists) throw;
         WriteReport(context, {"store delete", path, "nothing to delete: the switch is not there", {}});
         return Exit::Done;
     }

@@ -10,12 +10,12 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
-#include "tools/dvsctl/commands.h"
-#include "tools/dvsctl/envelope.h"
+#include "form/text.h"
+#include "tools/dvsctl/cli/commands.h"
+#include "tools/dvsctl/cli/envelope.h"
+#include "tools/dvsctl/cli/table.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/verbs.h"
-#include "tools/dvsctl/table.h"
-#include "tools/dvsctl/text.h"
 
 namespace dvs::ctl {
 

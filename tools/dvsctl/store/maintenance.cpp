@@ -13,15 +13,16 @@
 #include <unistd.h>
 
 #include "configstore/upgrade.h"
-#include "tools/dvsctl/commands.h"
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/files.h"
-#include "tools/dvsctl/model.h"
+#include "form/model.h"
+#include "form/text.h"
+#include "tools/dvsctl/cli/commands.h"
+#include "tools/dvsctl/cli/envelope.h"
+#include "tools/dvsctl/sources/files.h"
+#include "tools/dvsctl/sources/source.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/scratch.h"
 #include "tools/dvsctl/store/verbs.h"
-#include "tools/dvsctl/text.h"
 
 namespace dvs::ctl {
 
@@ -40,7 +41,7 @@ void SyncDirectoryOf(const std::string &path) {
     const int error = errno;
     if (fd >= 0) close(fd);
     if (!synced)
-        throw Error(Exit::Failed, "the backup may not survive a power cut")
+        throw Error(ErrorKind::Failed, "the backup may not survive a power cut")
             .In(path)
             .Because(std::string("its directory cannot be synced: ") + std::strerror(error));
 }
@@ -52,7 +53,7 @@ void ReplaceBackup(const OpenStore &store, const std::string &target) {
     if (std::rename(beside.c_str(), target.c_str()) == 0) return;
     const int error = errno;
     (void)unlink(beside.c_str());
-    throw Error(Exit::Failed, "cannot replace the file").In(target).Because(std::strerror(error));
+    throw Error(ErrorKind::Failed, "cannot replace the file").In(target).Because(std::strerror(error));
 }
 
 // What an upgrade would bring, from the library's own work on a copy.
@@ -120,7 +121,7 @@ Exit RunStoreBackup(Context &context) {
     const std::string &target = options.target;
     const bool exists = FileExists(target);
     if (exists && !options.mayExist)
-        throw Error(Exit::Failed, "the backup's file is there already")
+        throw Error(ErrorKind::Failed, "the backup's file is there already")
             .In(target)
             .Because("a backup does not replace another one by itself")
             .Try("name another file, or give --may-exist");

@@ -10,7 +10,7 @@
 
 #include <fmt/format.h>
 
-#include "tools/dvsctl/text.h"
+#include "form/text.h"
 
 namespace dvs::ctl {
 

@@ -7,7 +7,7 @@
 
 #include <string>
 
-#include "tools/dvsctl/context.h"
+#include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
 

@@ -7,11 +7,11 @@
 #include <boost/json/value.hpp>
 #include <fmt/format.h>
 
-#include "tools/dvsctl/commands.h"
+#include "form/text.h"
+#include "tools/dvsctl/cli/commands.h"
 #include "tools/dvsctl/store/access.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/verbs.h"
-#include "tools/dvsctl/text.h"
 
 namespace dvs::ctl {
 
@@ -39,7 +39,7 @@ ObjectChange PlanOne(const OpenStore &store, const admin::Address &address, std:
 void CheckRevision(const OpenStore &store, std::int64_t revision) {
     const std::int64_t latest = store.LatestRevision();
     if (revision > latest)
-        throw Error(Exit::Failed, fmt::format("there is no revision {} yet", revision))
+        throw Error(ErrorKind::Failed, fmt::format("there is no revision {} yet", revision))
             .In(StoreName(store.Path()))
             .Because(fmt::format("the latest is {}", latest))
             .Try("dvsctl store history lists them");
@@ -55,7 +55,8 @@ std::vector<ObjectChange> Plan(const OpenStore &store, const std::optional<admin
     }
     ObjectChange change = PlanOne(store, *only, revision);
     if (!change.after)
-        throw Error(Exit::NotThere, fmt::format("the store held no such switch as of revision {}", revision))
+        throw Error(ErrorKind::NotThere,
+                    fmt::format("the store held no such switch as of revision {}", revision))
             .In(StoreName(store.Path()))
             .Try("dvsctl store history shows when it was there; dvsctl store delete removes it");
     return {std::move(change)};
@@ -67,7 +68,7 @@ Exit RunStoreRestore(Context &context) {
     const Options &options = context.options;
     const auto revision = RevisionOf(options);
     if (!revision)
-        throw Error(Exit::Usage, "store restore needs --revision N")
+        throw Error(ErrorKind::Usage, "store restore needs --revision N")
             .Try("dvsctl store history lists the revisions");
     const std::string path = StorePathOf(options.store.value_or(""));
     const std::optional<std::string> wanted = OnlySwitchOf(options);

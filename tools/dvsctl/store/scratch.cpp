@@ -3,7 +3,7 @@
 
 #include "tools/dvsctl/store/scratch.h"
 
-#include "tools/dvsctl/files.h"
+#include "tools/dvsctl/sources/files.h"
 
 namespace dvs::ctl {
 

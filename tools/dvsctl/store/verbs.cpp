@@ -1,15 +1,15 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Reports of the store verbs (verbs.h).
 
+#include "form/text.h"
 #include "tools/dvsctl/store/verbs.h"
-#include "tools/dvsctl/text.h"
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
 #include <fmt/format.h>
 
-#include "tools/dvsctl/envelope.h"
-#include "tools/dvsctl/files.h"
+#include "tools/dvsctl/cli/envelope.h"
+#include "tools/dvsctl/sources/files.h"
 #include "tools/dvsctl/store/document.h"
 
 namespace dvs::ctl {
