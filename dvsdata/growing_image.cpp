@@ -22,15 +22,20 @@ GrowingImage::~GrowingImage() {
 bool GrowingImage::Grow(std::size_t size) {
     constexpr std::size_t kFirst = std::size_t{1} << 16;
     const std::size_t capacity = std::max(kFirst, (capacity_ + size) * 2);
-    auto *const block =
-        capacity <= kMaxSize ? static_cast<std::uint8_t *>(std::realloc(begin_, capacity)) : nullptr;
+    const bool isLarge = capacity >= 2 * base::kHugePage;
+    void *block = nullptr;
+    if (capacity <= kMaxSize) block = isLarge ? std::malloc(capacity) : std::realloc(begin_, capacity);
     if (!block) {
         gaveUp_ = true;
         return false;
     }
-    begin_ = block;
+    if (isLarge) { // not by realloc, which copies before huge pages can be asked for
+        base::AdviseHugePages(block, capacity);
+        if (at_ > 0) std::memcpy(block, begin_, at_);
+        std::free(begin_);
+    }
+    begin_ = static_cast<std::uint8_t *>(block);
     capacity_ = capacity;
-    if (capacity >= 2 * base::kHugePage) base::AdviseHugePages(block, capacity);
     return true;
 }
 
