@@ -2,7 +2,7 @@
 // Loading switches from the config store into one state buffer. Exported (dvs/configstore.h); stands on the
 // property frame, which rebuilds the properties of one store object, and on switch_object.h.
 
-#include "dvs/configstore.h"
+#include "configstore/load.h"
 
 #include <array>
 #include <bit>
@@ -16,15 +16,16 @@
 
 #include "configstore/converters/common.h"
 #include "configstore/converters/switch_version.h"
-#include "configstore/layouts/switch_version.h"
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
 #include "configstore/maps/prop_loader.h"
 #include "configstore/switch_object.h"
+#include "dvs/configstore.h"
 #include "dvsdata/emit.h"
 #include "dvsdata/growing_image.h"
 #include "dvsdata/list_internal.h"
 #include "dvsstate/owned_list.h"
+#include "dvsstate/versions.h"
 #include "platform/status_text.h"
 
 namespace {
@@ -246,7 +247,7 @@ int32_t LoadSwitch(configstore::Object *object, const Target &state) {
     dvsSwitchClass = SwitchClassOf(fields.forwardingClass.get());
     if (const int32_t status = dvs::convert::ReadSwitchVersion(object, &fields.version))
         return FailedSwitch(fields, static_cast<uint32_t>(status));
-    dvsWidePortRecords = fields.version > dvs::layout::kLastNarrowVersion;
+    dvsWidePortRecords = dvs::state::HasWidePortRecords(fields.version);
     if (const HYP_ReturnStatus status = AppendFields(target, fields)) return FailedSwitch(fields, status);
     if (const int32_t status = LoadProperties(object, target, fields.version)) return status;
     if (state.image) {
@@ -333,25 +334,29 @@ int32_t CompleteDesired(const RootObjects &desired, const RootObjects &current) 
 
 } // namespace
 
-int32_t DVSState_LoadFromConfigStoreAsBuf(void **out, uint32_t *outLen, bool desired) {
-    StoreHandle store;
-    if (const int32_t status = store.Open()) return status;
+int32_t dvs::config::LoadState(configstore::Store *store, bool desired, void **out, uint32_t *outLen) {
     SwitchFilter filter;
     if (const int32_t status = filter.Create()) return status;
     RootObjects desiredObjects;
     RootObjects currentObjects;
     if (desired) {
-        const int32_t status = desiredObjects.ListDesired(store.get());
+        const int32_t status = desiredObjects.ListDesired(store);
         if (status) LogError("Failed to get dvs desired user config instances\n");
         if (status) return status;
     }
-    if (const int32_t status = currentObjects.ListCurrent(store.get(), filter.get())) {
+    if (const int32_t status = currentObjects.ListCurrent(store, filter.get())) {
         LogError("Failed to get dvs instances\n");
         return status;
     }
     if (!desired) return LoadAll(currentObjects, out, outLen);
     const int32_t status = CompleteDesired(desiredObjects, currentObjects);
     return status ? status : LoadAll(desiredObjects, out, outLen);
+}
+
+int32_t DVSState_LoadFromConfigStoreAsBuf(void **out, uint32_t *outLen, bool desired) {
+    StoreHandle store;
+    if (const int32_t status = store.Open()) return status;
+    return LoadState(store.get(), desired, out, outLen);
 }
 
 bool StringExistInArray(const char *s, const char **array, uint32_t n) {

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Saving switches to the config store: a state buffer goes into the switch table, every switch of it becomes
-// one store object, all of them in one transaction. Exported (dvs/configstore.h); stands on the property
-// frame for the single property and on switch_object.h for the object around it.
+// Saves switches to the config store: a state buffer is loaded into the switch table, and every switch of it
+// becomes one store object, all in one transaction. Uses the property frame for each property and
+// switch_object.h for the object around them.
 
 #include "configstore/save.h"
 
@@ -14,15 +14,15 @@
 #include "configstore/log.h"
 #include "configstore/maps/prop_frame.h"
 #include "configstore/maps/prop_saver.h"
+#include "configstore/scratch_table.h"
 #include "configstore/switch_object.h"
 #include "dvs/configstore.h"
 #include "dvs/state.h"
+#include "dvsstate/versions.h"
 
 namespace {
 
 using namespace dvs::config;
-
-constexpr uint32_t kLastNarrowVersion = 99;
 
 // What the walk over the switches carries along. On the heap, and checked, because running out of memory here
 // has a message and a result of its own.
@@ -106,7 +106,7 @@ int32_t WriteObject(configstore::Store *store, configstore::Object *object) {
 // The walk's callback: true ends it.
 bool SaveSwitch(DVSwitch *sw, void *arg) {
     auto *context = static_cast<SaveContext *>(arg);
-    dvsWidePortRecords = DVS_Version(sw) > kLastNarrowVersion;
+    dvsWidePortRecords = dvs::state::HasWidePortRecords(DVS_Version(sw));
     dvsSwitchClass = SwitchClassOf(DVS_ClassName(sw));
     RootObject object;
     context->status = FetchForRewrite(context->store, DVS_SwitchId(sw), &object);
@@ -193,36 +193,59 @@ int32_t RunTransaction(configstore::Store *store, const char *switchId, Existing
     return status;
 }
 
-} // namespace
-
-int32_t dvs::config::SaveBuffer(const void *buf, uint32_t len, const char *switchId, Unloadable policy) {
-    MXUserRecLock *lock = DVSwitchHandleLock();
-    (void)DVSState_ConfigReset();
-    const HYP_ReturnStatus loaded = DVSState_ConfigDeserialize(buf, len);
-    if (loaded != HYP_OK && policy == Unloadable::IsRefused) {
-        (void)DVSState_ConfigReset();
-        DVSwitchHandleUnlock(lock);
-        return static_cast<int32_t>(loaded);
-    }
+// The first step of every save. A status other than 0 refuses the buffer.
+int32_t LoadIntoTable(ScratchTable *table, const void *buf, uint32_t len, const char *switchId,
+                      Unloadable policy) {
+    const HYP_ReturnStatus loaded = table->Load(buf, len);
+    if (loaded != HYP_OK && policy == Unloadable::IsRefused) return static_cast<int32_t>(loaded);
     LogSystem(LOG_DEBUG, "Start DVSState_SaveBufToConfigStore_ByInstance, swId:[%s]",
               switchId ? switchId : "");
     dvsConfigStoreTimeMs = 0;
+    return 0;
+}
 
-    // These two keep the lock and the loaded table: callers have always had to release it on them.
+int32_t SaveBuffer(configstore::Store *store, const void *buf, uint32_t len, const char *switchId,
+                   Unloadable policy) {
+    Existing existing; // declared before the table: its objects are released after the unlock
+    ScratchTable table;
+    if (const int32_t status = LoadIntoTable(&table, buf, len, switchId, policy)) return status;
+    if (const int32_t status = configstore::BeginTransaction(store)) return status;
+    return RunTransaction(store, switchId, &existing);
+}
+
+} // namespace
+
+int32_t dvs::config::SaveState(configstore::Store *store, const void *buf, uint32_t len,
+                               const char *switchId) {
+    return SaveBuffer(store, buf, len, switchId, Unloadable::CountsAsEmpty);
+}
+
+int32_t dvs::config::SaveStateChecked(configstore::Store *store, const void *buf, uint32_t len,
+                                      const char *switchId) {
+    const HYP_ReturnStatus status = VerifyState(buf, len);
+    if (status != HYP_OK) return static_cast<int32_t>(status);
+    return SaveBuffer(store, buf, len, switchId, Unloadable::IsRefused);
+}
+
+int32_t dvs::config::SaveToHostStore(const void *buf, uint32_t len, const char *switchId, Unloadable policy) {
     StoreHandle store;
-    if (store.Open()) return kFailed;
-    if (const int32_t status = configstore::BeginTransaction(store.get())) return status;
-
-    // Declared before the lock is released: objects and store go last.
     Existing existing;
-    const int32_t status = RunTransaction(store.get(), switchId, &existing);
-    (void)DVSState_ConfigReset();
-    DVSwitchHandleUnlock(lock);
-    return status;
+    ScratchTable table;
+    if (const int32_t status = LoadIntoTable(&table, buf, len, switchId, policy)) return status;
+    if (store.Open()) {
+        table.Keep();
+        return kFailed;
+    }
+    if (const int32_t status = configstore::BeginTransaction(store.get())) {
+        table.Keep();
+        store.Keep();
+        return status;
+    }
+    return RunTransaction(store.get(), switchId, &existing);
 }
 
 int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId) {
-    return dvs::config::SaveBuffer(buf, len, switchId, Unloadable::CountsAsEmpty);
+    return SaveToHostStore(buf, len, switchId, Unloadable::CountsAsEmpty);
 }
 
 int32_t DVSState_SaveBufToConfigStore(const void *buf, uint32_t len) {

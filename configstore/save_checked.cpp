@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The save that looks before it leaps: the plain one takes a buffer it cannot load for one without switches,
-// and would empty the store. Stands on the state view, which finds what a load would stumble over, and on the
-// plain save.
+// The checked save. A plain save treats a buffer that does not load as one without switches and empties the
+// store; the checked save verifies the buffer first, with the state view.
 
 #include "dvs/configstore.h"
 
@@ -15,17 +14,19 @@ namespace {
 
 constexpr std::size_t kTextSize = 512;
 
-// First what is wrong, then where: the smallest thing that has the fault.
+// Names the fault, then the smallest part of the state that has it.
 void Report(const dvs::state::StateFault &fault) {
     char what[kTextSize];
     char where[kTextSize];
-    (void)fault.Describe(what); // cut where it is longer
+    (void)fault.Describe(what); // cut if it is longer
     (void)fault.path.Format(where);
     dvs::config::LogError("State is not saved to configstore: %s, at byte %zu%s%s\n", what, fault.offset,
                           *where ? " in " : "", where);
 }
 
-HYP_ReturnStatus Verify(const void *buf, uint32_t len) {
+} // namespace
+
+HYP_ReturnStatus dvs::config::VerifyState(const void *buf, uint32_t len) {
     if (uwMaxNumActivePortsSystemWide == 0) {
         const HYP_ReturnStatus status = dvs::state::ReadHostLimit("");
         if (status != HYP_OK) return status;
@@ -37,11 +38,9 @@ HYP_ReturnStatus Verify(const void *buf, uint32_t len) {
     return verdict.first.Status();
 }
 
-} // namespace
-
 int32_t DVSState_SaveBufToConfigStoreChecked(const void *buf, uint32_t len, const char *switchId) {
-    const HYP_ReturnStatus status = Verify(buf, len);
+    const HYP_ReturnStatus status = dvs::config::VerifyState(buf, len);
     if (status != HYP_OK) return static_cast<int32_t>(status);
-    // What is sound may still not load, for want of memory.
-    return dvs::config::SaveBuffer(buf, len, switchId, dvs::config::Unloadable::IsRefused);
+    // A sound buffer can still fail to load, without memory.
+    return dvs::config::SaveToHostStore(buf, len, switchId, dvs::config::Unloadable::IsRefused);
 }

@@ -2,13 +2,13 @@
 #ifndef CONFIGSTORE_SWITCH_OBJECT_H
 #define CONFIGSTORE_SWITCH_OBJECT_H
 
-// The store object of a switch as the save, the load and the upgrade see it: where it is addressed, how it is
-// fetched for rewriting, and owners for stores and objects. Stands on converters/common.h for the smaller
-// owners.
+// The store object of a switch for the save, the load and the upgrade: its address, how it is fetched for
+// rewriting, and owners for stores and objects. converters/common.h has the smaller owners.
 
 #include <cstdint>
 #include <span>
 
+#include "configstore/maps/prop_frame.h"
 #include "dvs/state.h"
 #include "platform/configstore.h"
 
@@ -25,9 +25,6 @@ inline constexpr const char *kSource = "EXTERNAL";
 /// Host property with the name of the switch's port set.
 inline constexpr const char *kPortsetKey = "com.orbeno.common.host.portset";
 
-/// The library's own failure.
-inline constexpr int32_t kFailed = -1;
-
 class StoreHandle {
 public:
     StoreHandle() = default;
@@ -39,6 +36,8 @@ public:
     /// 0 with a store, or a status other than 0 after the family's message; -1 for success without a store.
     [[nodiscard]] int32_t Open();
     [[nodiscard]] configstore::Store *get() const { return store_; }
+    /// Leaves the store open.
+    void Keep() { store_ = nullptr; }
 
 private:
     configstore::Store *store_ = nullptr;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Carrying an older host's state file over: the identity of its switches into the store, or into a plain
-// list. Stands on dvs/file.h for the file, on the switch table for its switches and on switch_object.h.
+// Upgrade from an older host's state file: copies the identity of its switches into the store, or into a plain
+// list.
 
 #include "configstore/upgrade.h"
 
@@ -11,6 +11,7 @@
 
 #include "configstore/converters/common.h"
 #include "configstore/log.h"
+#include "configstore/scratch_table.h"
 #include "configstore/switch_object.h"
 #include "dvs/file.h"
 #include "dvs/state.h"
@@ -96,14 +97,18 @@ int32_t RunTransaction(configstore::Store *store) {
     return status;
 }
 
-// The state file's switches into the store; the caller has the lock and cleans up unless *keepLock is set.
-int32_t SaveToStore(bool *keepLock) {
-    StoreHandle store;
-    *keepLock = true; // as in the save, callers have always had to release it on these two
-    if (store.Open()) return kFailed;
-    if (const int32_t status = configstore::BeginTransaction(store.get())) return status;
-    *keepLock = false;
-    return RunTransaction(store.get());
+// Loads the file into the table. False, after a message to syslog, for a file that is empty or cannot be read:
+// then there is nothing to carry over.
+bool LoadFile(const char *stateFile, FileBuffer *file) {
+    const HYP_ReturnStatus read = file->Read(stateFile);
+    (void)DVSState_ConfigReset();
+    if (read == HYP_FILE_EMPTY)
+        LogSystem(LOG_DEBUG, "File is empty, skip load");
+    else if (read != HYP_OK)
+        LogSystem(LOG_INFO, "Failed to read DVS config from sticky-bit file.");
+    else
+        file->LoadIntoTable();
+    return read == HYP_OK;
 }
 
 bool ListSwitch(DVSwitch *sw, void *arg) {
@@ -117,25 +122,29 @@ bool ListSwitch(DVSwitch *sw, void *arg) {
 
 } // namespace
 
-int32_t RetrieveUpgradeInfoFrom(const char *stateFile) {
-    MXUserRecLock *lock = DVSwitchHandleLock();
+int32_t dvs::config::UpgradeFromFile(configstore::Store *store, const char *stateFile) {
     FileBuffer file;
-    const HYP_ReturnStatus read = file.Read(stateFile);
-    (void)DVSState_ConfigReset();
-    bool keepLock = false;
-    int32_t status = 0;
-    if (read == HYP_FILE_EMPTY) {
-        LogSystem(LOG_DEBUG, "File is empty, skip load");
-    } else if (read != HYP_OK) {
-        LogSystem(LOG_INFO, "Failed to read DVS config from sticky-bit file.");
-    } else {
-        file.LoadIntoTable();
-        status = SaveToStore(&keepLock);
+    ScratchTable table;
+    if (!LoadFile(stateFile, &file)) return 0;
+    if (const int32_t status = configstore::BeginTransaction(store)) return status;
+    return RunTransaction(store);
+}
+
+int32_t RetrieveUpgradeInfoFrom(const char *stateFile) {
+    FileBuffer file;
+    StoreHandle store;
+    ScratchTable table;
+    if (!LoadFile(stateFile, &file)) return 0;
+    // As in the save, these two paths keep the lock and the loaded table.
+    if (store.Open()) {
+        table.Keep();
+        return kFailed;
     }
-    if (keepLock) return status;
-    (void)DVSState_ConfigReset();
-    DVSwitchHandleUnlock(lock);
-    return status;
+    if (const int32_t status = configstore::BeginTransaction(store.get())) {
+        table.Keep();
+        return status;
+    }
+    return RunTransaction(store.get());
 }
 
 DvsBasicInfo BasicInfoFrom(const char *stateFile) {
@@ -145,7 +154,7 @@ DvsBasicInfo BasicInfoFrom(const char *stateFile) {
     (void)DVSState_ConfigReset();
     file.LoadIntoTable();
     DVSState_SwitchForEach(ListSwitch, &info);
-    file.LeaveAllocated(); // so it has always been; nothing points into it
+    file.LeaveAllocated(); // stated; nothing points into it
     return info;
 }
 

@@ -7,6 +7,7 @@
 #include <span>
 #include <string_view>
 
+#include "dvsstate/versions.h"
 #include "kernel/filters.h"
 #include "kernel/request.h"
 #include "kernel/scratch.h"
@@ -20,9 +21,6 @@ constexpr const char *kConnectionId = "com.orbeno.common.port.connectid";
 constexpr const char *kExtraConfig = "com.orbeno.extraconfig.";
 constexpr const char *kPortExtraConfig = "com.orbeno.port.extraConfig";
 constexpr std::string_view kPortsetFc = "com.orbeno.net.portset.fc.";
-
-/// Above this version the platform itself owns the names of kNewerPlatformNames.
-constexpr uint32_t kLastVersionBefore = 106;
 
 /// Port data of this type is the platform's own also below "com.orbeno.net.".
 constexpr uint32_t kDefaultType = 32;
@@ -102,7 +100,7 @@ bool IsNewerSwitch(const char *switchName) {
     uint32_t version = 0;
     if (valueLen < sizeof version) return false;
     std::memcpy(&version, value, sizeof version);
-    return version > kLastVersionBefore;
+    return dvs::state::IsOverlayVersion(version);
 }
 
 uint32_t ConnectionId(DVSPort *port) {

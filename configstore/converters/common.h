@@ -23,8 +23,7 @@
 
 namespace dvs::convert {
 
-/// The library's own failure: a value the store cannot express, or no memory.
-inline constexpr int32_t kFailed = -1;
+using config::kFailed;
 
 // --- Fields of packed values. The caller has checked that the field lies inside. ---
 

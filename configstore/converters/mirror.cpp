@@ -11,7 +11,7 @@
 #include "configstore/converters/mirror_ports.h"
 #include "configstore/layouts/mirror.h"
 #include "configstore/converters/switch_version.h"
-#include "configstore/layouts/switch_version.h"
+#include "dvsstate/versions.h"
 
 const char *SESSION_TYPE_LOCAL_ENUM_2_SCHEMA[VSPAN_SESSION_TYPE_NUM] = {
     "MIXED_DEST_MIRROR",
@@ -268,7 +268,7 @@ int32_t HasWideRecords(const LoadArgs &args, bool *wide) {
     }
     uint32_t version = 0;
     const int32_t status = ReadSwitchVersion(owner, &version);
-    *wide = version > layout::kLastNarrowVersion;
+    *wide = state::HasWidePortRecords(version);
     return status;
 }
 

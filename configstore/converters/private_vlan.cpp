@@ -7,6 +7,7 @@
 #include "configstore/converters/common.h"
 #include "configstore/converters/switch_version.h"
 #include "configstore/layouts/private_vlan.h"
+#include "dvsstate/versions.h"
 
 const char *PVLAN_2_CHARS[] = {nullptr, "PROMISCUOUS", "ISOLATED", "COMMUNITY", nullptr};
 int32_t CHARS_2_PVLAN[] = {-1, 1, 2, 3, -1};
@@ -25,8 +26,6 @@ constexpr auto kType = At<uint8_t>(kEntry, "type");
 
 constexpr const char *kVswitchKey = "com.orbeno.vswitch.pvlanMap";
 constexpr const char *kEtherswitchKey = "com.orbeno.etherswitch.pvlanMap";
-// Above this version number a switch keeps its map under the vswitch key, whatever its class.
-constexpr uint32_t kLastEtherswitchVersion = 106;
 
 int32_t SaveEntry(const SaveArgs &args, std::span<const uint8_t> entry) {
     StoreText id;
@@ -86,7 +85,7 @@ int32_t ChooseKey(configstore::Object *switchObject, const char **key) {
     uint32_t version = 0;
     if (ReadSwitchVersion(switchObject, &version)) return kFailed;
     const bool isVswitch =
-        std::strcmp(forwardingClass.get(), "cswitch") == 0 || version > kLastEtherswitchVersion;
+        std::strcmp(forwardingClass.get(), "cswitch") == 0 || state::IsOverlayVersion(version);
     *key = isVswitch ? kVswitchKey : kEtherswitchKey;
     return 0;
 }

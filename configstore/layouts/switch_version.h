@@ -34,11 +34,6 @@ inline constexpr VersionRow kVersions[] = {
 };
 // clang-format on
 
-/// From this version number on a switch is one with the overlay flag set.
-inline constexpr uint32_t kFirstOverlayVersion = 107;
-/// Up to this version number a switch has the narrow port records of mirror sessions.
-inline constexpr uint32_t kLastNarrowVersion = 99;
-
 /// The text of a number; null for a number that is no version.
 constexpr const char *VersionText(uint32_t number) {
     for (const VersionRow &row : kVersions) {

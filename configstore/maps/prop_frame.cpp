@@ -28,12 +28,12 @@ int64_t dvsConfigStoreTimeMs = 0;
 namespace {
 
 using dvs::ConverterType;
+using dvs::config::kFailed;
 using dvs::config::LogError;
 using dvs::config::LogTrace;
 using dvs::config::Tracing;
 using dvs::convert::ConverterFor;
 
-constexpr int32_t kFailed = -1;
 constexpr uint32_t kPropTypeState = 0x10;
 
 const char *Leaf(const DVSProp2ConfigEntry &row) {

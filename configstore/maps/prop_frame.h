@@ -17,6 +17,13 @@
 #include "dvs/data.h"
 #include "platform/configstore.h"
 
+namespace dvs::config {
+
+/// The library's own failure: a value the store cannot express, an unknown row, or no memory.
+inline constexpr int32_t kFailed = -1;
+
+} // namespace dvs::config
+
 /// The class of the switch at hand: 1 for "vswitch", 2 for "cswitch", 0 for every other class name.
 extern uint32_t dvsSwitchClass;
 

@@ -10,25 +10,23 @@
 #include "configstore/converters/common.h"
 #include "configstore/converters/health_check.h"
 #include "configstore/converters/switch_version.h"
-#include "configstore/layouts/switch_version.h"
 #include "configstore/converters/table.h"
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/walk.h"
 #include "configstore/typed/own_form.h"
 #include "configstore/typed/tree.h"
 #include "dvsstate/owned_list.h"
+#include "dvsstate/versions.h"
 
 namespace dvs::typed {
 namespace {
-
-constexpr uint32_t kFirstOverlayVersion = 107;
 
 // The converters' process-wide values as the property's own key calls for, and silence. Restored at the end.
 class Surroundings {
 public:
     Surroundings(std::string_view key, const Context &context) {
         dvsSwitchClass = key.find(".vswitch.") != std::string_view::npos ? 1 : 0;
-        dvsWidePortRecords = context.version > layout::kLastNarrowVersion;
+        dvsWidePortRecords = state::HasWidePortRecords(context.version);
         dvsLoadedSwitch = nullptr;
         dvsconfigstore_debug = -1;
     }
@@ -145,7 +143,7 @@ private:
         // The overlay flag is itself what the others ask for.
         if (propClass_ != DVS_PROP_CLASS_GLOBAL || type_->type == ConverterType::kOverlayFlag) return 0;
         int32_t status =
-            configstore::SetValueBool(root_.get(), "ovl_enabled", context_.version >= kFirstOverlayVersion);
+            configstore::SetValueBool(root_.get(), "ovl_enabled", state::IsOverlayVersion(context_.version));
         if (status || type_->type == ConverterType::kSwitchVersion) return status;
         configstore::Object *product = nullptr;
         status = GetOrCreateSubObject(true, root_.get(), "product", nullptr, &product);

@@ -41,9 +41,9 @@ extern int32_t dvsconfigstore_debug;
  *
  * Returns 0 when everything is committed; -1 when the store cannot be opened, an object cannot be created,
  * memory is short or a value cannot be expressed; else the status of the store call that failed. The store is
- * then as it was. The switch-state lock stays held, and the table loaded, where the store cannot be opened
- * (-1) or the transaction cannot be begun (its status): callers of those two paths release it with
- * DVSwitchHandleUnlock.
+ * then as it was. If the store cannot be opened (-1) or the transaction cannot be begun (its status), the
+ * switch-state lock stays held and the table stays loaded; the caller releases the lock with
+ * DVSwitchHandleUnlock. A transaction that cannot be begun leaves the store open as well.
  */
 int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId);
 

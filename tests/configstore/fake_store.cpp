@@ -22,6 +22,7 @@ std::string g_failName;
 int32_t g_failNameStatus = configstore::FAILED;
 bool g_failed = false;
 bool g_noStore = false;
+configstore::Store *g_lastStore = nullptr;
 
 } // namespace
 
@@ -123,13 +124,14 @@ int32_t GetStore(Store **store) {
     ENTER;
     *store = nullptr;
     if (g_noStore) return OK;
-    *store = new Store;
+    *store = g_lastStore = new Store;
     ++g_open;
     return OK;
 }
 void DestroyStore(Store *store) {
     if (!store) return;
     --g_open;
+    if (store == g_lastStore) g_lastStore = nullptr;
     delete store;
 }
 int32_t BeginTransaction(Store *store) {
@@ -287,6 +289,9 @@ bool Failed() {
 }
 void GiveNoStore(bool none) {
     g_noStore = none;
+}
+void DestroyKeptStore() {
+    DestroyStore(g_lastStore);
 }
 int OpenHandles() {
     return g_open;

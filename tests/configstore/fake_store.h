@@ -40,6 +40,9 @@ bool Failed();
 /// Lets GetStore report success without a store.
 void GiveNoStore(bool none);
 
+/// Destroys the store handle that GetStore gave out last, if it is still open: for tests of saves that keep it.
+void DestroyKeptStore();
+
 /// Everything handed out and not yet given back: stores, objects, filter specs, arrays, texts.
 int OpenHandles();
 

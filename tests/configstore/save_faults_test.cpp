@@ -2,6 +2,7 @@
 // Saves with a store that fails: nothing half done is left in it, and no lock is left held but where it
 // always was.
 
+#include "configstore/save.h"
 #include "configstore/store_fixture.h"
 
 using namespace state_builder;
@@ -75,6 +76,7 @@ void FailEachCall(const char *id) {
             EXPECT_EQ(failed == "GetStore" ? -1 : 8, result);
             EXPECT_EQ(2, StoreTest::SwitchesInTable()) << "the table stays loaded";
             StoreTest::ReleaseKeptLock();
+            fake_store::DestroyKeptStore();
         }
         EXPECT_EQ(0, StoreTest::SwitchesInTable());
         EXPECT_EQ(0, lock_count::Held());
@@ -109,8 +111,48 @@ TEST_F(SaveFaults, WithoutATransactionTheLockStaysHeldAndTheTableLoaded) {
     fake_store::FailFunction("BeginTransaction", configstore::BUSY);
     EXPECT_EQ(2, Save(After()));
     EXPECT_EQ(2, SwitchesInTable());
-    EXPECT_EQ(0, fake_store::OpenHandles()) << "the store's handle is no part of what stays";
+    EXPECT_EQ(1, fake_store::OpenHandles()) << "the store handle stays open";
     ReleaseKeptLock();
+    fake_store::DestroyKeptStore();
+}
+
+TEST_F(SaveFaults, WithoutATransactionTheCheckedSaveKeepsTheSame) {
+    fake_store::FailFunction("BeginTransaction", configstore::BUSY);
+    EXPECT_EQ(2, SaveChecked(State(After())));
+    EXPECT_EQ(2, SwitchesInTable());
+    EXPECT_EQ(1, fake_store::OpenHandles());
+    ReleaseKeptLock();
+    fake_store::DestroyKeptStore();
+}
+
+// Saves into a store of the caller's clean up on every path.
+TEST_F(SaveFaults, IntoAnOpenStoreNothingIsKept) {
+    configstore::Store *store = nullptr;
+    ASSERT_EQ(0, configstore::GetStore(&store));
+    const Bytes state = State(After());
+    const auto len = static_cast<uint32_t>(state.size());
+    for (const auto save : {dvs::config::SaveState, dvs::config::SaveStateChecked}) {
+        fake_store::FailFunction("BeginTransaction", configstore::BUSY);
+        EXPECT_EQ(2, save(store, state.data(), len, nullptr));
+        EXPECT_EQ(0, lock_count::Held());
+        EXPECT_EQ(0, SwitchesInTable());
+        fake_store::FailFunction(nullptr);
+        EXPECT_EQ(0, save(store, state.data(), len, nullptr));
+        EXPECT_EQ(0, lock_count::Held());
+        EXPECT_EQ(0, SwitchesInTable());
+        EXPECT_EQ(1, fake_store::OpenHandles()) << "the test's own store";
+    }
+    const int calls = fake_store::Calls();
+    EXPECT_EQ(0, dvs::config::SaveStateChecked(store, state.data(), len, "a"));
+    EXPECT_EQ("BeginTransaction", fake_store::CallName(calls + 1));
+    const std::string saved = fake_store::Dump();
+    Bytes damaged = state;
+    damaged[40] ^= 1;
+    EXPECT_NE(0, dvs::config::SaveStateChecked(store, damaged.data(), len, nullptr));
+    EXPECT_EQ(saved, fake_store::Dump());
+    EXPECT_EQ(0, dvs::config::SaveState(store, damaged.data(), len, nullptr));
+    EXPECT_EQ("", fake_store::Dump());
+    configstore::DestroyStore(store);
 }
 
 TEST_F(SaveFaults, AFailedListingIsTheResult) {

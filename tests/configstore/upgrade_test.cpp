@@ -137,6 +137,24 @@ TEST_F(UpgradeTest, WithoutStoreOrTransactionTheLockStaysHeldAndTheTableLoaded) 
     ReleaseKeptLock();
 }
 
+TEST_F(UpgradeTest, IntoAnOpenStoreNothingIsKept) {
+    Write({Small("a", "ps")});
+    configstore::Store *store = nullptr;
+    ASSERT_EQ(0, configstore::GetStore(&store));
+    fake_store::FailFunction("BeginTransaction", configstore::BUSY);
+    EXPECT_EQ(2, dvs::config::UpgradeFromFile(store, path.c_str()));
+    EXPECT_EQ(0, lock_count::Held());
+    EXPECT_EQ(0, SwitchesInTable());
+    EXPECT_EQ("", fake_store::Dump());
+    fake_store::FailFunction(nullptr);
+    EXPECT_EQ(0, dvs::config::UpgradeFromFile(store, path.c_str()));
+    EXPECT_NE(std::string::npos, fake_store::Dump().find("#a/portset_name = \"ps\"\n"));
+    EXPECT_EQ(0, dvs::config::UpgradeFromFile(store, (path.string() + ".absent").c_str()));
+    EXPECT_EQ(0, lock_count::Held());
+    EXPECT_EQ(0, SwitchesInTable());
+    configstore::DestroyStore(store);
+}
+
 TEST_F(UpgradeTest, EveryStoreCallInTurnLeavesTheStoreAsItWas) {
     Write({Small("a", "new"), Small("b", "new"), Small("c", "")});
     dvsconfigstore_debug = -1;

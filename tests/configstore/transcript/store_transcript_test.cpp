@@ -451,6 +451,7 @@ TEST(Transcript, OfFailingStoreCalls) {
                     MXUserRecLock *lock = DVSwitchHandleLock();
                     DVSwitchHandleUnlock(lock);
                     DVSwitchHandleUnlock(lock);
+                    fake_store::DestroyKeptStore();
                 }
                 Load();
                 Load(true);

@@ -12,6 +12,7 @@
 #include <fmt/format.h>
 #include <unistd.h>
 
+#include "configstore/switch_object.h"
 #include "tools/dvsctl/sources/files.h"
 #include "tools/dvsctl/store/document.h"
 #include "tools/dvsctl/store/progress.h"
@@ -19,11 +20,6 @@
 namespace dvs::ctl {
 
 namespace {
-
-// The address of every switch's object.
-constexpr const char *kKey = "switches";
-constexpr const char *kGroup = "network_vds";
-constexpr const char *kComponent = "qel";
 
 struct StatusRow {
     std::int32_t status;
@@ -176,7 +172,7 @@ admin::Layer LayerOf(const Options &options) {
 }
 
 admin::Address SwitchAddress(admin::Layer layer, std::string id) {
-    return {layer, kKey, kGroup, kComponent, std::move(id)};
+    return {layer, config::kKey, config::kGroup, config::kComponent, std::move(id)};
 }
 
 admin::Address FindObject(const OpenStore &store, admin::Layer layer, const std::string &text,

@@ -13,6 +13,7 @@
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/walk.h"
 #include "dvs/configstore.h"
+#include "dvsstate/versions.h"
 #include "form/json/codec.h"
 #include "form/value.h"
 #include "tools/dvsctl/cli/options.h"
@@ -159,9 +160,8 @@ std::vector<std::string> FieldChanges(const TypedText &before, const TypedText &
 
 // The fields of the records that differ although they mean the same.
 std::vector<std::string> RecordChanges(const Owner &owner, const Property &before, const Property &after) {
-    constexpr std::uint32_t kLastNarrowVersion = 99;
     const layout::Record *record =
-        layout::RecordOf(owner.propClass, before.name, owner.version > kLastNarrowVersion);
+        layout::RecordOf(owner.propClass, before.name, state::HasWidePortRecords(owner.version));
     if (!record) return {};
     std::map<std::string, std::string> left;
     (void)layout::Walk(*record, before.value,

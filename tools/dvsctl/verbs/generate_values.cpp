@@ -15,6 +15,7 @@
 #include "configstore/typed/typed_value.h"
 #include "dvs/configstore.h"
 #include "dvsdata/format.h"
+#include "dvsstate/versions.h"
 
 namespace dvs::ctl {
 
@@ -23,7 +24,6 @@ namespace {
 namespace json = boost::json;
 
 constexpr std::uint32_t kFirstOverlayVersion = 100;
-constexpr std::uint32_t kLastEtherswitchMap = 106; // later versions have the vswitch's private VLAN map
 constexpr std::uint32_t kGuestPeriod = 8;          // over so many guest ports every key is there, or over all
 
 // The first three have a key of every row between them.
@@ -357,7 +357,7 @@ constexpr Row kRows[] = {
 bool HasKey(const SwitchPlan &sw, std::string_view key) {
     const bool isCswitch = sw.className == "cswitch";
     const bool isVswitchKey = key.starts_with("com.orbeno.vswitch.");
-    if (key.ends_with(".pvlanMap")) return isVswitchKey == (isCswitch || sw.version > kLastEtherswitchMap);
+    if (key.ends_with(".pvlanMap")) return isVswitchKey == (isCswitch || state::IsOverlayVersion(sw.version));
     if (key == "com.orbeno.common.host.uplinkPorts") return sw.uplinks > 0;
     const bool isVswitch = isCswitch || sw.className == "vswitch";
     if (isVswitchKey) return isVswitch && !(isCswitch && key == "com.orbeno.vswitch.mtu");
