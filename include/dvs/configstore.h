@@ -10,40 +10,39 @@ extern "C" {
 #endif
 
 /*
- * The switches in the host's configuration store: saving a state buffer, loading one back, carrying an older
- * host's state file over, and the tables that say where each property lives in the store.
+ * Saves and loads switches in the host's configuration store: save a state buffer, load one back, import an
+ * older host's state file. Also the tables that map each property to its place in the store.
  *
- * Results are int32_t: 0, the store's own status (6 for what is absent, 2 for a busy store, …), or -1 for a
- * failure of the library's own. State buffers are those of DVSState_ConfigSerialize.
+ * Results are int32_t: 0, the store's own status (6 not found, 2 store busy, …), or -1 for a failure inside
+ * the library. State buffers are those of DVSState_ConfigSerialize.
  *
- * Every save and the upgrade take the switch-state lock for their whole run and use the process-wide switch
- * table as scratch: it is reset before and after, so a caller must not keep switches of its own in it
- * meanwhile. The load and GetDvsBasicInfoFromFileHyp take no lock; run one operation of this family at a
- * time.
+ * Every save and the upgrade hold the switch-state lock for their whole run and use the process-wide switch
+ * table as scratch: it is reset before and after. Do not call them while the table holds your own switches.
+ * The load and GetDvsBasicInfoFromFileHyp take no lock; run one operation of this family at a time.
  *
- * Messages go to standard output as far as dvsconfigstore_debug lets them, the saves' and the upgrade's
- * start, end and timings to syslog. A sink set with DVSLog_SetSink gets all of them.
+ * Messages go to standard output according to dvsconfigstore_debug; the start, end and timings of saves and
+ * of the upgrade go to syslog. A sink set with DVSLog_SetSink receives all of them.
  */
 
-/* Level of the messages: errors print at 0 or above, traces above 0. 10 at start. */
+/* Level of the messages: errors print at 0 or above, traces above 0. Initially 10. */
 extern int32_t dvsconfigstore_debug;
 
 /*
- * Saves the switches of a state buffer, each as one store object, all in one transaction: an object that
- * exists is emptied of everything this library writes and written afresh.
+ * Saves the switches of a state buffer, one store object each, in one transaction. An existing object is
+ * cleared of everything this library writes, then written again.
  *
- * buf, len  the state buffer. A buffer that does not deserialize counts as one without switches, which in a
- *           save of all deletes every switch of the store: DVSState_SaveBufToConfigStoreChecked refuses such
- *           a buffer.
- * switchId  saves this switch only and leaves all other objects alone. Where the buffer lacks it, its own
- *           object is deleted. NULL saves all, and deletes the objects of switches that the buffer does not
- *           hold.
+ * buf, len  the state buffer. A buffer that does not deserialize counts as one without switches; saving all
+ *           then deletes every switch in the store. DVSState_SaveBufToConfigStoreChecked rejects such a
+ *           buffer.
+ * switchId  saves only this switch and does not touch other objects. If the buffer does not contain it, its
+ *           object is deleted. NULL saves all switches and deletes the objects of switches that are not in
+ *           the buffer.
  *
- * Returns 0 when everything is committed; -1 when the store cannot be opened, an object cannot be created,
- * memory is short or a value cannot be expressed; else the status of the store call that failed. The store is
- * then as it was. If the store cannot be opened (-1) or the transaction cannot be begun (its status), the
- * switch-state lock stays held and the table stays loaded; the caller releases the lock with
- * DVSwitchHandleUnlock. A transaction that cannot be begun leaves the store open as well.
+ * Returns 0 when everything is committed; -1 if the store cannot be opened, an object cannot be created,
+ * memory runs out or a value cannot be converted; else the status of the failed store call. On failure the
+ * store is unchanged. If the store cannot be opened (-1) or the transaction cannot be started (its status),
+ * the switch-state lock stays held and the table stays loaded; the caller releases the lock with
+ * DVSwitchHandleUnlock. If the transaction cannot be started, the store also stays open.
  */
 int32_t DVSState_SaveBufToConfigStore_ByInstance(const void *buf, uint32_t len, const char *switchId);
 
@@ -52,7 +51,7 @@ int32_t DVSState_SaveBufToConfigStore(const void *buf, uint32_t len);
 
 /*
  * Fetches the kernel's persistent state (DVSHYP_PersistentStateGet) and saves it like
- * DVSState_SaveBufToConfigStore_ByInstance. -1 when it cannot be fetched, after a message with the cause.
+ * DVSState_SaveBufToConfigStore_ByInstance. -1 if the fetch fails, after a message with the cause.
  */
 int32_t DVSState_SaveToConfigStore_ByInstance(const char *switchId);
 
@@ -60,78 +59,75 @@ int32_t DVSState_SaveToConfigStore_ByInstance(const char *switchId);
 int32_t DVSState_SaveToConfigStore(void);
 
 /*
- * The save for everyone who is not sure of the buffer: verifies it first, every level of it, then saves as
- * DVSState_SaveBufToConfigStore_ByInstance does.
+ * The save for untrusted buffers: verifies every level of the buffer, then saves like
+ * DVSState_SaveBufToConfigStore_ByInstance.
  *
- * Returns, with neither the store nor the switch table touched, the HYP_ReturnStatus of the fault as a signed
- * number where the buffer does not verify: HYP_BAD_PARAM (malformed), HYP_BAD_CHECKSUM, HYP_NOT_FOUND (a
- * switch without a field it must have), HYP_EXISTS (a port twice), HYP_LIMIT_EXCEEDED (more switches or ports
- * than this host takes), or what the host answers when asked for its limit. A message names the fault and
- * where it is.
+ * If the buffer does not verify, touches neither the store nor the switch table and returns the
+ * HYP_ReturnStatus of the fault as a signed number: HYP_BAD_PARAM (malformed), HYP_BAD_CHECKSUM,
+ * HYP_NOT_FOUND (a switch lacks a required field), HYP_EXISTS (duplicate port), HYP_LIMIT_EXCEEDED (more
+ * switches or ports than this host allows), or the status of the failed query for the host's limit. A message
+ * names the fault and its location.
  */
 int32_t DVSState_SaveBufToConfigStoreChecked(const void *buf, uint32_t len, const char *switchId);
 
 /*
  * Rebuilds a state buffer from the store's switch objects.
  *
- * out, outLen  receive the buffer and its length in bytes; released with free(). Untouched unless a buffer
- *              was made.
- * desired      loads the desired user configuration, each object completed with the "portset_name" of the
- *              current object at the same position; -1 where the two layers hold different numbers of
- *              switches.
+ * out, outLen  receive the buffer and its length in bytes; released with free(). Untouched if no buffer is
+ *              created.
+ * desired      true loads the desired user configuration; each object gets the "portset_name" of the current
+ *              object at the same position. -1 if the two layers hold different numbers of switches.
  *
- * Returns 0 or the failing status. A switch that cannot be rebuilt ends the load WITHOUT a buffer and, where
- * its "uuid" still reads, with the result 0: test the buffer as well as the result.
+ * Returns 0 or the failing status. If a switch cannot be rebuilt, the load returns NO buffer and, if the
+ * switch's "uuid" is readable, still returns 0: check the buffer as well as the result.
  */
 int32_t DVSState_LoadFromConfigStoreAsBuf(void **out, uint32_t *outLen, bool desired);
 
 /*
- * Carries the identity of every switch of the host's state file into the store: name, uuid, port limit and,
- * from the host property "com.orbeno.common.host.portset", the port set's name. Switches without that
- * property are left as they are. A state file that is empty or cannot be read is no failure and touches
- * nothing.
+ * Copies the identity of every switch in the host's state file into the store: name, uuid, port limit and,
+ * from the host property "com.orbeno.common.host.portset", the port set's name. Skips switches without that
+ * property. An empty or unreadable state file is not a failure; nothing is touched.
  *
- * Returns 0, -1 or the failing store status. As with the saves, the switch-state lock stays held where the
- * store cannot be opened or the transaction cannot be begun.
+ * Returns 0, -1 or the failing store status. As with the saves, the switch-state lock stays held if the
+ * store cannot be opened or the transaction cannot be started.
  */
 int32_t DVSState_RetrieveDVSUpgradeInfo(void);
 
-/* What GetDvsBasicInfoFromFileHyp says of one switch. All pointers are lent by the switch table. */
+/* One switch in the result of GetDvsBasicInfoFromFileHyp. The switch table owns the strings. */
 typedef struct {
     const char *switchId;    /* the switch's id */
-    const char *name;        /* its display name; "unknown" where it has none */
-    const char *portsetName; /* the host property "com.orbeno.common.host.portset"; NULL where it is absent */
+    const char *name;        /* its display name; "unknown" if it has none */
+    const char *portsetName; /* the host property "com.orbeno.common.host.portset"; NULL if absent */
 } DvsBasicInfoEntry;
 
 typedef struct {
-    DvsBasicInfoEntry entries[32]; /* `count` of them, in the order of the switch table */
-    int32_t count;                 /* 0 where the state file cannot be read */
+    DvsBasicInfoEntry entries[32]; /* the first `count` are valid, in the order of the switch table */
+    int32_t count;                 /* 0 if the state file cannot be read */
 } DvsBasicInfo;
 
 /*
  * Lists the switches of the host's state file. The switches stay in the switch table and the file's buffer
- * stays allocated: what the result points to is valid until the table is next reset. Takes no lock.
+ * stays allocated, so the result is valid until the next reset of the table. Takes no lock.
  */
 DvsBasicInfo GetDvsBasicInfoFromFileHyp(void);
 
-/* Whether `s` equals one of the first `n` texts of `array`; false where either is NULL or n is 0. */
+/* True if `s` equals one of the first `n` texts of `array`; false if either is NULL or n is 0. */
 bool StringExistInArray(const char *s, const char **array, uint32_t n);
 
-/* Whose property it is; selects the mapping table. */
+/* Class of a property; selects the mapping table. */
 enum {
     DVS_PROP_CLASS_GLOBAL = 0, /* a switch's global property */
     DVS_PROP_CLASS_HOST = 1,   /* a switch's property on this host */
     DVS_PROP_CLASS_PORT = 2    /* a property of one port */
 };
 
-/* One row of a mapping table: where a property lives in the store, and which converter carries it there and
- * back. */
+/* One row of a mapping table: where a property lives in the store, and which converter saves and loads it. */
 typedef struct {
-    const char *key;   /* the property's key; "DEFAULT": the row for what no other takes; NULL at the end */
+    const char *key;   /* the property's key; "DEFAULT" for keys without a row; NULL in the end row */
     char path[5][128]; /* names from the switch's or port's object down to the leaf; unused slots all zero */
-    uint32_t depth;    /* how many names the path has; 0 at the end */
-    uint32_t converterType; /* 0 to 36; 37 at the end */
-    uint32_t loadPropType;  /* type word of what a load rebuilds from this row: 16; 0 at the end */
+    uint32_t depth;    /* number of names in the path; 0 in the end row */
+    uint32_t converterType; /* 0 to 36; 37 in the end row */
+    uint32_t loadPropType;  /* type word of the loaded property: 16; 0 in the end row */
     uint32_t reserved;      /* always 0 */
 } DVSProp2ConfigEntry;
 
@@ -142,9 +138,9 @@ _Static_assert(sizeof(DVSProp2ConfigEntry) == 664, "the rows are exported data")
 #endif
 
 /*
- * The mapping tables, read from their first row to the end row: a save takes the first row of a key, a load
- * goes through them in order. Ordinary writable data: a changed row counts from the next switch on; nothing
- * locks them.
+ * The mapping tables, from their first row to the end row. A save uses the first row with the key; a load
+ * processes the rows in order. Ordinary writable data: a changed row takes effect from the next switch on.
+ * No lock protects them.
  */
 extern DVSProp2ConfigEntry dvsGlobalProp2Config[], dvsPortProp2Config[], dvsHostProp2Config[];
 
@@ -154,13 +150,13 @@ extern DVSProp2ConfigEntry *dvsConfigMaps[];
 /* dvsConfigMaps[kind]; the kind is not checked. */
 DVSProp2ConfigEntry *GetConfigMap(int kind);
 
-/* What a save clears out of an object that exists, each list ended by NULL: values, singleton sub-objects,
- * and lists of instances. */
+/* What a save clears from an existing object: values, singleton sub-objects and lists of instances. Each list
+ * is NULL-terminated. */
 extern const char *UNUSED_PRIMITIVE_PROPS[], *UNUSED_SINGLETON_PROPS[], *UNUSED_NON_SINGLETON_PROPS[];
 
 /*
- * Enumerations: the store's text at the index of the value, NULL in an empty slot; and, named the other way
- * round, the value at the position of the text.
+ * Enumerations. Value-to-text arrays hold the store's text at the index of the value, NULL in an empty slot.
+ * Text-to-value arrays hold the value at the position of the text.
  */
 extern const char *TEAMING_POLICY_SCHEMA[]; /* 7 slots, the first and the last empty */
 extern int32_t TEAMING_POLICY_ENUM[];       /* 6 values by slot of TEAMING_POLICY_SCHEMA; not its inverse */
@@ -175,8 +171,8 @@ extern const char *LACP_MODE_2_CAHRS[];                /* 4 slots, the last empt
 extern const char *LACP_LB_POLICY_SCHEMA[];            /* 22 slots, the last empty */
 extern const char *CDP_MODE_2_CHARS[];                 /* 3 slots, the last empty */
 extern const char *CDP_OPERATION_2_CHARS[];            /* 5 slots, the last empty */
-extern int32_t CHARS_2_CDP_MODE[];                     /* 3 values; the last stands for an unknown text */
-extern int32_t CHARS_2_CDP_OPERATION[];                /* 5 values; the last stands for an unknown text */
+extern int32_t CHARS_2_CDP_MODE[];                     /* 3 values; the last is for unknown texts */
+extern int32_t CHARS_2_CDP_OPERATION[];                /* 5 values; the last is for unknown texts */
 
 #ifdef __cplusplus
 }

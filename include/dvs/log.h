@@ -7,16 +7,16 @@ extern "C" {
 #endif
 
 /*
- * Where messages go. Every message goes to its stated stream by default (standard output, standard error or the
- * host's log); with a sink set it goes there instead, whole, one call a message.
+ * Where messages go. By default every message goes to its own stream: standard output, standard error or the host's
+ * log. If a sink is set, it receives all messages instead, one call per whole message.
  *
- * sink   called with the level the message prints at (-1 for a message that no level guards), the text exactly as it
- *        would be printed, line end included, and `arg`. It must not call back into the library, and `text` is lent
- *        for the call only. NULL restores the default streams.
- * arg    kept and passed on; never looked at.
+ * sink   called with the message's level (-1 for a message that no level guards), the text exactly as it would be
+ *        printed, including the newline, and `arg`. It must not call back into the library. `text` is valid only
+ *        during the call. NULL restores the default streams.
+ * arg    passed to the sink unchanged.
  *
- * Takes a lock of its own for the exchange only: set the sink before other threads use the library, or accept that a
- * message in flight still reaches the old one.
+ * Takes its own lock, only for the exchange. Set the sink before other threads use the library; otherwise a message
+ * in flight may still reach the old sink.
  */
 typedef void (*DVSLogSink)(int level, const char *text, void *arg);
 void DVSLog_SetSink(DVSLogSink sink, void *arg);

@@ -9,9 +9,9 @@ extern "C" {
 #endif
 
 /*
- * Statuses: 32-bit words of the hypervisor kernel's status space, 0 on success. Every operation that returns
- * HYP_ReturnStatus says in its own comment which of these it gives and what each means there.
- * HYP_ReturnStatusToString (the host's service) gives each a short text.
+ * Statuses: 32-bit words of the hypervisor kernel's status space, 0 on success. The comment of each operation that
+ * returns HYP_ReturnStatus lists the statuses it returns and what each means there.
+ * HYP_ReturnStatusToString (a host service) returns a short text for each.
  */
 typedef uint32_t HYP_ReturnStatus;
 
