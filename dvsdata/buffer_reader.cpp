@@ -1,8 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Reading serialized lists: the header's checks, the walk over the entries, lists made from it, and lists
-// read where they lie. Every number in a buffer is distrusted: nothing is read outside the length that the
-// header says, which is checked against the length given first. Leans on format.h and the list's record;
-// deserialize.cpp and the state's deserialization stand on it.
+// Reads serialized lists: checks the header, walks the entries, builds lists, and reads lists in place.
+// Buffers are untrusted: nothing outside the length in the header is read, and that length is first checked
+// against the given one. Used by deserialize.cpp and the state's deserialization.
 
 #include <cstring>
 #include <memory>
@@ -15,7 +14,7 @@
 namespace dvs::data {
 namespace {
 
-/// An entry whose sizes were checked.
+/// An entry with checked sizes.
 struct Place {
     const std::uint8_t *at;
     std::uint32_t size, dataLen;
@@ -35,7 +34,7 @@ bool IsAligned(std::size_t value) {
     return HYP_BAD_PARAM;
 }
 
-/// The entry at `offset`, which is not behind the end of the buffer. HYP_NOT_FOUND at the end marker.
+/// Reads the entry at `offset`, which must not be past the buffer's end. HYP_NOT_FOUND at the end marker.
 inline HYP_ReturnStatus PlaceAt(Bytes buf, std::uint32_t offset, Place *place) {
     const std::uint32_t remaining = static_cast<std::uint32_t>(buf.size()) - offset;
     if (remaining < kMarkerSize) [[unlikely]]
@@ -45,7 +44,7 @@ inline HYP_ReturnStatus PlaceAt(Bytes buf, std::uint32_t offset, Place *place) {
     if (size == 0) return HYP_NOT_FOUND;
     if (size > remaining) [[unlikely]]
         return BlockTooLarge(size);
-    // The room check refuses every size below 143, hence also an entry without a whole fixed part.
+    // The room check rejects every size below 143, so also an entry without a whole fixed part.
     const std::uint32_t dataLen = remaining >= kEntryFixedSize ? Load32(at + kDataLenOffset) : 0;
     if (dataLen > size || size - dataLen < kMinEntryRoom) [[unlikely]]
         return BadLengths(dataLen, size);
@@ -66,7 +65,7 @@ HYP_ReturnStatus CheckVersion(Bytes buf) {
     return HYP_BAD_PARAM;
 }
 
-/// True when the sum of the bytes given, `given` of them, is that of the buffer and nothing else.
+/// True if the known sum, over `given` bytes, covers exactly this buffer.
 bool IsSumOf(Bytes buf, KnownSum known, std::size_t given) {
     return known.known && buf.size() == given && IsAligned(buf.size()) && buf.size() > kUnsummedSize;
 }
@@ -75,10 +74,11 @@ struct FreeList {
     void operator()(DVSData *list) const { DVSData_Free(list); }
 };
 
-/// A value up to here makes an entry whose size cannot wrap.
+/// Up to this value length, an entry's size cannot wrap.
 constexpr std::uint32_t kMaxPlainLen = UINT32_MAX / 2;
 
-/// Append() of an entry that lies there as it is to be: one copy, and zeros for what the format leaves open.
+/// Appends an entry whose image can be copied as is: one copy, plus zeros for the bytes the format leaves
+/// open.
 inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
     const NameField field(place.at + kNameOffset);
     const std::string_view name(reinterpret_cast<const char *>(place.at + kNameOffset), field.Len());
@@ -94,14 +94,14 @@ inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
                 std::size_t{kEntryFixedSize} + place.dataLen);
     if (!field.IsPlain()) [[unlikely]]
         std::memset(entry->name + name.size(), 0, kNameSize - name.size());
-    entry->serialSize = serialSize; // not always what the image says
+    entry->serialSize = serialSize; // may differ from the image
     Link(list, entry, serialSize, name);
     return HYP_OK;
 }
 
-/// What the entries of a sound buffer take in a list's own block. 0, which has each be a block of its own,
-/// for every other buffer, so that what is wrong with it comes out as it always does; and where an entry more
-/// or less is a matter of messages.
+/// The room that the entries of a valid buffer need in a list's own block. Returns 0, so that each entry gets
+/// its own block, for a faulty buffer (its faults are then reported as usual) and if messages print for each
+/// entry.
 std::uint64_t RoomFor(Bytes buf, std::uint32_t typeMask) {
     if (Emits(kDetail)) return 0;
     std::uint64_t room = 0;
@@ -119,7 +119,7 @@ std::uint64_t RoomFor(Bytes buf, std::uint32_t typeMask) {
 HYP_ReturnStatus AppendAll(DVSData *list, Bytes buf, std::uint32_t typeMask) {
     Place place{};
     HYP_ReturnStatus status;
-    // The offset never passes the end: each entry's size was checked against what remains.
+    // The offset never passes the end: each entry's size was checked against the remaining bytes.
     for (std::uint32_t offset = kHeaderSize; (status = PlaceAt(buf, offset, &place)) == HYP_OK;
          offset += place.size) {
         if (Emits(kEntry)) [[unlikely]]
@@ -183,8 +183,8 @@ HYP_ReturnStatus BufferReader::Open(Bytes buf, KnownSum known, PartSums parts) {
     return CheckChecksum(buf_, parts == PartSums::Yes ? SumParts() : Checksum(buf_));
 }
 
-// Guesses the entries before they are checked, and sums each value by itself on the way. Where the guess
-// fails the rest is summed as one piece: the result is the checksum in any case.
+// Assumes the entries are valid before they are checked, and sums each value separately. If that fails, it
+// sums the rest as one piece; the total is the checksum in both cases.
 std::uint32_t BufferReader::SumParts() {
     numParts_ = 0;
     if (buf_.size() <= kUnsummedSize) return 0;
@@ -232,7 +232,7 @@ HYP_ReturnStatus InPlaceList::Open(Bytes buf, std::uint32_t typeMask, KnownSum k
     reader_ = start_;
     start_.Quiet();
 
-    // The messages are those of a list being built, which whoever reads them expects to see.
+    // Print the messages of building a list, as readers of the log expect.
     EmitAllocating();
     std::uint32_t serialSize = kMinBufferSize;
     EmitAllocated(serialSize);
@@ -252,7 +252,7 @@ HYP_ReturnStatus InPlaceList::Open(Bytes buf, std::uint32_t typeMask, KnownSum k
 }
 
 bool InPlaceList::Next(EntryRef *entry) {
-    // Everything was checked when the buffer was opened, so the only failure left is the end.
+    // Open checked everything, so the only possible failure is the end.
     while (reader_.Next(entry) == HYP_OK)
         if (entry->propType & typeMask_) return true;
     return false;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The read-only cursor of buffer_view.h. Its checks are kept in the order of the deserializer's
-// (buffer_reader.cpp); a test holds the two against each other on damaged buffers.
+// The read-only cursor of buffer_view.h. Its checks are in the order of the deserializer's
+// (buffer_reader.cpp); a test compares the two on damaged buffers.
 
 #include "dvsdata/buffer_view.h"
 
@@ -15,7 +15,7 @@ namespace {
 struct FaultRow {
     const char *text;
     HYP_ReturnStatus status;
-    const char *numbers; // how found and expected are shown
+    const char *numbers; // format of found and expected
 };
 
 // In the order of FaultKind.
@@ -115,8 +115,8 @@ bool BufferView::Stop(FaultKind kind, std::size_t offset, std::uint32_t found, s
 
 bool BufferView::Next(EntryView *entry) {
     if (!walking_) return false;
-    // `offset_` never passes the end: each entry's size is checked against what remains before it is stepped
-    // over.
+    // `offset_` never passes the end: each entry's size is checked against the remaining bytes before the
+    // step.
     const auto remaining = static_cast<std::uint32_t>(bytes_.size() - offset_);
     if (remaining < kMarkerSize) return Stop(FaultKind::NoMarker, offset_, remaining, kMarkerSize);
     const Bytes rest = bytes_.subspan(offset_);

@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The additive checksum, in the widest form the processor offers. Every serialization and every read passes
-// each byte through here, and a plain loop is several times slower than the copy it guards. Leans on format.h
-// only.
+// The additive checksum, in the widest form the processor supports. Every serialization and every read sums
+// each byte here; a plain loop is several times slower than the copy of the data.
 
 #include "dvsdata/format.h"
 
@@ -73,7 +72,7 @@ __attribute__((target("avx2"))) std::uint32_t SumAvx2(Bytes bytes) {
 #else
 
 std::uint32_t SumPortable(Bytes bytes) {
-    // Four independent accumulators: one would wait for its own previous addition.
+    // Four independent accumulators, so that no addition waits for the previous one.
     std::uint32_t a = 0, b = 0, c = 0, d = 0;
     while (bytes.size() >= 16) {
         a += Load32(bytes.data());

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The exported ways to read a buffer: into a list, or a single value without one. Leans on the readers of
-// list_internal.h.
+// The exported functions that read a buffer: into a list, or a single value without a list. Uses the readers
+// of list_internal.h.
 
 #include <cstring>
 
@@ -10,13 +10,13 @@
 namespace dvs::data {
 namespace {
 
-/// Whoever has no buffer has one of no bytes.
+/// A null buffer is treated as empty.
 Bytes AsBytes(const void *buf, std::uint32_t bufLen) {
     return {static_cast<const std::uint8_t *>(buf), buf ? bufLen : 0};
 }
 
-/// Copies the value of the entry at `at`, which matched, out of a buffer that has `room` bytes behind its
-/// fixed part.
+/// Copies the value of the matching entry at `at` out of a buffer with `room` bytes after the entry's fixed
+/// part.
 HYP_ReturnStatus CopyValue(const std::uint8_t *at, std::size_t room, const char *name, void *propVal,
                            std::uint32_t propValSize) {
     const std::uint32_t dataLen = Load32(at + kDataLenOffset);
@@ -30,8 +30,7 @@ HYP_ReturnStatus CopyValue(const std::uint8_t *at, std::size_t room, const char 
     return HYP_OK;
 }
 
-// Laxer than a list's reader: an entry's size and value length need not agree. All that is read lies in the
-// buffer.
+// Laxer than a list's reader: an entry's size and value length need not agree. All reads stay in the buffer.
 HYP_ReturnStatus FindValue(Bytes buf, const char *name, void *propVal, std::uint32_t propValSize) {
     const std::string_view wanted(name);
     for (std::size_t offset = kHeaderSize;;) {
@@ -73,7 +72,7 @@ HYP_ReturnStatus DVSData_DeserializeGetPropVal(const void *buf, uint32_t bufLen,
     if (!buf || !name || !propVal) return HYP_BAD_PARAM;
     Bytes bytes = AsBytes(buf, bufLen);
     if (const HYP_ReturnStatus status = CheckLengths(&bytes); status != HYP_OK) return status;
-    // Here the checksum is judged before the version, unlike where a list is built.
+    // This call checks the checksum before the version, unlike the calls that build a list.
     if (const HYP_ReturnStatus status = CheckChecksum(bytes, Checksum(bytes)); status != HYP_OK)
         return status;
     const std::uint16_t version = Load16(bytes.data() + kVersionOffset);

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The emitter of the property lists and their debug level, on top of dvsdata/log.h.
+// Message output of the property lists and their debug level, on top of dvsdata/log.h.
 
 #include "dvsdata/emit.h"
 

@@ -2,8 +2,8 @@
 #ifndef DVSDATA_FORMAT_H
 #define DVSDATA_FORMAT_H
 
-// The serialized form of a property list: the one definition of its sizes, offsets and checksum. Bottom of
-// the dvsdata layer; list, writer, readers and the read-only view lean on it.
+// The serialized form of a property list: the one definition of its sizes, offsets and checksum. Used by the
+// list, the writer, the readers and the read-only view.
 //
 // All numbers are little-endian, every entry starts on a 4-byte boundary of the buffer.
 //
@@ -16,7 +16,7 @@
 //
 //   entry    offset  size
 //                 0     4  entry size: (value length + 146) rounded down to a multiple of 4
-//                 4   128  name, NUL-terminated; bytes behind the NUL written as 0
+//                 4   128  name, NUL-terminated; bytes after the NUL written as 0
 //               132     4  property type word
 //               136     4  value length
 //               140        value, then padding up to the entry size (2 to 5 bytes when written here),
@@ -53,27 +53,27 @@ inline constexpr std::uint32_t kMaxNameLen = kNameSize - 1;
 inline constexpr std::uint32_t kPropTypeOffset = kNameOffset + kNameSize;
 inline constexpr std::uint32_t kDataLenOffset = kPropTypeOffset + 4;
 inline constexpr std::uint32_t kEntryFixedSize = kDataLenOffset + 4;
-/// Readers refuse an entry with less room than this beside its value; the rounding of EntrySize() always
-/// leaves it.
+/// Readers reject an entry with less room than this besides its value; EntrySize() always leaves at least
+/// this much.
 inline constexpr std::uint32_t kMinEntryRoom = 143;
 
-/// The header and the first 20 bytes of the first entry (its size and 16 characters of its name) are not
-/// summed.
+/// The checksum excludes the header and the first 20 bytes of the first entry (its size and 16 characters of
+/// its name).
 inline constexpr std::uint32_t kUnsummedSize = 32;
 
 inline constexpr std::uint32_t kDefaultPropType = 0x20;
 inline constexpr std::uint32_t kPropKindMask = 0xfc;
-/// Entries with none of these bits are left out by DVSData_Deserialize.
+/// DVSData_Deserialize skips entries with none of these bits.
 inline constexpr std::uint32_t kDeserializeTypeMask = 0x800000fc;
 
-/// Size of the serialized entry for a value of that length. Wraps for lengths close to 4 GiB; see
+/// Size of the serialized entry for a value of this length. Wraps for lengths close to 4 GiB; see
 /// DVSData_Append.
 constexpr std::uint32_t EntrySize(std::uint32_t dataLen) {
     return (dataLen + (kMinEntryRoom + 3)) & ~3u;
 }
 static_assert(EntrySize(0) == 144 && EntrySize(1) == 144 && EntrySize(2) == 148 && EntrySize(6) == 152);
 
-// The in-memory entry carries its serialized image behind the link pointer.
+// The in-memory entry holds its serialized image after the link pointer.
 inline constexpr std::size_t kImageOffset = offsetof(DVSDataEntry, serialSize);
 static_assert(kImageOffset == sizeof(void *));
 static_assert(offsetof(DVSDataEntry, name) == kImageOffset + kNameOffset);
@@ -81,7 +81,7 @@ static_assert(offsetof(DVSDataEntry, propType) == kImageOffset + kPropTypeOffset
 static_assert(offsetof(DVSDataEntry, dataLen) == kImageOffset + kDataLenOffset);
 static_assert(offsetof(DVSDataEntry, data) == kImageOffset + kEntryFixedSize);
 
-// Bytes enter and leave through these: buffers come from outside and need not be aligned.
+// Buffer accessors: buffers come from outside and may be unaligned.
 inline std::uint32_t Load32(const void *from) {
     std::uint32_t value;
     std::memcpy(&value, from, sizeof value);
@@ -99,9 +99,8 @@ inline void Store16(void *to, std::uint16_t value) {
     std::memcpy(to, &value, sizeof value);
 }
 
-/// Fills a name field: at most 127 characters, then zeros. In pieces of fixed size, because for a length that
-/// is only known to be small compilers emit string instructions, which take longer than all the rest of an
-/// append.
+/// Fills a name field: at most 127 characters, then zeros. Copies in pieces of fixed size: for a small
+/// variable length compilers emit string instructions, which cost more than the rest of an append.
 inline void StoreName(void *field, std::string_view name) {
     constexpr std::size_t kPiece = 16;
     auto *const to = static_cast<char *>(field);
@@ -121,14 +120,14 @@ inline void StoreName(void *field, std::string_view name) {
     std::memcpy(to + size - kPiece, name.data() + size - kPiece, kPiece);
 }
 
-/// Wrapping sum of the u32 words of `bytes`, plus each byte of an incomplete last word. Sums of neighbouring
-/// pieces add up to the sum of the whole as long as every piece but the last is a multiple of 4 long.
+/// Wrapping sum of the u32 words of `bytes`, plus each byte of an incomplete last word. The sum of a whole is
+/// the sum of its pieces if every piece except the last has a length that is a multiple of 4.
 [[nodiscard]] std::uint32_t Sum(Bytes bytes);
 
-/// Sum() as every processor of the family can do it; for tests that hold the two against each other.
+/// Sum() without processor extensions, for tests that compare the two.
 [[nodiscard]] std::uint32_t SumBaseline(Bytes bytes);
 
-/// Checksum of a whole buffer: the sum of all but its first 32 bytes, hence 0 for a buffer of up to 32.
+/// Checksum of a whole buffer: the sum of all but its first 32 bytes; 0 for a buffer of up to 32 bytes.
 [[nodiscard]] inline std::uint32_t Checksum(Bytes buffer) {
     return buffer.size() <= kUnsummedSize ? 0 : Sum(buffer.subspan(kUnsummedSize));
 }

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Writing nested buffers into one block, and the filters of a serialization. Leans on format.h; serialize.cpp
-// and the state's serialization stand on it.
+// Writes nested buffers into one block, and filters entries of a serialization. Used by serialize.cpp and the
+// state's serialization.
 
 #include <cassert>
 #include <cstring>
@@ -11,10 +11,10 @@
 namespace dvs::data {
 namespace {
 
-/// Marks data that must stay whatever a named filter leaves out.
+/// Marks data that no named filter excludes.
 constexpr const char *kPersistName = "com.orbeno.common.port.volatile.persist";
 
-/// The entries' part of the list's serialized form, end marker included, as the list's own books have it.
+/// The entries' part of the list's serialized form, end marker included, according to the list's own size.
 std::uint32_t EntriesSize(const DVSData *list) {
     return list->serialSize - kHeaderSize;
 }
@@ -103,7 +103,7 @@ void ImageWriter::EndEntry() {
     assert(depth_ > 0 && (failed_ || at_ <= levels_[depth_ - 1].entryEnd));
     const std::size_t end = levels_[depth_ - 1].entryEnd;
     if (end < at_)
-        failed_ = true; // More value than announced.
+        failed_ = true; // The value is longer than BeginEntry stated.
     else
         Zero(end - at_);
 }

@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The property list: an ordered chain of entries, each carrying the image of its serialized form. Bottom of
-// the dvsdata layer; leans on format.h for sizes and emit.h for messages. Everything above uses it through
-// dvs/data.h.
+// The property list: an ordered chain of entries, each holding the image of its serialized form. Other layers
+// use it through dvs/data.h.
 
 #include "dvsdata/list_internal.h"
 
@@ -31,7 +30,7 @@ DVSDataEntry *Previous(const DVSData *list, const DVSDataEntry *entry) {
     return previous;
 }
 
-/// Takes the entry out of the chain and out of the list's size, and says so. The caller frees it.
+/// Removes the entry from the chain and from the list's size, with a message. The caller frees it.
 void Unlink(DVSData *list, DVSDataEntry *previous, DVSDataEntry *entry) {
     RecordOf(list).names.Removing(list, entry);
     (previous ? previous->next : list->head) = entry->next;
@@ -41,8 +40,8 @@ void Unlink(DVSData *list, DVSDataEntry *previous, DVSDataEntry *entry) {
         EmitRemoved(entry->name, entry->dataLen, entry->propType, list->serialSize);
 }
 
-/// Writes all but the value. Bytes the format leaves open are zero: images are reproducible and carry no heap
-/// contents.
+/// Writes everything except the value. Bytes that the format leaves open are zero, so images are reproducible
+/// and contain no heap contents.
 void FillEntry(DVSDataEntry *entry, std::uint32_t serialSize, std::string_view name, std::uint32_t dataLen,
                std::uint32_t propType) {
     ClearPadding(entry, serialSize);
@@ -62,7 +61,7 @@ bool Overlaps(const void *bytes, std::size_t size, const DVSDataEntry *entry) {
 HYP_ReturnStatus Replace(DVSData *list, DVSDataEntry *old, std::string_view name, const void *data,
                          std::uint32_t dataLen, std::uint32_t propType) {
     const std::uint32_t newType = propType ? propType : old->propType;
-    // Name and value may be the old entry's own: then it has to outlive the append.
+    // Name and value may belong to the old entry, which must then outlive the append.
     const bool ownBytes = Overlaps(data, dataLen, old) || Overlaps(name.data(), name.size() + 1, old);
     Unlink(list, Previous(list, old), old);
     if (!ownBytes) FreeEntry(list, old);
@@ -78,7 +77,7 @@ HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, 
     if (!entry) return Append(list, name, data, dataLen, effectiveType);
     if (entry->dataLen != dataLen) return Replace(list, entry, name, data, dataLen, propType);
 
-    // Type 0 resets the type here and keeps it in Replace: callers rely on both.
+    // Type 0 resets the type here but keeps it in Replace; callers rely on both.
     if (dataLen) std::memmove(entry->data, data, dataLen);
     entry->propType = effectiveType;
     EmitUpdated(name, dataLen, list->serialSize);
@@ -153,7 +152,7 @@ void DVSData_Free(DVSData *list) {
             list->freeFn(entry);
         }
     }
-    // What has no block of its own goes with the handle, and need not even be looked at.
+    // Entries without their own block are freed with the handle.
     for (DVSDataEntry *entry; record.separateNum && (entry = list->head);) {
         list->head = entry->next;
         FreeEntry(list, entry);
@@ -204,7 +203,7 @@ HYP_ReturnStatus DVSData_Next(DVSData *list, DVSDataEntry *current, DVSDataEntry
 }
 
 void DVSData_ForEach(DVSData *list, DVSDataForEachFn callback, void *arg) {
-    // The callback may remove the entry it is given, so its successor is fetched first.
+    // The callback may remove its entry, so fetch the successor first.
     for (DVSDataEntry *entry = list->head, *next; entry; entry = next) {
         next = entry->next;
         if (callback(entry->name, entry->data, entry->dataLen, entry->propType, arg)) return;

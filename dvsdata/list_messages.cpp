@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The lines that lists print while they are built and written (list_internal.h): in one place, because the
-// switch state does the same work without building a list and prints the same. Leans on the emitter.
+// The messages that lists print while they are built and written (list_internal.h). In one place, because the
+// switch state prints the same messages when it does the same work without a list.
 
 #include "dvsdata/emit.h"
 #include "dvsdata/list_internal.h"

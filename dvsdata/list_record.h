@@ -2,18 +2,17 @@
 #ifndef DVSDATA_LIST_RECORD_H
 #define DVSDATA_LIST_RECORD_H
 
-// What a list's block holds behind the handle that callers see, and the steps that every addition to a list
-// and every removal share. For list.cpp and for the reading of buffers, which makes entries of its own; leans
-// on the name index.
+// The private data after the list handle in its block, and the steps shared by all additions and removals.
+// Used by list.cpp and by the reader of buffers, which creates entries itself.
 //
-// An entry has a block of its own, or a place in that of the handle:
+// An entry has its own block or a place in the handle's block:
 //
 //     | DVSData | NameIndex ... | entry | entry | entry |        | entry |   | entry |
-//     ^ the handle               ^ room for those of a buffer    ^ added later
+//     ^ the handle               ^ room for a buffer's entries   ^ added later
 //
-// The second form is for lists that the library itself makes of whole buffers, of ports by the thousand, from
-// the process heap: there a block an entry costs more than all the rest of reading. Places of entries that
-// were removed are not used again. Lists with a caller's allocator never have such room.
+// The library uses the second form for lists that it builds from whole buffers, such as thousands of ports,
+// on the process heap: one block per entry would cost more than the rest of reading. Places of removed
+// entries are not reused. Lists with a caller's allocator never have such room.
 
 #include <cstddef>
 #include <cstdint>
@@ -37,15 +36,15 @@
 
 namespace dvs::data {
 
-/// A list with what the library keeps for itself behind it, in the same block.
+/// A list followed by the library's private data, in one block.
 struct ListRecord {
     DVSData face;
     NameIndex names;
-    std::uint8_t *room, *roomEnd; // places not taken yet, in this block
-    std::uint32_t separateNum;    // entries with a block of their own
+    std::uint8_t *room, *roomEnd; // unused places in this block
+    std::uint32_t separateNum;    // entries with their own block
 };
 static_assert(offsetof(ListRecord, face) == 0);
-// Agents are compiled with the handle: its fields stay where they are.
+// Agents are compiled with the handle: its fields must not move.
 static_assert(offsetof(DVSData, serialSize) == 0);
 static_assert(offsetof(DVSData, head) == 8);
 static_assert(offsetof(DVSData, tail) == 16);
@@ -57,16 +56,16 @@ inline ListRecord &RecordOf(DVSData *list) {
     return *reinterpret_cast<ListRecord *>(list);
 }
 
-/// Where the list's room begins.
+/// Start of the list's room.
 inline std::uint8_t *PlacesOf(DVSData *list) {
     return reinterpret_cast<std::uint8_t *>(&RecordOf(list) + 1);
 }
 
-/// DVSData_Alloc with so much room for entries behind the handle.
+/// DVSData_Alloc with `room` bytes for entries after the handle.
 [[nodiscard]] HYP_ReturnStatus NewList(DVSData **list, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn,
                                        std::uint64_t room);
 
-/// Sanitizers see places as the heap's blocks: with a gap between them, and gone when they are given up.
+/// Makes sanitizers treat places like heap blocks: with a gap between them, and inaccessible once freed.
 inline void Forbid([[maybe_unused]] const void *bytes, [[maybe_unused]] std::size_t size) {
 #ifdef DVS_ADDRESS_SANITIZER
     __asan_poison_memory_region(bytes, size);
@@ -78,7 +77,7 @@ inline void Allow([[maybe_unused]] const void *bytes, [[maybe_unused]] std::size
 #endif
 }
 
-/// What an entry takes of a list's room.
+/// Bytes that an entry takes from a list's room.
 constexpr std::uint64_t PlaceSize(std::uint32_t serialSize) {
 #ifdef DVS_ADDRESS_SANITIZER
     constexpr std::uint64_t kGap = 16;
@@ -88,14 +87,14 @@ constexpr std::uint64_t PlaceSize(std::uint32_t serialSize) {
     return (kImageOffset + std::uint64_t{serialSize} + kGap + 7) & ~std::uint64_t{7};
 }
 
-/// Memory for an entry; null when there is none.
+/// Allocates an entry; null if out of memory.
 inline DVSDataEntry *NewEntry(DVSData *list, std::uint32_t serialSize) {
     void *const block = list->allocFn(kImageOffset + std::uint64_t{serialSize});
     RecordOf(list).separateNum += block != nullptr;
     return static_cast<DVSDataEntry *>(block);
 }
 
-/// The same from the list's room, as far as that goes.
+/// Allocates an entry from the list's room; falls back to NewEntry if the room is used up.
 inline DVSDataEntry *NewPlace(DVSData *list, std::uint32_t serialSize) {
     ListRecord &record = RecordOf(list);
     const std::uint64_t size = PlaceSize(serialSize);
@@ -106,7 +105,7 @@ inline DVSDataEntry *NewPlace(DVSData *list, std::uint32_t serialSize) {
     return reinterpret_cast<DVSDataEntry *>(place);
 }
 
-/// Releases an entry that is in no list any more.
+/// Frees an entry that is in no list.
 inline void FreeEntry(DVSData *list, DVSDataEntry *entry) {
     ListRecord &record = RecordOf(list);
     const std::less<const void *> before;
@@ -118,13 +117,13 @@ inline void FreeEntry(DVSData *list, DVSDataEntry *entry) {
     list->freeFn(entry);
 }
 
-/// The padding lies in the last 5 bytes of the block; this runs into the value, or the fields before an empty
-/// one, which are written next.
+/// Clears the padding, which is in the last 5 bytes of the block. This also clears part of the value, or of
+/// the fields before an empty one; both are written next.
 inline void ClearPadding(DVSDataEntry *entry, std::uint32_t serialSize) {
     std::memset(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset + serialSize - 8, 0, 8);
 }
 
-/// Puts a finished entry behind the tail. `name` is its name, uncut.
+/// Appends a finished entry. `name` is its full name, not truncated.
 inline void Link(DVSData *list, DVSDataEntry *entry, std::uint32_t serialSize, std::string_view name) {
     entry->next = nullptr;
     (list->tail ? list->tail->next : list->head) = entry;

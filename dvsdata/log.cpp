@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Message delivery. The lowest piece of the library: every family's emitter stands on it, it stands on nothing.
+// Message delivery. Every family's message output uses it; it uses nothing else of the library.
 
 #include "dvsdata/log.h"
 
@@ -25,7 +25,7 @@ Destination Current() {
 }
 
 void FormatToSink(const Destination &to, int level, const char *format, va_list args) {
-    // Most messages are one short line; a longer one costs an allocation, and is cut when there is no memory.
+    // Most messages are one short line. A longer one needs an allocation; if that fails, it is truncated.
     char line[512];
     va_list again;
     va_copy(again, args);

@@ -2,9 +2,9 @@
 #ifndef DVSDATA_NAME_FIELD_H
 #define DVSDATA_NAME_FIELD_H
 
-// The name field of a serialized entry, as somebody else wrote it: how long the name is and whether what lies
-// behind it is what this library would have written. Both from one look at the whole field and without a
-// branch that depends on it, since names of all lengths take turns. Leans on format.h.
+// The name field of a serialized entry from any writer: the length of the name, and whether the bytes after
+// it are what this library would have written. Computes both from the whole field without a data-dependent
+// branch, because name lengths vary.
 
 #include <bit>
 #include <cstdint>
@@ -18,7 +18,7 @@
 
 namespace dvs::data {
 
-/// A bit for each zero among 64 bytes.
+/// One bit for each zero among 64 bytes.
 inline std::uint64_t ZerosIn(const std::uint8_t *bytes) {
 #if defined(__SSE2__)
     const auto zeros = [bytes](std::size_t from) {
@@ -39,15 +39,15 @@ inline std::uint64_t ZerosIn(const std::uint8_t *bytes) {
 struct NameField {
     explicit NameField(const std::uint8_t *field) : low(ZerosIn(field)), high(ZerosIn(field + 64)) {}
 
-    /// Characters up to the NUL, at most 127: what a list stores.
+    /// Characters up to the NUL, at most 127, as a list stores them.
     [[nodiscard]] std::uint32_t Len() const {
         if (low) return static_cast<std::uint32_t>(std::countr_zero(low));
         return high ? 64 + static_cast<std::uint32_t>(std::countr_zero(high)) : kMaxNameLen;
     }
 
-    /// It ends in a NUL, and nothing but zeros follow.
+    /// True if the name ends in a NUL and only zeros follow.
     [[nodiscard]] bool IsPlain() const {
-        // Nothing but ones from the lowest one on: adding that one carries all of them away.
+        // If all bits from the lowest one up are set, adding the lowest bit carries them all away.
         const auto onesToTheEnd = [](std::uint64_t bits) { return bits + (bits & -bits) == 0; };
         return low ? onesToTheEnd(low) && ~high == 0 : high && onesToTheEnd(high);
     }

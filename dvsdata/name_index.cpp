@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The name index of property lists; see name_index.h. Leans on list_internal.h for the comparison of names.
+// The name index of property lists (name_index.h).
 
 #include "dvsdata/name_index.h"
 
@@ -22,8 +22,8 @@ std::string_view NameOf(const DVSDataEntry *entry) {
     return {entry->name, ::strnlen(entry->name, kMaxNameLen)};
 }
 
-/// Eight bytes a step, the last ones once more where there are fewer; spread by a multiplication, so that
-/// every bit of a name reaches the bits that are used.
+/// Eight bytes per step; the last step may overlap the previous one. A multiplication spreads them, so that
+/// every bit of a name affects the bits that are used.
 std::uint32_t Hash(std::string_view name) {
     constexpr std::uint64_t kSpread = 0x9e3779b97f4a7c15u;
     std::uint64_t hash = name.size() * kSpread;
@@ -54,13 +54,13 @@ struct alignas(8) NameIndex::Table {
     struct Node {
         DVSDataEntry *entry;
         std::uint32_t hash;
-        std::uint32_t next; // in the chain, or among the free ones
+        std::uint32_t next; // in the chain or in the free list
     };
 
     std::uint32_t size; // a power of two
-    std::uint32_t used; // nodes ever handed out
-    std::uint32_t free; // first of those given back
-    bool inListOrder;   // nodes stand in the order of the list: none was ever given back
+    std::uint32_t used; // nodes ever allocated
+    std::uint32_t free; // head of the free list
+    bool inListOrder;   // nodes are in list order: none was ever freed
 
     static std::uint64_t BlockSize(std::uint32_t size) {
         return sizeof(Table) + std::uint64_t{size} * (sizeof(Bucket) + sizeof(Node));
@@ -78,7 +78,7 @@ struct alignas(8) NameIndex::Table {
         std::memset(static_cast<void *>(Buckets()), 0xff, size * sizeof(Bucket)); // kNone everywhere
     }
 
-    /// A node for each entry. What the smaller table knows need not be worked out again, nor looked at.
+    /// Adds a node for each entry. Reuses the hashes of the smaller table without reading the names again.
     void Fill(DVSData *list, std::uint32_t newSize, const Table *smaller) {
         Clear(newSize);
         const DVSDataEntry *last = nullptr;
@@ -159,7 +159,7 @@ DVSDataEntry *NameIndex::At(std::uint32_t position) const {
     return entry;
 }
 
-/// A bit for each entry whose name has that print.
+/// One bit for each entry whose name has this fingerprint byte.
 std::uint32_t NameIndex::Candidates(std::uint8_t print) const {
     std::uint32_t bits = 0;
 #if defined(__SSE2__)
@@ -183,7 +183,7 @@ void NameIndex::RemoveShort(const DVSDataEntry *entry) {
     const auto position = static_cast<std::uint32_t>(std::countr_zero(left));
     --count_;
     std::memmove(&prints_[position], &prints_[position] + 1, count_ - position);
-    // Every anchor from there on now stands for the entry behind the one it held.
+    // Each anchor from here on moves to the next entry.
     for (std::uint32_t i = (position + kStride - 1) / kStride; i <= count_ / kStride; ++i)
         anchors_[i] = anchors_[i]->next;
 }
@@ -192,7 +192,7 @@ void NameIndex::AddedLong(DVSData *list, DVSDataEntry *entry, std::string_view n
     ++count_;
     if (mode_ == Mode::Hashed && !table_->IsFull())
         table_->Add(entry, Hash(name));
-    else if (mode_ != Mode::Walk || std::has_single_bit(count_)) // Memory may be back after a while.
+    else if (mode_ != Mode::Walk || std::has_single_bit(count_)) // Retry after a failed allocation.
         BuildTable(list);
 }
 

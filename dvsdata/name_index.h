@@ -2,14 +2,14 @@
 #ifndef DVSDATA_NAME_INDEX_H
 #define DVSDATA_NAME_INDEX_H
 
-// Finds an entry by name without walking the list. Kept by whatever changes a list and never by a lookup, so
-// that readers without a lock stay readers; lists hold one in their record (list_record.h).
+// Finds an entry by name without walking the list. Only functions that change a list update the index, never
+// a lookup, so concurrent reads without a lock are safe. Each list holds one in its record (list_record.h).
 //
-// A short list has it in its handle: one byte drawn from each name, compared all at once, and the address of
-// every fourth entry. Nothing is allocated for that. A longer list has a hash table from the list's own
-// allocator. Each chain is in list order, so the first match is the list's first match, and adding goes to
-// the chain's end without comparing anything, however many namesakes there are. Without memory for the table
-// the list is walked.
+// A short list's index is part of its handle: one byte of each name, all compared at once, and the address of
+// every fourth entry. It allocates nothing. A longer list has a hash table from the list's own allocator.
+// Each chain is in list order, so its first match is the list's first match. Adding appends to a chain
+// without any comparison, however many duplicates there are. If allocating the table fails, lookups walk the
+// list.
 
 #include <array>
 #include <cstdint>
@@ -23,15 +23,15 @@ namespace dvs::data {
 
 class NameIndex {
 public:
-    /// Up to here the handle's own bytes do.
+    /// The maximum length of a list that is indexed in the handle.
     static constexpr std::uint32_t kShortMax = 32;
-    /// A list that shrinks to this has no use for its table any more.
+    /// A list that shrinks to this length drops its table.
     static constexpr std::uint32_t kShrinkTo = 16;
 
-    /// The first entry of that name, or null.
+    /// Returns the first entry with this name, or null.
     [[nodiscard]] DVSDataEntry *Find(const DVSData *list, std::string_view name) const;
 
-    /// After `entry` was linked at the tail.
+    /// Call after `entry` was linked at the tail.
     void Added(DVSData *list, DVSDataEntry *entry, std::string_view name) {
         name = name.substr(0, kMaxNameLen);
         if (mode_ == Mode::Short && count_ < kShortMax) [[likely]]
@@ -39,9 +39,9 @@ public:
         else
             AddedLong(list, entry, name);
     }
-    /// Before `entry` is unlinked.
+    /// Call before `entry` is unlinked.
     void Removing(DVSData *list, DVSDataEntry *entry);
-    /// Gives the table back. The index is of no use afterwards unless the list is empty.
+    /// Frees the table. The index is unusable afterwards unless the list is empty.
     void Drop(DVSData *list);
 
 private:
@@ -52,7 +52,7 @@ private:
 
     [[nodiscard]] DVSDataEntry *At(std::uint32_t position) const;
     [[nodiscard]] std::uint32_t Candidates(std::uint8_t print) const;
-    /// One byte of a name, drawn from its end, where names differ.
+    /// One byte derived from the end of a name, where names differ most.
     static std::uint8_t Print(std::string_view name) {
         std::uint32_t word = 0;
         if (name.size() >= sizeof word) [[likely]]

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Finishing a buffer that was written in place (open_buffer.h).
+// Finishes a buffer that was written in place (open_buffer.h).
 
 #include "dvsdata/open_buffer.h"
 
@@ -17,7 +17,7 @@ void FinishBuffer(std::uint8_t *block, std::size_t end, const OpenBuffer &buffer
     Store32(header + kChecksumOffset, checksum);
     Store16(header + kVersionOffset, kFormatVersion);
     if (!outer) return;
-    // The buffer around sums this one's first bytes too, and the bytes since its last nested buffer.
+    // The enclosing buffer also sums this one's first bytes, and the bytes since its last nested buffer.
     outer->sum += checksum + Sum(written.subspan(buffer.start, std::min<std::size_t>(size, kUnsummedSize))) +
                   Sum(written.subspan(outer->summedTo, buffer.start - outer->summedTo));
     outer->summedTo = end;

@@ -2,9 +2,9 @@
 #ifndef DVSDATA_OPEN_BUFFER_H
 #define DVSDATA_OPEN_BUFFER_H
 
-// A serialized buffer that is being written in place, and how it is finished. Each byte is summed once
-// although it counts in the checksum of every buffer around it. Leans on format.h; what writes nested buffers
-// into one block (image_writer.cpp, growing_image.cpp) stands on it.
+// A serialized buffer that is written in place, and how it is finished. Each byte is summed once although it
+// counts in the checksum of every enclosing buffer. Used by the writers of nested buffers (image_writer.cpp,
+// growing_image.cpp).
 
 #include <cstddef>
 #include <cstdint>
@@ -19,13 +19,13 @@ struct OpenBuffer {
     std::uint32_t sum;
 };
 
-/// One that starts at `at`, with nothing summed.
+/// A buffer that starts at `at`, with nothing summed.
 inline OpenBuffer OpenBufferAt(std::size_t at) {
     return {at, at + kUnsummedSize, 0};
 }
 
-/// Fills in the header of the buffer that ends at `end` of the block, marker included. `outer` is the buffer
-/// around it, null for the outermost one.
+/// Fills in the header of the buffer that ends at `end` of the block, marker included. `outer` is the
+/// enclosing buffer; null for the outermost one.
 void FinishBuffer(std::uint8_t *block, std::size_t end, const OpenBuffer &buffer, OpenBuffer *outer);
 
 } // namespace dvs::data

@@ -1,6 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Serialization of lists: the buffer convention of the exported calls around the image writer. Leans on
-// list_internal.h and format.h.
+// Serialization of lists: the exported functions and their buffer convention, on top of the image writer.
 
 #include <cstring>
 
@@ -11,8 +10,8 @@ using namespace dvs::data;
 
 namespace {
 
-/// A buffer of `size` bytes by the convention of dvs/data.h: the caller's, or one of the list's own, which
-/// goes back to the list unless it is kept.
+/// A buffer of `size` bytes by the convention of dvs/data.h: the caller's, or one from the list's allocator,
+/// which is freed unless it is kept.
 class OutputBuffer {
 public:
     OutputBuffer(DVSData *list, void **buf, std::uint32_t *bufLen)
@@ -89,7 +88,7 @@ HYP_ReturnStatus DVSData_SerializeExTypeProp(DVSData *list, void **buf, uint32_t
 }
 
 HYP_ReturnStatus DVSData_SerializeEntry(DVSData *list, const char *name, void **buf, uint32_t *bufLen) {
-    // Clearing the length first refuses every buffer of the caller's. Callers have come to rely on it.
+    // Clearing the length first rejects every caller's buffer. Callers rely on it.
     *bufLen = 0;
     const DVSDataEntry *const entry = FindWholeName(list, name);
     if (!entry) return HYP_NOT_FOUND;

@@ -1,10 +1,9 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The state file's stated sequences (dvs/file.h): direct I/O where the file system takes it, one write, one
-// read, no flush. Called by agents, by state retrieval and by the upgrade; durable.cpp is the variant that
-// survives a power cut.
+// The plain read and write of the state file (dvs/file.h): direct I/O if the file system supports it, one
+// write, one read, no flush. Called by agents, state retrieval and the upgrade. durable.cpp survives a power
+// cut.
 //
-// Opens carry O_NONBLOCK beside what is stated, so that a FIFO under the path's name is an error and not a
-// hang.
+// Opens add O_NONBLOCK, so that a FIFO under the path's name is an error and does not block.
 
 #include "dvs/file.h"
 
@@ -28,7 +27,7 @@ struct Free {
     void operator()(void *block) const { std::free(block); }
 };
 
-/// A block of the process heap with an aligned area in it.
+/// A heap block with an aligned area in it.
 class AlignedBlock {
 public:
     explicit AlignedBlock(uint64_t size) : block_(static_cast<char *>(std::malloc(size + kBlockSize - 1))) {
@@ -52,16 +51,15 @@ Descriptor OpenDirectOrPlain(const char *path, int flags) {
     return Descriptor(fd >= 0 ? fd : open(path, flags | O_CLOEXEC | O_NONBLOCK, kOwnerOnly));
 }
 
-/// Steps 2 to 5 of a write: the file `target` with the buffer in it. `file` stays open for the caller to
-/// close.
+/// Writes the buffer to the file `target`. `file` stays open; the caller closes it.
 HYP_ReturnStatus WriteTarget(const char *target, const void *buf, uint32_t len, Descriptor *file) {
     *file = OpenDirectOrPlain(target, O_WRONLY | O_CREAT);
     if (!*file) {
         Report("failed to open dvsfile %s for write, error: %s\n", target, Err_Errno2String(errno));
         return HYP_IO_ERROR;
     }
-    // One byte and not none, kept as it is: a file that nothing was written to is then of odd size, not
-    // empty.
+    // One byte instead of none, kept on purpose: if nothing else is written, the file has an odd size and is
+    // not empty.
     if (ftruncate(file->Get(), 1) != 0) {
         Report("failed to truncate dvsfile %s, error: %s\n", target, Err_Errno2String(errno));
         return HYP_IO_ERROR;

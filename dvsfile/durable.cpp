@@ -1,8 +1,8 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The write that survives a power cut (dvs/file.h, DVSFile_WriteDurable); dvsctl and the emulator use it.
-// Everything is done relative to one descriptor of the directory, so that lock, temporary file, rename and
-// flush meet the same directory whatever happens to the path meanwhile. Nothing here allocates, apart from
-// the C library's directory stream.
+// The write that survives a power cut (dvs/file.h, DVSFile_WriteDurable). Used by dvsctl and the emulator.
+// All steps use one descriptor of the directory, so that lock, temporary file, rename and sync apply to the
+// same directory even if the path changes meanwhile. Nothing here allocates, except the C library's directory
+// stream.
 
 #include "dvs/file.h"
 
@@ -33,14 +33,13 @@ using std::chrono::milliseconds;
 constexpr auto kLockWait = milliseconds(10'000);
 constexpr auto kLockPoll = milliseconds(20);
 constexpr mode_t kOwnerOnly = 0600;
-constexpr int kMaxLinks = 40;     // as many as the system itself follows
-constexpr int kMaxNameTries = 16; // of names that nobody can foresee: more than one is a fault, not bad luck
+constexpr int kMaxLinks = 40;     // the system's own limit
+constexpr int kMaxNameTries = 16; // names are random, so more than one collision means a fault
 
-/// A path cut in two at its last slash. The directory part keeps its slash; it is empty for the working
-/// directory.
+/// A path split at its last slash. The directory part keeps its slash; it is empty for the working directory.
 class TargetPath {
 public:
-    /// Takes `path` and follows the symbolic links that its last part names. errno is set on failure.
+    /// Sets `path` and follows symbolic links of its last part. Sets errno on failure.
     [[nodiscard]] bool Resolve(const char *path);
 
     [[nodiscard]] const char *Whole() const { return text_.data(); }
@@ -53,7 +52,7 @@ private:
         const std::size_t slash = std::string_view(text_.data()).rfind('/');
         return slash == std::string_view::npos ? 0 : slash + 1;
     }
-    /// Puts `part` behind the first `keep` characters. False when the path becomes too long.
+    /// Puts `part` after the first `keep` characters. False if the path becomes too long.
     [[nodiscard]] bool Replace(std::size_t keep, std::string_view part);
 
     std::array<char, PATH_MAX> text_{};
@@ -74,7 +73,7 @@ bool TargetPath::Resolve(const char *path) {
     for (int links = 0; links <= kMaxLinks; links++) {
         std::array<char, PATH_MAX> link{};
         const ssize_t length = readlink(Whole(), link.data(), link.size());
-        // EINVAL is what anything but a link answers; what is absent is to be created.
+        // EINVAL: not a link. ENOENT: the file is to be created.
         if (length < 0) return errno == EINVAL || errno == ENOENT;
         const std::string_view to(link.data(), static_cast<std::size_t>(length));
         if (!Replace(to.starts_with('/') ? 0 : BaseOffset(), to)) return false;
@@ -93,8 +92,8 @@ Descriptor TargetPath::OpenDirectory() const {
     return Descriptor(open(directory.data(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
 }
 
-/// Owner of the directory's lock. It is given up by name and not left to the close: a process forked
-/// meanwhile by another thread shares the open file, and would keep the lock.
+/// Owns the directory's lock. Unlocks explicitly instead of by close: a process forked meanwhile by another
+/// thread shares the open file and would keep the lock.
 class DirectoryLock {
 public:
     explicit DirectoryLock(int fd) : fd_(fd) {}
@@ -125,8 +124,8 @@ private:
     bool held_ = false;
 };
 
-/// Removes what killed writers of this file left. The caller holds the directory's lock, hence none is in
-/// use. Only plain files can be ours. A failure is none of the save's: the names never collide.
+/// Removes files left behind by killed writers of this file. The caller holds the directory's lock, so none
+/// is in use. Only regular files can be ours. Failures are ignored: the names never collide.
 void RemoveStale(int directory, std::string_view base) {
     struct CloseDir {
         void operator()(DIR *stream) const { (void)closedir(stream); }
@@ -147,7 +146,7 @@ void RemoveStale(int directory, std::string_view base) {
     }
 }
 
-/// The temporary file: made under a new name, gone with this owner unless it was renamed.
+/// The temporary file: created under a new name, removed by the destructor unless renamed.
 class TempFile {
 public:
     explicit TempFile(int directory) : directory_(directory) {}
@@ -164,7 +163,7 @@ public:
             if (!MakeTempName(base, &name_)) return false;
             file_ = Descriptor(openat(directory_, name_.data(),
                                       O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, kOwnerOnly));
-            if (file_) return fchmod(file_.Get(), kOwnerOnly) == 0; // the umask may have taken bits away
+            if (file_) return fchmod(file_.Get(), kOwnerOnly) == 0; // the umask may have cleared bits
             if (errno != EEXIST) return false;
         }
         return false;
@@ -175,7 +174,7 @@ public:
             const ssize_t written =
                 pwrite(file_.Get(), bytes.data(), bytes.size(), static_cast<off_t>(offset));
             if (written < 0 && errno == EINTR) continue;
-            if (written == 0) errno = ENOSPC; // no progress and no reason: the device has no room
+            if (written == 0) errno = ENOSPC; // no progress and no error: the device is full
             if (written <= 0) return false;
             bytes.remove_prefix(static_cast<std::size_t>(written));
             offset += static_cast<uint64_t>(written);
@@ -197,7 +196,8 @@ private:
     bool renamed_ = false;
 };
 
-/// Renaming onto a FIFO, a socket or a device would quietly replace it: what a save to /dev/null must not do.
+/// A rename onto a FIFO, a socket or a device would silently replace it: a save to /dev/null must not do
+/// that.
 bool IsSpecialFile(int directory, const char *base) {
     struct stat info {};
     if (fstatat(directory, base, &info, AT_SYMLINK_NOFOLLOW) != 0) return false;
@@ -216,7 +216,7 @@ HYP_ReturnStatus WriteFailure(const char *path) {
     return HYP_WRITE_ERROR;
 }
 
-/// The part under the directory's lock.
+/// The steps under the directory's lock.
 HYP_ReturnStatus ReplaceFile(const char *path, int directory, const char *base, std::string_view bytes,
                              uint64_t paddedSize) {
     static constexpr std::array<char, kBlockSize> kPadding{};
@@ -246,7 +246,7 @@ HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len, m
     if (!target.Resolve(path)) return OpenFailure(path);
     const Descriptor directory = target.OpenDirectory();
     if (!directory) return OpenFailure(path);
-    DirectoryLock lock(directory.Get()); // given up before the directory is closed
+    DirectoryLock lock(directory.Get()); // released before the directory is closed
     if (!lock.Take(lockWait)) {
         Report("failed to lock the directory of dvsfile %s, error: %s\n", path, Err_Errno2String(errno));
         return HYP_IO_ERROR;

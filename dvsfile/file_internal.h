@@ -2,7 +2,7 @@
 #ifndef DVSFILE_FILE_INTERNAL_H
 #define DVSFILE_FILE_INTERNAL_H
 
-// What the files of this folder share: sizes, the owner of a descriptor and the way out for messages.
+// Shared by the files of this folder: sizes, the descriptor owner and message output.
 
 #include <cerrno>
 #include <chrono>
@@ -14,10 +14,10 @@
 
 namespace dvs::file {
 
-/// Transfers are aligned to this in memory, in offset and in length, as direct I/O wants it.
+/// Alignment of transfers in memory, in offset and in length, as required by direct I/O.
 inline constexpr uint64_t kBlockSize = 512;
 
-/// First size that a state file must not have.
+/// State files must be smaller than this.
 inline constexpr uint64_t kSizeLimit = uint64_t{1} << 32;
 
 constexpr uint64_t PaddedSize(uint64_t len) {
@@ -46,8 +46,7 @@ private:
         return fd;
     }
     void Reset(int fd) {
-        // A close that fails has released the descriptor all the same; errno stays that of the failure
-        // before.
+        // A failed close still releases the descriptor. Keep the errno of the earlier failure.
         const int savedErrno = errno;
         if (fd_ >= 0) (void)close(fd_);
         errno = savedErrno;
@@ -57,16 +56,16 @@ private:
     int fd_ = -1;
 };
 
-/// Gives one message to the sink or to the host's log. State-file messages are not guarded by a debug level.
+/// Sends one message to the sink or to the host's log. No debug level guards state-file messages.
 void Report(const char *format, ...) __attribute__((format(printf, 1, 2)));
 
-/// What stands behind the bytes of a file.
+/// Padding after the contents of a file.
 enum class Padding {
     ToBlock, ///< zeros up to the next multiple of kBlockSize: a state file
-    None     ///< nothing: any other file that wants the same durability
+    None     ///< nothing: any other file that needs the same durability
 };
 
-/// DVSFile_WriteDurable with the time it waits for the directory's lock, for files of either kind.
+/// DVSFile_WriteDurable with a wait limit for the directory's lock, for files with either padding.
 [[nodiscard]] HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len,
                                             std::chrono::milliseconds lockWait,
                                             Padding padding = Padding::ToBlock);

@@ -1,6 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The one emitter of state-file messages: to the sink, or to the host's log with the level these messages
-// have there.
+// Message output of the state file: to the sink, or to the host's log at the fixed level of these messages.
 
 #include "dvsfile/file_internal.h"
 

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Names of temporary files, made for and recognised by durable.cpp. Without allocations, as all of a durable
-// write.
+// Creates and recognises the names of temporary files for durable.cpp. Allocates nothing, like the rest of a
+// durable write.
 
 #include "dvsfile/temp_name.h"
 
@@ -17,8 +17,7 @@ namespace {
 constexpr std::string_view kHexDigits = "0123456789abcdef";
 
 bool FillRandom(std::array<uint8_t, kRandomBytes> *bytes) {
-    // So few bytes come whole or not at all; a signal is only noticed while the system's pool is not ready
-    // yet.
+    // Reads this small are never partial. EINTR only occurs before the system's pool is initialized.
     ssize_t got = 0;
     do {
         got = getrandom(bytes->data(), bytes->size(), 0);

@@ -2,9 +2,9 @@
 #ifndef DVSFILE_TEMP_NAME_H
 #define DVSFILE_TEMP_NAME_H
 
-// Names of the temporary files of durable writes: ".BASE.dvs-" and 32 random hexadecimal digits, BASE being
-// the first kMaxBaseLen characters of the state file's own name, so that every name the file system allows
-// has room for it.
+// Names of the temporary files of durable writes: ".BASE.dvs-" and 32 random hexadecimal digits. BASE is the
+// first kMaxBaseLen characters of the state file's name, so the result fits the file system's limit for
+// names.
 
 #include <array>
 #include <string_view>
@@ -18,11 +18,11 @@ inline constexpr std::size_t kTempNameSize = 1 + kMaxBaseLen + kTempMark.size() 
 
 using TempName = std::array<char, kTempNameSize>;
 
-/// Makes a name that cannot be foreseen for the file called `base`. False, with errno set, when the system
-/// gives no random bytes.
+/// Creates an unpredictable name for the file called `base`. Returns false and sets errno if the system has
+/// no random bytes.
 [[nodiscard]] bool MakeTempName(std::string_view base, TempName *name);
 
-/// Whether `name` is one that MakeTempName gives for `base`.
+/// True if MakeTempName could have created `name` for `base`.
 [[nodiscard]] bool IsTempName(std::string_view base, std::string_view name);
 
 } // namespace dvs::file
