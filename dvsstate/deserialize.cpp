@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Ports, switches and the whole switch table from serialized state. Nested values are read where they lie: of
-// the levels above the property lists nothing is built. Checks, the order of failures and messages are those
-// of building a list for each level. Leans on the readers of dvsdata, the switch table and the port table.
+// Ports, switches and the whole switch table from serialized state. Reads nested values in place; it builds
+// no lists above the property lists. Checks, the order of failures and messages match those of building a
+// list for each level. Uses the readers of dvsdata, the switch table and the port table.
 
 #include <algorithm>
 #include <array>
@@ -22,7 +22,7 @@ namespace data = dvs::data;
 
 namespace {
 
-/// A buffer, and its sum when the buffer around it told.
+/// A buffer, and its checksum if the outer buffer provided it.
 struct Source {
     data::Bytes bytes;
     data::KnownSum sum;
@@ -36,7 +36,7 @@ Source SourceOf(const data::EntryRef &entry) {
     return {entry.value, entry.sum};
 }
 
-/// An entry's name, ended by NUL: where it lies, or a copy when its field has no room for one.
+/// An entry's name, NUL-terminated: in place, or a copy if its field has no terminator.
 class NameText {
 public:
     explicit NameText(std::string_view name) : text_(name.data()) {
@@ -63,7 +63,7 @@ HYP_ReturnStatus ReadOwned(OwnedList &list, const Source &source) {
     return status;
 }
 
-/// The u32 a value starts with. HYP_BAD_PARAM when it is shorter.
+/// Reads the u32 at the start of a value. HYP_BAD_PARAM if the value is shorter.
 HYP_ReturnStatus ReadU32(data::Bytes value, uint32_t *number) {
     if (value.size() < sizeof *number) return HYP_BAD_PARAM;
     *number = data::Load32(value.data());
@@ -84,7 +84,7 @@ HYP_ReturnStatus AddAs(DVSwitch *sw, const char *portId, DVSData *list, DVSDataE
     status = DVSStatePortAdd(sw, portId, list, kind, nullptr);
     Message(kError, "Deserialize DV port(type %d) %s, return %s\n", static_cast<int>(kind), portId,
             Text(status));
-    (void)DVSData_Remove(list, kPortKind); // it is there
+    (void)DVSData_Remove(list, kPortKind); // it exists
     return status;
 }
 
@@ -95,24 +95,24 @@ HYP_ReturnStatus AddPort(DVSwitch *sw, const char *portId, const Source &source)
     HYP_ReturnStatus status = ReadOwned(list, source);
     if (status != HYP_OK) return status;
     status = AddAs(sw, portId, list.get(), FindEntry(list.get(), kPortKind));
-    if (status == HYP_OK) (void)list.release(); // the port's from here on
+    if (status == HYP_OK) (void)list.release(); // the port owns it now
     return status;
 }
 
 // ---- Switches ----
 
-/// The fixed entries of a switch: the first one of each name. Every other entry is a port.
+/// The fixed entries of a switch: the first entry of each name. All other entries are ports.
 class FixedEntries {
 public:
     explicit FixedEntries(data::InPlaceList &list);
 
-    /// None when there is no such entry.
+    /// Null if there is no such entry.
     [[nodiscard]] const data::EntryRef *Find(std::string_view name) const {
         const Slot &slot = slots_[IndexOf(name)];
         return slot.present ? &slot.entry : nullptr;
     }
     [[nodiscard]] bool Holds(const data::EntryRef &entry) const {
-        // No entry begins at 0, where the slots of missing ones point.
+        // No entry begins at 0, so offset 0 marks a missing one.
         return std::ranges::any_of(slots_,
                                    [&](const Slot &slot) { return slot.entry.offset == entry.offset; });
     }
@@ -141,7 +141,7 @@ FixedEntries::FixedEntries(data::InPlaceList &list) {
     list.Rewind();
 }
 
-/// One switch being rebuilt from its buffer.
+/// Rebuilds one switch from its buffer.
 class SwitchReader {
 public:
     SwitchReader(const char *switchId, data::InPlaceList &list)
@@ -161,7 +161,7 @@ private:
     OwnedList hostList_, globalList_;
     uint32_t version_ = 0, maxPorts_ = 0;
     std::string_view className_;
-    uint32_t removed_ = 0; // bytes of the entries that are gone from the list by now, for messages
+    uint32_t removed_ = 0; // bytes of the entries removed from the list so far, for messages
 };
 
 HYP_ReturnStatus SwitchReader::Run() {
@@ -181,12 +181,12 @@ HYP_ReturnStatus SwitchReader::Run() {
         Message(kError, "DVS %s acquire failed\n", switchId_);
         return HYP_NOT_FOUND;
     }
-    // The old lists live to the end of this: the buffer may lie in one of them.
+    // The old lists live until the end of this function: the buffer may lie in one of them.
     sw->hostPropList = std::exchange(hostList_, OwnedList(sw->hostPropList)).release();
     sw->globalPropList = std::exchange(globalList_, OwnedList(sw->globalPropList)).release();
     status = AddPorts(sw);
     if (status != HYP_OK && create)
-        (void)DVSStateSwitchRemove(switchId_); // the port's failure is the one to tell
+        (void)DVSStateSwitchRemove(switchId_); // report the port's failure
     Message(status == HYP_OK ? kTrace : kError, "Deserialize dvs %s return %s\n", switchId_, Text(status));
     return status;
 }
@@ -234,7 +234,7 @@ HYP_ReturnStatus SwitchReader::AddPorts(DVSwitch *sw) {
     return HYP_OK;
 }
 
-/// The line of taking a fixed entry out of the list that would have been built.
+/// Emits the line for removing a fixed entry from the list that would have been built.
 void SwitchReader::EmitRemoved(std::string_view name) {
     if (!data::Emits(data::kDetail)) return;
     uint32_t listSize = data::kMinBufferSize;
@@ -285,7 +285,7 @@ HYP_ReturnStatus DVSState_ConfigDeserialize(const void *buf, uint32_t len) {
         status = ReadSwitch(NameText(entry.name), SourceOf(entry));
         if (status == HYP_OK) continue;
         Message(kError, "DVSState_SwitchDeserialize failed %s\n", Text(status));
-        (void)DVSState_ConfigReset(); // the failure that led here is the one to tell
+        (void)DVSState_ConfigReset(); // report the original failure
         return status;
     }
     return HYP_OK;

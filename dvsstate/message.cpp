@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The switch state's one way out for messages, on top of dvsdata/log.h; every file of this folder calls it.
+// Message output of the switch state, on top of dvsdata/log.h. Used by every file of this folder.
 
 #include "dvsstate/message.h"
 

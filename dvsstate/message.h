@@ -2,7 +2,7 @@
 #ifndef DVSSTATE_MESSAGE_H
 #define DVSSTATE_MESSAGE_H
 
-// The emitter of the switch state: every message of this folder goes out here, guarded by dvs_debug.
+// Message output of the switch state. Every message of this folder goes through it; dvs_debug sets the level.
 
 #include "dvs/state.h"
 
@@ -13,15 +13,15 @@ inline constexpr int kError = 0;
 inline constexpr int kTrace = 1;
 inline constexpr int kDetail = 2;
 
-/// True when messages of this level print: worth asking before work that only a message needs.
+/// True if messages of this level print. Check it before work that only a message needs.
 [[nodiscard]] inline bool Prints(int level) {
     return dvs_debug >= level;
 }
 
-/// Prints to standard output (or the sink) when dvs_debug is at `level` or above.
+/// Prints to standard output (or the sink) if dvs_debug is at least `level`.
 void Message(int level, const char *format, ...) __attribute__((format(printf, 2, 3)));
 
-/// Prints to standard error (or the sink), whatever dvs_debug says.
+/// Prints to standard error (or the sink), regardless of dvs_debug.
 void MessageUnguarded(const char *format, ...) __attribute__((format(printf, 1, 2)));
 
 /// The text of a status, for messages.

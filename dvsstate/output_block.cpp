@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Blocks for serialized state (output_block.h), on the process heap.
+// Blocks for serialized state (output_block.h), allocated on the process heap.
 
 #include "dvsstate/output_block.h"
 

@@ -2,8 +2,8 @@
 #ifndef DVSSTATE_OUTPUT_BLOCK_H
 #define DVSSTATE_OUTPUT_BLOCK_H
 
-// Where a serialization of the switch state goes, by the buffer convention of dvs/data.h: the caller's
-// buffer, or a block that is handed over on success and freed otherwise.
+// The output of a serialization of the switch state, by the buffer convention of dvs/data.h: the caller's
+// buffer, or a new block that is handed over on success and freed otherwise.
 
 #include <cstdint>
 #include <span>
@@ -20,13 +20,13 @@ public:
     OutputBlock(const OutputBlock &) = delete;
     OutputBlock &operator=(const OutputBlock &) = delete;
 
-    /// Room for `size` bytes. HYP_NO_MEMORY when it cannot be had. A caller's buffer that is too small, and a
-    /// size that no buffer can have, leave Bytes empty, and writing to it comes to nothing: what else may
-    /// fail, and what is said meanwhile, comes before that is told.
+    /// Reserves `size` bytes. HYP_NO_MEMORY if the allocation fails. If the caller's buffer is too small, or
+    /// no buffer can have this size, Bytes stays empty and writes to it are no-ops. The caller reports that
+    /// last, after all other failures and messages.
     [[nodiscard]] HYP_ReturnStatus Reserve(uint64_t size);
     [[nodiscard]] bool HasRoom() const { return !bytes_.empty(); }
     [[nodiscard]] std::span<uint8_t> Bytes() const { return bytes_; }
-    /// Gives the outputs their values; there must be room.
+    /// Sets the outputs; requires room.
     void HandOver();
 
 private:
@@ -38,8 +38,8 @@ private:
     std::span<uint8_t> bytes_;
 };
 
-/// malloc for blocks that may be whole states: those ask for huge pages, without which the page faults of a
-/// fresh block cost more than filling it. Released with free.
+/// malloc for blocks that may hold whole states. Large blocks request huge pages; otherwise the page faults
+/// of a fresh block cost more than filling it. Released with free.
 [[nodiscard]] void *StateAlloc(uint64_t size);
 
 } // namespace dvs::state

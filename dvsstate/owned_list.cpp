@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Small helpers over property lists (owned_list.h); they lean on the exported list operations only.
+// Helpers over property lists (owned_list.h). They use the exported list operations only.
 
 #include "dvsstate/owned_list.h"
 

@@ -2,8 +2,8 @@
 #ifndef DVSSTATE_OWNED_LIST_H
 #define DVSSTATE_OWNED_LIST_H
 
-// Property lists of the switch state: made with the process heap, owned until they are handed over, and read
-// where there may be none.
+// Property lists of the switch state: allocated on the process heap, owned until handed over, with null-safe
+// reads.
 
 #include <cstdint>
 #include <memory>
@@ -18,16 +18,16 @@ struct ListFree {
 };
 using OwnedList = std::unique_ptr<DVSData, ListFree>;
 
-/// An empty list. `list` is untouched on failure.
+/// Creates an empty list. `list` is untouched on failure.
 [[nodiscard]] HYP_ReturnStatus NewList(OwnedList &list);
 
-/// The list that a buffer holds. `list` is untouched on failure.
+/// Deserializes a buffer into a list. `list` is untouched on failure.
 [[nodiscard]] HYP_ReturnStatus DeserializeOwned(OwnedList &list, const void *buf, uint32_t len);
 
-/// The first entry of this name in a list that may be absent; none when there is no such entry or list.
+/// Returns the first entry with this name; null if there is no such entry or `list` is null.
 [[nodiscard]] DVSDataEntry *FindEntry(DVSData *list, const char *name);
 
-/// An entry's value as text: up to its first NUL, or its end.
+/// An entry's value as text: up to its first NUL or its end.
 [[nodiscard]] std::string_view TextOf(DVSDataEntry *entry);
 
 } // namespace dvs::state

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Finding ports by id, by the UUID of their switch and by alias, and walking them. Leans on the port table;
-// the kernel interface and the config store come in through here.
+// Finds ports by id, by the UUID of their switch and by alias, and walks them. Uses the port table; used by
+// the kernel interface and the config store.
 
 #include "dvsstate/message.h"
 #include "dvsstate/names.h"
@@ -62,7 +62,7 @@ DVSPort *DVSState_LocalCachePortFind(const char *switchId, const char *portId) {
 DVSPort *DVSState_PortFindByUUID(const uint8_t uuid[16], const char *portId) {
     const auto switchId = UuidText(uuid);
     DVSPort *port = DVSState_PortFind(switchId.data(), portId);
-    // The first try has looked among the local-cache ports already; the second is kept as it is.
+    // Known quirk, kept: the first lookup already tried the local-cache ports.
     return port ? port : DVSState_LocalCachePortFind(switchId.data(), portId);
 }
 

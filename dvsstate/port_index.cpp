@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The index of a switch's ports (port_index.h), between the records of switch_record.h and the port table.
+// The index of a switch's ports (port_index.h).
 
 #include "dvsstate/port_index.h"
 
@@ -15,7 +15,7 @@ namespace {
 
 constexpr uint32_t kFirstBucketNum = 2 * kWalkedSlots;
 
-/// Up to seven bytes, those in the middle possibly twice: what tells them apart is all there.
+/// Packs up to seven bytes into a word, some in the middle twice; different inputs of one size differ.
 uint64_t ShortWord(const char *text, std::size_t size) {
     const auto byte = [text](std::size_t at) { return uint64_t{static_cast<unsigned char>(text[at])}; };
     if (size >= 4) return dvs::data::Load32(text) | uint64_t{dvs::data::Load32(text + size - 4)} << 32;
@@ -23,8 +23,8 @@ uint64_t ShortWord(const char *text, std::size_t size) {
 }
 
 uint32_t HashOf(std::string_view id) {
-    // Eight bytes a step; an odd multiplier and a shift spread them. Ids made to collide cost what a walk
-    // costs.
+    // Eight bytes per step; an odd multiplier and a shift mix them. Ids that collide on purpose cost as much
+    // as a walk.
     constexpr uint64_t kMultiplier = 0x9e3779b97f4a7c15;
     uint64_t hash = id.size();
     const auto mix = [&hash](uint64_t word) {
@@ -44,7 +44,7 @@ DVSPort *&BucketFor(DVSwitch *sw, uint32_t hash) {
     return BucketsOf(sw)[hash & (FrontOf(sw).bucketNum - 1)];
 }
 
-/// The port of a bucket behind which one of this slot belongs. The bucket's first port stands before that
+/// The port after which a port of this slot belongs in the bucket. The bucket's first port is before that
 /// slot.
 DVSPort *Before(DVSPort *head, uint32_t slot) {
     DVSPort *port = head;
@@ -53,8 +53,8 @@ DVSPort *Before(DVSPort *head, uint32_t slot) {
     return port;
 }
 
-/// Links a port into its bucket, in slot order. Ports mostly come in slot order, so the bucket's last one is
-/// tried first.
+/// Links a port into its bucket, in slot order. Ports mostly come in slot order, so it tries the bucket's
+/// last port first.
 void Link(DVSwitch *sw, DVSPort *port) {
     PortFront &front = FrontOf(port);
     DVSPort *&bucket = BucketFor(sw, front.hash);
@@ -72,7 +72,7 @@ void Link(DVSwitch *sw, DVSPort *port) {
     if (before == headFront.tail) headFront.tail = port;
 }
 
-/// Empties the buckets, now `bucketNum` of them, and links every port anew.
+/// Clears the buckets, sets their number to `bucketNum`, and links every port again.
 void Rebuild(DVSwitch *sw, uint32_t bucketNum) {
     SwitchFront &front = FrontOf(sw);
     front.bucketNum = std::min(bucketNum, front.bucketCapacity);
@@ -107,7 +107,7 @@ void IndexAdd(DVSwitch *sw, DVSPort *port, const PortKey &key, uint32_t slot) {
         return;
     }
     if (front.portNum >= front.bucketNum && front.bucketNum < front.bucketCapacity) {
-        Rebuild(sw, front.bucketNum * 2); // the port stands in its slot already
+        Rebuild(sw, front.bucketNum * 2); // the port is already in its slot
         return;
     }
     Link(sw, port);

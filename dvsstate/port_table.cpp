@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The ports of a switch: adding and removing them within the limits of switch and host. Leans on the switch
-// record for its slots and on the port index; the lookups of port_find.cpp and state deserialization stand on
-// it.
+// The ports of a switch: adds and removes them within the limits of switch and host. Uses the switch record
+// and the port index; used by port_find.cpp and state deserialization.
 
 #include "dvsstate/port_table.h"
 
@@ -47,15 +46,15 @@ bool Is(const DVSPort *port, std::string_view portId, uint32_t kind) {
     return port->portType == kind && portId == port->portId;
 }
 
-/// What the scan before an add finds. No slot is `slotNum` or above.
+/// Result of the scan before an add. All slots are below `slotNum`.
 struct ScanResult {
     DVSPort *existing; // first port of the same id and kind
     uint32_t existingSlot;
-    uint32_t freeSlot; // first empty one, kNoSlot when there is none
+    uint32_t freeSlot; // first empty slot, or kNoSlot
 };
 constexpr uint32_t kNoSlot = UINT32_MAX;
 
-/// The scan over a switch that has no index: slots behind `usedSlots` are known to be empty.
+/// Scans a switch without an index: slots from `usedSlots` on are empty.
 ScanResult ScanSlots(DVSwitch *sw, std::string_view portId, uint32_t kind, uint32_t end) {
     ScanResult result{nullptr, kNoSlot, kNoSlot};
     const uint32_t used = std::min(end, FrontOf(sw).usedSlots);
@@ -73,8 +72,8 @@ ScanResult ScanSlots(DVSwitch *sw, std::string_view portId, uint32_t kind, uint3
     return result;
 }
 
-/// The same from the index. A port behind `end` is in nobody's way, and is the first of its kind only when
-/// none stands before it.
+/// The same with the index. A port at or after `end` does not conflict, and is returned as the first of its
+/// kind only if there is none before it.
 ScanResult ScanIndex(DVSwitch *sw, const PortKey &key, uint32_t kind, uint32_t end) {
     ScanResult result{nullptr, kNoSlot, kNoSlot};
     if (kind != DVS_PORT_ZOMBIE) {
@@ -96,7 +95,7 @@ ScanResult ScanIndex(DVSwitch *sw, const PortKey &key, uint32_t kind, uint32_t e
     return result;
 }
 
-/// The part of the record that an add may use. The limits can say more than the record has slots.
+/// Scans the usable part of the record. The limits may exceed the record's slots.
 ScanResult Scan(DVSwitch *sw, const PortKey &key, uint32_t kind) {
     const uint32_t end = std::min(sw->maxPorts, FrontOf(sw).slotNum);
     return HasIndex(sw) ? ScanIndex(sw, key, kind, end) : ScanSlots(sw, key.id, kind, end);
@@ -105,7 +104,7 @@ ScanResult Scan(DVSwitch *sw, const PortKey &key, uint32_t kind) {
 DVSPort *PlacePort(DVSwitch *sw, const PortKey &key, DVSData *data, uint32_t kind, uint32_t slot) {
     DVSPort *port = NewPort();
     if (!port) return nullptr;
-    std::memcpy(port->portId, key.id.data(), key.id.size()); // its length was checked
+    std::memcpy(port->portId, key.id.data(), key.id.size()); // the length was checked
     port->owner = sw;
     port->portType = kind;
     port->portData = data;
@@ -145,7 +144,7 @@ HYP_ReturnStatus DVSStatePortAdd(DVSwitch *sw, const char *portId, DVSData *data
     if (status != HYP_OK) return status;
     const ScanResult scan = Scan(sw, key, kind);
     if (scan.existing) {
-        // The slot stands where the words want the kind, and the other way round: kept on purpose.
+        // Known quirk, kept: the message prints the slot as the type and the kind as the slot.
         Message(kError, "DVSStatePortAdd port %s type %d[%d] exists.\n", portId,
                 static_cast<int>(scan.existingSlot), static_cast<int>(kind));
         if (existingPort) *existingPort = scan.existing;
@@ -181,8 +180,8 @@ HYP_ReturnStatus DVSStatePortRemove(DVSwitch *sw, const char *portId, uint32_t k
 }
 
 bool RemoveAllPorts(DVSwitch *sw) {
-    FrontOf(sw).bucketNum = 0; // no index, which would follow each step to nobody's use
-    bool endsHere = false;     // a slot just emptied is still marked: the next port would not be found
+    FrontOf(sw).bucketNum = 0; // drop the index; updating it on each step would be wasted work
+    bool endsHere = false;     // the slot just emptied is still marked: a lookup would not find the next port
     return !WalkSlots(sw, [&](DVSPort *port, uint32_t slot) {
         if (Prints(kTrace)) Message(kTrace, "DVSState_PortRemove %s, %s\n", sw->switchId, port->portId);
         if (endsHere) return true;
@@ -195,9 +194,9 @@ bool RemoveAllPorts(DVSwitch *sw) {
 DVSPort *FindPort(DVSwitch *sw, std::string_view portId, uint32_t kind) {
     if (HasIndex(sw)) {
         DVSPort *port = IndexFind(sw, PortKey(portId), kind);
-        // The slots are the callers' to see and to change: a port that is no longer in its own is for the
-        // walk to judge. (One emptied before it would end the walk, and here goes unnoticed: looking for it
-        // would be the walk.)
+        // Callers may change the slots. If the port is no longer in its slot, fall back to the walk. (A walk
+        // also ends at an emptied slot before the port; the index does not detect that, because checking for
+        // it would cost a walk.)
         if (!port || PortAt(sw, FrontOf(port).slot) == port) return port;
     }
     DVSPort *found = nullptr;
@@ -243,7 +242,7 @@ HYP_ReturnStatus DVSState_PortAddShadow(const char *switchId, const char *portId
     HYP_ReturnStatus status = DeserializeOwned(data, buf, len);
     if (status != HYP_OK) return status;
     status = AddById(switchId, portId, data.get(), DVS_PORT_SHADOW);
-    if (status == HYP_OK) (void)data.release(); // the port's from here on
+    if (status == HYP_OK) (void)data.release(); // the port owns it now
     return status;
 }
 

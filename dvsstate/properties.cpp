@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // Host and global properties of a switch and the data of a port: thin operations over their property lists.
-// Values are opaque bytes here; their meanings belong to the converters of the config store.
+// Values are opaque bytes here; the converters of the config store interpret them.
 
 #include <cstdarg>
 
@@ -12,7 +12,7 @@ using namespace dvs::state;
 
 namespace {
 
-// The two families differ in the list they work on and in the names their traces carry.
+// The two families differ in their list and in the names in their traces.
 struct Family {
     DVSData *DVSwitch::*list;
     const char *setTrace, *clearTrace, *lookupTrace, *readTrace, *isSetTrace;
@@ -30,7 +30,7 @@ constexpr Family kGlobal = {
     "DVSState_GlobalPropRead %s, %s\n",  "DVSState_GlobalPropIsSet %s: %s\n",
 };
 
-/// A trace of one of the tables above: a format of two texts, the switch id and the property's name.
+/// Emits a trace from the tables above: a format with two texts, the switch id and the property's name.
 void Trace(int level, const char *format, const char *switchId, const char *name) {
 #pragma GCC diagnostic push
 #pragma GCC diagnostic ignored "-Wformat-nonliteral"
@@ -61,7 +61,7 @@ HYP_ReturnStatus ForEach(DVSData *list, DVSPropForEachFn callback, void *arg) {
     }
 }
 
-/// Sets a property in a list that may not exist yet: a switch that came without one gets it here.
+/// Sets a property. Creates the list if the switch has none.
 HYP_ReturnStatus Update(DVSData *&list, const char *name, const void *data, uint32_t len, uint32_t propType) {
     if (list) return DVSData_Update(list, name, data, len, propType);
     OwnedList made;
@@ -162,7 +162,7 @@ namespace {
 
 enum class DataOperation { Get, Set, Clear };
 
-/// What the operation gives and takes: the outputs of a get, the value of a set.
+/// In- and outputs of the operation: the outputs of a get, the value of a set.
 struct DataArguments {
     const void *value = nullptr;
     uint32_t size = 0;

@@ -1,8 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Serialization of ports, switches and the whole switch table. A state nests three levels of lists; sizes are
-// known beforehand, so every value is written once, straight to its place in the final block, and summed
-// once. Messages and failures are those of building a list for each level, in that order. Leans on the image
-// writer of dvsdata.
+// Serializes ports, switches and the whole switch table. A state nests three levels of lists. Sizes are known
+// beforehand, so every value is written once, to its place in the final block, and summed once. Messages and
+// failures match, in order, those of building a list for each level. Uses the image writer of dvsdata.
 
 #include <cstdlib>
 #include <cstring>
@@ -21,13 +20,13 @@ namespace data = dvs::data;
 
 namespace {
 
-// ---- Sizes. Sums of many 32-bit sizes, hence 64 bits. ----
+// ---- Sizes. 64 bits, because they sum many 32-bit sizes. ----
 
 uint64_t EntrySize(uint64_t valueSize) {
     return (valueSize + data::kMinEntryRoom + 3) & ~uint64_t{3};
 }
 
-/// True when a value of this size can be an entry: sizes of entries are 32 bits wide.
+/// True if a value of this size fits in an entry, whose size is 32 bits wide.
 bool FitsEntry(uint64_t valueSize) {
     return EntrySize(valueSize) <= UINT32_MAX - data::kImageOffset;
 }
@@ -36,7 +35,7 @@ data::Filter FilterOf(uint32_t version) {
     return version == kFilteredVersion ? data::Filter::WithoutTypes(kFilteredTypes) : data::Filter::None();
 }
 
-/// The size of a switch's list as a buffer. Unlike data::SerializedSize it says nothing.
+/// The size of a switch's list as a buffer. Unlike data::SerializedSize it emits no messages.
 uint32_t ListSize(const DVSData *list, uint32_t version) {
     if (version != kFilteredVersion) return list->serialSize;
     uint32_t size = data::kMinBufferSize;
@@ -49,7 +48,7 @@ uint32_t ListSize(const DVSData *list, uint32_t version) {
     return size;
 }
 
-/// True when the port's kind has to be added to its serialized data.
+/// True if the port's kind must be added to its serialized data.
 bool LacksKind(DVSPort *port) {
     return port->portType != DVS_PORT_ACTIVE && !FindEntry(port->portData, kPortKind);
 }
@@ -76,7 +75,7 @@ data::Bytes BytesOf(const void *value, std::size_t size) {
     return {static_cast<const uint8_t *>(value), size};
 }
 
-/// The lines of the list that a level would have been built in.
+/// Emits the lines of the list that a level would have been built in.
 class ListLines {
 public:
     void Add(std::string_view name, uint64_t valueSize) {
@@ -94,7 +93,7 @@ private:
     uint32_t size_ = data::kMinBufferSize;
 };
 
-void AnnounceBuffer(uint32_t version, uint64_t size) {
+void EmitBufferStart(uint32_t version, uint64_t size) {
     data::EmitOldVersion(version);
     data::EmitBufferSize(static_cast<uint32_t>(size));
 }
@@ -107,14 +106,14 @@ HYP_ReturnStatus WritePort(data::ImageWriter &writer, DVSPort *port, uint64_t si
     return writer.List(port->portData, data::Filter::None(), bufSize, &kind);
 }
 
-/// One switch as a buffer.
+/// Writes one switch as a buffer.
 class SwitchWriter {
 public:
     SwitchWriter(data::ImageWriter &writer, DVSwitch *sw, uint64_t size)
         : writer_(writer), sw_(sw), size_(size) {}
-    /// What is said before anything can fail.
-    static void Announce(const DVSwitch *sw);
-    /// HYP_LIMIT_EXCEEDED at the end of it all when there is no room for the buffer.
+    /// Emits the messages that come before any failure.
+    static void EmitStart(const DVSwitch *sw);
+    /// Returns HYP_LIMIT_EXCEEDED at the end if there is no room for the buffer.
     HYP_ReturnStatus Run(bool hasRoom);
 
 private:
@@ -132,7 +131,7 @@ private:
     ListLines lines_;
 };
 
-void SwitchWriter::Announce(const DVSwitch *sw) {
+void SwitchWriter::EmitStart(const DVSwitch *sw) {
     Message(kTrace, "DVSState_SwitchSerialize %s\n", sw->switchId);
     data::EmitAllocating();
 }
@@ -148,7 +147,7 @@ HYP_ReturnStatus SwitchWriter::Run(bool hasRoom) {
         status = AddPorts();
     }
     if (status == HYP_OK) {
-        AnnounceBuffer(sw_->version, size_);
+        EmitBufferStart(sw_->version, size_);
         if (hasRoom && size_ <= UINT32_MAX)
             EmitWholeList();
         else
@@ -165,7 +164,7 @@ void SwitchWriter::AddField(std::string_view name, data::Bytes value) {
 }
 
 void SwitchWriter::AddFields() {
-    // Callers can write into the record: nothing behind the name's end goes out.
+    // Callers can write into the record: write nothing after the name's NUL.
     char className[sizeof sw_->className] = {};
     std::memcpy(className, sw_->className, strnlen(sw_->className, sizeof className));
     AddField(kSwitchVersion, BytesOf(&sw_->version, sizeof sw_->version));
@@ -178,7 +177,7 @@ HYP_ReturnStatus SwitchWriter::AddList(const char *name, const char *what, const
     const HYP_ReturnStatus status = WriteList(name, list);
     if (status != HYP_OK) {
         Message(kError, "Failed to add switch %s %s, return %s\n", sw_->switchId, what, Text(status));
-        // Says so on failure too: kept as it is.
+        // Known quirk, kept: also printed on failure.
         Message(kTrace, "Add DVS(%s) property list succesfully\n", sw_->switchId);
     }
     return status;
@@ -201,7 +200,7 @@ HYP_ReturnStatus SwitchWriter::WriteList(const char *name, const DVSData *list) 
 HYP_ReturnStatus SwitchWriter::AddPort(DVSPort *port) {
     Message(kDetail, "DVSState_PortSerialize %s\n", port->portId);
     const uint64_t size = PortSize(port);
-    AnnounceBuffer(sw_->version, size);
+    EmitBufferStart(sw_->version, size);
     writer_.BeginEntry(port->portId, kStatePropType, static_cast<uint32_t>(size));
     const HYP_ReturnStatus status = WritePort(writer_, port, size);
     if (status != HYP_OK) return status;
@@ -220,7 +219,7 @@ HYP_ReturnStatus SwitchWriter::AddPorts() {
     return status;
 }
 
-/// The lines of serializing the switch's own list, whose entries are all written by now.
+/// Emits the lines for serializing the switch's own list, after all its entries are written.
 void SwitchWriter::EmitWholeList() const {
     if (!data::Emits(data::kDetail)) return;
     ListLines::Write(kSwitchVersion, sizeof sw_->version);
@@ -238,7 +237,7 @@ void SwitchWriter::EmitWholeList() const {
 
 HYP_ReturnStatus SwitchFailed(const DVSwitch *sw, HYP_ReturnStatus status) {
     Message(kError, "DVSStateConfigSerializeCB DVS %s failed %s\n", sw->switchId, Text(status));
-    return HYP_EXISTS; // whatever the failure was
+    return HYP_EXISTS; // regardless of the actual failure
 }
 
 using SwitchSizes = std::array<uint64_t, kSwitchNum>;
@@ -250,7 +249,7 @@ HYP_ReturnStatus WriteSwitches(data::ImageWriter &writer, const SwitchSizes &siz
         DVSwitch *sw = dvsSwitchTable[slot];
         if (!sw) continue;
         writer.BeginEntry(sw->switchId, kStatePropType, static_cast<uint32_t>(sizes[slot]));
-        SwitchWriter::Announce(sw);
+        SwitchWriter::EmitStart(sw);
         HYP_ReturnStatus status = SwitchWriter(writer, sw, sizes[slot]).Run(true);
         if (status == HYP_OK && !FitsEntry(sizes[slot])) status = HYP_BAD_PARAM;
         if (status != HYP_OK) return SwitchFailed(sw, status);
@@ -288,16 +287,16 @@ HYP_ReturnStatus SerializeTable(void **buf, uint32_t *len) {
     data::ImageWriter writer(block.Bytes());
     status = WriteSwitches(writer, sizes);
     if (status != HYP_OK) return status;
-    AnnounceBuffer(kStateVersion, stateSize);
+    EmitBufferStart(kStateVersion, stateSize);
     if (!block.HasRoom()) return HYP_LIMIT_EXCEEDED;
     EmitWholeState(sizes);
     block.HandOver();
     return HYP_OK;
 }
 
-/// A swap can bring two switches of one id together. The later one then takes the earlier one's place in the
-/// state, by the rules of a list's update, so it is built as one.
-HYP_ReturnStatus SerializeTwins(void **buf, uint32_t *len) {
+/// Serializes a table with duplicate ids, which a swap can create. By the rules of a list update, the later
+/// switch takes the earlier one's place in the state, so the state is built as a list.
+HYP_ReturnStatus SerializeDuplicates(void **buf, uint32_t *len) {
     OwnedList state;
     const HYP_ReturnStatus status = NewList(state);
     if (status != HYP_OK) return NoStateList(status);
@@ -314,7 +313,7 @@ HYP_ReturnStatus SerializeTwins(void **buf, uint32_t *len) {
     return DVSData_Serialize(state.get(), buf, len, kStateVersion);
 }
 
-bool HasTwins() {
+bool HasDuplicateIds() {
     for (auto slot = dvsSwitchTable.begin(); slot != dvsSwitchTable.end(); ++slot)
         if (*slot && FindSlot((*slot)->switchId) != slot) return true;
     return false;
@@ -327,7 +326,7 @@ HYP_ReturnStatus DVSState_PortSerialize(DVSPort *port, void **buf, uint32_t *len
     DVSData *list = port->portData;
     if (!LacksKind(port)) return DVSData_Serialize(list, buf, len, port->owner->version);
     const uint64_t size = PortSize(port);
-    AnnounceBuffer(port->owner->version, size);
+    EmitBufferStart(port->owner->version, size);
     OutputBlock block(buf, len, list->allocFn, list->freeFn);
     HYP_ReturnStatus status = block.Reserve(size);
     if (status != HYP_OK) return status;
@@ -339,7 +338,7 @@ HYP_ReturnStatus DVSState_PortSerialize(DVSPort *port, void **buf, uint32_t *len
 }
 
 HYP_ReturnStatus DVSState_SwitchSerialize(DVSwitch *sw, void **buf, uint32_t *len) {
-    SwitchWriter::Announce(sw);
+    SwitchWriter::EmitStart(sw);
     const uint64_t size = SwitchSize(sw);
     OutputBlock block(buf, len, StateAlloc, std::free);
     HYP_ReturnStatus status = block.Reserve(size);
@@ -353,5 +352,5 @@ HYP_ReturnStatus DVSState_SwitchSerialize(DVSwitch *sw, void **buf, uint32_t *le
 HYP_ReturnStatus DVSState_ConfigSerialize(void **buf, uint32_t *len) {
     Message(kTrace, "DVSState_ConfigSerialize\n");
     const StateLock lock;
-    return HasTwins() ? SerializeTwins(buf, len) : SerializeTable(buf, len);
+    return HasDuplicateIds() ? SerializeDuplicates(buf, len) : SerializeTable(buf, len);
 }

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The verdict over a whole state, and the words for its faults (state_view.h). Stands on the walk alone; the
-// tables of a load are kept here in small, so that the process-wide table stays untouched.
+// Verifies a whole state and holds the texts of its faults (state_view.h). Uses the walk only. It keeps small
+// copies of a load's tables, so the process-wide table is not touched.
 
 #include <algorithm>
 #include <bit>
@@ -29,7 +29,7 @@ struct FaultRow {
 // In the order of StateFaultKind.
 constexpr FaultRow kFaults[] = {
     {"no fault", HYP_OK},
-    {"malformed buffer", HYP_BAD_PARAM}, // the buffer's own text and status stand in for these
+    {"malformed buffer", HYP_BAD_PARAM}, // replaced by the buffer's own text and status
     {"switch has no switchVersion", HYP_NOT_FOUND},
     {"switchVersion is shorter than four bytes", HYP_BAD_PARAM},
     {"switch has no className", HYP_NOT_FOUND},
@@ -49,18 +49,18 @@ const FaultRow &Row(StateFaultKind kind) {
     return kFaults[static_cast<std::size_t>(kind)];
 }
 
-/// What a load would have in the table by now. An id that comes again adds to the switch that is there.
+/// A switch that a load would have in the table by now. A repeated id adds to the existing switch.
 struct LoadedSwitch {
     std::string_view id;
     uint32_t version, maxPorts, classFlags, portNum;
 };
 
-/// The ports that a load would have in its table by now, by where their names stand in the bytes.
+/// The ports that a load would have in its table by now, keyed by the position of their names in the bytes.
 class SeenPorts {
 public:
     explicit SeenPorts(Bytes bytes) : bytes_(bytes) {}
 
-    /// HYP_EXISTS when the port was there; it is from now on. The names lie in the bytes.
+    /// Inserts a port; HYP_EXISTS if it is already present. The names must lie in the bytes.
     HYP_ReturnStatus Insert(std::string_view switchId, std::string_view portId, uint32_t kind) {
         if (used_ * 2 >= slots_.size() && !Grow()) return HYP_NO_MEMORY;
         const std::size_t hash = std::hash<std::string_view>{}(portId) ^
@@ -79,7 +79,7 @@ public:
 private:
     struct Slot {
         uint32_t hash;
-        uint32_t switchName, portName; // offsets, which a length of 32 bits bounds; 0 in a free slot
+        uint32_t switchName, portName; // 32-bit offsets: the length is a u32; 0 in a free slot
         uint32_t kind;
     };
 
@@ -113,22 +113,22 @@ private:
     }
 
     Bytes bytes_;
-    std::vector<Slot> slots_; // a power of two of them, at most half of them used
+    std::vector<Slot> slots_; // the size is a power of two; at most half of the slots are used
     std::size_t used_ = 0;
 };
 
-class Judge {
+class Verifier {
 public:
-    Judge(Bytes bytes, std::optional<uint32_t> hostMaxPorts)
+    Verifier(Bytes bytes, std::optional<uint32_t> hostMaxPorts)
         : bytes_(bytes), hostMaxPorts_(hostMaxPorts), seen_(bytes) {}
     StateVerdict Run();
 
 private:
-    void Blame(const StateItem &item, const StateFault &fault);
+    void RecordFault(const StateItem &item, const StateFault &fault);
     StateFault LoadSwitch(const StateItem &item);
     StateFault LoadPort(const StateItem &item);
     [[nodiscard]] bool IsOverLimit() const;
-    void Take(const StateItem &item);
+    void Visit(const StateItem &item);
 
     Bytes bytes_;
     std::optional<uint32_t> hostMaxPorts_;
@@ -136,57 +136,57 @@ private:
     SeenPorts seen_;
     std::array<LoadedSwitch, kSwitchNum> table_{};
     std::size_t tableSize_ = 0;
-    LoadedSwitch other_{}; // one that the table has no room for
+    LoadedSwitch other_{}; // a switch that the table has no room for
     LoadedSwitch *current_ = &other_;
     uint32_t portNum_ = 0;       // of all switches
-    bool switchSound_ = false;   // the switch being walked, with all it has held so far
-    bool holderSound_ = false;   // the list or port being walked
-    std::size_t locatedEnd_ = 0; // of the buffer whose checksum verdict_.located is about
+    bool switchValid_ = false;   // the current switch, with its contents so far
+    bool holderValid_ = false;   // the current list or port
+    std::size_t locatedEnd_ = 0; // end of the buffer that verdict_.located reports a checksum fault for
 };
 
-StateVerdict Judge::Run() {
+StateVerdict Verifier::Run() {
     StateView view(bytes_);
     for (StateItem item; view.Next(&item);)
-        Take(item);
+        Visit(item);
     return verdict_;
 }
 
-void Judge::Take(const StateItem &item) {
+void Verifier::Visit(const StateItem &item) {
     StateFault fault = item.fault;
     switch (item.kind) {
     case StateItemKind::Switch:
         verdict_.all.switches++;
         if (const StateFault refused = LoadSwitch(item); !fault) fault = refused;
-        switchSound_ = !fault;
+        switchValid_ = !fault;
         break;
     case StateItemKind::Port:
         verdict_.all.ports++;
         if (!fault) fault = LoadPort(item);
-        holderSound_ = !fault;
-        switchSound_ = switchSound_ && holderSound_;
-        if (holderSound_) verdict_.sound.ports++;
+        holderValid_ = !fault;
+        switchValid_ = switchValid_ && holderValid_;
+        if (holderValid_) verdict_.sound.ports++;
         break;
     case StateItemKind::List:
-        holderSound_ = !fault;
+        holderValid_ = !fault;
         break;
     case StateItemKind::Property:
         verdict_.all.properties++;
-        if (holderSound_) verdict_.sound.properties++;
+        if (holderValid_) verdict_.sound.properties++;
         break;
     case StateItemKind::End:
-        if (item.depth == 1 && switchSound_) verdict_.sound.switches++;
+        if (item.depth == 1 && switchValid_) verdict_.sound.switches++;
         break;
     case StateItemKind::State:
     case StateItemKind::Field:
     case StateItemKind::Other:
         break;
     }
-    if (fault) Blame(item, fault);
+    if (fault) RecordFault(item, fault);
 }
 
-/// The first fault counts. One inside the buffer whose checksum is blamed so far says more precisely where it
-/// is.
-void Judge::Blame(const StateItem &item, const StateFault &fault) {
+/// Keeps the first fault. A fault inside the buffer with the recorded checksum fault replaces the location,
+/// because it is more precise.
+void Verifier::RecordFault(const StateItem &item, const StateFault &fault) {
     const bool first = !verdict_.first;
     if (first) verdict_.first = fault;
     if (!first && fault.offset >= locatedEnd_) return;
@@ -197,7 +197,7 @@ void Judge::Blame(const StateItem &item, const StateFault &fault) {
     locatedEnd_ = sumOfItem ? item.buffer->BaseOffset() + size : 0;
 }
 
-StateFault Judge::LoadSwitch(const StateItem &item) {
+StateFault Verifier::LoadSwitch(const StateItem &item) {
     const std::string_view id = item.entry.Name();
     const auto end = table_.begin() + static_cast<std::ptrdiff_t>(tableSize_);
     const auto known =
@@ -219,7 +219,7 @@ StateFault Judge::LoadSwitch(const StateItem &item) {
     return {};
 }
 
-StateFault Judge::LoadPort(const StateItem &item) {
+StateFault Verifier::LoadPort(const StateItem &item) {
     const auto fault = [&item](StateFaultKind kind) {
         return StateFault{kind, item.entry.offset, item.path, {}};
     };
@@ -235,7 +235,7 @@ StateFault Judge::LoadPort(const StateItem &item) {
     return {};
 }
 
-bool Judge::IsOverLimit() const {
+bool Verifier::IsOverLimit() const {
     if ((current_->classFlags & kUnlimitedClass) == 0 && current_->portNum == current_->maxPorts) return true;
     return portNum_ == *hostMaxPorts_ || static_cast<int32_t>(current_->maxPorts) < 1;
 }
@@ -257,7 +257,7 @@ bool StateFault::Describe(std::span<char> out) const {
 }
 
 StateVerdict VerifyState(Bytes bytes, std::optional<uint32_t> hostMaxPorts) {
-    return Judge(bytes, hostMaxPorts).Run();
+    return Verifier(bytes, hostMaxPorts).Run();
 }
 
 } // namespace dvs::state

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The walk of state_view.h. Each buffer is looked at once when it is entered, in the order in which a load
-// judges it; afterwards the walk only hands out what lies there.
+// The walk of state_view.h. It checks each buffer once on entry, in the order in which a load checks it;
+// after that it only returns items.
 
 #include "dvsstate/state_view.h"
 
@@ -17,9 +17,9 @@ using data::BufferView;
 using data::Bytes;
 using data::EntryView;
 
-// In the order of kFixedEntries, and where each stands in Level::fieldOffsets.
+// In the order of kFixedEntries; the index into Level::fieldOffsets.
 enum FixedEntry : std::size_t { kVersionEntry, kClassEntry, kMaxPortsEntry, kGlobalEntry, kHostEntry };
-constexpr std::size_t kNowhere = 0; // no entry starts in a header
+constexpr std::size_t kNoEntry = 0; // no entry starts in a header
 
 bool IsDropped(const EntryView &entry) {
     return (entry.propType & data::kDeserializeTypeMask) == 0;
@@ -35,7 +35,7 @@ std::string_view TextOf(const EntryView &entry) {
     return {text, entry.value.empty() ? 0 : strnlen(text, entry.value.size())};
 }
 
-/// The fault of one buffer, all of its entries included.
+/// The fault of one buffer, including all of its entries.
 data::Fault CheckBuffer(BufferView view) {
     view.Rewind();
     for (EntryView entry; view.Next(&entry);) {
@@ -48,11 +48,11 @@ StateFault BufferFault(const data::Fault &fault, const StatePath &path) {
     return {StateFaultKind::Buffer, fault.offset, path, fault};
 }
 
-/// The first entry of each fixed name that a load would keep.
+/// The first entry of each fixed name, as a load would keep it.
 std::array<EntryView, std::size(kFixedEntries)> FindFixedEntries(BufferView view) {
     std::array<EntryView, std::size(kFixedEntries)> found;
     std::array<bool, std::size(kFixedEntries)> have{};
-    (void)view.WalkAnyway(); // a buffer that cannot be walked at all has no entries
+    (void)view.WalkAnyway(); // a buffer that cannot be walked has no entries
     for (EntryView entry; view.Next(&entry);) {
         if (IsDropped(entry)) continue;
         const auto name = std::ranges::find(kFixedEntries, entry.Name());
@@ -97,7 +97,7 @@ void StateView::Descend(StateItem *item, Bytes bytes, std::size_t offset) {
     level = {BufferView(bytes, offset), item->entry, {}, false};
     item->buffer = &level.view;
     item->fault = BufferFault(CheckBuffer(level.view), item->path);
-    (void)level.view.WalkAnyway(); // where it says no, the level has no entries
+    (void)level.view.WalkAnyway(); // if it returns false, the level has no entries
 }
 
 void StateView::GiveSwitch(StateItem *item) {
@@ -107,19 +107,19 @@ void StateView::GiveSwitch(StateItem *item) {
     const auto fixed = FindFixedEntries(level.view);
     for (std::size_t i = 0; i < fixed.size(); i++)
         level.fieldOffsets[i] = fixed[i].offset;
-    if (fixed[kVersionEntry].offset != kNowhere) item->sw.version = U32Of(fixed[kVersionEntry]);
-    if (fixed[kMaxPortsEntry].offset != kNowhere) item->sw.maxPorts = U32Of(fixed[kMaxPortsEntry]);
-    if (fixed[kClassEntry].offset != kNowhere) item->sw.className = TextOf(fixed[kClassEntry]);
+    if (fixed[kVersionEntry].offset != kNoEntry) item->sw.version = U32Of(fixed[kVersionEntry]);
+    if (fixed[kMaxPortsEntry].offset != kNoEntry) item->sw.maxPorts = U32Of(fixed[kMaxPortsEntry]);
+    if (fixed[kClassEntry].offset != kNoEntry) item->sw.className = TextOf(fixed[kClassEntry]);
 
     for (const FixedEntry list : {kHostEntry, kGlobalEntry}) {
-        if (item->fault || fixed[list].offset == kNowhere) continue;
+        if (item->fault || fixed[list].offset == kNoEntry) continue;
         item->fault = BufferFault(data::VerifyBuffer(fixed[list].value, fixed[list].ValueOffset()),
                                   Below(item->path, kFixedEntries[list]));
     }
     for (const FieldCheck &check : kFieldChecks) {
         if (item->fault) return;
         const EntryView &entry = fixed[check.entry];
-        if (entry.offset == kNowhere) {
+        if (entry.offset == kNoEntry) {
             item->fault = {check.missing, item->entry.offset, item->path, {}};
         } else if (check.tooShort != StateFaultKind::None && !U32Of(entry)) {
             item->fault = {check.tooShort, entry.offset, Below(item->path, kFixedEntries[check.entry]), {}};

@@ -2,16 +2,15 @@
 #ifndef DVSSTATE_STATE_VIEW_H
 #define DVSSTATE_STATE_VIEW_H
 
-// A read-only walk over the bytes of a whole serialized state, for everything that looks without loading:
-// displays, verification, comparison, export, fuzzing. It allocates nothing, prints nothing, touches no
-// table, obeys no host's limits and drops no entry. Stands on dvsdata/buffer_view.h for each single buffer;
-// knows nobody above it.
+// A read-only walk over the bytes of a whole serialized state, for display, verification, comparison, export
+// and fuzzing. It allocates nothing, prints nothing, touches no table, ignores host limits and drops no
+// entry. Uses dvsdata/buffer_view.h for each single buffer.
 //
 //     StateView view(bytes);
 //     StateItem item;
 //     while (view.Next(&item)) { ... item.kind, item.depth, item.path, item.entry, item.fault ... }
 //
-// Items come in the order of the bytes, parents before what they hold:
+// Items come in byte order, parents before their contents:
 //
 //     depth 0   State       the buffer itself
 //     depth 1   Switch        an entry of it, and the buffer that is its value
@@ -22,8 +21,8 @@
 //     depth 3   Property          an entry of it
 //               End         the end marker of a State, Switch, List or Port, at that item's depth
 //
-// The walk goes on behind a fault as far as the bytes allow: over a wrong checksum or version into the
-// buffer, behind a damaged value to the next entry. VerifyState gives the verdict over the whole.
+// The walk continues after a fault as far as the bytes allow: into a buffer with a wrong checksum or version,
+// and past a damaged value to the next entry. VerifyState checks the whole state.
 //
 // All offsets count from the first byte of the state.
 
@@ -38,16 +37,16 @@
 
 namespace dvs::state {
 
-/// Names from the state down: switch id, then list name or port id (or field), then property. Lent from the
-/// bytes, not escaped: they may hold any character but NUL.
+/// Names from the state down: switch id, then list name or port id (or field), then property. They point into
+/// the bytes and are not escaped: they may contain any character but NUL.
 struct StatePath {
     static constexpr std::size_t kMaxDepth = 3;
 
     std::array<std::string_view, kMaxDepth> names{};
     std::size_t depth = 0; // names in use; 0 is the state itself
 
-    /// Writes the names with a slash between them into `out`, cut to its size and ended by NUL; false when
-    /// cut.
+    /// Writes the names, separated by slashes, into `out`, truncated to its size and NUL-terminated; false if
+    /// truncated.
     bool Format(std::span<char> out) const;
     bool operator==(const StatePath &other) const = default;
 };
@@ -56,41 +55,41 @@ enum class StateFaultKind : std::uint8_t {
     None,
     Buffer,          // a buffer is malformed: see `buffer`
     VersionMissing,  // a switch without "switchVersion"; at the switch
-    VersionShort,    // of less than four bytes; at the entry
+    VersionShort,    // shorter than four bytes; at the entry
     ClassMissing,    // a switch without "className"; at the switch
     MaxPortsMissing, // a switch without "maxPorts"; at the switch
-    MaxPortsShort,   // of less than four bytes; at the entry
+    MaxPortsShort,   // shorter than four bytes; at the entry
     SwitchIdLong,    // 64 characters or more; at the switch
-    PortKindShort,   // a port kind of less than four bytes; at that property
+    PortKindShort,   // a port kind shorter than four bytes; at that property
     PortIdLong,      // 48 characters or more (16 up to switch version 6); at the port
     PortRepeated,    // a second port of the same id and kind, not zombies; at the second
-    // Only where host limits are asked for:
+    // Only with host limits:
     TooManySwitches, // the table has no room for it; at the switch
     SwitchTooLarge,  // its port limit exceeds the host's free ports; at the switch
     TooManyPorts,    // one more port than the limit of its switch or of the host; at the port
-    NoMemory         // the rest of the state is not searched for repeated ports; at the port
+    NoMemory         // the rest of the state is not checked for repeated ports; at the port
 };
 
-/// What is wrong and where.
+/// A fault and its location.
 struct StateFault {
     StateFaultKind kind = StateFaultKind::None;
     std::size_t offset = 0; // of the byte, in the whole state
-    StatePath path;         // of the switch, list, port or property that is faulty
-    data::Fault buffer;     // for Buffer
+    StatePath path;         // of the faulty switch, list, port or property
+    data::Fault buffer;     // for kind Buffer
 
     explicit operator bool() const { return kind != StateFaultKind::None; }
-    /// What is wrong, in a few words; static.
+    /// A short description of the fault; static.
     [[nodiscard]] const char *Text() const;
-    /// The status a load refuses with; HYP_OK for None.
+    /// The status with which a load rejects it; HYP_OK for None.
     [[nodiscard]] HYP_ReturnStatus Status() const;
-    /// Writes the text, with the numbers of a malformed buffer, into `out`, cut and ended by NUL; false when
-    /// cut.
+    /// Writes the text, with the numbers of a malformed buffer, into `out`, truncated and NUL-terminated;
+    /// false if truncated.
     bool Describe(std::span<char> out) const;
 };
 
 enum class StateItemKind : std::uint8_t { State, Switch, Field, List, Port, Property, Other, End };
 
-/// The fields of a switch; absent ones (and numbers of less than four bytes) have no value.
+/// The fields of a switch; absent ones (and numbers shorter than four bytes) have no value.
 struct SwitchSummary {
     std::optional<std::uint32_t> version, maxPorts;
     std::optional<std::string_view> className; // up to its NUL or its end
@@ -100,17 +99,17 @@ struct StateItem {
     StateItemKind kind = StateItemKind::State;
     std::size_t depth = 0;
     StatePath path;
-    data::EntryView entry; // all fields as they stand; empty for State, and for End of it
-    /// The buffer of a State, Switch, List, Port or their End: header, base offset, used size. Lent until the
-    /// next item; null for other kinds.
+    data::EntryView entry; // all fields as stored; empty for State, and for End of it
+    /// The buffer of a State, Switch, List, Port or their End: header, base offset, used size. Valid until
+    /// the next item; null for other kinds.
     const data::BufferView *buffer = nullptr;
-    /// Its type word has none of the bits that a load asks for, which therefore passes over it (kind Other on
-    /// depth 1 and 2: what it might have been does not matter).
+    /// True if the type word has none of the bits that a load accepts, so a load skips the entry (kind Other
+    /// on depth 1 and 2).
     bool dropped = false;
     SwitchSummary sw;           // for Switch
-    std::uint32_t portKind = 1; // for Port: what a load makes of it
-    /// The first fault of this switch, list, port or state in the order in which a load finds them, but for
-    /// what is wrong with its ports (which have their own) and, in a state, with its switches.
+    std::uint32_t portKind = 1; // for Port: the kind a load gives it
+    /// The first fault of this switch, list, port or state in the order in which a load finds them. Excludes
+    /// faults of a switch's ports (they report their own) and, for a state, of its switches.
     StateFault fault;
 };
 
@@ -119,16 +118,16 @@ public:
     /// `bytes` must outlive the view and its items.
     explicit StateView(data::Bytes bytes) : bytes_(bytes) {}
 
-    /// The next item; false behind the last one.
+    /// Returns the next item; false after the last one.
     bool Next(StateItem *item);
-    /// Passes over what the item given last holds: the next one is its End.
+    /// Skips the contents of the last returned item: the next item is its End.
     void Skip();
 
 private:
-    /// A buffer being walked.
+    /// A buffer on the current path.
     struct Level {
         data::BufferView view;
-        data::EntryView entry;                     // whose value it is
+        data::EntryView entry;                     // the entry that holds the buffer
         std::array<std::size_t, 5> fieldOffsets{}; // of a switch's fixed entries
         bool skipped = false;
     };
@@ -140,7 +139,7 @@ private:
 
     data::Bytes bytes_;
     std::array<Level, StatePath::kMaxDepth> levels_{};
-    std::size_t depth_ = 0; // buffers being walked
+    std::size_t depth_ = 0; // number of buffers on the current path
     bool started_ = false;
 };
 
@@ -149,16 +148,16 @@ struct StateCounts {
 };
 
 struct StateVerdict {
-    /// What a load into an empty table would stumble over first; None: the state is sound.
+    /// The first fault that a load into an empty table would find; None: the state is valid.
     StateFault first;
-    /// The same, or the innermost fault inside it: one wrong byte spoils the checksum of every buffer around
-    /// it, and this is the smallest of them.
+    /// The same, or the innermost fault inside it: one wrong byte breaks the checksum of every enclosing
+    /// buffer, and this is the smallest of them.
     StateFault located;
-    StateCounts sound; // properties: of sound lists and ports; switches: with everything they hold
+    StateCounts sound; // properties of valid lists and ports; switches whose whole contents are valid
     StateCounts all;
 };
 
-/// Judges the whole state. With `hostMaxPorts`, which is the host-wide port limit, also whether the state
+/// Verifies the whole state. `hostMaxPorts` is the host-wide port limit; if given, also checks that the state
 /// fits into an empty table of such a host.
 [[nodiscard]] StateVerdict VerifyState(data::Bytes bytes,
                                        std::optional<std::uint32_t> hostMaxPorts = std::nullopt);

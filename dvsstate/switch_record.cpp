@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Allocation of switch and port records (switch_record.h): the lowest piece of the switch table.
+// Allocates and frees switch and port records (switch_record.h).
 
 #include "dvsstate/switch_record.h"
 
@@ -12,7 +12,7 @@
 
 namespace dvs::state {
 
-// Fronts leave the records behind them aligned, as the bucket array does with the front.
+// Fronts keep the records after them aligned; the bucket array does the same for the front.
 static_assert(sizeof(SwitchFront) % alignof(DVSwitch) == 0);
 static_assert(sizeof(PortFront) % alignof(DVSPort) == 0);
 static_assert(alignof(DVSPort *) == alignof(DVSwitch));
@@ -24,12 +24,13 @@ DVSPort **BucketsOf(DVSwitch *sw) {
 
 namespace {
 
-/// As many buckets as slots, to the next power of two; none where the slots are walked anyway.
+/// The number of slots rounded up to a power of two; 0 if the slots are walked anyway.
 std::size_t BucketCapacity(uint32_t slotNum) {
     return slotNum > kWalkedSlots ? std::bit_ceil(std::size_t{slotNum}) : 0;
 }
 
-/// The buckets stay unwritten until the index is built, so a switch of few ports never touches their pages.
+/// The buckets are not written until the index is built, so a switch with few ports never touches their
+/// pages.
 DVSwitch *NewRecord(uint32_t slotNum) {
     const std::size_t capacity = BucketCapacity(slotNum);
     if (capacity > UINT32_MAX) return nullptr;

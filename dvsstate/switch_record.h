@@ -2,11 +2,11 @@
 #ifndef DVSSTATE_SWITCH_RECORD_H
 #define DVSSTATE_SWITCH_RECORD_H
 
-// The allocation of switch and port records. Callers see exactly the fields of DVSwitch and DVSPort; what the
-// library keeps for itself stands in front of the record in the same block:
+// The allocation of switch and port records. Callers see exactly the fields of DVSwitch and DVSPort; private
+// fields are in front of the record in the same block:
 //
 //     | buckets[bucketCapacity] | SwitchFront | DVSwitch … ports[slotNum] |     | PortFront | DVSPort |
-//                                             ^ the address everyone else knows             ^ likewise
+//                                             ^ the address that callers get                ^ the same
 //
 // Used by the switch table (creation, removal), the port table (slots) and the port index (buckets, links).
 
@@ -17,7 +17,7 @@
 
 namespace dvs::state {
 
-// Agents are compiled with these records: a field that moves breaks every one of them.
+// Agents are compiled with these records: moving a field breaks all of them.
 static_assert(sizeof(DVSwitch) == 240);
 static_assert(offsetof(DVSwitch, numPorts) == 0);
 static_assert(offsetof(DVSwitch, maxPorts) == 4);
@@ -38,23 +38,23 @@ static_assert(offsetof(DVSPort, portType) == 64);
 
 /// Private fields of a switch. They are valid as long as the record.
 struct SwitchFront {
-    uint32_t slotNum;        // slots that ports[] really has: the host-wide limit at creation
+    uint32_t slotNum;        // allocated slots of ports[]: the host-wide limit at creation
     uint32_t usedSlots;      // one past the highest slot that ever held a port
     uint32_t firstFree;      // every slot below holds a port
     uint32_t portNum;        // ports in the index
-    uint32_t bucketNum;      // buckets in use, a power of two; 0 while there is no index
+    uint32_t bucketNum;      // buckets in use, a power of two; 0 without an index
     uint32_t bucketCapacity; // buckets in front of these fields; 0 for a record with few slots
 };
 
-/// Private fields of a port: its links in the switch's index. Meaningless while the switch has none.
+/// Private fields of a port: its links in the switch's index. Meaningless if the switch has no index.
 struct PortFront {
     DVSPort *next; // in the bucket, in slot order; null at its end
-    DVSPort *tail; // in a bucket's first port: its last one
+    DVSPort *tail; // in a bucket's first port: the bucket's last port
     uint32_t hash; // of the id
-    uint32_t slot; // where the port stands
+    uint32_t slot; // the port's slot
 };
 
-// A switch with few slots in use is walked; an index would cost it more than it saves.
+// A switch with few slots in use is walked; an index would cost more than it saves.
 inline constexpr uint32_t kWalkedSlots = 64;
 
 [[nodiscard]] inline SwitchFront &FrontOf(DVSwitch *sw) {
@@ -65,17 +65,17 @@ inline constexpr uint32_t kWalkedSlots = 64;
 }
 [[nodiscard]] DVSPort **BucketsOf(DVSwitch *sw);
 
-/// A record with `slotNum` empty slots, its bit vector and both property lists empty. HYP_NO_MEMORY when any
-/// of its blocks cannot be had; nothing is left behind then.
+/// Creates a record with `slotNum` empty slots, its bit vector and two empty property lists. HYP_NO_MEMORY if
+/// any allocation fails; nothing stays allocated then.
 [[nodiscard]] HYP_ReturnStatus NewSwitch(uint32_t slotNum, DVSwitch **out);
 
-/// Frees the record, its bit vector and property lists; not its ports. None is fine.
+/// Frees the record, its bit vector and property lists, but not its ports. Null is a no-op.
 void FreeSwitch(DVSwitch *sw);
 
-/// A zeroed record; none when there is no memory.
+/// Returns a zeroed record; null if out of memory.
 [[nodiscard]] DVSPort *NewPort();
 
-/// Frees the record and its port data. None is fine.
+/// Frees the record and its port data. Null is a no-op.
 void FreePort(DVSPort *port);
 
 } // namespace dvs::state

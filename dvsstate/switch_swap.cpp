@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Operations on the whole switch table: the reset, and those by which the kernel's persistent state replaces
-// switches that are not to be persisted with their stored copies. All hold the lock "dvsstate" throughout.
+// Operations on the whole switch table: the reset, and the replacement of non-persistent switches by their
+// stored copies in the kernel's persistent state. All hold the lock "dvsstate" throughout.
 
 #include <algorithm>
 #include <cstring>
@@ -71,7 +71,7 @@ void DVSState_UpdateGlobalSwsArray(DVSwitch *table[32], const char ids[32][64]) 
         const auto slot = FindSlot({ids[row], strnlen(ids[row], kSwitchIdSize)});
         if (slot == dvsSwitchTable.end()) continue;
         position = std::find(position, end, nullptr);
-        if (position == end) continue; // no room: the switch stays where it is
+        if (position == end) continue; // no room: the switch stays in the table
         *position++ = std::exchange(*slot, nullptr);
     }
     std::ranges::swap_ranges(dvsSwitchTable, std::span(table, kSwitchNum));

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The switch table: adding, removing and finding switches, their fields, and the lock that guards the table.
-// Everything else of this folder stands on it; it leans on the record (switch_record.h), the port table for
-// removing a switch's ports, and the host for the port limit.
+// The switch table: adds, removes and finds switches, gives access to their fields, and holds the table's
+// lock. Uses the record (switch_record.h), the port table to remove a switch's ports, and the host for the
+// port limit.
 
 #include "dvsstate/switch_table.h"
 
@@ -32,7 +32,7 @@ constexpr uint32_t kLockRank = 0xfeffffff;
 constexpr char kKitSignature[] = "dvsstate";
 constexpr uint32_t kKitVersion = 21;
 
-/// Set once, on first use, by the host's runtime, which makes the creation safe to race.
+/// Created once, on first use, by the host's runtime, which makes concurrent creation safe.
 constinit MXUserRecLock *g_lock = nullptr;
 
 struct SwitchClass {
@@ -40,7 +40,7 @@ struct SwitchClass {
     uint32_t flags;
 };
 
-// Classes that are not held to a limit of their own; every other class has no flags.
+// Classes without a limit of their own; every other class has no flags.
 constexpr SwitchClass kClasses[] = {
     // name            flags
     {"ovlvswitch", kUnlimitedClass | kOverlayClass},
@@ -62,14 +62,14 @@ bool IsSupported(uint32_t version) {
     });
 }
 
-/// Fits the text into a field of `size` bytes: cut, terminated, zero behind it.
+/// Copies the text into a field of `size` bytes: truncated, NUL-terminated, padded with zeros.
 void CopyText(char *field, std::size_t size, std::string_view text) {
     const std::size_t length = std::min(text.size(), size - 1);
     std::memcpy(field, text.data(), length);
     std::memset(field + length, 0, size - length);
 }
 
-/// Finds a free slot and fills it; the table is as it was on every failure.
+/// Finds a free slot and fills it. The table is unchanged on failure.
 HYP_ReturnStatus InsertSwitch(const char *switchId, std::string_view className, uint32_t classFlags,
                               uint32_t maxPorts, uint32_t version) {
     const StateLock lock;
@@ -144,7 +144,7 @@ HYP_ReturnStatus DVSStateSwitchRemove(const char *switchId) {
         Message(kError, "DVSState_SwitchRemove DVSID %s, statue %s\n", switchId, Text(HYP_NOT_FOUND));
         return HYP_NOT_FOUND;
     }
-    // Kept on purpose: a port that cannot be removed leaves the switch in place, and that counts as success.
+    // Known quirk, kept: if a port cannot be removed, the switch stays and the result is success.
     if (!RemoveAllPorts(*slot)) return HYP_OK;
     FreeSwitch(*slot);
     *slot = nullptr;
@@ -202,7 +202,7 @@ DVSwitch *DVSState_SwitchFindByAlias(const char *alias) {
 
 void DVSState_SwitchForEach(DVSSwitchForEachFn callback, void *arg) {
     const StateLock lock;
-    // Each slot is read when its turn comes: a callback may remove switches.
+    // Read each slot when its turn comes: a callback may remove switches.
     for (DVSwitch *const &slot : dvsSwitchTable) {
         if (slot && callback(slot, arg)) return;
     }

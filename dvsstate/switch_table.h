@@ -2,8 +2,8 @@
 #ifndef DVSSTATE_SWITCH_TABLE_H
 #define DVSSTATE_SWITCH_TABLE_H
 
-// The process-wide switch table and its lock, for the other files of this folder. Exported operations on it
-// are in dvs/state.h.
+// The process-wide switch table and its lock, for the other files of this folder. dvs/state.h declares the
+// exported operations on it.
 
 #include <array>
 #include <cstdint>
@@ -14,14 +14,14 @@
 namespace dvs::state {
 
 inline constexpr std::size_t kSwitchNum = 32;      // slots of the table
-inline constexpr std::size_t kSwitchIdSize = 64;   // with the terminator
-inline constexpr std::size_t kClassNameSize = 128; // with the terminator
+inline constexpr std::size_t kSwitchIdSize = 64;   // terminator included
+inline constexpr std::size_t kClassNameSize = 128; // terminator included
 
 // classFlags of a switch.
-inline constexpr uint32_t kUnlimitedClass = 1; // not held to maxPorts
+inline constexpr uint32_t kUnlimitedClass = 1; // exempt from maxPorts
 inline constexpr uint32_t kOverlayClass = 2;
 
-/// The flags of a class, by its whole name; 0 for one that is held to its limit.
+/// The flags of a class, by its whole name; 0 for classes with a limit of their own.
 [[nodiscard]] uint32_t ClassFlags(std::string_view className);
 
 /// Slot order is insertion order into the first free slot. Guarded by the lock "dvsstate".
@@ -39,19 +39,19 @@ private:
     MXUserRecLock *lock_;
 };
 
-/// Reads the host-wide port limit into uwMaxNumActivePortsSystemWide. For the first add of a switch, and for
-/// whoever has to know the limit before it. The id is for the messages.
+/// Reads the host-wide port limit into uwMaxNumActivePortsSystemWide. Called by the first switch add, and by
+/// callers that need the limit before it. The id is for the messages.
 [[nodiscard]] HYP_ReturnStatus ReadHostLimit(const char *switchId);
 
-/// The worker of DVSState_SwitchAdd. The class name comes from a buffer, so it may be of any length.
+/// The worker of DVSState_SwitchAdd. The class name comes from a buffer, so it may have any length.
 [[nodiscard]] HYP_ReturnStatus DVSStateSwitchAdd(const char *switchId, std::string_view className,
                                                  uint32_t maxPorts, uint32_t version);
 
 /// The worker of DVSState_SwitchRemove. The caller holds the lock.
 [[nodiscard]] HYP_ReturnStatus DVSStateSwitchRemove(const char *switchId);
 
-/// The slot of the first switch of this id. None (end of the table) when there is no such switch. The caller
-/// holds the lock.
+/// The slot of the first switch with this id; the end of the table if there is none. The caller holds the
+/// lock.
 [[nodiscard]] std::array<DVSwitch *, kSwitchNum>::iterator FindSlot(std::string_view switchId);
 
 } // namespace dvs::state

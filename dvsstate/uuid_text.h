@@ -2,8 +2,8 @@
 #ifndef DVSSTATE_UUID_TEXT_H
 #define DVSSTATE_UUID_TEXT_H
 
-// The text form of a UUID, by which switches carry it as their id: sixteen pairs of lower-case hexadecimal
-// digits with a blank between them, a hyphen between the eighth and the ninth.
+// The text form of a UUID, used as a switch id: sixteen pairs of lower-case hexadecimal digits, separated by
+// spaces, with a hyphen between the eighth and the ninth.
 
 #include <array>
 #include <cstddef>
@@ -13,7 +13,7 @@ namespace dvs::state {
 
 inline constexpr std::size_t kUuidSize = 16;
 inline constexpr std::size_t kUuidTextSize =
-    3 * kUuidSize; // a pair and what follows it, the terminator at the end
+    3 * kUuidSize; // a pair and its separator, or the terminator at the end
 
 [[nodiscard]] inline std::array<char, kUuidTextSize> UuidText(const uint8_t *uuid) {
     constexpr char kDigits[] = "0123456789abcdef";

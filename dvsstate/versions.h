@@ -2,7 +2,7 @@
 #ifndef DVSSTATE_VERSIONS_H
 #define DVSSTATE_VERSIONS_H
 
-// The switch version numbers at which something changes. Switches have the versions 4 to 12, 100, and 107 to
+// The switch version numbers at which behaviour changes. Switches have the versions 4 to 12, 100, and 107 to
 // 112; the last range is 7 to 12 with the overlay flag set.
 
 #include <cstdint>
@@ -12,7 +12,7 @@ namespace dvs::state {
 /// From this version on the port records of mirror sessions are wide.
 inline constexpr uint32_t kFirstWideVersion = 100;
 
-/// First of the overlay versions. From it on the private VLAN map has the vswitch key whatever the class, and
+/// First of the overlay versions. From it on the private VLAN map has the vswitch key for every class, and
 /// the platform owns more names.
 inline constexpr uint32_t kFirstOverlayVersion = 107;
 
