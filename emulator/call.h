@@ -2,7 +2,7 @@
 #ifndef EMULATOR_CALL_H
 #define EMULATOR_CALL_H
 
-// One command as it arrived and what is answered to it: what the server hands to the module and gets back.
+// One command and its reply, as passed between the server and the module.
 
 #include <cstdint>
 #include <cstdlib>
@@ -15,7 +15,7 @@
 
 namespace dvs::emulator {
 
-/// A request; the spans are lent for the call.
+/// A request. The spans are valid during the call.
 struct Call {
     int32_t request;
     uint32_t flags; // wire::Flags
@@ -31,7 +31,7 @@ struct FreeBlock {
 };
 using Block = std::unique_ptr<void, FreeBlock>;
 
-/// The bytes of a reply: its own, or lent by the module until its next command.
+/// The bytes of a reply: owned, or borrowed from the module until its next command.
 struct Payload {
     const char *data = nullptr;
     uint32_t size = 0;
@@ -48,7 +48,7 @@ struct Answer {
     Payload payload;
 };
 
-/// The errno that goes with a refusal.
+/// The errno that matches a failure status.
 [[nodiscard]] int ErrnoOf(HYP_ReturnStatus status);
 
 } // namespace dvs::emulator

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Non-blocking reassembly of requests and sending of answers for one client.
+// Non-blocking reassembly of requests and sending of replies for one client.
 
 #include "emulator/connection.h"
 
@@ -15,14 +15,14 @@ namespace dvs::emulator {
 
 namespace {
 
-/// A request without a large value fits, so that it takes one receive.
+/// Large enough for a request without a large value, so that it takes one receive.
 constexpr std::size_t kFirstCapacity = 4096;
 
-/// What may wait for less is not counted: every client may have that.
-constexpr std::size_t kFree = 64 << 10;
+/// Buffers up to this size are not counted in the budget: every client may have one.
+constexpr std::size_t kUncountedSize = 64 << 10;
 
 constexpr uint64_t Counted(std::size_t size) {
-    return size > kFree ? size : 0;
+    return size > kUncountedSize ? size : 0;
 }
 
 } // namespace
@@ -31,7 +31,7 @@ Connection::Connection(int fd, pid_t peer, MemoryBudget *budget)
     : fd_(fd), peer_(peer), budget_(budget), lastProgress_(Clock::now()) {}
 
 Connection::~Connection() {
-    budget_->Return(Counted(capacity_) + outTaken_);
+    budget_->Return(Counted(capacity_) + outReserved_);
     close(fd_);
 }
 
@@ -52,15 +52,15 @@ bool Connection::Reserve(std::size_t size) {
     return true;
 }
 
-/// Learns from the header how much is to come.
-bool Connection::JudgeHeader() {
+/// Reads the size of the request from the header.
+bool Connection::CheckHeader() {
     const wire::RequestHeader header = Header();
     if (header.magic != wire::kMagic || header.version != wire::kVersion) return false;
     if (header.kind != static_cast<uint16_t>(wire::Kind::Ioctl) &&
         header.kind != static_cast<uint16_t>(wire::Kind::Limits))
         return false;
     if (header.dataSize > wire::kMaxTransfer || header.cmdInSize > wire::kMaxTransfer) return false;
-    judged_ = true;
+    headerValid_ = true;
     if (header.kind == static_cast<uint16_t>(wire::Kind::Ioctl))
         needed_ += wire::kRecordSize + std::size_t{header.dataSize} + header.cmdInSize;
     return true;
@@ -68,8 +68,8 @@ bool Connection::JudgeHeader() {
 
 bool Connection::Receive() {
     for (;;) {
-        // Announced sizes cost what has arrived of them, twice over at most. Room is made where there is none
-        // left, not with each receive: what has arrived is copied along.
+        // Memory use is at most twice the bytes that have arrived, whatever the header announces. The buffer
+        // grows only when it is full, not on each receive, because growing copies what has arrived.
         const std::size_t room = std::min(needed_, received_ * 2);
         if (received_ == capacity_ && !Reserve(std::max(room, kFirstCapacity))) return false;
         const ssize_t got = recv(fd_, in_.get() + received_, capacity_ - received_, MSG_DONTWAIT);
@@ -78,8 +78,8 @@ bool Connection::Receive() {
         if (got < 0) return errno == EAGAIN || errno == EWOULDBLOCK;
         received_ += static_cast<std::size_t>(got);
         lastProgress_ = Clock::now();
-        if (!judged_ && HasHeader() && !JudgeHeader()) return false;
-        // The common request is complete by now; otherwise there may be more to take in.
+        if (!headerValid_ && HasHeader() && !CheckHeader()) return false;
+        // The common request is complete by now; otherwise more may have arrived.
         if (HasRequest() || received_ < capacity_) return true;
     }
 }
@@ -102,12 +102,12 @@ Call Connection::Request() const {
 }
 
 bool Connection::Finish() {
-    // A client that did not wait for its answer has begun the next request already.
+    // A client that did not wait for its reply may have begun the next request.
     const std::size_t surplus = received_ - needed_;
     if (surplus > 0) std::memmove(in_.get(), in_.get() + needed_, surplus);
     received_ = surplus;
     needed_ = sizeof(wire::RequestHeader);
-    judged_ = false;
+    headerValid_ = false;
     if (Counted(capacity_) > 0 && surplus <= kFirstCapacity) {
         auto smaller = std::make_unique_for_overwrite<char[]>(kFirstCapacity);
         std::memcpy(smaller.get(), in_.get(), surplus);
@@ -115,7 +115,7 @@ bool Connection::Finish() {
         budget_->Return(Counted(capacity_));
         capacity_ = kFirstCapacity;
     }
-    return !HasHeader() || JudgeHeader();
+    return !HasHeader() || CheckHeader();
 }
 
 bool Connection::Send(const wire::ReplyHeader &header, Payload payload) {
@@ -127,7 +127,7 @@ bool Connection::Send(const wire::ReplyHeader &header, Payload payload) {
     if (!Flush()) return false;
     if (!sending_) return true;
     if (!budget_->Take(Counted(out_.size))) return false;
-    outTaken_ = Counted(out_.size);
+    outReserved_ = Counted(out_.size);
     if (!out_.IsLent()) return true;
     Block copy(std::malloc(out_.size));
     if (!copy) return false;
@@ -155,8 +155,8 @@ bool Connection::Flush() {
     }
     sending_ = false;
     out_ = {};
-    budget_->Return(outTaken_);
-    outTaken_ = 0;
+    budget_->Return(outReserved_);
+    outReserved_ = 0;
     return true;
 }
 

@@ -2,9 +2,8 @@
 #ifndef EMULATOR_CONNECTION_H
 #define EMULATOR_CONNECTION_H
 
-// One client: the request that is arriving, the answer that is leaving. Never blocks. A client is not
-// trusted: what it announces costs memory only as it arrives, and one that stands still in mid-message is
-// given up.
+// One client: its incoming request and outgoing reply. Never blocks. Clients are untrusted: announced sizes
+// use memory only as the bytes arrive, and a client that stalls in the middle of a message is disconnected.
 
 #include <chrono>
 #include <cstdint>
@@ -20,7 +19,7 @@ namespace dvs::emulator {
 
 using Clock = std::chrono::steady_clock;
 
-/// Bytes that all clients together may keep waiting in requests and answers.
+/// Limit for the bytes of all clients' pending requests and replies.
 class MemoryBudget {
 public:
     explicit MemoryBudget(uint64_t limit) : limit_(limit) {}
@@ -46,20 +45,20 @@ public:
     int Fd() const { return fd_; }
     pid_t Peer() const { return peer_; }
 
-    /// Takes in what has arrived. False when the client is gone, is no client, or asks for more than there
-    /// is.
+    /// Receives what has arrived. Returns false if the client has closed, sent an invalid header, or needs
+    /// more memory than the budget allows.
     [[nodiscard]] bool Receive();
 
-    /// True when a whole request has arrived; Request gives it, lent until Finish.
-    bool HasRequest() const { return judged_ && received_ >= needed_; }
+    /// True if a whole request has arrived. Request() returns it; it is valid until Finish().
+    bool HasRequest() const { return headerValid_ && received_ >= needed_; }
     wire::Kind RequestKind() const;
     Call Request() const;
 
-    /// Forgets the request. False when what follows it is none.
+    /// Discards the request. Returns false if the bytes after it are not a valid request.
     [[nodiscard]] bool Finish();
 
-    /// Sends an answer, now as far as it goes and the rest with Flush; a lent payload is copied if it has to
-    /// wait. False when the client is to be given up.
+    /// Sends as much of a reply as possible now; Flush sends the rest. A borrowed payload is copied if it has
+    /// to wait. Returns false if the client must be disconnected.
     [[nodiscard]] bool Send(const wire::ReplyHeader &header, Payload payload);
     [[nodiscard]] bool Flush();
 
@@ -68,8 +67,7 @@ public:
     bool IsInMessage() const { return (received_ > 0 && !HasRequest()) || sending_; }
     Clock::time_point LastProgress() const { return lastProgress_; }
 
-    /// The fault that is to befall the request at hand, and when: set by the server while it delays an
-    /// answer.
+    /// The fault to apply to the current request, and when. Set by the server while it delays a reply.
     struct Delayed {
         Clock::time_point due;
         Fault fault;
@@ -80,26 +78,26 @@ private:
     bool HasHeader() const { return received_ >= sizeof(wire::RequestHeader); }
     wire::RequestHeader Header() const;
     [[nodiscard]] bool Reserve(std::size_t size);
-    [[nodiscard]] bool JudgeHeader();
+    [[nodiscard]] bool CheckHeader();
 
     const int fd_;
     const pid_t peer_;
     MemoryBudget *const budget_;
     Clock::time_point lastProgress_;
 
-    // The request: `received_` bytes of at least `needed_`, which grows as the header becomes known.
+    // The request: `received_` bytes of at least `needed_`. The header sets `needed_`.
     std::unique_ptr<char[]> in_;
     std::size_t capacity_ = 0;
     std::size_t received_ = 0;
     std::size_t needed_ = sizeof(wire::RequestHeader);
-    bool judged_ = false; // the header has arrived and is one, so `needed_` is the whole request's
+    bool headerValid_ = false; // a valid header has arrived, so `needed_` is the size of the whole request
 
-    // The answer.
+    // The reply.
     bool sending_ = false;
     wire::ReplyHeader outHeader_{};
     Payload out_;
     std::size_t sent_ = 0;
-    uint64_t outTaken_ = 0; // of the budget
+    uint64_t outReserved_ = 0; // of the budget
 };
 
 } // namespace dvs::emulator

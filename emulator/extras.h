@@ -2,8 +2,8 @@
 #ifndef EMULATOR_EXTRAS_H
 #define EMULATOR_EXTRAS_H
 
-// What the module keeps beside the switch table: associations, link states, uplink data. None of it is part
-// of the state that commands 0 and 3 exchange, nor of the state file.
+// Data that the module stores outside the switch table: associations, link states, uplink data. It is not
+// part of the state that commands 0 and 3 exchange, nor of the state file.
 
 #include <cstdint>
 #include <functional>
@@ -16,7 +16,7 @@ namespace dvs::emulator {
 
 struct PortExtras {
     bool linkUp = false;
-    bool gaveConnectionId = false; // by a link that came up; taken back when it goes down
+    bool gaveConnectionId = false; // assigned when the link came up; removed when it goes down
     std::map<int32_t, std::vector<char>> uplinks;
 };
 
@@ -25,7 +25,7 @@ struct SwitchExtras {
     std::map<std::string, PortExtras, std::less<>> ports;
 };
 
-/// By switch id.
+/// Keyed by switch id.
 using Extras = std::map<std::string, SwitchExtras, std::less<>>;
 
 } // namespace dvs::emulator

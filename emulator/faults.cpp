@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Parsing and firing of faults; see the header for their form.
+// Parses and applies faults; faults.h describes their form.
 
 #include "emulator/faults.h"
 
@@ -17,7 +17,7 @@ struct ErrnoName {
     int value;
 };
 
-// The errors a driver answers with; others are given by number.
+// The errors a driver usually returns; others are given by number.
 constexpr ErrnoName kErrnoNames[] = {
     {"EPERM", EPERM},   {"ENOENT", ENOENT},       {"EINTR", EINTR},   {"EIO", EIO},
     {"ENXIO", ENXIO},   {"EAGAIN", EAGAIN},       {"ENOMEM", ENOMEM}, {"EACCES", EACCES},
@@ -105,7 +105,7 @@ bool Parse(std::string_view text, Fault *fault, std::string *why) {
         return false;
     }
     if (fault->Refuses() || fault->drop != Drop::No || fault->delay.count() > 0) return true;
-    *why = "nothing goes wrong: give status=, errno=, delay= or drop";
+    *why = "no effect given: add status=, errno=, delay= or drop";
     return false;
 }
 
@@ -126,7 +126,7 @@ std::optional<Fault> Faults::Next(int32_t command) {
         const bool matches = !fault->command || *fault->command == command;
         const bool due = matches && (fault->seen++, fault->nth == 0 || fault->seen == fault->nth);
         if (due && !next) next = *fault;
-        // A fault with a number has had its turn, whether or not another one came first.
+        // A fault with nth= is used up by its request even if an earlier fault applies to it.
         fault = due && fault->nth != 0 ? faults_.erase(fault) : fault + 1;
     }
     return next;

@@ -2,15 +2,15 @@
 #ifndef EMULATOR_FAULTS_H
 #define EMULATOR_FAULTS_H
 
-// Faults on demand: what an agent's developer wants the module to do wrong, and when.
+// Fault injection: makes chosen commands of the module fail.
 //
-//   command=N     the command's number; every command without it
-//   nth=N         only the N-th matching request, then never again; every one without it
-//   status=S      refuse with this status (decimal or 0x…)
-//   errno=E       refuse with this errno (number or name)
-//   delay=D       answer late: milliseconds, or with the suffix ms or s
-//   drop          close the connection instead of carrying the request out
-//   drop=after    carry the request out, then close the connection instead of answering
+//   command=N     the command's number; without it, every command
+//   nth=N         only the N-th matching request, once; without it, every one
+//   status=S      fail with this status (decimal or 0x…)
+//   errno=E       fail with this errno (number or name)
+//   delay=D       delay the reply: milliseconds, or with the suffix ms or s
+//   drop          close the connection without executing the request
+//   drop=after    execute the request, then close the connection without a reply
 
 #include <chrono>
 #include <cstdint>
@@ -26,7 +26,7 @@ namespace dvs::emulator {
 enum class Drop { No, Before, After };
 
 struct Fault {
-    std::string text; // as it was given
+    std::string text; // as given by the user
     std::optional<int32_t> command;
     uint64_t nth = 0; // 0: every one
     std::optional<HYP_ReturnStatus> status;
@@ -40,12 +40,12 @@ struct Fault {
 
 class Faults {
 public:
-    /// Adds the fault that `text` describes. False, with `*why`, when it describes none.
+    /// Parses and adds a fault. On a parse error returns false and sets `*why`.
     [[nodiscard]] bool Add(std::string_view text, std::string *why);
     void Clear() { faults_.clear(); }
     const std::vector<Fault> &All() const { return faults_; }
 
-    /// Counts a request and returns what is to go wrong with it: the first fault whose turn it is.
+    /// Counts a request and returns the first fault that applies to it.
     [[nodiscard]] std::optional<Fault> Next(int32_t command);
 
 private:

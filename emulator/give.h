@@ -2,19 +2,19 @@
 #ifndef EMULATOR_GIVE_H
 #define EMULATOR_GIVE_H
 
-// How a fetched value gets into an answer, and the names the module itself knows.
+// Puts a fetched value into a reply; also the property names that the module itself uses.
 
 #include "emulator/call.h"
 
 namespace dvs::emulator {
 
-/// Read as a global property, this is the switch's version number.
+/// Reading this global property returns the switch's version number.
 inline constexpr const char *kSwitchVersionProp = "com.orbeno.common.version";
 
-/// Given to a port by a link that comes up.
+/// Assigned to a port when its link comes up.
 inline constexpr const char *kConnectionIdProp = "com.orbeno.common.port.connectid";
 
-/// Answers a fetch with a value, or with the size that its buffer should have.
+/// Replies to a fetch with a value, or with the size that its buffer needs.
 [[nodiscard]] inline HYP_ReturnStatus Give(const Call &call, const void *value, uint32_t size,
                                            Answer *answer) {
     answer->dataLen = size;

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Making the socket (listen.h). Called by Server, which closes and removes it.
+// Creates the socket (listen.h). Server closes and removes it.
 
 #include "emulator/listen.h"
 
@@ -19,20 +19,20 @@ namespace dvs::emulator {
 
 namespace {
 
-constexpr std::chrono::seconds kTurn{10}; // others need a moment only; who holds it longer is no emulator
-constexpr std::chrono::milliseconds kPause{2};
+constexpr std::chrono::seconds kLockTimeout{10}; // emulators hold the lock only briefly
+constexpr std::chrono::milliseconds kRetryInterval{2};
 
 bool Failed(const std::string &what, std::string *why) {
     *why = what + ": " + std::strerror(errno);
     return false;
 }
 
-/// True when the path is free for a new socket: there is nothing, or a socket that nobody listens at.
+/// True if the path is free for a new socket: it does not exist, or is a socket without a listener.
 bool FreePath(const sockaddr_un &address, std::string *why) {
     struct stat status {};
     if (lstat(address.sun_path, &status) != 0) return errno == ENOENT || Failed(address.sun_path, why);
     if (!S_ISSOCK(status.st_mode)) {
-        *why = std::string(address.sun_path) + " is there and is no socket";
+        *why = std::string(address.sun_path) + " exists and is not a socket";
         return false;
     }
     const int probe = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
@@ -50,7 +50,7 @@ bool FreePath(const sockaddr_un &address, std::string *why) {
 int BindAt(const sockaddr_un &address, std::string *why) {
     const int fd = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC | SOCK_NONBLOCK, 0);
     if (fd == -1) return Failed("socket", why), -1;
-    // The mask makes the mode 0600 from the first moment.
+    // The umask gives the socket mode 0600 from the start.
     const mode_t mask = umask(0177);
     const bool bound = bind(fd, reinterpret_cast<const sockaddr *>(&address), sizeof address) == 0;
     const bool listens = bound && listen(fd, SOMAXCONN) == 0;
@@ -61,31 +61,30 @@ int BindAt(const sockaddr_un &address, std::string *why) {
     return -1;
 }
 
-/// The directory of the socket, locked. Between looking at a socket that nobody listens at and putting
-/// another one in its place lies a moment in which somebody else may have done the same: his, too, would be
-/// unlinked. The lock is on the directory so that nothing is left behind in it.
-class DirectoryTurn {
+/// A lock on the socket's directory. Without it, two emulators could both find a stale socket, and the slower
+/// one would unlink the new socket of the other. Locking the directory itself leaves no lock file behind.
+class DirectoryLock {
 public:
-    DirectoryTurn() = default;
-    ~DirectoryTurn() {
+    DirectoryLock() = default;
+    ~DirectoryLock() {
         if (fd_ != -1) close(fd_);
     }
-    DirectoryTurn(const DirectoryTurn &) = delete;
-    DirectoryTurn &operator=(const DirectoryTurn &) = delete;
+    DirectoryLock(const DirectoryLock &) = delete;
+    DirectoryLock &operator=(const DirectoryLock &) = delete;
 
     [[nodiscard]] bool Take(const std::string &path, std::string *why) {
         const std::size_t slash = path.rfind('/');
         const std::string directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
         fd_ = open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
         if (fd_ == -1) return Failed(directory, why);
-        const auto end = std::chrono::steady_clock::now() + kTurn;
+        const auto end = std::chrono::steady_clock::now() + kLockTimeout;
         while (flock(fd_, LOCK_EX | LOCK_NB) != 0) {
             if (errno != EWOULDBLOCK && errno != EINTR) return Failed(directory, why);
             if (std::chrono::steady_clock::now() >= end) {
                 *why = directory + " is locked by another program";
                 return false;
             }
-            std::this_thread::sleep_for(kPause);
+            std::this_thread::sleep_for(kRetryInterval);
         }
         return true;
     }
@@ -100,12 +99,12 @@ int ListenAt(const std::string &path, std::string *why) {
     sockaddr_un address{};
     address.sun_family = AF_UNIX;
     if (path.empty() || path.size() >= sizeof address.sun_path) {
-        *why = "a socket's path has 1 to " + std::to_string(sizeof address.sun_path - 1) + " characters";
+        *why = "socket path must have 1 to " + std::to_string(sizeof address.sun_path - 1) + " characters";
         return -1;
     }
     std::memcpy(address.sun_path, path.c_str(), path.size());
-    DirectoryTurn turn;
-    if (!turn.Take(path, why) || !FreePath(address, why)) return -1;
+    DirectoryLock lock;
+    if (!lock.Take(path, why) || !FreePath(address, why)) return -1;
     return BindAt(address, why);
 }
 

@@ -2,15 +2,14 @@
 #ifndef EMULATOR_LISTEN_H
 #define EMULATOR_LISTEN_H
 
-// Where the emulator is reached: making its socket without taking another emulator's away.
+// Creates the emulator's socket without disturbing another emulator.
 
 #include <string>
 
 namespace dvs::emulator {
 
-/// Listens at `path`, mode 0600; a socket that nobody listens at any more is replaced. Emulators that start
-/// there at the same time take turns, so that one of them gets it and the others find it in use. -1 with
-/// `*why`.
+/// Listens at `path`, mode 0600. Replaces a socket without a listener. If several emulators start at the same
+/// path, one gets the socket and the others find it in use. Returns -1 and sets `*why` on failure.
 [[nodiscard]] int ListenAt(const std::string &path, std::string *why);
 
 } // namespace dvs::emulator

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// dvs-emulator: the hypervisor kernel's switching module as an ordinary process.
+// dvs-emulator: runs the hypervisor kernel's switching module as an ordinary process.
 
 #include <cstdio>
 #include <exception>
@@ -14,7 +14,7 @@ int Main(int argc, char **argv) {
     Options options;
     std::string why;
     if (!ParseOptions(argc, argv, &options, &why)) {
-        Complain(why + "; see --help");
+        PrintError(why + "; see --help");
         return kExitUsage;
     }
     switch (options.mode) {
@@ -41,7 +41,7 @@ int main(int argc, char **argv) {
     try {
         return Main(argc, argv);
     } catch (const std::exception &error) {
-        Complain(error.what());
+        PrintError(error.what());
         return kExitFailed;
     }
 }

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The table of commands, the checks that all of them share, and the commands on whole states and switches.
-// Properties and ports are in module_values.cpp, text commands in text_commands.cpp.
+// The table of commands, their common checks, and the commands on whole states and switches.
+// module_values.cpp has the commands on properties and ports, text_commands.cpp the text commands.
 
 #include "emulator/module.h"
 
@@ -68,7 +68,7 @@ static_assert(std::ranges::equal(CommandTable::kRows, device::kCommands, {}, &Co
 
 namespace {
 
-/// What a switch takes of a serialized state beside its lists and ports: its entry and its three fixed
+/// Upper bound for a switch in a serialized state, without its lists and ports: its entry and its three fixed
 /// fields.
 constexpr uint64_t kSwitchOverhead = 1024;
 
@@ -76,13 +76,13 @@ template <std::size_t N> bool Terminated(const char (&field)[N]) {
     return strnlen(field, N) < N;
 }
 
-/// A record whose texts do not end has no names to work with.
+/// False if a text of the record is not NUL-terminated.
 bool HasTexts(const DVSHYPRequest &record) {
     return Terminated(record.switchName) && Terminated(record.portId) && Terminated(record.propName) &&
            Terminated(record.cmd);
 }
 
-/// A length without a buffer behind it: what copying from or to user space would fault on.
+/// True if a length has no buffer: copying from or to user space would fault.
 bool LacksBuffer(const Call &call) {
     switch (device::TransferOf(call.request)) {
     case Transfer::ValueIn:
@@ -97,7 +97,7 @@ bool LacksBuffer(const Call &call) {
     return false;
 }
 
-/// What an entry with `size` bytes of value takes of a serialized list.
+/// Size of an entry with a value of `size` bytes in a serialized list.
 constexpr uint64_t EntrySize(uint64_t size) {
     return size + 146;
 }
@@ -107,7 +107,7 @@ uint64_t ListSize(const DVSData *list) {
 }
 
 bool AddPortSize(DVSPort *port, void *arg) {
-    // Room for the kind that serialization may append.
+    // Reserve room for the kind that serialization may add.
     *static_cast<uint64_t *>(arg) += ListSize(port->portData) + EntrySize(sizeof port->portType);
     return false;
 }
@@ -119,18 +119,18 @@ bool AddSwitchSize(DVSwitch *sw, void *arg) {
     return false;
 }
 
-/// The state set aside while another one is tried, with the ports it counts for. Put back unless it is
-/// dropped.
-class SetAside {
+/// Moves the current state, with its ports in the host-wide count, aside while another one is loaded.
+/// Restores it unless it is dropped.
+class SavedState {
 public:
-    SetAside() { Exchange(); }
-    ~SetAside() {
+    SavedState() { Exchange(); }
+    ~SavedState() {
         if (dropped_) return;
         (void)DVSState_ConfigReset();
         Exchange();
     }
-    SetAside(const SetAside &) = delete;
-    SetAside &operator=(const SetAside &) = delete;
+    SavedState(const SavedState &) = delete;
+    SavedState &operator=(const SavedState &) = delete;
 
     void Drop() {
         Exchange();
@@ -154,8 +154,8 @@ bool RemoveLeftoverPort(DVSPort *port, void *) {
     char id[sizeof port->portId];
     std::memcpy(id, port->portId, sizeof id);
     const char *switchId = DVS_SwitchId(port->owner);
-    // The walk allows removing the port it is at: the first of its id and kind, since earlier ones are gone
-    // by now.
+    // The walk allows removing its current port. That port is the first with its id and kind, because earlier
+    // ones have been removed.
     if (port->portType == DVS_PORT_ZOMBIE)
         (void)DVSState_PortRemoveZombie(switchId, id);
     else if (port->portType == DVS_PORT_LOCAL_CACHE)
@@ -168,7 +168,7 @@ bool SanitizeSwitch(DVSwitch *sw, void *) {
     return false;
 }
 
-/// The highest slot in use and one: a limit below it would hide ports from the switch.
+/// One past the highest slot in use: a lower limit would hide ports from the switch.
 bool RaiseToSlot(DVSPort *port, void *arg) {
     auto *slots = static_cast<std::pair<uint32_t, const DVSwitch *> *>(arg);
     while (slots->second->ports[slots->first++] != port) {
@@ -230,7 +230,7 @@ HYP_ReturnStatus Module::Dispatch(const Call &call, Answer *answer) {
     if (!row) return HYP_NOT_SUPPORTED;
     counters_.calls[static_cast<std::size_t>(call.request)]++;
     if (LacksBuffer(call)) {
-        // As where copying fails, nothing has written a status.
+        // As with a failed copy from user space, the module has not written a status.
         answer->error = EFAULT;
         return call.record.status == HYP_OK ? static_cast<HYP_ReturnStatus>(HYP_FAILURE) : call.record.status;
     }
@@ -276,7 +276,7 @@ PortExtras &Module::ExtrasOf(DVSPort *port) {
 
 HYP_ReturnStatus Module::StateInit(const Call &call, Answer *) {
     const dvs::state::StateLock lock;
-    SetAside old;
+    SavedState old;
     const HYP_ReturnStatus status =
         DVSState_ConfigDeserialize(call.value.data(), static_cast<uint32_t>(call.value.size()));
     if (status != HYP_OK) return status;
@@ -293,7 +293,7 @@ HYP_ReturnStatus Module::StateCleanup(const Call &, Answer *) {
 
 HYP_ReturnStatus Module::StateSanitize(const Call &, Answer *) {
     DVSState_SwitchForEach(SanitizeSwitch, nullptr);
-    // What a removed port had beside its data goes with it.
+    // Delete the extra data of removed ports.
     for (auto &[switchId, sw] : extras_) {
         DVSwitch *found = DVSState_SwitchFind(switchId.c_str());
         std::erase_if(sw.ports, [&](const auto &port) {
@@ -313,7 +313,7 @@ HYP_ReturnStatus Module::StateGet(const Call &call, Answer *answer) {
         state.reset(serialized);
     }
     const HYP_ReturnStatus status = Give(call, state.get(), fetchedStateSize_, answer);
-    // Refused, the client asks again at once with the size it was told.
+    // After a failure the client immediately retries with the returned size.
     if (status == HYP_OK)
         answer->payload.owned = std::move(state);
     else
@@ -354,7 +354,7 @@ HYP_ReturnStatus Module::SwitchSetMaxPorts(const Call &call, Answer *) {
     const uint32_t ports = call.record.maxPorts;
     if (ports > uwMaxNumActivePortsSystemWide) return HYP_LIMIT_EXCEEDED;
     if (sw->classFlags & dvs::state::kUnlimitedClass) {
-        // The class is not held to a limit: it is kept as asked for, and its slots stay the host's.
+        // This class has no limit of its own: store the requested one; the number of slots stays the host's.
         sw->newMaxPorts = ports;
         return HYP_OK;
     }
@@ -371,7 +371,7 @@ HYP_ReturnStatus Module::SwitchSetVersion(const Call &call, Answer *) {
     const uint32_t version = call.record.version;
     const HYP_ReturnStatus status = DVSState_SwitchSetVersion(name, version);
     if (status != HYP_OK) return status;
-    // Where the version is a property as well, the two are one.
+    // If the version is also set as a property, keep the two equal.
     DVSDataEntry *entry = nullptr;
     if (DVSState_GlobalPropLookup(name, kSwitchVersionProp, &entry) != HYP_OK) return HYP_OK;
     return DVSState_GlobalPropSet(name, kSwitchVersionProp, &version, sizeof version,

@@ -2,8 +2,8 @@
 #ifndef EMULATOR_MODULE_H
 #define EMULATOR_MODULE_H
 
-// The switching module: the commands over the library's own switch table, which holds the live state. Knows
-// nothing of sockets; single-threaded.
+// The switching module: the commands over the library's own switch table, which holds the live state.
+// Independent of sockets; single-threaded.
 
 #include <array>
 #include <string>
@@ -27,16 +27,16 @@ struct Counters {
 
 class Module {
 public:
-    /// `stateFile` is empty for none; with `sync` the state is saved after every change.
+    /// An empty `stateFile` means none. With `sync`, the state is saved after every change.
     Module(std::string stateFile, bool sync);
 
-    /// Carries out one command. Without memory for it, HYP_NO_MEMORY.
+    /// Executes one command. Returns HYP_NO_MEMORY if out of memory.
     [[nodiscard]] Answer Execute(const Call &call);
 
-    /// Loads the state file, if there is one. On failure the state is empty and `*why` says what is wrong.
+    /// Loads the state file, if it exists. On failure the state is empty and `*why` describes the error.
     [[nodiscard]] HYP_ReturnStatus LoadState(std::string *why);
 
-    /// Saves the state durably; HYP_OK when there is no state file.
+    /// Saves the state durably; HYP_OK if there is no state file.
     [[nodiscard]] HYP_ReturnStatus SaveState();
 
     Faults &FaultTable() { return faults_; }
@@ -88,9 +88,9 @@ private:
     HYP_ReturnStatus LinkUp(DVSPort *port);
     HYP_ReturnStatus LinkDown(DVSPort *port);
 
-    /// HYP_LIMIT_EXCEEDED when `size` bytes more leave the state no room.
+    /// HYP_LIMIT_EXCEEDED if the state has no room for `size` more bytes.
     HYP_ReturnStatus CheckRoom(uint64_t size);
-    /// The same for a property's value, which has a limit of its own.
+    /// The same for a property's value, which also has its own limit.
     HYP_ReturnStatus CheckValue(uint64_t size);
     PortExtras &ExtrasOf(DVSPort *port);
     void Forget(const char *switchName, const char *portId);
@@ -101,8 +101,8 @@ private:
     Faults faults_;
     Counters counters_;
     uint32_t lastConnectionId_ = 0;
-    uint64_t sizeBound_ = 0; // never below the state's size; made exact when it would refuse a value
-    Block fetchedState_; // the state as it was when a receive buffer was too small for it, until it changes
+    uint64_t sizeBound_ = 0; // upper bound of the state's size; made exact before it rejects a value
+    Block fetchedState_; // the state of a fetch whose buffer was too small; dropped on a change
     uint32_t fetchedStateSize_ = 0;
 };
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The commands on properties, ports and uplink data: a few lines each over the library's own operations.
+// The commands on properties, ports and uplink data: thin wrappers over the library's operations.
 
 #include <charconv>
 #include <cstring>
@@ -31,7 +31,7 @@ uint32_t SizeOf(const Call &call) {
     return static_cast<uint32_t>(call.value.size());
 }
 
-/// The uplink's number as the library writes it: decimal, nothing else.
+/// Parses the uplink's number as the library writes it: decimal digits only.
 bool ParseUplink(const char *text, int32_t *uplink) {
     const char *end = text + std::strlen(text);
     const auto [stop, error] = std::from_chars(text, end, *uplink);
@@ -80,7 +80,8 @@ HYP_ReturnStatus Module::HostPropClear(const Call &call, Answer *) {
 // Ports
 
 HYP_ReturnStatus Module::PortAdd(const Call &call, Answer *) {
-    // A whole list, not one value: what a port's state was fetched as can be added again.
+    // Check the room, not the value limit: a port's data is a whole list, and a fetched port can be added
+    // again.
     const HYP_ReturnStatus status = CheckRoom(call.value.size());
     if (status != HYP_OK) return status;
     return DVSState_PortDeserialize(call.record.switchName, call.record.portId, call.value.data(),
@@ -141,7 +142,7 @@ HYP_ReturnStatus Module::UplinkDataSet(const Call &call, Answer *) {
     if (!ParseUplink(call.record.propName, &uplink)) return HYP_BAD_PARAM;
     DVSPort *port = ::FindPort(call);
     if (!port) return HYP_NOT_FOUND;
-    // As a property, it is not set to nothing.
+    // As with properties, an empty value is an error.
     if (call.value.empty()) return HYP_FAILURE;
     const HYP_ReturnStatus status = CheckValue(call.value.size());
     if (status != HYP_OK) return status;

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Parsing of the command line: one table of options, each a word, those with a value followed by it.
+// Parses the command line with one table of options. A value is the word after its option.
 
 #include "emulator/options.h"
 
@@ -19,7 +19,7 @@ bool SetMaxPorts(Options *options, std::string_view value, std::string *why) {
     const char *end = value.data() + value.size();
     const auto [stop, error] = std::from_chars(value.data(), end, options->maxPorts);
     if (error == std::errc() && stop == end && options->maxPorts > 0) return true;
-    *why = "--max-ports wants a number from 1 on";
+    *why = "--max-ports requires a number of 1 or more";
     return false;
 }
 
@@ -31,21 +31,21 @@ bool SetFault(Options *options, std::string_view value, std::string *why) {
 
 struct Row {
     std::string_view name;
-    std::string_view value; // what the help calls it; none for a plain option
+    std::string_view value; // placeholder in the help; empty for an option without a value
     std::string_view help;
     Setter set;
 };
 
 constexpr Row kRows[] = {
-    {"--socket", "PATH", "listen here; $DVS_EMULATOR without it",
+    {"--socket", "PATH", "listen on this socket (default: $DVS_EMULATOR)",
      [](Options *options, std::string_view value, std::string *) { return options->socket = value, true; }},
-    {"--state", "FILE", "load the state from this file, save it there at exit",
+    {"--state", "FILE", "load the state from this file and save it there at exit",
      [](Options *options, std::string_view value, std::string *) { return options->state = value, true; }},
-    {"--max-ports", "N", "ports of the whole host; $DVS_MAX_PORTS or 65536 without it", SetMaxPorts},
+    {"--max-ports", "N", "ports of the whole host (default: $DVS_MAX_PORTS, else 65536)", SetMaxPorts},
     {"--sync", "", "save the state after every change",
      [](Options *options, std::string_view, std::string *) { return options->sync = true; }},
-    {"--fault", "SPEC", "let commands fail: 'command=19,nth=3,status=0x0bad0014' (again for more)", SetFault},
-    {"--help", "", "print this",
+    {"--fault", "SPEC", "inject a fault: 'command=19,nth=3,status=0x0bad0014' (repeatable)", SetFault},
+    {"--help", "", "print this help",
      [](Options *options, std::string_view, std::string *) { return options->mode = Mode::Help, true; }},
     {"--version", "", "print the version",
      [](Options *options, std::string_view, std::string *) { return options->mode = Mode::Version, true; }},
@@ -65,9 +65,9 @@ bool Wrong(std::string text, std::string *why) {
 
 bool Complete(Options *options, std::string *why) {
     if (options->mode == Mode::Help || options->mode == Mode::Version) return true;
-    if (options->sync && options->state.empty()) return Wrong("--sync wants --state", why);
+    if (options->sync && options->state.empty()) return Wrong("--sync requires --state", why);
     if (options->mode == Mode::Run) {
-        if (options->command.empty()) return Wrong("run wants a command behind --", why);
+        if (options->command.empty()) return Wrong("run requires a command after --", why);
         options->command.push_back(nullptr);
         return true;
     }
@@ -93,7 +93,7 @@ bool ParseOptions(int argc, char **argv, Options *options, std::string *why) {
         const Row *row = FindRow(word);
         if (!row) return Wrong("unknown option \"" + std::string(word) + "\"", why);
         const bool valued = !row->value.empty();
-        if (valued && i + 1 == argc) return Wrong(std::string(word) + " wants a value", why);
+        if (valued && i + 1 == argc) return Wrong(std::string(word) + " requires a value", why);
         if (!row->set(options, valued ? argv[++i] : "", why)) return false;
     }
     return Complete(options, why);
@@ -103,8 +103,8 @@ void PrintHelp() {
     std::puts(
         "usage: dvs-emulator [OPTIONS]\n"
         "       dvs-emulator run [OPTIONS] -- COMMAND...\n\n"
-        "The hypervisor kernel's switching module as an ordinary process, on a Unix socket. `run` starts\n"
-        "a private one, and a private configuration store, for one command and exits with its status.\n");
+        "Runs the hypervisor kernel's switching module as an ordinary process on a Unix socket. `run`\n"
+        "starts a private emulator and configuration store for one command and exits with its status.\n");
     for (const Row &row : kRows) {
         const std::string usage = std::string(row.name) + ' ' + std::string(row.value);
         std::printf("  %-18s %.*s\n", usage.c_str(), static_cast<int>(row.help.size()), row.help.data());

@@ -14,7 +14,7 @@ namespace dvs::emulator {
 
 enum class Mode { Serve, Run, Help, Version };
 
-/// Exit statuses of the emulator itself; `run` passes on its command's.
+/// Exit statuses of the emulator itself; `run` returns its command's status.
 enum ExitStatus { kExitDone = 0, kExitFailed = 1, kExitUsage = 2, kExitDamaged = 6 };
 
 struct Options {
@@ -24,10 +24,10 @@ struct Options {
     uint32_t maxPorts = 0; // 0: the host's default
     bool sync = false;
     Faults faults;
-    std::vector<char *> command; // of `run`, ending in null
+    std::vector<char *> command; // of `run`, null-terminated
 };
 
-/// False, with `*why`, for a wrong command line.
+/// Parses the command line. On a usage error returns false and sets `*why`.
 [[nodiscard]] bool ParseOptions(int argc, char **argv, Options *options, std::string *why);
 
 void PrintHelp();

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// `dvs-emulator run`: a private emulator and configuration store for the length of one command. Three
-// processes: this one waits and tidies up, one child serves, the other is the command.
+// `dvs-emulator run`: a private emulator and configuration store for one command. Uses three processes: the
+// parent waits and cleans up, one child serves, the other runs the command.
 
 #include <cerrno>
 #include <csignal>
@@ -18,7 +18,7 @@ namespace dvs::emulator {
 
 namespace {
 
-/// A directory for the socket and the store, gone with its contents at the end.
+/// A directory for the socket and the store; the destructor removes it with its contents.
 class PrivateDirectory {
 public:
     PrivateDirectory() {
@@ -27,7 +27,7 @@ public:
         if (!mkdtemp(path_.data())) path_.clear();
     }
     ~PrivateDirectory() {
-        std::error_code ignored; // nothing is left to be done about it
+        std::error_code ignored; // best effort
         if (!path_.empty()) std::filesystem::remove_all(path_, ignored);
     }
     PrivateDirectory(const PrivateDirectory &) = delete;
@@ -47,8 +47,8 @@ int StatusOf(pid_t child) {
     return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
 }
 
-/// Starts the serving child and waits until it serves; -1, with its exit status, when it does not come to
-/// that.
+/// Starts the serving child and waits until it is ready. If it fails, returns -1 and sets `*exitStatus` to
+/// its exit status.
 pid_t StartEmulator(const Options &options, int *exitStatus) {
     int ready[2];
     *exitStatus = kExitFailed;
@@ -57,13 +57,12 @@ pid_t StartEmulator(const Options &options, int *exitStatus) {
     const pid_t child = fork();
     if (child == 0) {
         close(ready[0]);
-        // Keys pressed at the terminal are the command's; the emulator ends when this process says so or is
-        // gone.
+        // Terminal signals go to the command only. The emulator ends when this process signals it or exits.
         setpgid(0, 0);
         prctl(PR_SET_PDEATHSIG, SIGTERM);
         if (getppid() != parent) _exit(kExitFailed);
         const auto tell = [&] { (void)!write(ready[1], "", 1); };
-        std::exit(Serve(options, tell)); // in order: whoever watches it reports at the end
+        std::exit(Serve(options, tell)); // runs exit handlers: sanitizers and coverage report at exit
     }
     close(ready[1]);
     char byte = 0;
@@ -82,11 +81,11 @@ pid_t StartCommand(const Options &options, const std::string &directory, const s
     sigprocmask(SIG_SETMASK, &signals, nullptr);
     execvp(options.command[0], options.command.data());
     const int error = errno;
-    Complain(std::string(options.command[0]) + ": " + std::strerror(error));
+    PrintError(std::string(options.command[0]) + ": " + std::strerror(error));
     _exit(error == ENOENT ? 127 : 126);
 }
 
-/// Waits for the command, passing on the signals that ask this process to end.
+/// Waits for the command and forwards termination signals to it.
 int WaitForCommand(pid_t command, const sigset_t &passedOn) {
     for (;;) {
         const int signal = sigwaitinfo(&passedOn, nullptr);
@@ -100,11 +99,11 @@ int WaitForCommand(pid_t command, const sigset_t &passedOn) {
 } // namespace
 
 int RunCommand(Options options) {
-    // Inherited as ignored it would never tell of the command's end.
+    // If SIGCHLD is inherited as ignored, the command's end is not reported.
     std::signal(SIGCHLD, SIG_DFL);
     const PrivateDirectory directory;
     if (directory.Path().empty()) {
-        Complain(std::string("no temporary directory: ") + std::strerror(errno));
+        PrintError(std::string("no temporary directory: ") + std::strerror(errno));
         return kExitFailed;
     }
     if (options.socket.empty()) options.socket = directory.Path() + "/socket";
@@ -121,10 +120,10 @@ int RunCommand(Options options) {
     if (command != -1)
         status = WaitForCommand(command, waited);
     else
-        Complain(std::strerror(errno));
+        PrintError(std::strerror(errno));
     kill(emulator, SIGTERM);
     const int emulatorStatus = StatusOf(emulator);
-    // A state that could not be saved must not pass for a success of the command.
+    // If the state could not be saved, do not return the command's success.
     return status == kExitDone ? emulatorStatus : status;
 }
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The life of one emulator: limits, state, socket, signals, state again.
+// Runs one emulator: sets the limits, loads the state, creates the socket, handles signals, saves the state.
 
 #include "emulator/serve.h"
 
@@ -22,53 +22,53 @@ namespace dvs::emulator {
 
 namespace {
 
-/// Settles the port limit before anything needs it. The process must not ask an emulator for it: it is the
-/// emulator.
-bool SettleLimit(uint32_t maxPorts) {
+/// Sets the port limit before anything uses it. Unsets DVS_EMULATOR, so that the emulator does not ask itself
+/// for the limit.
+bool InitPortLimit(uint32_t maxPorts) {
     unsetenv("DVS_EMULATOR");
     if (maxPorts > 0) DVSHost_SetMaxPorts(maxPorts);
     uint32_t limit = 0;
     const HYP_ReturnStatus status = KIT_Get(KIT_NODE_net_maxPortsSystemWide, nullptr, &limit, sizeof limit);
-    if (status != HYP_OK) Complain(std::string("DVS_MAX_PORTS: ") + HYP_ReturnStatusToString(status));
+    if (status != HYP_OK) PrintError(std::string("DVS_MAX_PORTS: ") + HYP_ReturnStatusToString(status));
     uwMaxNumActivePortsSystemWide = limit;
     return status == HYP_OK;
 }
 
-/// Started without its standard streams, what is opened first would take their numbers, and messages would go
-/// there: to a client, or into the state file.
-void HoldStandardStreams() {
+/// Opens /dev/null for missing standard streams. Otherwise the next opened files would take their numbers,
+/// and messages would go to a client or into the state file.
+void OpenStandardStreams() {
     int fd = 0;
     while (fd != -1 && fd <= STDERR_FILENO)
         fd = open("/dev/null", O_RDWR);
     if (fd != -1) close(fd);
 }
 
-/// Whoever starts programs under nohup means them to outlive the terminal. SIGINT is another matter: shells
-/// ignore it for whatever they start in the background.
-bool OutlivesTerminal() {
+/// True under nohup, which asks a program to survive its terminal. SIGINT does not count: shells ignore it
+/// for background programs.
+bool IgnoresHangup() {
     struct sigaction action {};
     return sigaction(SIGHUP, nullptr, &action) == 0 && action.sa_handler == SIG_IGN;
 }
 
-/// A descriptor that becomes readable when the process is told to end.
+/// Returns a descriptor that becomes readable on a termination signal.
 int EndSignals() {
-    // Nobody has to listen to the ready line.
+    // The reader of the ready line may be gone.
     std::signal(SIGPIPE, SIG_IGN);
     sigset_t signals;
     sigemptyset(&signals);
     for (const int signal : {SIGTERM, SIGINT})
         sigaddset(&signals, signal);
-    if (!OutlivesTerminal()) sigaddset(&signals, SIGHUP);
+    if (!IgnoresHangup()) sigaddset(&signals, SIGHUP);
     sigprocmask(SIG_BLOCK, &signals, nullptr);
     return signalfd(-1, &signals, SFD_CLOEXEC | SFD_NONBLOCK);
 }
 
-/// What a state file that cannot be taken over means for the caller.
+/// The exit status for a state file that cannot be loaded.
 int LoadFailure(HYP_ReturnStatus status) {
     switch (status) {
     case HYP_READ_ERROR:
     case HYP_NO_MEMORY:
-    case HYP_NOT_FOUND: // it is there, but may not be read
+    case HYP_NOT_FOUND: // it exists but is not readable
         return kExitFailed;
     default:
         return kExitDamaged;
@@ -77,26 +77,26 @@ int LoadFailure(HYP_ReturnStatus status) {
 
 } // namespace
 
-void Complain(const std::string &text) {
+void PrintError(const std::string &text) {
     std::fprintf(stderr, "dvs-emulator: %s\n", text.c_str());
 }
 
 int Serve(const Options &options, const std::function<void()> &ready) {
-    HoldStandardStreams();
+    OpenStandardStreams();
     const int stopFd = EndSignals();
-    if (!SettleLimit(options.maxPorts)) return kExitUsage;
+    if (!InitPortLimit(options.maxPorts)) return kExitUsage;
     Module module(options.state, options.sync);
     module.FaultTable() = options.faults;
     std::string why;
     HYP_ReturnStatus status = module.LoadState(&why);
     if (status != HYP_OK) {
-        Complain(why);
+        PrintError(why);
         return LoadFailure(status);
     }
     {
         Server server(&module);
         if (stopFd == -1 || !server.Listen(options.socket, &why)) {
-            Complain(stopFd == -1 ? std::strerror(errno) : why);
+            PrintError(stopFd == -1 ? std::strerror(errno) : why);
             return kExitFailed;
         }
         ready();
@@ -105,7 +105,7 @@ int Serve(const Options &options, const std::function<void()> &ready) {
     close(stopFd);
     status = module.SaveState();
     if (status == HYP_OK) return kExitDone;
-    Complain(options.state + ": not saved: " + HYP_ReturnStatusToString(status));
+    PrintError(options.state + ": cannot be saved: " + HYP_ReturnStatusToString(status));
     return kExitFailed;
 }
 

@@ -2,7 +2,7 @@
 #ifndef EMULATOR_SERVE_H
 #define EMULATOR_SERVE_H
 
-// The two ways of running: in the foreground until a signal, and around one command.
+// The two modes: in the foreground until a signal, and around one command.
 
 #include <functional>
 
@@ -10,15 +10,15 @@
 
 namespace dvs::emulator {
 
-/// Serves until SIGTERM, SIGINT or SIGHUP (unless that is ignored) and saves the state; the exit status.
-/// `ready` is called once clients can connect.
+/// Serves until SIGTERM, SIGINT or SIGHUP (unless ignored), then saves the state. Returns the exit status.
+/// Calls `ready` once clients can connect.
 [[nodiscard]] int Serve(const Options &options, const std::function<void()> &ready);
 
-/// Starts an emulator and a store of its own for the options' command; the command's exit status.
+/// Runs the options' command with a private emulator and store. Returns the command's exit status.
 [[nodiscard]] int RunCommand(Options options);
 
-/// A line on standard error.
-void Complain(const std::string &text);
+/// Prints a line to standard error.
+void PrintError(const std::string &text);
 
 } // namespace dvs::emulator
 

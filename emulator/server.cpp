@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The poll loop. Leans on Connection for bytes and on Module for what they mean.
+// The poll loop. Connection handles the bytes, Module executes the commands.
 
 #include "emulator/server.h"
 
@@ -24,10 +24,10 @@ constexpr std::size_t kReservedDescriptors = 32; // state file, signals, standar
 constexpr int kSendBuffer = 2 << 20;
 constexpr uint64_t kWaitingBytes = 1ULL << 30;
 constexpr std::chrono::seconds kStall{60};
-constexpr std::chrono::seconds kFarewell{5};
+constexpr std::chrono::seconds kStopTimeout{5};
 
-/// As many clients as descriptors allow, raising the soft limit where that helps.
-std::size_t RoomForClients() {
+/// The number of clients that the descriptor limit allows. Raises the soft limit if possible.
+std::size_t MaxClients() {
     rlimit limit{};
     if (getrlimit(RLIMIT_NOFILE, &limit) != 0) return kMaxClients / 2;
     const rlim_t wanted = kMaxClients + kReservedDescriptors;
@@ -39,11 +39,11 @@ std::size_t RoomForClients() {
     return static_cast<std::size_t>(std::min<rlim_t>(usable, kMaxClients));
 }
 
-/// Room for a large reply to leave in few pieces. Beyond the system's limit where that is allowed.
+/// Enlarges the send buffer, beyond the system's limit if permitted, so that a large reply takes few writes.
 void WidenSendBuffer(int fd) {
     const int size = kSendBuffer;
     if (setsockopt(fd, SOL_SOCKET, SO_SNDBUFFORCE, &size, sizeof size) != 0)
-        (void)setsockopt(fd, SOL_SOCKET, SO_SNDBUF, &size, sizeof size); // the default is slower, not wrong
+        (void)setsockopt(fd, SOL_SOCKET, SO_SNDBUF, &size, sizeof size); // best effort
 }
 
 wire::ReplyHeader NewReply() {
@@ -55,7 +55,7 @@ wire::ReplyHeader NewReply() {
 
 } // namespace
 
-Server::Server(Module *module) : module_(module), budget_(kWaitingBytes), maxClients_(RoomForClients()) {}
+Server::Server(Module *module) : module_(module), budget_(kWaitingBytes), maxClients_(MaxClients()) {}
 
 Server::~Server() {
     if (listenFd_ == -1) return;
@@ -104,7 +104,7 @@ int Server::NextTimeout() const {
     auto wait = std::chrono::milliseconds(-1);
     const auto now = Clock::now();
     const auto consider = [&](Clock::time_point when) {
-        // Rounded up: waking a moment early would only mean to poll again.
+        // Round up: waking early would only cause another poll.
         const auto left =
             std::max(std::chrono::ceil<std::chrono::milliseconds>(when - now), decltype(wait){0});
         if (wait.count() < 0 || left < wait) wait = left;
@@ -124,33 +124,33 @@ void Server::ServeOnce(int stopFd, bool *stopped) {
     polled_.push_back({stopFd, POLLIN, 0});
     polled_.push_back({listenFd_, POLLIN, 0});
     for (const auto &client : clients_) {
-        // A client whose answer is delayed or not yet taken is not listened to.
+        // Do not read from a client whose reply is delayed or not fully sent.
         const int events = client->delayed ? 0 : client->IsSending() ? POLLOUT : POLLIN;
         polled_.push_back({client->Fd(), static_cast<short>(events), 0});
     }
     if (poll(polled_.data(), polled_.size(), NextTimeout()) < 0) return;
     const auto now = Clock::now();
     for (std::size_t i = 0; i < clients_.size(); i++) {
-        if (!Keeps(clients_[i].get(), polled_[i + 2].revents, now)) clients_[i].reset();
+        if (!ServeClient(clients_[i].get(), polled_[i + 2].revents, now)) clients_[i].reset();
     }
     std::erase(clients_, nullptr);
     if (polled_[1].revents) Accept();
     *stopped = polled_[0].revents != 0;
 }
 
-/// Nobody new is heard; who is in mid-request may end it; who has been answered is done.
+/// Stops accepting connections and lets in-flight requests finish. Idle clients are disconnected.
 void Server::FinishRequests() {
     stopping_ = true;
     unlink(path_.c_str());
     close(listenFd_);
     listenFd_ = -1;
-    stopAt_ = Clock::now(); // the first round only looks for what has arrived
+    stopAt_ = Clock::now(); // the first round only serves requests that have already arrived
     for (const auto &client : clients_) {
         if (client->delayed) client->delayed->due = stopAt_;
     }
     bool stopped = false;
     ServeOnce(-1, &stopped);
-    stopAt_ = Clock::now() + kFarewell;
+    stopAt_ = Clock::now() + kStopTimeout;
     for (;;) {
         std::erase_if(clients_, [](const auto &client) { return client->IsIdle(); });
         if (clients_.empty() || Clock::now() >= stopAt_) break;
@@ -159,8 +159,8 @@ void Server::FinishRequests() {
     clients_.clear();
 }
 
-/// What a round does for one client; false when it is to be given up.
-bool Server::Keeps(Connection *client, short events, Clock::time_point now) {
+/// Handles one client in a poll round; false if it must be disconnected.
+bool Server::ServeClient(Connection *client, short events, Clock::time_point now) {
     try {
         if (client->delayed && client->delayed->due <= now) {
             Fault fault = std::move(client->delayed->fault);
@@ -176,7 +176,7 @@ bool Server::Keeps(Connection *client, short events, Clock::time_point now) {
     }
 }
 
-/// Carries out what has arrived whole, which is one request of a client that waits for its answers.
+/// Executes complete requests: one, for a client that waits for its replies.
 bool Server::ServeRequests(Connection *client) {
     while (client->HasRequest() && !client->IsSending()) {
         if (client->RequestKind() == wire::Kind::Limits) {
@@ -184,7 +184,7 @@ bool Server::ServeRequests(Connection *client) {
             continue;
         }
         const Call call = client->Request();
-        // Whoever set faults must be able to look at them and take them back.
+        // The fault command is exempt, so that faults can always be listed and cleared.
         const bool exempt = call.request == NumberOf(device::Command::CmdExec) && std::string_view(call.record.cmd, 5) == "fault";
         const auto fault = exempt ? std::nullopt : module_->FaultTable().Next(call.request);
         if (fault && fault->delay.count() > 0 && !stopping_) {

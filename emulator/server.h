@@ -2,8 +2,8 @@
 #ifndef EMULATOR_SERVER_H
 #define EMULATOR_SERVER_H
 
-// The socket and the loop over its clients. One thread carries out one request at a time, in the order in
-// which they become complete: what a command sees is never in the middle of another one.
+// The socket and the loop over its clients. One thread executes one request at a time, in the order in which
+// they complete, so commands never interleave.
 
 #include <memory>
 #include <string>
@@ -23,10 +23,10 @@ public:
     Server(const Server &) = delete;
     Server &operator=(const Server &) = delete;
 
-    /// Listens at `path` (listen.h). False with `*why`.
+    /// Listens at `path` (listen.h). On failure returns false and sets `*why`.
     [[nodiscard]] bool Listen(const std::string &path, std::string *why);
 
-    /// Serves until `stopFd` becomes readable, then finishes the requests in hand.
+    /// Serves until `stopFd` becomes readable, then finishes requests in flight.
     void Run(int stopFd);
 
 private:
@@ -36,7 +36,7 @@ private:
     [[nodiscard]] bool MayConnect(pid_t peer) const;
     void ServeOnce(int stopFd, bool *stopped);
     void FinishRequests();
-    [[nodiscard]] bool Keeps(Connection *client, short events, Clock::time_point now);
+    [[nodiscard]] bool ServeClient(Connection *client, short events, Clock::time_point now);
     [[nodiscard]] bool ServeRequests(Connection *client);
     [[nodiscard]] bool CarryOut(Connection *client, const Fault &fault);
     [[nodiscard]] bool AnswerLimits(Connection *client);
@@ -48,7 +48,7 @@ private:
     int listenFd_ = -1;
     std::size_t maxClients_;
     bool stopping_ = false;
-    Clock::time_point stopAt_; // while stopping: when patience ends
+    Clock::time_point stopAt_; // while stopping: the deadline
     std::vector<pollfd> polled_;
     Clients clients_;
 };

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The emulator's state file: loaded at start, saved durably. A file that is there but cannot be taken over
-// whole is never saved over.
+// The emulator's state file: loaded at start, saved durably. A file that exists but cannot be loaded
+// completely is never overwritten.
 
 #include <cerrno>
 #include <cstring>
@@ -16,7 +16,7 @@ namespace dvs::emulator {
 HYP_ReturnStatus Module::LoadState(std::string *why) {
     if (stateFile_.empty()) return HYP_OK;
     struct stat status {};
-    // The file layer's "not found" covers a file that may not be read, which must not be taken for a new one.
+    // The file layer also returns "not found" for an unreadable file, which must not count as a new one.
     if (stat(stateFile_.c_str(), &status) != 0) {
         if (errno == ENOENT) return HYP_OK;
         *why = stateFile_ + ": " + std::strerror(errno);

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Text commands, for people and scripts that watch and control the module: one table of them. Replies are lines of
-// text; switch and port names are escaped before they become part of a line.
+// Text commands, for people and scripts that watch and control the module, in one table. Replies are lines of
+// text; switch and port names are escaped.
 
 #include <algorithm>
 #include <array>
@@ -15,11 +15,11 @@
 
 namespace dvs::emulator {
 
-/// What stands behind a text command's name.
+/// The arguments of a text command.
 struct Module::TextArguments {
     const Call &call;
-    std::string_view rest;          // the text behind the name
-    std::vector<std::string> words; // the same, split at blanks; "…" keeps blanks together
+    std::string_view rest;          // the text after the name
+    std::vector<std::string> words; // the same, split at spaces; "…" keeps spaces together
 };
 
 struct TextCommandTable {
@@ -31,12 +31,12 @@ struct TextCommandTable {
         Handler handler;
     };
     static constexpr std::array kRows = {
-        Row{"help", "", "lists the text commands", &Module::TextHelp},
+        Row{"help", "", "list the text commands", &Module::TextHelp},
         Row{"stats", "", "counts of commands, switches and ports", &Module::TextStats},
         Row{"ports", "[SWITCH]", "a switch's ports: id, kind, connection id, link", &Module::TextPorts},
-        Row{"event", "[SWITCH] PORT up|down", "a port's link comes up or goes down", &Module::TextEvent},
-        Row{"save", "", "saves the state to the state file", &Module::TextSave},
-        Row{"fault", "SPEC|list|clear", "makes later commands fail, come late or get lost",
+        Row{"event", "[SWITCH] PORT up|down", "set a port's link up or down", &Module::TextEvent},
+        Row{"save", "", "save the state to the state file", &Module::TextSave},
+        Row{"fault", "SPEC|list|clear", "inject faults: failed, delayed or dropped commands",
             &Module::TextFault},
     };
 };
@@ -45,7 +45,7 @@ namespace {
 
 constexpr std::string_view kKinds[] = {"none", "active", "shadow", "zombie", "local-cache"};
 
-/// As a word of a reply: quoted, with everything but plain printing characters escaped.
+/// Formats a name for a reply: quoted, with everything but plain printing characters escaped.
 std::string Quoted(std::string_view text) {
     static constexpr char kHex[] = "0123456789abcdef";
     std::string quoted = "\"";
@@ -79,7 +79,7 @@ std::vector<std::string> Split(std::string_view text) {
     return words;
 }
 
-/// Switch ids hold blanks as often as not, so the words up to the last few are one id; without any it is the
+/// Switch ids often contain spaces, so all words except the last `behind` form one id. Without any, uses the
 /// record's.
 std::string SwitchOf(const Call &call, const std::vector<std::string> &words, std::size_t behind) {
     if (words.size() <= behind) return call.record.switchName;
@@ -102,7 +102,7 @@ uint32_t ConnectionId(DVSPort *port) {
     return id;
 }
 
-/// A walk's arguments: what is known beside the table, and the reply to add to.
+/// The arguments of a walk: the extra data, and the reply to append to.
 struct Listing {
     Extras *extras;
     std::string *reply;
@@ -219,7 +219,7 @@ HYP_ReturnStatus Module::TextEvent(const TextArguments &arguments, std::string *
     return status == HYP_OK && sync_ ? SaveState() : status;
 }
 
-/// A number that no port has: agents give some themselves, and a loaded state brings others with it.
+/// Returns an unused number: agents assign some themselves, and a loaded state contains others.
 uint32_t Module::NextConnectionId() {
     Ids taken{0}; // 0 is none
     DVSState_SwitchForEach(CollectConnectionIds, &taken);
@@ -228,7 +228,7 @@ uint32_t Module::NextConnectionId() {
     return lastConnectionId_;
 }
 
-/// A link that comes up is a connection, and gets a number; one that the agent gave the port is kept.
+/// A link that comes up gets a connection number, unless the agent has already assigned one.
 HYP_ReturnStatus Module::LinkUp(DVSPort *port) {
     PortExtras &extras = ExtrasOf(port);
     extras.linkUp = true;
@@ -245,7 +245,7 @@ HYP_ReturnStatus Module::LinkDown(DVSPort *port) {
     if (!extras.gaveConnectionId) return HYP_OK;
     extras.gaveConnectionId = false;
     const HYP_ReturnStatus status = DVSState_PortDataClear(port, kConnectionIdProp);
-    // An agent may have cleared it itself.
+    // The agent may have cleared it.
     return status == HYP_NOT_FOUND ? static_cast<HYP_ReturnStatus>(HYP_OK) : status;
 }
 
