@@ -2,7 +2,7 @@
 #ifndef BASE_BASE64_H
 #define BASE_BASE64_H
 
-// Base64 (RFC 4648) in its one canonical form: padded, without line ends, unused bits zero.
+// Base64 (RFC 4648) in canonical form only: padded, without line breaks, unused bits zero.
 
 #include <array>
 #include <cstddef>
@@ -15,7 +15,7 @@ namespace base64 {
 
 inline constexpr char kDigits[] = "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
 
-/// By character; 0xff where it is no digit.
+/// Indexed by character; 0xff if it is no base64 digit.
 inline constexpr std::array<std::uint8_t, 256> kValues = [] {
     std::array<std::uint8_t, 256> values{};
     values.fill(0xff);
@@ -31,7 +31,7 @@ inline constexpr std::array<std::uint8_t, 256> kValues = [] {
     return (size + 2) / 3 * 4;
 }
 
-/// The most bytes that a text of `size` characters decodes to.
+/// The maximum number of bytes that a text of `size` characters decodes to.
 [[nodiscard]] constexpr std::size_t DecodedBase64Size(std::size_t size) {
     return size / 4 * 3;
 }
@@ -57,8 +57,8 @@ inline char *EncodeBase64(char *out, const void *data, std::size_t size) {
     return out;
 }
 
-/// Decodes into `out`, which has room for DecodedBase64Size(text.size()) bytes; *size is how many were
-/// written. False when the text is not base64 in its canonical form.
+/// Decodes into `out`, which has room for DecodedBase64Size(text.size()) bytes; *size receives the number of
+/// bytes written. False if the text is not canonical base64.
 [[nodiscard]] inline bool DecodeBase64(std::string_view text, void *out, std::size_t *size) {
     if (text.size() % 4 != 0) return false;
     auto *at = static_cast<std::uint8_t *>(out);
@@ -81,7 +81,7 @@ inline char *EncodeBase64(char *out, const void *data, std::size_t size) {
         const std::uint32_t a = value(whole), b = value(whole + 1);
         const std::uint32_t c = padding == 1 ? value(whole + 2) : 0;
         if ((a | b | c) > 63) return false;
-        if (padding == 1 ? (c & 3) != 0 : (b & 15) != 0) return false; // bits that no byte takes
+        if (padding == 1 ? (c & 3) != 0 : (b & 15) != 0) return false; // unused bits must be zero
         *at++ = static_cast<std::uint8_t>(a << 2 | b >> 4);
         if (padding == 1) *at++ = static_cast<std::uint8_t>((b & 15) << 4 | c >> 2);
     }

@@ -14,8 +14,8 @@ namespace dvs::base {
 
 inline constexpr std::size_t kHugePage = std::size_t{1} << 21; // bytes
 
-/// Asks the system for huge pages. Only whole pages inside the block are named, because what lies around it may
-/// belong to the heap. Best effort: a refusal is ignored.
+/// Asks the system for huge pages. Covers only whole pages inside the block, because memory around it may
+/// belong to the heap. Best effort: errors are ignored.
 inline void AdviseHugePages(void *block, std::size_t size) {
     const auto address = reinterpret_cast<std::uintptr_t>(block);
     const std::uintptr_t start = (address + kHugePage - 1) & ~(kHugePage - 1);

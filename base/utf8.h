@@ -2,13 +2,13 @@
 #ifndef BASE_UTF8_H
 #define BASE_UTF8_H
 
-// What is well-formed UTF-8: no overlong forms, no surrogates, nothing above U+10FFFF.
+// UTF-8 validation: no overlong forms, no surrogates, nothing above U+10FFFF.
 
 #include <cstddef>
 
 namespace dvs::base {
 
-/// The length of the well-formed sequence at `text`, 1 to 4 bytes; 0 when there is none.
+/// The length of the well-formed sequence at `text`, 1 to 4 bytes; 0 if it is not well-formed.
 [[nodiscard]] inline std::size_t Utf8Length(const char *text, const char *end) {
     const auto *const at = reinterpret_cast<const unsigned char *>(text);
     const auto left = static_cast<std::size_t>(end - text);

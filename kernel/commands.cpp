@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The commands: each fills the fields of the record that it uses and sends it through the device channel. The module's
-// status is returned unchanged.
+// The commands. Each fills the record's fields that it uses and sends the record through the device channel.
+// The module's status is returned unchanged.
 
 #include <cstdio>
 

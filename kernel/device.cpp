@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The device channel: plain calls over the cached descriptor, fetches and command executions over one of
-// their own. Leans on platform/device.h only; every command of the kernel interface goes through here.
+// The device channel: plain calls use the cached descriptor; fetches and command executions open their own.
+// Every command of the kernel interface goes through it.
 
 #include <atomic>
 #include <cerrno>
@@ -25,7 +25,7 @@ using dvs::hyp::Step;
 constexpr const char *kDevicePath = "/pelo/devices/char/hypdriver/dvsdev";
 constexpr int kNoDescriptor = -1;
 
-/// The plain calls' descriptor. Opened by the first call, never closed; a failed open leaves it unset.
+/// The descriptor of plain calls. Opened by the first call, never closed; a failed open leaves it unset.
 constinit std::atomic<int> g_cachedFd{kNoDescriptor};
 
 int OpenDevice() {
@@ -43,12 +43,12 @@ int CachedDescriptor() {
     const int opened = OpenDevice();
     if (opened == kNoDescriptor) return kNoDescriptor;
     if (g_cachedFd.compare_exchange_strong(cached, opened, std::memory_order_acq_rel)) return opened;
-    // Another thread's first call was quicker: one descriptor is enough.
+    // Another thread's first call finished earlier; keep its descriptor.
     (void)HostDevice_Close(opened);
     return cached;
 }
 
-/// Presets the record's status and sends it. False, with errno, when the call failed.
+/// Presets the record's status and sends the record. If the call fails, returns false and sets errno.
 bool SendRequest(int fd, int command, DVSHYPRequest *req) {
     req->status = HYP_FAILURE;
     const bool sent = HostDevice_Ioctl(fd, command, req) != -1;
@@ -56,7 +56,7 @@ bool SendRequest(int fd, int command, DVSHYPRequest *req) {
     return sent;
 }
 
-/// One call's own descriptor.
+/// A descriptor for one call.
 class Device {
 public:
     Device() : fd_(OpenDevice()) {}
@@ -68,7 +68,7 @@ public:
 
     bool IsOpen() const { return fd_ != kNoDescriptor; }
 
-    /// False when the call failed.
+    /// False if the call failed.
     bool Send(Command command, DVSHYPRequest *req) const { return SendRequest(fd_, NumberOf(command), req); }
 
 private:
@@ -80,14 +80,14 @@ struct FreeBlock {
 };
 using Block = std::unique_ptr<void, FreeBlock>;
 
-/// A module may name a size of 0, for which malloc may return null.
+/// Allocates at least one byte: a module may return size 0, for which malloc may return null.
 Block AllocateBuffer(uint32_t size) {
     Block block(std::malloc(size ? size : 1));
     if (!block) Observe({Step::Allocate, 0});
     return block;
 }
 
-/// Hands the buffer over, unless the module claims more bytes than it holds.
+/// Returns the buffer to the caller, unless the module claims more bytes than it holds.
 HYP_ReturnStatus HandOut(Block buffer, uint32_t capacity, uint32_t claimed, void **out, uint32_t *outLen) {
     if (claimed > capacity) {
         Observe({Step::Reply, 0});
@@ -99,8 +99,8 @@ HYP_ReturnStatus HandOut(Block buffer, uint32_t capacity, uint32_t claimed, void
     return HYP_OK;
 }
 
-/// The result of a receiving call that failed. A failed call with the status of success holds no reply: it is
-/// a claim of bytes that no buffer holds.
+/// The result of a failed receiving call. If the call failed but its status is success, there is no reply:
+/// treat it as a claim of more bytes than the buffer holds.
 HYP_ReturnStatus Refused(HYP_ReturnStatus status, uint32_t named, uint32_t *outLen) {
     *outLen = status == HYP_OK ? 0 : named;
     return status == HYP_OK ? static_cast<HYP_ReturnStatus>(HYP_FAILURE) : status;
@@ -122,7 +122,7 @@ extern "C" HYP_ReturnStatus DVSHYP_Ioctl(int request, DVSHYPRequest *req) {
     if (fd == kNoDescriptor) return HYP_FAILURE;
     if (SendRequest(fd, request, req)) return HYP_OK;
     const int error = errno;
-    // A missing object is an expected answer of the lookups.
+    // Lookups return ENOENT for missing objects; that is not an error.
     if (error != ENOENT) dvs::hyp::Print("ioctl failed: %s\n", Err_Errno2String(error));
     return req->status;
 }
@@ -145,8 +145,7 @@ extern "C" HYP_ReturnStatus DVSHYP_CmdExec(const char *switchName, const char *c
         req.cmdOut = Address(buffer.get());
         if (device.Send(Command::CmdExec, &req))
             return HandOut(std::move(buffer), capacity, req.cmdOutLen, out, outLen);
-        // Whether the module asked for more is not looked at: it is asked again for as long as it refuses the
-        // buffer.
+        // Retry whenever the module rejects the buffer, even if it does not ask for a larger one.
         if (req.status != HYP_LIMIT_EXCEEDED) return Refused(req.status, req.cmdOutLen, outLen);
     }
 }
@@ -171,7 +170,8 @@ HYP_ReturnStatus Fetch(Command command, DVSHYPRequest *req, void **out, uint32_t
         }
         req->data = Address(buffer.get());
         if (device.Send(command, req)) return HandOut(std::move(buffer), capacity, req->dataLen, out, outLen);
-        // A module that refuses the buffer without asking for a larger one would be asked for ever.
+        // Do not retry if the module rejects the buffer without asking for a larger one: that would never
+        // end.
         const bool again = req->status == HYP_LIMIT_EXCEEDED && req->dataLen > capacity;
         if (!again) return Refused(req->status, req->dataLen, outLen);
     }

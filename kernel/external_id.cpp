@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Finding a port by the external id that its virtual adapter carries. The one command without a request of
-// its own: it searches a fetched copy of the module's whole state.
+// Finds a port by the external id of its virtual adapter. This is the only command without its own request:
+// it searches a fetched copy of the module's whole state.
 
 #include <cstdlib>
 #include <cstring>
@@ -12,7 +12,7 @@
 
 namespace {
 
-/// Where a port keeps its external id, the one that counts first.
+/// Property names of a port's external id, in order of precedence.
 constexpr const char *kExternalIdKeys[] = {
     "com.orbeno.port.extraConfig.vnic.external.id",
     "com.orbeno.port.extraConfig.hypnic.external.id",
@@ -30,7 +30,7 @@ bool ReadExternalId(DVSPort *port, std::string_view *id) {
     return false;
 }
 
-/// The test favours the stored id: a leading part of the asked-for id is a match, and so is an empty one.
+/// Matches if the stored id is a prefix of the requested id; an empty stored id always matches.
 bool StopAtMatch(DVSPort *port, void *arg) {
     auto *result = static_cast<DVSHYPExternalIdResult *>(arg);
     std::string_view stored;

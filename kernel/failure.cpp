@@ -1,5 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The observers of failed device calls: one list a thread, innermost first. The device channel reports to it.
+// The observers of failed device calls: one list per thread, innermost first. The device channel reports to
+// them.
 
 #include "kernel/failure.h"
 

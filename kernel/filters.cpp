@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The exported name filters over property lists, which retrieval and queries are made of.
+// The exported name filters over property lists, used by retrieval and queries.
 
 #include "kernel/filters.h"
 

@@ -2,15 +2,15 @@
 #ifndef KERNEL_FILTERS_H
 #define KERNEL_FILTERS_H
 
-// The walk that every name filter of the kernel interface is made of.
+// The walk shared by all name filters of the kernel interface.
 
 #include "dvs/data.h"
 #include "dvsdata/list_internal.h"
 
 namespace dvs::hyp {
 
-/// Removes every entry that `keep` rejects, each judged by itself; walks on from the entry before a removed
-/// one. Returns the status that ended the walk.
+/// Removes every entry that `keep` rejects, deciding for each entry separately. After a removal, continues
+/// from the entry before it. Returns the status that ended the walk.
 template <class Keep> HYP_ReturnStatus KeepIf(DVSData *list, Keep keep) {
     DVSDataEntry *before = nullptr;
     DVSDataEntry *entry = nullptr;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The lock "dvshyp", which serialises the uses of the switch table as scratch. Its rank is one below that of
-// the switch-state lock, since it is taken first.
+// The lock "dvshyp", which serializes the uses of the switch table as scratch. Its rank is one below that of
+// the switch-state lock, because it is taken first.
 
 #include <atomic>
 
@@ -11,7 +11,7 @@ namespace {
 
 constexpr uint32_t kLockRank = 0xFEFFFFFE;
 
-/// Set once, by the runtime, which makes the creation safe to race.
+/// Set once by the runtime, which makes concurrent creation safe.
 constinit MXUserRecLock *g_lock = nullptr;
 
 } // namespace

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The one way out for the kernel interface's messages, on top of the library's message delivery.
+// Message output of the kernel interface, on top of the library's message delivery.
 
 #include "kernel/log.h"
 

@@ -2,7 +2,7 @@
 #ifndef KERNEL_LOG_H
 #define KERNEL_LOG_H
 
-// The kernel interface's emitter: its messages go to standard error whatever the debug levels.
+// Message output of the kernel interface: to standard error, regardless of the debug levels.
 
 namespace dvs::hyp {
 

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Queries: one list of the module's state, narrowed to what an agent asks for, and the list of a switch's
-// ports. Leans on the switch table as scratch and on the filters.
+// Queries: one list of the module's state, reduced to the requested entries, and the list of a switch's
+// ports. Uses the switch table as scratch, and the filters.
 
 #include <cstdlib>
 #include <cstring>
@@ -22,7 +22,7 @@ constexpr const char *kExtraConfig = "com.orbeno.extraconfig.";
 constexpr const char *kPortExtraConfig = "com.orbeno.port.extraConfig";
 constexpr std::string_view kPortsetFc = "com.orbeno.net.portset.fc.";
 
-/// Port data of this type is the platform's own also below "com.orbeno.net.".
+/// Port data of this type belongs to the platform also below "com.orbeno.net.".
 constexpr uint32_t kDefaultType = 32;
 
 /// The type for which overlay queries keep kPortsetFc entries of any type.
@@ -35,7 +35,7 @@ struct PlatformName {
     const char **keep;
 };
 
-/// What a vendor query of a switch strips, in this order.
+/// The names that a vendor query of a switch removes, in this order.
 constexpr PlatformName kPlatformNames[] = {
     {"com.orbeno.common.", nullptr},
     {"com.orbeno.etherswitch.", nullptr},
@@ -49,7 +49,7 @@ constexpr PlatformName kNewerPlatformNames[] = {
     {"com.orbeno.ovl.vdr.dvptracking", nullptr},
 };
 
-/// What a vendor query of a port strips, in this order.
+/// The names that a vendor query of a port removes, in this order.
 constexpr PlatformName kPortPlatformNames[] = {
     {"com.orbeno.common.", nullptr},
     {"com.orbeno.etherswitch.", nullptr},
@@ -65,15 +65,15 @@ constexpr std::string_view kOverlayPrefixes[] = {
     "com.orbeno.vswitch.disabled",  "com.orbeno.net.portset.fc.",        "com.orbeno.extraConfig.sddcaas.",
 };
 
-/// Takes a list out of the switch, so that the table's reset leaves it alone. A switch that lacks it gives an
-/// empty one; none when there is no memory.
+/// Moves a list out of the switch, so that the table's reset does not free it. Returns an empty list if the
+/// switch has none, and null if out of memory.
 List Detach(DVSData **member) {
     List list(*member);
     *member = nullptr;
     return list ? std::move(list) : dvs::hyp::NewList();
 }
 
-/// The frame of the switch-level queries: one list of one switch, narrowed, handed out on success only.
+/// Common part of the switch-level queries: reduces one list of one switch and returns it on success only.
 template <class Narrow>
 HYP_ReturnStatus QuerySwitchList(const char *switchName, bool global, DVSData **out, Narrow &&narrow) {
     return dvs::hyp::WithModuleSwitch(switchName, [&](DVSwitch *sw) -> HYP_ReturnStatus {
@@ -85,13 +85,13 @@ HYP_ReturnStatus QuerySwitchList(const char *switchName, bool global, DVSData **
     });
 }
 
-/// The walks of the filters end at the end of the list; that is no failure.
+/// Applies the filters. Their status is ignored: they return HYP_NOT_FOUND at the end of the list.
 void StripAll(DVSData *list, std::span<const PlatformName> names, uint32_t propType) {
     for (const PlatformName &name : names)
         (void)DVSHYPStripNamedPropForType(list, name.needle, name.keep, propType);
 }
 
-/// False also when the module does not say, or says it in less than a word.
+/// Returns false also if the module returns no version, or less than four bytes.
 bool IsNewerSwitch(const char *switchName) {
     void *value = nullptr;
     uint32_t valueLen = 0;

@@ -2,8 +2,8 @@
 #ifndef KERNEL_REQUEST_H
 #define KERNEL_REQUEST_H
 
-// The request record as the commands fill it, and the growing fetch. The record's layout is the module's
-// interface: every offset that another program could get wrong is pinned here.
+// Helpers to fill the request record, and the fetch with a growing buffer. The record's layout is the
+// module's interface, so the assertions below fix every offset.
 
 #include <cstddef>
 #include <cstdint>
@@ -36,22 +36,22 @@ static_assert(sizeof(DVSHYPPortList) == 8);
 
 using device::Command;
 
-/// What a fetch and a command execution offer the module first.
+/// Buffer size of the first attempt of a fetch or command execution.
 inline constexpr uint32_t kFirstBufferSize = 32768;
 
-/// Copies what fits of `text` with its NUL into a zeroed field.
+/// Copies `text` with its NUL into a zeroed field, truncated to the field.
 template <std::size_t N> void SetText(char (&field)[N], const char *text) {
     std::memcpy(field, text, strnlen(text, N - 1));
 }
 
-/// An address as the record carries it.
+/// An address in the form of the record.
 inline uint64_t Address(const void *pointer) {
     return reinterpret_cast<std::uintptr_t>(pointer);
 }
 
-/// Sends `req` with a receive buffer that grows for as long as the module names a larger size. On success
-/// `*out` is the caller's, of `*outLen` bytes; otherwise it is null. Opens a descriptor of its own: safe in
-/// any thread.
+/// Sends `req` with a receive buffer that grows as long as the module asks for a larger size. On success
+/// `*out` is the caller's, of `*outLen` bytes; otherwise it is null. Opens its own descriptor, so it is
+/// thread-safe.
 [[nodiscard]] HYP_ReturnStatus Fetch(Command command, DVSHYPRequest *req, void **out, uint32_t *outLen);
 
 } // namespace dvs::hyp

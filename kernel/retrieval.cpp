@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The persistent state: the module's live state without what only makes sense while the host runs. Leans on
-// the fetch, the switch table as scratch, the state file and the filters; the saves to state file and config
-// store start here.
+// The persistent state: the module's live state without data that is only valid while the host runs. Uses the
+// fetch, the switch table as scratch, the state file and the filters. Used by the saves to the state file and
+// the config store.
 
 #include <cstdlib>
 #include <cstring>
@@ -19,14 +19,14 @@ constexpr const char *kOpaquePortset = "com.orbeno.common.portset.opaque";
 constexpr const char *kPortPersist = "com.orbeno.common.port.volatile.persist";
 constexpr std::string_view kTrue = "true";
 
-/// Serialization leaves out ports of this type.
+/// Serialization skips ports of this type.
 constexpr uint32_t kSkippedPort = 0;
 
 void StripVolatile(DVSData *list) {
-    if (list) (void)DVSHYPStripNamedProp(list, kVolatilePart); // the walk's end is no failure
+    if (list) (void)DVSHYPStripNamedProp(list, kVolatilePart); // the status only marks the end of the walk
 }
 
-/// Only the four bytes of "true" are compared, so that whatever begins with them counts.
+/// Compares only the four bytes of "true", so longer values that begin with them match too.
 bool IsOpaquePortset(DVSwitch *sw) {
     void *value = nullptr;
     uint32_t valueLen = 0;
@@ -34,19 +34,19 @@ bool IsOpaquePortset(DVSwitch *sw) {
     return std::string_view(static_cast<const char *>(value), valueLen).starts_with(kTrue);
 }
 
-/// True for ids that consist of digits and read as a number above 999, whatever their length.
+/// True for ids of decimal digits only with a value above 999, at any length.
 bool IsDynamicPortId(std::string_view id) {
     if (id.empty() || id.find_first_not_of("0123456789") != std::string_view::npos) return false;
     const std::size_t first = id.find_first_not_of('0');
     return first != std::string_view::npos && id.size() - first > 3;
 }
 
-/// Ports of an opaque port set with such ids come and go with the host.
+/// Removes a port of an opaque port set with such an id: these ports do not persist.
 bool RemoveDynamicPort(DVSPort *port, void *) {
-    // The id outlives the record that it is read from.
+    // Copy the id: the record is freed first.
     char id[sizeof port->portId];
     std::memcpy(id, port->portId, sizeof id);
-    // A port that is not active is not found here; its type leaves it out of the persistent state.
+    // This does not find ports that are not active; their type excludes them from the persistent state.
     if (IsDynamicPortId(std::string_view(id, strnlen(id, sizeof id))))
         (void)DVSState_PortRemove(DVS_SwitchId(port->owner), id);
     return false;
@@ -71,13 +71,13 @@ bool CleanSwitch(DVSwitch *sw, void *) {
     return false;
 }
 
-/// The last step of a retrieval, with the state to keep in the table.
+/// The last step of a retrieval, with the persistent state in the table.
 HYP_ReturnStatus CleanAndSerialize(void **out, uint32_t *outLen) {
     DVSState_SwitchForEach(CleanSwitch, nullptr);
     return DVSState_ConfigSerialize(out, outLen);
 }
 
-/// The switches that were moved aside, and the ids of those that are not to be persisted as they are.
+/// The switches moved out of the table, and the ids of the non-persistent ones.
 struct ParkedSwitches {
     DVSwitch *switches[32] = {};
     char removedIds[32][64] = {};
@@ -97,7 +97,7 @@ HYP_ReturnStatus LoadStateFile(const char *stateFile) {
     if (status != HYP_OK) return status;
     status = DVSState_ConfigDeserialize(contents, contentsLen);
     if (status != HYP_OK) {
-        // The contents stay allocated on this path: stated behaviour.
+        // The contents stay allocated on this path, as documented in dvs/hyp.h.
         dvs::hyp::Print("DVSState_ConfigDeserialize failed: %s\n", HYP_ReturnStatusToString(status));
         return status;
     }

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Lists of the kernel interface: made of the process heap, decoded from what the module answers.
+// Lists of the kernel interface: allocated on the process heap, decoded from the module's replies.
 
 #include "kernel/scratch.h"
 

@@ -2,8 +2,8 @@
 #ifndef KERNEL_SCRATCH_H
 #define KERNEL_SCRATCH_H
 
-// The module's state in the process's switch table, for as long as one operation works on it; and the owners
-// of what fetches hand out.
+// The module's state in the process's switch table for the duration of one operation, and the owners of
+// fetched data.
 
 #include <cstdint>
 #include <memory>
@@ -22,13 +22,12 @@ struct FreeList {
 };
 using List = std::unique_ptr<DVSData, FreeList>;
 
-/// The switch table borrowed under "dvshyp". Whatever path leaves, the table is emptied before the lock is
-/// released.
+/// The switch table borrowed under "dvshyp". On every path, the table is emptied before the lock is released.
 class BorrowedTable {
 public:
     BorrowedTable() : lock_(DVSwitchHYPLock()) {}
     ~BorrowedTable() {
-        // What stays in the table when a reset fails cannot be removed by trying again.
+        // If the reset fails, retrying would not help.
         (void)DVSState_ConfigReset();
         DVSwitchHYPUnlock(lock_);
     }
@@ -52,7 +51,7 @@ template <class Work> [[nodiscard]] HYP_ReturnStatus WithModuleState(Work &&work
     return status == HYP_OK ? work() : status;
 }
 
-/// The same for an operation on one switch: HYP_NOT_FOUND when the state has none of that name.
+/// The same for an operation on one switch: HYP_NOT_FOUND if the state does not contain it.
 template <class Work> [[nodiscard]] HYP_ReturnStatus WithModuleSwitch(const char *switchName, Work &&work) {
     return WithModuleState([&]() -> HYP_ReturnStatus {
         DVSwitch *sw = DVSState_SwitchFind(switchName);
@@ -63,7 +62,7 @@ template <class Work> [[nodiscard]] HYP_ReturnStatus WithModuleSwitch(const char
 /// Fetches one port's property list from the module and decodes it into a list of the process heap.
 [[nodiscard]] HYP_ReturnStatus FetchPortData(const char *switchName, const char *portId, List *list);
 
-/// An empty list of the process heap; none when there is no memory.
+/// Creates an empty list on the process heap; null if out of memory.
 [[nodiscard]] List NewList();
 
 } // namespace dvs::hyp
