@@ -2,8 +2,9 @@
 #ifndef PLATFORM_DEVICE_COMMANDS_H
 #define PLATFORM_DEVICE_COMMANDS_H
 
-// The switching module's commands: numbers, names, and which buffers of the request record each one uses. The only
-// list of them; the library, the embedded device and the emulator all read it. docs/emulator.md has it as a table.
+// The switching module's commands: numbers, names, and the buffers of the request record that each one uses.
+// This is the only list; the library, the embedded device and the emulator use it. docs/emulator.md has it as
+// a table.
 
 #include <algorithm>
 #include <array>
@@ -105,7 +106,7 @@ static_assert(std::ranges::is_sorted(kCommands, {}, &CommandRow::command));
 /// One more than the largest command number.
 inline constexpr int32_t kCommandEnd = NumberOf(kCommands.back().command) + 1;
 
-/// Null for a number that is no command.
+/// Returns null if the number is no command.
 constexpr const CommandRow *FindCommand(int32_t number) {
     const auto row =
         std::ranges::lower_bound(kCommands, static_cast<Command>(number), {}, &CommandRow::command);

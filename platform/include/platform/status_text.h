@@ -9,8 +9,8 @@ extern "C" {
 #endif
 
 /*
- * The text of a status, for messages. Never NULL; the text is constant and lives as long as the process. A status
- * that the host does not know has a text of its own that says so.
+ * The text of a status, for messages. Never NULL; constant, valid as long as the process. An unknown status
+ * has its own text that says so.
  */
 const char *HYP_ReturnStatusToString(HYP_ReturnStatus status);
 
