@@ -1,8 +1,8 @@
 #!/bin/bash
 # SPDX-License-Identifier: Apache-2.0
-# From a bare machine to a first look: installs what is missing, builds, and takes the example site through a state
-# file, verification, display, a change, the difference, and back. Works in a directory of its own and leaves nothing
-# behind but build/release.
+# From a bare machine to a first tour: installs missing packages, builds, and takes the example site through a state file,
+# verification, display, a change, a comparison, and back. Works in a temporary directory and leaves only build/release
+# behind.
 set -euo pipefail
 from=$PWD
 cd "$(dirname "$0")"
@@ -11,17 +11,17 @@ usage() {
     cat <<'EOF'
 Usage: ./quickstart.sh [--built DIR]
 
-Installs missing packages (apt, as root or through sudo), builds build/release, shows dvsctl at work.
+Installs missing packages (apt, as root or through sudo), builds build/release, then demonstrates dvsctl.
 
-  --built DIR    take the programs of this build directory, and install and build nothing
-  --help         this text
+  --built DIR    use the programs of this build directory; install and build nothing
+  --help         print this help
 EOF
 }
 
 build=
 while [ $# -gt 0 ]; do
     case $1 in
-    --built) build=$(cd "$from" && realpath "${2:?--built wants a directory}") && shift ;;
+    --built) build=$(cd "$from" && realpath "${2:?--built requires a directory}") && shift ;;
     --help | -h) usage && exit 0 ;;
     *) usage >&2 && exit 2 ;;
     esac
@@ -33,7 +33,7 @@ trap 'rm -rf "$work"' EXIT
 
 say() { printf '\n\033[1m== %s\033[0m\n' "$*"; }
 [ -t 1 ] && [ -z "${NO_COLOR:-}" ] || say() { printf '\n== %s\n' "$*"; }
-# Prints a command as one would type it, then runs it.
+# Prints a command as a user would type it, then runs it.
 run() {
     local word line=
     for word in "$@"; do
@@ -59,38 +59,38 @@ root=$PWD
 cp examples/site-basic.json examples/site.json "$work/"
 cd "$work"
 
-say "The example site, written as JSON, becomes a state file"
+say "Convert the example site from JSON to a state file"
 run copy json:site-basic.json site.db
 
-say "Every nested buffer of it is checked"
+say "Verify every nested buffer"
 run verify site.db
 
-say "What is in it: the storage switch"
+say "Show the storage switch"
 run show site.db --switch storage
 
-say "One setting of every switch and port, one line each"
+say "List one setting of every switch and port"
 run show site.db --props '*.alias' --columns switch,port,kind,value
 
-say "A site with more to it, written in typed fields: trunks, teaming, shaping, mirroring, pools"
+say "Convert a larger site with typed fields: trunks, teaming, shaping, mirroring, pools"
 run copy json:site.json campus.db
 run show campus.db --switch campus --port web-1
 
-say "What one of these properties is, and where its bytes are"
+say "Describe one of these properties and its byte layout"
 run props com.orbeno.etherswitch.port.vlan
 
-say "Another VLAN for web-1: compared by meaning, then by bytes"
+say "Change the VLAN of web-1; compare by meaning, then by bytes"
 sed 's/"vlan_id": 100/"vlan_id": 150/' site.json >moved.json
-run diff json:site.json json:moved.json && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
+run diff json:site.json json:moved.json && exit 1 || [ $? -eq 1 ] # 1: they differ, as expected
 run diff json:site.json json:moved.json --raw && exit 1 || [ $? -eq 1 ]
 
-say "A state of any size for trials: realistic, every known property, the same for the same seed"
+say "Generate a test state: realistic, any size, every known property, reproducible by seed"
 run generate --switches 4 --ports 100 --seed 7 trial.db
 run show trial.db --props '*.vlan' --columns port,value --no-headings | head -n 8 || true
 
-say "The first bytes of the smaller site, and what they are"
+say "Annotate the first bytes of the smaller site"
 run hexdump site.db | head -n 24 || true
 
-say "A colleague edits a copy: larger frames, a port unblocked, a new port"
+say "Edit a copy: larger frames, one port unblocked, one new port"
 run copy site.db json:edit.json
 python3 - edit.json <<'PYTHON'
 import json
@@ -114,52 +114,52 @@ with open(path, "w", encoding="utf-8") as file:
     json.dump(site, file, ensure_ascii=False)
 PYTHON
 
-say "What the edit would change, without changing it"
+say "Preview the edit (dry run)"
 run copy --dry-run json:edit.json site.db
 
-say "The edit goes to a state file of its own; the difference to the first one"
+say "Write the edit to a second state file and compare the two"
 run copy json:edit.json edited.db
-run diff site.db edited.db && exit 1 || [ $? -eq 1 ] # 1: they differ, as they should
+run diff site.db edited.db && exit 1 || [ $? -eq 1 ] # 1: they differ, as expected
 
-say "And back: state file to JSON to state file gives the same bytes"
+say "Round trip: state file to JSON to state file gives the same bytes"
 run copy site.db json:back.json
 run copy json:back.json back.db
 cmp site.db back.db
 echo "site.db and back.db are equal, byte for byte."
 
-say "One wrong byte in the name of port nfs-b: recognised, and located"
+say "Corrupt one byte in the name of port nfs-b: verify detects and locates it"
 cp site.db damaged.db
 offset=$(grep -abo nfs-b damaged.db | head -n 1 | cut -d: -f1)
 printf 'X' | dd of=damaged.db bs=1 seek="$offset" conv=notrunc status=none
 run verify damaged.db && exit 1 || [ $? -eq 6 ] # 6: malformed
 
-say "The main job: the state file goes into a fresh config store, in one transaction"
+say "Save the state file to a new config store, in one transaction"
 export DVS_CONFIGSTORE=$work/configstore.db
 run copy --dry-run site.db store: | head -n 3
 run copy site.db store:
 run verify store:
 run store list
 
-say "The store keeps typed fields: the port web-1 as it reads them"
+say "Show port web-1 as the store holds it, in typed fields"
 run show store: --switch production --port web-1
 run schema ports.settings | head -n 8
 
-say "Loaded back, the state is the same but for what a round trip changes by design"
+say "Load the state back: it is the same except for intended round-trip changes"
 run copy store: loaded.db
 run diff site.db loaded.db --ignore-types --switch production && exit 1 || [ $? -eq 1 ]
 cat <<'TEXT'
-Why (docs/config-store.md has the whole table):
-- Switches of these classes have the host's port limit, and that is what is saved of them.
-- The MTU is one field of the store, and every property that stands for it is loaded from there.
-- A store has one object for each port id, and no kinds: shadow, zombie and local-cache ports come back as active ones,
-  and of two ports with one id the later one's settings win ("web-3").
-- Flags are booleans there; as texts they come back with the bytes that their readers have always been given.
-- What is loaded is of the type that the store's settings have (left out of this difference by --ignore-types).
+Why (docs/config-store.md has the full table):
+- Switches of these classes have the host's port limit, so the save writes that limit.
+- The store has one MTU field; every property for the MTU is loaded from it.
+- A store has one object per port id and no port kinds: shadow, zombie and local-cache ports come back as active ones.
+  If two ports have the same id, the later one's settings win ("web-3").
+- The store keeps flags as booleans; text flags come back in the fixed form that their readers expect.
+- Loaded properties have the type of the store's settings (--ignore-types hides this difference).
 TEXT
 run copy loaded.db store:again.db
-run diff loaded.db store:again.db --switch production # nothing more changes the second time
+run diff loaded.db store:again.db --switch production # the second round trip changes nothing
 
-say "The colleague's edit is saved too; the store remembers what was before"
+say "Save the edit too; the store keeps the previous version"
 run copy --dry-run edited.db store:
 run copy edited.db store:
 run store history
@@ -167,7 +167,7 @@ run store restore --revision 1 --dry-run
 run store restore --revision 1
 run diff loaded.db store:
 
-say "A live switching module: the emulator, started on the example's state file"
+say "Start the emulator, a live switching module, with the example's state file"
 cp site.db module.db
 export DVS_EMULATOR=$work/module.socket DVS_CONFIGSTORE=$work/live.db
 "$emulator" --socket "$DVS_EMULATOR" --state module.db >ready &
@@ -179,21 +179,21 @@ run verify kernel:
 run copy kernel: store:
 run copy store: saved.db
 
-say "Changes to the live module: one VLAN, one new port"
+say "Change the live module: one VLAN, one new port"
 run kernel prop set production com.orbeno.etherswitch.port.vlan '{"vlan_id": 100}' --port web-1 --dry-run
 run kernel prop set production com.orbeno.etherswitch.port.vlan '{"vlan_id": 100}' --port web-1
 run kernel port add production 77
 run kernel ports production
 
-say "The live state goes into the store; what that changed there"
+say "Save the live state to the store and show what changed"
 run copy kernel: store:
 run diff saved.db store: && exit 1 || [ $? -eq 1 ]
 
-say "Loaded back into an emptied module"
+say "Load it back into an empty module"
 run kernel state cleanup
 run copy store: kernel:
 run kernel prop get production com.orbeno.etherswitch.port.vlan --port web-1
 kill "$module"
-wait "$module" # it saves its state and ends with 0
+wait "$module" # it saves its state and exits with 0
 
-printf '\nThat was dvsctl. Next: %s --help, README.md, docs/json-form.md; ./test.sh runs the tests.\n' "${dvsctl#"$root"/}"
+printf '\nEnd of the dvsctl tour. Next: %s --help, README.md, docs/json-form.md; ./test.sh runs the tests.\n' "${dvsctl#"$root"/}"

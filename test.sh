@@ -1,7 +1,7 @@
 #!/bin/bash
 # SPDX-License-Identifier: Apache-2.0
 # Builds everything and runs every test, in the release build and under AddressSanitizer and
-# UndefinedBehaviorSanitizer. The last line says how many tests passed and failed.
+# UndefinedBehaviorSanitizer. The last line counts the tests that passed and failed.
 set -euo pipefail
 cd "$(dirname "$0")"
 
@@ -9,17 +9,17 @@ usage() {
     cat <<'EOF'
 Usage: ./test.sh [OPTIONS]
 
-  --fast         only the unit tests, only the debug build: the loop while editing
-  --long         the random and repeated tests in their full length: minutes more
+  --fast         run only the unit tests, in the debug build: for the edit loop
+  --long         run random and repeated tests at full length: takes minutes longer
   --no-install   do not install missing packages
-  --jobs N       parallel compilations and tests (default: one per processor)
-  --help         this text
+  --jobs N       number of parallel compilations and tests (default: one per processor)
+  --help         print this help
 
-Exit status: 0 when every test passed, 1 otherwise, 2 for wrong usage.
+Exit status: 0 if every test passed, 1 otherwise, 2 for a usage error.
 EOF
 }
 
-# What each of these counts stands beside the default in the test that reads it. One that is set already stays.
+# The test that reads each of these counts documents it beside its default. A count that is already set stays.
 lengthen() {
     timeout=7200
     local count
@@ -42,7 +42,7 @@ while [ $# -gt 0 ]; do
     --fast) presets=(debug) label=(-L unit) ;;
     --long) lengthen ;;
     --no-install) install=no ;;
-    --jobs) jobs=${2:?--jobs wants a number} && shift ;;
+    --jobs) jobs=${2:?--jobs requires a number} && shift ;;
     --help | -h) usage && exit 0 ;;
     *) usage >&2 && exit 2 ;;
     esac
@@ -62,7 +62,7 @@ for preset in "${presets[@]}"; do
     echo "== $preset: test"
     report=build/$preset/test-results.xml
     rm -f "$report"
-    # Only what failed is worth reading; the report has the rest.
+    # Show only failures; the report has the rest.
     ctest --preset "$preset" --parallel "$jobs" --output-junit "$PWD/$report" "${label[@]}" |
         grep -vE '^ *(Start +[0-9]+:|[0-9]+/[0-9]+ Test .* Passed |$)' || true
     count() { tr '\n\t' '  ' <"$report" | grep -o '<testsuite [^>]*>' | grep -oE " $1=\"[0-9]+\"" | grep -oE '[0-9]+'; }
@@ -76,6 +76,6 @@ for preset in "${presets[@]}"; do
 done
 
 echo
-[ "$skipped" -eq 0 ] || echo "$skipped tests could not run on this machine; each says why in its output."
+[ "$skipped" -eq 0 ] || echo "$skipped tests were skipped on this machine; their output gives the reason."
 echo "Tests: $passed passed, $failed failed (${summary#, })"
 [ "$failed" -eq 0 ]

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Property lists beside the floor of floor.h and, for lookups, a std::unordered_map. Nanoseconds of processor
-// time for one operation on the whole list (lookups: for one name). Names of about 36 characters, values of 8
-// to 256 bytes: 32 properties are 9 KB.
+// Property lists against the floor of floor.h and, for lookups, a std::unordered_map. Nanoseconds of
+// processor time for one operation on the whole list (lookups: on one name). Names have about 36 characters,
+// values 8 to 256 bytes: 32 properties are 9 KB.
 
 #include <benchmark/benchmark.h>
 
@@ -54,7 +54,7 @@ std::vector<std::uint8_t> MakeBuffer(const std::vector<Prop> &props) {
     return bytes;
 }
 
-/// The names of all properties in random order, as operators' tools ask for them.
+/// The names of all properties in random order, like the lookups of operators' tools.
 std::vector<const char *> Shuffled(const std::vector<Prop> &props) {
     std::vector<const char *> names;
     for (const Prop &prop : props)
@@ -144,7 +144,7 @@ void DeserializeFloor(benchmark::State &state, std::uint32_t count) {
     }
 }
 
-/// The last property: all of the buffer is walked.
+/// Finds the last property, so it walks the whole buffer.
 void Find(benchmark::State &state, std::uint32_t count) {
     const auto props = bench::MakeProps(count);
     const auto buffer = MakeBuffer(props);

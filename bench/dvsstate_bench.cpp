@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Ports beside a std::unordered_map, and whole states beside the least work their format allows. Nanoseconds
-// of processor time for one operation on all of the ports (find: for one). A state of 32 switches with 512
-// ports of 12 properties is 48 MB; the other shape is one switch with 16,384 ports.
+// Ports against a std::unordered_map, and whole states against the least work their format allows.
+// Nanoseconds of processor time for one operation on all ports (find: on one). A state of 32 switches with
+// 512 ports of 12 properties is 48 MB; the other shape is one switch with 16,384 ports.
 
 #include <benchmark/benchmark.h>
 
@@ -64,7 +64,7 @@ void AddRemove(benchmark::State &state, std::uint32_t count) {
     DVSState_ConfigReset();
 }
 
-/// Blocks of the sizes of a list handle and a port record.
+/// Blocks with the sizes of a list handle and a port record.
 struct FloorPort {
     std::unique_ptr<char[]> list = std::make_unique<char[]>(48);
     char record[24] = {};
@@ -111,7 +111,7 @@ void FindFloor(benchmark::State &state, std::uint32_t count) {
     }
 }
 
-/// Adding alone; removing everything is not measured.
+/// Measures adding only, without the removal.
 void AddOnly(benchmark::State &state, std::uint32_t count) {
     const auto ids = PortIds(count);
     for (auto _ : state) {
@@ -162,7 +162,7 @@ std::vector<std::uint8_t> StateOf(const Shape &shape) {
     return state;
 }
 
-/// Into a new block each time.
+/// Encodes into a new block each time.
 void EncodeCold(benchmark::State &state, Shape shape) {
     BuildTable(shape);
     for (auto _ : state) {
@@ -175,7 +175,7 @@ void EncodeCold(benchmark::State &state, Shape shape) {
     DVSState_ConfigReset();
 }
 
-/// Into one block, whose pages are there.
+/// Encodes into one block whose pages are already mapped.
 void EncodeWarm(benchmark::State &state, Shape shape) {
     BuildTable(shape);
     void *buf = nullptr;
@@ -196,8 +196,8 @@ void Decode(benchmark::State &state, Shape shape) {
     }
 }
 
-/// The floor's state: entries of properties in lists of ports, written behind an entry's fixed part for each
-/// port. Switches, of which there are few, are left out.
+/// The floor's state: property entries in port lists, one list after each port entry's fixed part. Omits
+/// switches, because there are few.
 using FloorState = std::vector<std::unique_ptr<bench::floor::List>>;
 
 FloorState BuildFloor(const Shape &shape) {

@@ -2,9 +2,9 @@
 #ifndef BENCH_FLOOR_H
 #define BENCH_FLOOR_H
 
-// The least work the format allows, as plain as it can be: one block an entry, copied one by one, plus a
-// checksum in four SSE2 accumulators (plain words elsewhere). No checks, no index, no messages. The peer of
-// the benchmarks; shares nothing with the library.
+// The least work the format allows: one block per entry, copied one by one, plus a checksum in four SSE2
+// accumulators (plain words elsewhere). No checks, no index, no messages. The baseline of the benchmarks;
+// shares no code with the library.
 
 #include <cstdint>
 #include <cstdlib>
@@ -22,7 +22,7 @@ struct Prop {
     std::string name, value;
 };
 
-/// `count` properties of some 282 bytes serialized, as the switch's own are called.
+/// `count` properties of about 282 bytes serialized, named like the switch's own.
 inline std::vector<Prop> MakeProps(std::uint32_t count) {
     std::vector<Prop> props;
     for (std::uint32_t i = 0; i < count; ++i)

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The kernel interface against an emulator: round trips beside a bare socket pair that carries the same
-// bytes, and the retrieval of the persistent state beside loading and serializing that state. Nanoseconds of
-// real time, since half of the work is another process's.
+// The kernel interface with an emulator: round trips against a bare socket pair that carries the same bytes,
+// and the retrieval of the persistent state against loading and serializing that state. Nanoseconds of real
+// time, because half of the work is another process's.
 
 #include <benchmark/benchmark.h>
 
@@ -55,7 +55,7 @@ void ReceiveAll(int fd, char *data, std::size_t size) {
     }
 }
 
-/// A child that answers requests of one size with replies of the given sizes, in turn.
+/// A child that replies to requests of one size with replies of the given sizes, in turn.
 class Echo {
 public:
     explicit Echo(std::vector<std::size_t> replies) {
@@ -123,7 +123,7 @@ void FetchFloor(benchmark::State &state) {
 }
 BENCHMARK(FetchFloor)->Name("fetch/1MB/floor")->UseRealTime();
 
-/// One switch with that many ports of twelve values each.
+/// One switch with `ports` ports of twelve values each.
 std::string MakeState(int ports) {
     const std::string value(150, 'v');
     dvs::test::Pairs pairs;

@@ -2,8 +2,8 @@
 #ifndef BENCH_PORT_SETTINGS_H
 #define BENCH_PORT_SETTINGS_H
 
-// Two kinds of ports for store_bench, of twelve settings each: what a host mostly has, and the settings whose
-// values are records that converters take apart.
+// Two kinds of ports for store_bench, with twelve settings each: typical settings, and settings whose values
+// are records that need converters.
 
 #include <cstdint>
 #include <string>
@@ -24,11 +24,11 @@ struct PortKind {
 
 inline constexpr std::size_t kSettingsOfAPort = 12;
 
-/// Texts, numbers, flags and small records. `version` makes one setting differ.
+/// Texts, numbers, flags and small records. One setting depends on `version`.
 std::vector<Setting> UsualSettings(int port, int version);
 
-/// A VLAN trunk, a teaming policy, shaping both ways, MAC security, filters, link aggregation, a mirror
-/// session, and what such a port has besides.
+/// A VLAN trunk, a teaming policy, shaping in both directions, MAC security, filters, link aggregation, a
+/// mirror session, and the usual settings of such a port.
 std::vector<Setting> StructuredSettings(int port, int version);
 
 inline constexpr PortKind kPortKinds[] = {{"usual", UsualSettings}, {"structured", StructuredSettings}};

@@ -2,17 +2,16 @@
 #ifndef BENCH_RATIO_H
 #define BENCH_RATIO_H
 
-// Benchmarks in pairs: the library's work and, in the same run, what it is measured against. Absolute times
-// say little on a shared machine, their ratio does.
+// Benchmarks in pairs: the library's work and its baseline in the same run. On a shared machine, absolute
+// times mean little, but their ratio does.
 //
-// Register both under one name, "<work>/dvs" and "<work>/floor", with what may be reached in kGoals of the
-// program:
+// Register both under one name, "<work>/dvs" and "<work>/floor", and list the goal in the program's kGoals:
 //
 //     const ratio::Goal kGoals[] = {{"serialize/32", 1.15}, ...};
 //     int main(int argc, char **argv) { return ratio::Main(argc, argv, kGoals); }
 //
-// Behind Google Benchmark's own lines comes one line a pair with the ratio of the fastest repetitions, which
-// are what other work on the machine has disturbed least.
+// After Google Benchmark's own lines, prints one line per pair with the ratio of the fastest repetitions,
+// which other work on the machine disturbs least.
 
 #include <benchmark/benchmark.h>
 
@@ -27,7 +26,7 @@ namespace ratio {
 
 struct Goal {
     const char *work;
-    double atMost; // times the floor
+    double atMost; // multiple of the floor
 };
 
 class Reporter : public benchmark::ConsoleReporter {
@@ -41,7 +40,7 @@ public:
             if (slash == std::string::npos) continue;
             double &best =
                 best_[name.substr(0, slash)].try_emplace(name.substr(slash + 1), kNone).first->second;
-            // Where part of the work is another process's, the benchmark asks for real time.
+            // If part of the work is another process's, the benchmark requests real time.
             const bool real = !run.run_name.time_type.empty();
             best = std::min(best, real ? run.GetAdjustedRealTime() : run.GetAdjustedCPUTime());
         }

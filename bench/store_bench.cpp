@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Saving one switch to the config store and loading it back, beside SQLite alone storing and reading one ready
-// document of the same size: all of it in one run, on the same disk, with the same durability. Prints milliseconds
-// (of the fastest round), ratios, nanoseconds a property and the peak memory. See README.md.
+// Saves one switch to the config store and loads it back, against SQLite alone writing and reading one ready
+// document of the same size: in one run, on the same disk, with the same durability. Prints milliseconds (of
+// the fastest round), ratios, nanoseconds per property and the peak memory. See README.md.
 //
 //   store_bench [--ports N[,N…]] [--kind usual|structured] [--rounds N] [--dir DIRECTORY]
 
@@ -71,7 +71,7 @@ State BuildState(const PortKind &kind, int ports, int version) {
     return state;
 }
 
-/// Of the fastest round, like the other programs' figures. `prepare` comes before each and is not timed.
+/// The time of the fastest round. Calls `prepare` before each round, untimed.
 double FastestMs(int rounds, const std::function<void(int)> &work, const std::function<void()> &prepare = {}) {
     double fastest = 0;
     for (int round = 0; round < rounds; round++) {
@@ -95,7 +95,7 @@ void RemoveDatabase(const std::string &path) {
         std::filesystem::remove(path + suffix);
 }
 
-/// SQLite with the store's durability and nothing else: a table of documents.
+/// Plain SQLite with the store's durability: a table of documents.
 class Plain {
   public:
     explicit Plain(std::string path) : path_(std::move(path)) { Open(); }
@@ -155,7 +155,7 @@ void Bench(const PortKind &kind, int ports, int rounds, const std::string &direc
     std::filesystem::create_directories(directory);
     const State states[2] = {BuildState(kind, ports, 0), BuildState(kind, ports, 1)};
     const long before = PeakMegabytes();
-    // Two documents in turn, so that each save changes something.
+    // Alternate two documents, so that each save changes something.
     const auto saveOne = [&](int round) {
         const State &state = states[round % 2];
         Check(DVSState_SaveBufToConfigStore(state.buffer, state.len) == 0, "the save");
@@ -173,7 +173,7 @@ void Bench(const PortKind &kind, int ports, int rounds, const std::string &direc
     const std::string plainPath = directory + "/plain.db";
     Plain plain(plainPath);
     plain.Store(document);
-    // Kept open, SQLite moves its log into the database once in a few commits only: each takes its share.
+    // If kept open, SQLite checkpoints its log only once in several commits; average over them.
     constexpr int kInARow = 6;
     const auto storeInARow = [&](int) {
         for (int i = 0; i < kInARow; i++)
@@ -214,8 +214,8 @@ void Bench(const PortKind &kind, int ports, int rounds, const std::string &direc
     std::filesystem::remove_all(directory);
 }
 
-/// In a process of its own, unless it is the only run: none finds memory that another has used. Profilers see
-/// one run best where there is one process.
+/// Runs in a separate process, so that no run reuses another's memory. A single run stays in this process,
+/// which suits profilers.
 void RunApart(bool apart, const std::function<void()> &run) {
     if (!apart) return run();
     const pid_t child = fork();

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
-# The two libraries made of dvs_objects. The exported names stand in one list, dvs.symbols: the version script is
-# written from it, and a test compares it with what the shared library really exports.
+# The two libraries built from dvs_objects. dvs.symbols lists the exported names: the version script is generated from
+# it, and a test compares it with the actual exports of the shared library.
 
 set(DVS_SYMBOLS ${CMAKE_SOURCE_DIR}/dvs.symbols)
 set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS ${DVS_SYMBOLS})
@@ -12,7 +12,7 @@ file(WRITE ${DVS_VERSION_SCRIPT} "DVS_1 {\n  global:\n    ${dvs_globals};\n  loc
 add_library(dvs SHARED $<TARGET_OBJECTS:dvs_objects>)
 add_library(dvs::dvs ALIAS dvs)
 set_target_properties(dvs PROPERTIES VERSION 1.0.0 SOVERSION 1 LINK_DEPENDS ${DVS_VERSION_SCRIPT}
-  INSTALL_RPATH "$ORIGIN") # the platform library lies beside it, wherever that is
+  INSTALL_RPATH "$ORIGIN") # the platform library is in the same directory
 target_include_directories(dvs INTERFACE
   $<BUILD_INTERFACE:${CMAKE_SOURCE_DIR}/include> $<INSTALL_INTERFACE:${CMAKE_INSTALL_INCLUDEDIR}>)
 target_link_options(dvs PRIVATE LINKER:--version-script=${DVS_VERSION_SCRIPT})
@@ -29,8 +29,8 @@ install(TARGETS dvs dvs_static dvs_platform dvs_platform_shared
   LIBRARY DESTINATION ${CMAKE_INSTALL_LIBDIR} ARCHIVE DESTINATION ${CMAKE_INSTALL_LIBDIR})
 install(DIRECTORY include/dvs DESTINATION ${CMAKE_INSTALL_INCLUDEDIR})
 
-# How others find the installed copy, wherever it has been moved: find_package(dvs) gives the target dvs::dvs, which
-# is the shared library; pkg-config knows it as libdvs.
+# Package files for the installed copy, relocatable: find_package(dvs) provides the target dvs::dvs, the shared
+# library; the pkg-config name is libdvs.
 include(CMakePackageConfigHelpers)
 set(DVS_PACKAGE_DIR ${CMAKE_INSTALL_LIBDIR}/cmake/dvs)
 configure_package_config_file(cmake/dvsConfig.cmake.in ${CMAKE_BINARY_DIR}/dvsConfig.cmake

@@ -1,6 +1,6 @@
 #!/bin/sh
 # SPDX-License-Identifier: Apache-2.0
-# Installs the Debian packages of packages.txt that are missing. Used by quickstart.sh and test.sh.
+# Installs missing Debian packages of packages.txt. Used by quickstart.sh and test.sh.
 set -eu
 
 here=$(dirname "$0")
@@ -26,7 +26,7 @@ echo "Installing:$missing"
 export DEBIAN_FRONTEND=noninteractive
 log=$(mktemp)
 trap 'rm -f "$log"' EXIT
-# shellcheck disable=SC2086 # the list is meant to be split
+# shellcheck disable=SC2086 # word splitting is intended
 if ! { $as_root apt-get update -qq && $as_root apt-get install -y -qq --no-install-recommends $missing; } >"$log" 2>&1; then
     cat "$log" >&2
     exit 1

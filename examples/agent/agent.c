@@ -1,13 +1,13 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 /*
- * A management agent in miniature: it sets a switch up in the switching module, then saves the module's live
- * state into the host's configuration store. It is plain C and links the shared library only, as agents do.
+ * A minimal management agent: it sets up a switch in the switching module, then saves the module's live state
+ * into the host's configuration store. Like real agents, it is plain C and links only the shared library.
  *
- *   agent setup SWITCH PORTS   adds a switch with that many ports, and names them
+ *   agent setup SWITCH PORTS   adds a switch with PORTS named ports
  *   agent save [SWITCH]        saves one switch, or all of them
  *   agent list SWITCH          prints the switch's active ports with their connection ids
  *
- * Exit status: 0 done, 1 refused or failed, 2 wrong usage.
+ * Exit status: 0 success, 1 failure, 2 usage error.
  */
 #include <inttypes.h>
 #include <stdio.h>
@@ -16,7 +16,7 @@
 
 #include <dvs/dvs.h>
 
-/* The type word of values that the store knows. */
+/* The type word of values that the store supports. */
 enum { PROP_TYPE = 0x10, SWITCH_VERSION = 12 };
 
 static int failed(const char *what, HYP_ReturnStatus status) {
@@ -28,7 +28,7 @@ static void *heap_alloc(uint64_t size) {
     return malloc(size);
 }
 
-/* A port travels as its serialized property list. */
+/* A port is sent as its serialized property list. */
 static HYP_ReturnStatus add_port(const char *sw, unsigned number) {
     char id[48];
     char alias[64];
@@ -40,7 +40,7 @@ static HYP_ReturnStatus add_port(const char *sw, unsigned number) {
     if (status != HYP_OK) return status;
     status =
         DVSData_Append(data, "com.orbeno.common.port.alias", alias, (uint32_t)strlen(alias) + 1, PROP_TYPE);
-    void *buf = NULL; /* none: the list allocates it */
+    void *buf = NULL; /* null: the list allocates it */
     uint32_t len = 0;
     if (status == HYP_OK) status = DVSData_Serialize(data, &buf, &len, SWITCH_VERSION);
     if (status == HYP_OK) status = DVSHYP_PortAdd(sw, id, buf, len);
@@ -55,7 +55,7 @@ static int setup(const char *sw, unsigned ports) {
     if (status != HYP_OK) return failed("adding the switch", status);
     status = DVSHYP_GlobalPropSet(sw, "com.orbeno.common.alias", alias, sizeof alias, PROP_TYPE);
     if (status != HYP_OK) return failed("naming the switch", status);
-    /* The store keeps the version as a property of the switch; a switch saved without it does not load again. */
+    /* The store keeps the version as a switch property; a switch saved without it cannot be loaded. */
     const uint32_t version = SWITCH_VERSION;
     status = DVSHYP_GlobalPropSet(sw, "com.orbeno.common.version", &version, sizeof version, PROP_TYPE);
     if (status != HYP_OK) return failed("stating the version", status);
