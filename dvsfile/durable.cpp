@@ -103,7 +103,7 @@ public:
         if (held_) (void)flock(fd_, LOCK_UN);
     }
 
-    [[nodiscard]] bool Take(milliseconds wait) {
+    [[nodiscard]] bool Acquire(milliseconds wait) {
         using Clock = std::chrono::steady_clock;
         const auto deadline = Clock::now() + wait;
         while (flock(fd_, LOCK_EX | LOCK_NB) != 0) {
@@ -247,7 +247,7 @@ HYP_ReturnStatus WriteDurable(const char *path, const void *buf, uint32_t len, m
     const Descriptor directory = target.OpenDirectory();
     if (!directory) return OpenFailure(path);
     DirectoryLock lock(directory.Get()); // released before the directory is closed
-    if (!lock.Take(lockWait)) {
+    if (!lock.Acquire(lockWait)) {
         Report("failed to lock the directory of dvsfile %s, error: %s\n", path, Err_Errno2String(errno));
         return HYP_IO_ERROR;
     }

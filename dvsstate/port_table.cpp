@@ -119,7 +119,7 @@ DVSPort *PlacePort(DVSwitch *sw, const PortKey &key, DVSData *data, uint32_t kin
     return port;
 }
 
-void TakeOut(DVSwitch *sw, DVSPort *port, uint32_t slot) {
+void RemoveFromSlot(DVSwitch *sw, DVSPort *port, uint32_t slot) {
     SwitchFront &front = FrontOf(sw);
     if (HasIndex(sw)) IndexRemove(sw, port);
     FreePort(port);
@@ -175,7 +175,7 @@ HYP_ReturnStatus DVSStatePortRemove(DVSwitch *sw, const char *portId, uint32_t k
     Message(kTrace, "DVSState_PortRemove %s, %s\n", sw->switchId, portId);
     DVSPort *port = FindPort(sw, portId, kind);
     if (!port) return HYP_NOT_FOUND;
-    TakeOut(sw, port, FrontOf(port).slot);
+    RemoveFromSlot(sw, port, FrontOf(port).slot);
     return HYP_OK;
 }
 
@@ -185,7 +185,7 @@ bool RemoveAllPorts(DVSwitch *sw) {
     return !WalkSlots(sw, [&](DVSPort *port, uint32_t slot) {
         if (Prints(kTrace)) Message(kTrace, "DVSState_PortRemove %s, %s\n", sw->switchId, port->portId);
         if (endsHere) return true;
-        TakeOut(sw, port, slot);
+        RemoveFromSlot(sw, port, slot);
         endsHere = BitVector_IsSet(sw->portBitmap, slot);
         return false;
     });

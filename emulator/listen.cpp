@@ -72,7 +72,7 @@ public:
     DirectoryLock(const DirectoryLock &) = delete;
     DirectoryLock &operator=(const DirectoryLock &) = delete;
 
-    [[nodiscard]] bool Take(const std::string &path, std::string *why) {
+    [[nodiscard]] bool Acquire(const std::string &path, std::string *why) {
         const std::size_t slash = path.rfind('/');
         const std::string directory = slash == std::string::npos ? "." : path.substr(0, slash + 1);
         fd_ = open(directory.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
@@ -104,7 +104,7 @@ int ListenAt(const std::string &path, std::string *why) {
     }
     std::memcpy(address.sun_path, path.c_str(), path.size());
     DirectoryLock lock;
-    if (!lock.Take(path, why) || !FreePath(address, why)) return -1;
+    if (!lock.Acquire(path, why) || !FreePath(address, why)) return -1;
     return BindAt(address, why);
 }
 

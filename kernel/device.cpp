@@ -88,7 +88,7 @@ Block AllocateBuffer(uint32_t size) {
 }
 
 /// Returns the buffer to the caller, unless the module claims more bytes than it holds.
-HYP_ReturnStatus HandOut(Block buffer, uint32_t capacity, uint32_t claimed, void **out, uint32_t *outLen) {
+HYP_ReturnStatus ReturnBuffer(Block buffer, uint32_t capacity, uint32_t claimed, void **out, uint32_t *outLen) {
     if (claimed > capacity) {
         Observe({Step::Reply, 0});
         *outLen = 0;
@@ -101,7 +101,7 @@ HYP_ReturnStatus HandOut(Block buffer, uint32_t capacity, uint32_t claimed, void
 
 /// The result of a failed receiving call. If the call failed but its status is success, there is no reply:
 /// treat it as a claim of more bytes than the buffer holds.
-HYP_ReturnStatus Refused(HYP_ReturnStatus status, uint32_t named, uint32_t *outLen) {
+HYP_ReturnStatus FailedReply(HYP_ReturnStatus status, uint32_t named, uint32_t *outLen) {
     *outLen = status == HYP_OK ? 0 : named;
     return status == HYP_OK ? static_cast<HYP_ReturnStatus>(HYP_FAILURE) : status;
 }
@@ -144,9 +144,9 @@ extern "C" HYP_ReturnStatus DVSHYP_CmdExec(const char *switchName, const char *c
         }
         req.cmdOut = Address(buffer.get());
         if (device.Send(Command::CmdExec, &req))
-            return HandOut(std::move(buffer), capacity, req.cmdOutLen, out, outLen);
+            return ReturnBuffer(std::move(buffer), capacity, req.cmdOutLen, out, outLen);
         // Retry whenever the module rejects the buffer, even if it does not ask for a larger one.
-        if (req.status != HYP_LIMIT_EXCEEDED) return Refused(req.status, req.cmdOutLen, outLen);
+        if (req.status != HYP_LIMIT_EXCEEDED) return FailedReply(req.status, req.cmdOutLen, outLen);
     }
 }
 
@@ -169,11 +169,11 @@ HYP_ReturnStatus Fetch(Command command, DVSHYPRequest *req, void **out, uint32_t
             return HYP_NO_MEMORY;
         }
         req->data = Address(buffer.get());
-        if (device.Send(command, req)) return HandOut(std::move(buffer), capacity, req->dataLen, out, outLen);
+        if (device.Send(command, req)) return ReturnBuffer(std::move(buffer), capacity, req->dataLen, out, outLen);
         // Do not retry if the module rejects the buffer without asking for a larger one: that would never
         // end.
         const bool again = req->status == HYP_LIMIT_EXCEEDED && req->dataLen > capacity;
-        if (!again) return Refused(req->status, req->dataLen, outLen);
+        if (!again) return FailedReply(req->status, req->dataLen, outLen);
     }
 }
 
