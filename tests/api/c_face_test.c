@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-/* A C program as an agent would write it: public headers, the shared library, nothing else. */
+/* A C program like an agent: it uses only the public headers and the shared library. */
 
 #include <stdio.h>
 #include <stdlib.h>

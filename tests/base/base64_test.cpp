@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Base64 both ways: the vectors of RFC 4648, and every way to be something else.
+// Base64 in both directions: the vectors of RFC 4648, and every kind of invalid text.
 
 #include "base/base64.h"
 
@@ -51,7 +51,7 @@ TEST(Base64, OnlyTheCanonicalFormIsDecoded) {
     for (const std::string_view text : {
              "Z", "Zg", "Zm9", "Zg=",         // not padded
              "Zg===", "Z===", "====", "=",    // padded too much
-             "Zh==", "Zm9=",                  // bits that no byte takes
+             "Zh==", "Zm9=",                  // unused bits that are not zero
              "Zg==Zg==", "Z=g=",              // padding inside
              "Zm9-", "Zm9_", "Zm 9", "Zm9\n", // other alphabets, white space
          })

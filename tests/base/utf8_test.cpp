@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What counts as UTF-8: each form at its limits, and each way to break it.
+// Valid UTF-8: each form at its limits, and each kind of invalid sequence.
 
 #include "base/utf8.h"
 
@@ -33,7 +33,7 @@ TEST(Utf8, BrokenSequencesHaveNoLength) {
     for (const std::string_view broken : {
              "", // nothing
              "\x80",
-             "\xbf", // a continuation alone
+             "\xbf", // a lone continuation byte
              "\xc0\x80",
              "\xc1\xbf", // overlong, two bytes
              "\xe0\x9f\xbf",
@@ -42,14 +42,14 @@ TEST(Utf8, BrokenSequencesHaveNoLength) {
              "\xed\xbf\xbf", // surrogates
              "\xf4\x90\x80\x80",
              "\xf5\x80\x80\x80", // above U+10FFFF
-             "\xff",             // never a lead
+             "\xff",             // never a lead byte
              "\xc3",
              "\xe1\x80",
-             "\xf1\x80\x80", // cut short
+             "\xf1\x80\x80", // truncated
              "\xc3(",
              "\xe1\x80(",
              "\xe1(\x80",
-             "\xf1(", // another byte where one must continue
+             "\xf1(", // another byte instead of a continuation
          })
         EXPECT_EQ(LengthOf(broken), 0U) << testing::PrintToString(std::string(broken));
 }

@@ -1,13 +1,13 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The library's side of the comparison with dvscodec.py: reads requests from standard input, each a line of words with
-// all bytes in hex ("-" for none), and answers each with one line.
+// The library's side of the comparison with dvscodec.py: reads requests from standard input, each a line of
+// words with all bytes in hex ("-" for none), and answers each with one line.
 //
 //   decode MASK BUFFER           -> STATUS [name type value]...       through DVSData_DeserializeWithPropType
 //   encode [name type value]...  -> STATUS BUFFER                     through DVSData_Append and DVSData_Serialize
 //   value ROOM NAME BUFFER       -> STATUS [value bytes of ROOM]      through DVSData_DeserializeGetPropVal
 //   view BUFFER                  -> STATUS OFFSET [name type value]...  through the read-only view
 //
-// Every buffer is handed over in a block of exactly its size.
+// Every buffer lies in a block of exactly its size.
 
 #include <cstdio>
 #include <cstdlib>

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // The store double's sub-objects and values (fake_store.h). Nodes are owned by pointer, so that addresses
-// stay while siblings come and go.
+// stay valid while siblings are added and removed.
 
 #include <cstdlib>
 #include <limits>
@@ -26,7 +26,7 @@ bool IsList(const Object &node) {
     return node.kind == Kind::Instances || node.kind == Kind::EmptyList;
 }
 
-// A member of the kind a setter needs; null where an object of that name is in the way.
+// A member of the kind a setter needs; null if an object has that name.
 Object *ForValue(Object *object, const char *name, Kind kind) {
     auto *node = object->Member(name);
     if (node->kind == Kind::Object && !node->items.empty()) return nullptr;

@@ -2,10 +2,10 @@
 #ifndef TESTS_CONFIGSTORE_FAKE_STORE_H
 #define TESTS_CONFIGSTORE_FAKE_STORE_H
 
-// An in-memory double of platform/configstore.h for tests of what stands above it. It follows the contract
-// but knows no schema and no limits, counts its calls, fails the one it is told to, and can be looked into.
-// One store per process, with both layers; a transaction is a copy, dropped when its handle is destroyed or
-// it is cancelled.
+// An in-memory double of platform/configstore.h for tests of the layers above it. It follows the contract,
+// has no schema and no limits, counts its calls, fails calls on request, and lets tests read its content.
+// There is one store per process, with both layers. A transaction is a copy, discarded on cancel or when its
+// handle is destroyed.
 //
 // A program that links the target fake_store uses it in place of the platform's store.
 
@@ -16,34 +16,34 @@
 
 namespace fake_store {
 
-/// Empties the store and forgets faults and counts. Handles that are still open stay valid.
+/// Empties the store and resets faults and counts. Open handles stay valid.
 void Reset();
 
-/// What is committed, as text: one line a value or object, in order, both layers.
+/// The committed content of both layers as text: one line per value or object, in order.
 std::string Dump();
 /// The same for one object that is not in the store (or not yet).
 std::string Dump(const configstore::Object *object);
 
-/// Calls so far of functions that return a status.
+/// The number of calls so far to functions that return a status.
 int Calls();
 /// Name of the `n`-th call, counted from 1.
 std::string CallName(int n);
 
-/// Lets the `n`-th call from here on (1 is the next) fail with `status`, its outputs untouched. 0 takes it
-/// back.
+/// Makes the `n`-th call from now on (1 is the next) fail with `status` and unchanged outputs. 0 disarms it.
 void FailCall(int n, int32_t status = configstore::FAILED);
-/// Lets every call of this function fail from here on; null takes it back.
+/// Makes every later call of this function fail; null disarms it.
 void FailFunction(const char *name, int32_t status = configstore::FAILED);
-/// Whether the call that was to fail has been made.
+/// Returns whether an armed failure has occurred.
 bool Failed();
 
-/// Lets GetStore report success without a store.
+/// Makes GetStore report success without a store.
 void GiveNoStore(bool none);
 
-/// Destroys the store handle that GetStore gave out last, if it is still open: for tests of saves that keep it.
+/// Destroys the store handle that GetStore returned last, if it is still open. For tests of saves that keep
+/// it.
 void DestroyKeptStore();
 
-/// Everything handed out and not yet given back: stores, objects, filter specs, arrays, texts.
+/// The number of unreleased handles: stores, objects, filter specs, arrays, texts.
 int OpenHandles();
 
 } // namespace fake_store

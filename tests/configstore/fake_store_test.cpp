@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The store double follows the parts of the contract that tests above it lean on.
+// The store double must follow the parts of the contract that other tests depend on.
 
 #include "configstore/fake_store.h"
 

@@ -2,7 +2,7 @@
 #ifndef TESTS_CONFIGSTORE_FAKE_TREE_H
 #define TESTS_CONFIGSTORE_FAKE_TREE_H
 
-// What the two halves of the store double share: the tree's nodes, and the way every call of it begins.
+// Shared by the two halves of the store double: the tree's nodes, and the start of every call.
 
 #include <algorithm>
 #include <cstdint>
@@ -15,7 +15,7 @@
 
 #include "platform/configstore.h"
 
-// The double's own memory is not what tests of running out of it are about.
+// Out-of-memory tests must not fail the double's own allocations.
 extern "C" void fault_suspend() __attribute__((weak));
 extern "C" void fault_resume() __attribute__((weak));
 
@@ -27,7 +27,7 @@ struct Object {
     Kind kind = Kind::Object;
     bool flag = false;
     int64_t number = 0;
-    std::string text; // a text's value, bytes of a binary
+    std::string text; // the value of a text or binary
     std::vector<std::pair<std::string, std::unique_ptr<Object>>> items;
     std::string id; // of an instance or a root
     std::string address;
@@ -73,12 +73,12 @@ namespace fake_store {
 
 using Kind = configstore::Object::Kind;
 
-/// Handles, arrays and texts that are out.
+/// Unreleased handles, arrays and texts.
 extern int g_open;
-/// Number of the id that was generated last.
+/// The number of the last generated id.
 extern uint32_t g_nextId;
 
-/// Counts the call; the status it is to fail with, 0 to go on.
+/// Counts the call. Returns the status it must fail with, or 0.
 int32_t Enter(const char *name);
 
 class Suspended {
@@ -113,7 +113,7 @@ inline configstore::Object **HandOut(const std::vector<configstore::Object *> &o
 
 } // namespace fake_store
 
-/// First line of every call that returns a status.
+/// The first line of every call that returns a status.
 #define ENTER                                                                                                \
     const fake_store::Suspended suspended;                                                                   \
     if (const int32_t staged = fake_store::Enter(__func__)) return staged

@@ -2,7 +2,7 @@
 #ifndef TESTS_CONFIGSTORE_FRAME_FIXTURE_H
 #define TESTS_CONFIGSTORE_FRAME_FIXTURE_H
 
-// One store object to save properties into and load them from, through the frame and the store double.
+// A store object for saving and loading properties through the frame and the store double.
 
 #include <cstdlib>
 #include <memory>
@@ -37,7 +37,7 @@ struct FrameTest : testing::Test {
         test->messages += text;
     }
 
-    /// Saves from a block of exactly the value's size, so that a look past it is found.
+    /// Saves from a block of exactly the value's size, so that a sanitizer reports an overread.
     int32_t Save(const std::string &key, const state_builder::Bytes &value,
                  uint32_t propClass = DVS_PROP_CLASS_GLOBAL, uint32_t propType = 0x10) {
         const std::unique_ptr<uint8_t, decltype(&std::free)> block(
@@ -47,7 +47,7 @@ struct FrameTest : testing::Test {
                         static_cast<uint32_t>(value.size()), propClass, propType);
     }
 
-    /// Everything LoadProps rebuilds; nothing, with `status` set, where it fails.
+    /// All properties that LoadProps returns; empty, with `status` set, on failure.
     state_builder::Props Load(uint32_t propClass = DVS_PROP_CLASS_GLOBAL,
                               configstore::Object *resources = nullptr) {
         DVSData *list = nullptr;
@@ -68,17 +68,17 @@ struct FrameTest : testing::Test {
         return props;
     }
 
-    /// The object's content, one line a value.
+    /// The object's content, one line per value.
     std::string Content() const { return fake_store::Dump(object); }
 
-    /// The sub-object of this name, made where it is absent.
+    /// The sub-object of this name, created if absent.
     configstore::Object *Sub(configstore::Object *parent, const char *name, const char *id = "") const {
         configstore::Object *sub = nullptr;
         EXPECT_EQ(0, GetOrCreateSubObject(true, parent, name, id, &sub));
         return sub;
     }
 
-    /// What every switch object has, and the converters of structured settings read.
+    /// The members of every switch object that converters of structured settings read.
     void MakeSwitch(const char *className = "etherswitch", const char *version = "7.0.3") const {
         configstore::Object *product = Sub(object, "product");
         EXPECT_EQ(0, configstore::SetValueStr(product, "forwarding_class", className));

@@ -2,8 +2,8 @@
 #ifndef TESTS_CONFIGSTORE_LOCK_COUNT_H
 #define TESTS_CONFIGSTORE_LOCK_COUNT_H
 
-// How many times this process holds recursive locks of the host runtime. Programs that link lock_count have
-// the two functions wrapped at link time.
+// Counts how often this process holds recursive locks of the host runtime. Linking lock_count wraps the two
+// lock functions.
 
 namespace lock_count {
 

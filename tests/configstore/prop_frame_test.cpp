@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The frame around the converters: which row a key gets, how its path is walked, what is said when something
-// fails.
+// The frame around the converters: the choice of a key's row, the walk of its path, and the messages on
+// failure.
 
 #include "configstore/maps/prop_frame.h"
 
@@ -17,7 +17,7 @@ namespace {
 
 struct PropFrame : FrameTest {};
 
-// The tables are writable; a test that writes puts back what was there.
+// The tables are writable; a test that writes to one restores it.
 class RowChange {
 public:
     RowChange(DVSProp2ConfigEntry *row, const DVSProp2ConfigEntry &changed) : row_(row), was_(*row) {
@@ -130,7 +130,7 @@ TEST_F(PropFrame, RebuildsEveryPropertyWithTheRowsType) {
 TEST_F(PropFrame, LoadsTablesOfAnyLength) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
     ASSERT_EQ(0, Save("com.orbeno.common.resv.threshold", U32(7)));
-    // Rows through more sub-objects than there are, and the two that find something at the end.
+    // Rows through more sub-objects than exist, and two rows at the end that match.
     std::vector<DVSProp2ConfigEntry> table(60, dvsGlobalProp2Config[26]);
     for (std::size_t i = 0; i < table.size(); ++i)
         std::snprintf(table[i].path[0], sizeof table[i].path[0], "absent%zu", i % 10);
@@ -292,7 +292,7 @@ TEST_F(PropFrame, LoadEndsAtAFieldOfAnotherType) {
 }
 
 TEST_F(PropFrame, LoadTakesAConvertersNotFoundForAFailure) {
-    // The policy's object is there and its mode is not.
+    // The policy's object exists, its mode does not.
     configstore::Object *policy = Sub(Sub(object, "settings"), "lacp_policy");
     ASSERT_EQ(0, configstore::SetValueBool(policy, "enabled", true));
     EXPECT_EQ(Props{}, Load(DVS_PROP_CLASS_PORT));

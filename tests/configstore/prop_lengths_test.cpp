@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Values of every length from 0 to 300 for every row, each in a block of exactly its size, so that a
-// sanitizer sees any look past it: saved, and what was stored loaded again. DVS_LENGTH_FILLS sets how many
-// contents each length gets.
+// Saves values of every length from 0 to 300 for every row and loads the result. Each value lies in a block
+// of exactly its size, so that a sanitizer reports any overread. DVS_LENGTH_FILLS sets the number of contents
+// per length.
 
 #include <random>
 
@@ -23,7 +23,7 @@ struct PropLengths : FrameTest {
     Bytes Fill(std::size_t length, int fill) {
         Bytes value(length, 0xff);
         if (fill == 0) return value;
-        // Small numbers pass for counts, lengths and indexes that hold; now and then a large one.
+        // Mostly small numbers, which are valid counts, lengths and indexes; sometimes a large one.
         for (auto &byte : value) {
             const auto number = random();
             byte = static_cast<uint8_t>(number % 8 < 5 ? 0 : number % 8 < 7 ? number / 8 % 4 : number / 8);
@@ -36,7 +36,7 @@ struct PropLengths : FrameTest {
         configstore::DestroyObject(object);
         ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "sw", "{}", &object));
         const int32_t saved = Save(key, value, propClass, propType);
-        // A list one of whose keys is empty is a single object for the store, which then has no instances.
+        // The store treats a list with an empty key as a single object without instances.
         EXPECT_TRUE(saved == 0 || saved == -1 || saved == configstore::BAD_PARAMETER ||
                     saved == configstore::SCHEMA_VIOLATION)
             << key << " " << saved;

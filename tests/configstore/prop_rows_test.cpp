@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The rows of the mapping tables, one by one: programs outside of this tree read them by position.
+// Every row of the mapping tables: programs outside this tree read the rows by position.
 
 #include <string>
 

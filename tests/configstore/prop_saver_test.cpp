@@ -1,5 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Saving many properties gives what saving them one by one does, also when a table changes in between.
+// Saving many properties gives the same result as saving them one by one, even when a table changes in
+// between.
 
 #include "configstore/maps/prop_saver.h"
 
@@ -27,7 +28,7 @@ struct PropSaverTest : FrameTest {
     }
 };
 
-// A table of the test's own in place of the global one.
+// Replaces the global table with a test table.
 class OwnTable {
 public:
     explicit OwnTable(std::vector<DVSProp2ConfigEntry> rows) : rows_(std::move(rows)) {
@@ -105,7 +106,7 @@ TEST_F(PropSaverTest, ASaverTakesTheTableAsItIsWhenItIsMade) {
     OwnTable table(
         {TextRow("com.example.zero", "zero"), TextRow(key, "one"), TextRow("com.example.two", "two")});
     ASSERT_EQ(0, SaveMany({{"com.example.one", Text("1")}}));
-    std::strcpy(key, "com.example.new"); // where it stands
+    std::strcpy(key, "com.example.new"); // in place
     EXPECT_EQ(-1, SaveMany({{"com.example.one", Text("2")}}));
     ASSERT_EQ(0, SaveMany({{"com.example.new", Text("3")}}));
     table[0].key = "com.example.two"; // an earlier row of a later key
@@ -141,7 +142,7 @@ TEST_F(PropSaverTest, ForgetsASubObjectThatARowOfItsOwnMayReplace) {
     DVSProp2ConfigEntry below = {"below", {"sub", "leaf"}, 2, 1, 16, 0};
     DVSProp2ConfigEntry list = {"list", {"sub"}, 1, 20, 16, 0};
     OwnTable table({below, list});
-    // An absent sub-object first, so that it is remembered and then taken for a list.
+    // An absent sub-object first: a cached pointer would then be used as a list.
     EXPECT_EQ(4, SaveMany({{"below", Text("1")}, {"list", U32(1) + Slot("x", 81)}, {"below", Text("2")}}));
     ASSERT_EQ(0, configstore::DeleteSubObject(object, "sub", ""));
     EXPECT_EQ(4, SaveMany({{"list", U32(1) + Slot("x", 81)}, {"below", Text("2")}}));

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The exported mapping tables: their layout and what holds for every row. The rows themselves are written out
-// once more in prop_rows_test.cpp.
+// The exported mapping tables: their layout and the invariants of every row. prop_rows_test.cpp lists the
+// rows.
 
 #include <algorithm>
 #include <set>
@@ -26,7 +26,7 @@ TEST(PropTables, AreSelectedByClass) {
     EXPECT_EQ(dvsGlobalProp2Config, GetConfigMap(DVS_PROP_CLASS_GLOBAL));
     EXPECT_EQ(dvsHostProp2Config, GetConfigMap(DVS_PROP_CLASS_HOST));
     EXPECT_EQ(dvsPortProp2Config, GetConfigMap(DVS_PROP_CLASS_PORT));
-    dvsConfigMaps[1] = dvsPortProp2Config; // writable, and read each time
+    dvsConfigMaps[1] = dvsPortProp2Config; // writable, and read on each call
     EXPECT_EQ(dvsPortProp2Config, GetConfigMap(DVS_PROP_CLASS_HOST));
     dvsConfigMaps[1] = dvsHostProp2Config;
 }

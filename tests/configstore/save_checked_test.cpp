@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The checked save: what is refused leaves store and switch table as they were.
+// The checked save: a rejected buffer leaves store and switch table unchanged.
 
 #include "configstore/store_fixture.h"
 
@@ -65,13 +65,13 @@ TEST_F(SaveCheckedTest, RefusesATruncatedBufferAtEveryLength) {
 }
 
 TEST_F(SaveCheckedTest, RefusesABufferThatIsDamagedDeepInside) {
-    // The innermost checksum alone is wrong: the value of a port is no buffer at all.
+    // Only the innermost checksum is wrong, so the value of a port is not a valid buffer.
     Switch sw = Small("a");
     Bytes state = State({sw});
     const std::string needle = "com.orbeno.common.port.alias";
     const auto at = std::search(state.begin(), state.end(), needle.begin(), needle.end());
     ASSERT_NE(state.end(), at);
-    *(at + 60) = 'x'; // behind the name's NUL: inside the sums of port, switch and state
+    *(at + 60) = 'x'; // after the name's NUL: covered by the checksums of port, switch and state
     ExpectRefused(state, HYP_BAD_CHECKSUM);
 }
 

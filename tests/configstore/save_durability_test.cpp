@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Whole saves into a real database: killed at any moment, with failing system calls, two at once beside a
-// reader. What is loaded is always one save, whole. DVS_KILL_ROUNDS and DVS_RACE_SAVES set how many,
-// DVS_FAULT_STEP=1 fails each call.
+// Whole saves into a real database: killed at random moments, with failing system calls, and two at once with
+// a reader. A load must always return exactly one save. DVS_KILL_ROUNDS and DVS_RACE_SAVES set the counts;
+// DVS_FAULT_STEP=1 fails every call.
 
 #include <chrono>
 #include <csignal>
@@ -26,7 +26,7 @@ namespace {
 
 constexpr int32_t kBusy = 2;
 
-// Every port says which save it belongs to.
+// Tags every port with its save.
 Bytes Tagged(int ports, const std::string &tag) {
     Switch sw;
     sw.id = "sw";
@@ -40,7 +40,7 @@ int32_t SaveBytes(const Bytes &state) {
     return DVSState_SaveBufToConfigStore(state.data(), static_cast<uint32_t>(state.size()));
 }
 
-// The tag of what the store holds; "none" where nothing can be loaded, "mixed" for a mixture.
+// The tag of the store's content; "none" if the load fails, "mixed" for a mixture of saves.
 std::string LoadTag(std::size_t ports) {
     void *buf = nullptr;
     uint32_t len = 0;
@@ -149,7 +149,8 @@ TEST_F(SaveDurability, AFailingWriteSyncOrTruncateLeavesTheOldContentOrTheNew) {
     options.step = fault::FromEnvironment("DVS_FAULT_STEP", 5);
     options.conclude = [](fault::Child &child) {
         if (DVSState_ConfigReset() != HYP_OK) child.Note("reset");
-        // Where the store cannot be opened or begun, the lock stays held as stated, and only there.
+        // The lock stays held only if the store cannot be opened or the transaction cannot begin, as
+        // documented.
     };
     for (const char *kind : {"write", "fsync", "truncate"}) {
         const std::string plan = std::string(kind) + ":%:EIO:path=" + path;

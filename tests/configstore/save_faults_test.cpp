@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Saves with a store that fails: nothing half done is left in it, and no lock is left held but where it
-// always was.
+// Saves with a failing store: the store keeps no partial change, and no lock stays held except where
+// documented.
 
 #include "configstore/save.h"
 #include "configstore/store_fixture.h"
@@ -42,7 +42,7 @@ std::vector<Switch> After() {
     return {a, b};
 }
 
-// Calls whose failure the save is stated to live with.
+// Calls whose failure the save ignores by contract.
 bool IsHarmless(const std::string &call) {
     return call == "GenerateInstanceId" || call == "CancelTransaction";
 }
@@ -125,7 +125,7 @@ TEST_F(SaveFaults, WithoutATransactionTheCheckedSaveKeepsTheSame) {
     fake_store::DestroyKeptStore();
 }
 
-// Saves into a store of the caller's clean up on every path.
+// Saves into the caller's store clean up on every path.
 TEST_F(SaveFaults, IntoAnOpenStoreNothingIsKept) {
     configstore::Store *store = nullptr;
     ASSERT_EQ(0, configstore::GetStore(&store));

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Saving whole states: what is written, what is cleared, what is deleted, what is said.
+// Saving whole states: what is written, cleared and deleted, and the messages.
 
 #include "configstore/store_fixture.h"
 
@@ -151,7 +151,7 @@ TEST_F(SaveTest, EmptiesAnExistingObjectOfEverythingItWrites) {
     ASSERT_EQ(0, Save({sw}));
     ASSERT_NE(bare, fake_store::Dump());
     ASSERT_EQ(0, Save({Small("a")}));
-    // The same lines; "uuid", which is never cleared, keeps its place in front.
+    // The same lines; "uuid" is never cleared and stays first.
     auto lines = [](const std::string &text) {
         std::vector<std::string> sorted;
         for (std::size_t at = 0; at < text.size(); at = text.find('\n', at) + 1)

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Converters of single values, both directions, byte for byte, for each class of switch.
+// Converters of single values in both directions, byte for byte, for each class of switch.
 
 #include "configstore/frame_fixture.h"
 
@@ -11,7 +11,7 @@ constexpr uint32_t kGlobal = DVS_PROP_CLASS_GLOBAL;
 constexpr uint32_t kHost = DVS_PROP_CLASS_HOST;
 constexpr uint32_t kPort = DVS_PROP_CLASS_PORT;
 
-// Saved value, the line it makes in the store, the value it loads as; an empty one for no property.
+// Saved value, its line in the store, and the loaded value; empty for no property.
 struct Case {
     const char *key;
     uint32_t propClass;
@@ -160,7 +160,7 @@ TEST_F(ScalarFaults, AbsentFieldsLoadAsNothing) {
 }
 
 TEST_F(ScalarFaults, FieldsOfAnotherTypeFailTheLoad) {
-    // A list is no scalar, whatever the scalar.
+    // A list is not a valid value of any scalar.
     for (const char *path : {"name", "is_opaque", "switch_address", "ovl_enabled"}) {
         ASSERT_EQ(0, configstore::SetValueEmptyList(object, path));
         (void)Load();

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// State buffers for tests (state_builder.h), on the exported list functions.
+// State buffers for tests (state_builder.h), built with the exported list functions.
 
 #include "configstore/state_builder.h"
 
@@ -130,7 +130,7 @@ Bytes State(const std::vector<Switch> &switches) {
 
 Props ParseList(const Bytes &buf) {
     DVSData *handle = nullptr;
-    // All types, those that a plain deserialization drops included.
+    // All types, including those that a plain deserialization drops.
     const HYP_ReturnStatus status = DVSData_DeserializeWithPropType(
         &handle, buf.data(), static_cast<uint32_t>(buf.size()),
         [](uint64_t size) { return std::malloc(size); }, std::free, 0xffffffff);

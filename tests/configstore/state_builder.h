@@ -2,7 +2,7 @@
 #ifndef TESTS_CONFIGSTORE_STATE_BUILDER_H
 #define TESTS_CONFIGSTORE_STATE_BUILDER_H
 
-// State buffers out of plain descriptions, and back, for tests of saving and loading.
+// Converts plain descriptions to state buffers and back, for tests of saving and loading.
 
 #include <cstdint>
 #include <string>
@@ -15,10 +15,10 @@ using Bytes = std::vector<uint8_t>;
 Bytes U32(uint32_t number);
 /// The text with its NUL.
 Bytes Text(const std::string &text);
-/// The text without one.
+/// The text without a NUL.
 Bytes Raw(const std::string &text);
 Bytes operator+(Bytes left, const Bytes &right);
-/// Filled up with zeroes to `size`.
+/// Padded with zeroes to `size`.
 Bytes Slot(const std::string &text, std::size_t size);
 
 struct Prop {
@@ -51,12 +51,12 @@ Prop Alias(const std::string &name);
 
 /// A state buffer of these switches.
 Bytes State(const std::vector<Switch> &switches);
-/// The switches of a state buffer; fails the test where it is malformed.
+/// The switches of a state buffer; fails the test if the buffer is malformed.
 std::vector<Switch> Parse(const Bytes &state);
 /// The entries of one serialized list.
 Props ParseList(const Bytes &list);
 
-/// The property of this key; a failure of the test, and an empty one, where it is absent.
+/// The property of this key; if absent, fails the test and returns an empty one.
 Prop Find(const Props &props, const std::string &key);
 bool Has(const Props &props, const std::string &key);
 

@@ -2,7 +2,7 @@
 #ifndef TESTS_CONFIGSTORE_STORE_FIXTURE_H
 #define TESTS_CONFIGSTORE_STORE_FIXTURE_H
 
-// Whole saves and loads on the store double.
+// A fixture for whole saves and loads with the store double.
 
 #include <cstdlib>
 #include <string>
@@ -52,7 +52,7 @@ struct StoreTest : testing::Test {
     static int32_t Save(const std::vector<state_builder::Switch> &switches, const char *id = nullptr) {
         return SaveBytes(state_builder::State(switches), id);
     }
-    /// The loaded switches; none where there is no buffer.
+    /// The loaded switches; empty without a buffer.
     std::vector<state_builder::Switch> Load(bool desired = false) {
         void *buf = nullptr;
         uint32_t len = 0;
@@ -70,7 +70,7 @@ struct StoreTest : testing::Test {
                                &count);
         return count;
     }
-    /// What those early returns leave behind.
+    /// Releases the lock and the table that those early returns keep.
     static void ReleaseKeptLock() {
         EXPECT_EQ(1, lock_count::Held());
         EXPECT_EQ(HYP_OK, DVSState_ConfigReset());
@@ -81,8 +81,8 @@ struct StoreTest : testing::Test {
 
     int32_t status = 0;
     bool gotBuffer = false;
-    std::string messages;            // of the library, all levels
-    std::vector<std::string> system; // what went to syslog
+    std::string messages;            // the library's messages of all levels
+    std::vector<std::string> system; // the lines sent to syslog
 };
 
 #endif

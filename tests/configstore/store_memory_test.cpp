@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Saves, loads and upgrades that run out of memory, at each allocation in turn: a status (or, for a load, no
-// buffer), nothing committed, no block lost, no lock held. The store double has the memory it needs.
+// Fails each allocation of saves, loads and upgrades in turn. Each must return a status (a load: no buffer),
+// commit nothing, leak nothing and hold no lock. The store double's own allocations do not fail.
 
 #include <filesystem>
 
@@ -32,7 +32,7 @@ Switch Full(const std::string &id) {
 struct StoreMemory : testing::Test {
     StoreMemory() {
         dvsconfigstore_debug = -1;
-        options.warmUp = true; // the lock and the host's limit are made once
+        options.warmUp = true; // the lock is created and the host's limit is read once
         options.conclude = [](fault::Child &child) {
             if (fake_store::OpenHandles() != 0) child.Note("handles ");
             if (StoreTest::SwitchesInTable() != 0) child.Note("table ");

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Converters of the DEFAULT rows: which list a property without a row goes to, and which of them come back.
+// Converters of the DEFAULT rows: the list that keeps a property without a row, and which of them load again.
 
 #include "configstore/frame_fixture.h"
 
@@ -14,7 +14,7 @@ constexpr uint32_t kPort = DVS_PROP_CLASS_PORT;
 struct Case {
     const char *key;
     uint32_t type;
-    const char *stored; // behind "/data/"
+    const char *stored; // after "/data/"
 };
 
 struct Unmapped : FrameTest, testing::WithParamInterface<uint32_t> {

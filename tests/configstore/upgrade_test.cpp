@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Carrying an old state file over, and the list of its switches.
+// Upgrading from an old state file, and the list of its switches.
 
 #include "configstore/upgrade.h"
 
@@ -25,7 +25,8 @@ using namespace state_builder;
 
 namespace {
 
-// The list of switches leaves the file's buffer allocated; the sanitizer is told, the test below counts it.
+// The list of switches leaves the file's buffer allocated. The leak checker ignores it; a test below counts
+// it.
 DvsBasicInfo BasicInfoLeaving(const std::string &path) {
 #ifdef DVS_LEAK_CHECK
     const __lsan::ScopedDisabler leaves;

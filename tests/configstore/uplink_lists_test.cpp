@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Converters of the uplink lists: slots on one side, a list of strings on the other.
+// Converters of the uplink lists between slots and a list of strings.
 
 #include "configstore/frame_fixture.h"
 
@@ -82,7 +82,8 @@ TEST_P(UplinkLists, LoadLetsALongTextRunIntoTheNextSlotAndStopsAtTheEnd) {
     ASSERT_EQ(0, configstore::AppendValueString(object, "uplink_port_keys", "x"));
     ASSERT_EQ(0, configstore::AppendValueString(object, "uplink_port_keys", last.c_str()));
     const Bytes value = Find(Load(kHost), kKeys).value;
-    // The first runs 12 characters and its NUL into the second slot, whose own text then covers two of them.
+    // The first text overflows by 12 characters and its NUL; the second slot's text then overwrites two of
+    // them.
     Bytes expected =
         U32(3) + Raw(std::string(48, 'f')) + Slot("x", 2) + Raw(std::string(10, 'f')) + Bytes(36);
     expected = expected + Raw(std::string(47, 'l')) + Bytes(1);

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What counts as a difference, and what does not.
+// Differences that the comparison reports, and those that it ignores.
 
 #include "tools/dvsctl/verbs/changes.h"
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The completion script, asked by a real bash: whatever the command table has is offered.
+// Runs the completion script in a real bash: it must offer everything in the command table.
 
 #include <algorithm>
 #include <cstdlib>
@@ -24,7 +24,7 @@ protected:
         Put("state.db", "");
     }
 
-    /// What is offered at the last of the words.
+    /// The completions offered for the last of the words.
     Words Offered(const Words &words) const {
         std::string script =
             "cd '" + At("") + "' && . ./dvsctl.bash && COMP_WORDS=('" DVS_BINARY_DIR "/bin/dvsctl'";
@@ -92,7 +92,7 @@ TEST_F(Completion, OffersValuesAndNames) {
     ExpectOffered({"kernel", "prop", "set", "s", "x", "1", "--as", ""}, "number");
     ExpectOffered({"store", "list", "--store", ""}, "state.db");
     ExpectOffered({"props", "com.orbeno.etherswitch.port.v"}, "com.orbeno.etherswitch.port.vlan");
-    EXPECT_EQ(Offered({"show", "--switch", "st"}), Words{""}); // ids are not guessed at
+    EXPECT_EQ(Offered({"show", "--switch", "st"}), Words{""}); // ids are not completed
     ExpectOffered({"--"}, "--version");
     EXPECT_EQ(Offered({"no-such-verb", "stor"}), Words{"store"});
 }

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Copies: the same bytes back, nothing half written, dry runs that change nothing.
+// Copies: bytes round-trip, writes are atomic, and dry runs change nothing.
 
 #include <gtest/gtest.h>
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The annotated dump gives every byte exactly once, of sound and of damaged states.
+// The annotated dump prints every byte exactly once, for valid and for damaged states.
 
 #include "tools/dvsctl/verbs/hexdump.h"
 
@@ -23,7 +23,7 @@ struct Collector : RangeWriter {
     std::vector<std::string> faults;
 };
 
-// True when the ranges meet without gap or overlap from the first byte to the last.
+// Returns success if the ranges cover the state from the first byte to the last without gap or overlap.
 testing::AssertionResult Covers(const Collector &collector, const Buffer &state) {
     std::size_t at = 0;
     for (const ByteRange &range : collector.ranges) {

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// States made by `dvsctl generate`: complete, sound, various, and the same for the same seed.
+// States from `dvsctl generate`: complete, valid, varied, and reproducible by seed.
 
 #include "program.h"
 
@@ -41,7 +41,7 @@ std::set<std::string> NamesOfPorts(const json::value &sw) {
     return names;
 }
 
-// By the names: the common keys and those of the class's family. A cswitch has no frame size of its own.
+// Selects by name: the common keys and those of the class's family. A cswitch has no frame size key.
 std::set<std::string> MappedKeys(int propClass, std::string_view className) {
     const bool isVswitch = className == "vswitch" || className == "cswitch";
     const std::string_view others = isVswitch ? "com.orbeno.etherswitch." : "com.orbeno.vswitch.";
@@ -70,7 +70,7 @@ TEST_F(Generate, TheSameSeedGivesTheSameBytes) {
     EXPECT_EQ(Dvsctl({"verify", At("a.db")}).status, 0);
 }
 
-// What one compiler made; the others must agree. Changes with every change of what is drawn.
+// The bytes from one compiler; the others must agree. Update it when the generator draws different values.
 TEST_F(Generate, TheBytesAreTheSameWithEveryCompiler) {
     ASSERT_EQ(Dvsctl({"generate", "--switches", "15", "--ports", "24", "--seed", "7", At("a.db")}).status, 0);
     std::uint64_t hash = 0xcbf29ce484222325;
@@ -166,7 +166,7 @@ TEST_F(Generate, ADryRunShowsWhatWouldBeWritten) {
     const json::value plan = Json(Dvsctl({"generate", "--dry-run", "--json", "--seed", "2", At("a.db")}));
     EXPECT_EQ(plan.at("command"), "generate");
     EXPECT_EQ(plan.at("is_written"), false);
-    EXPECT_EQ(plan.at("changes").as_array().size(), 6U); // three switches go, three come
+    EXPECT_EQ(plan.at("changes").as_array().size(), 6U); // three switches removed, three added
     EXPECT_NE(Dvsctl({"generate", "--dry-run", At("a.db")}).out.find("would change nothing"),
               std::string::npos);
     EXPECT_EQ(Get("a.db"), before);

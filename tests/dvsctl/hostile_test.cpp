@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Input that means harm: documents, state files, names and file kinds. Every one ends with a status and a
-// reason, and nothing is written.
+// Hostile input: documents, state files, names and file kinds. Each fails with a status and a reason, and
+// nothing is written.
 
 #include <gtest/gtest.h>
 
@@ -119,7 +119,7 @@ TEST_F(Hostile, PathsThatAreNoFilesDoNotHang) {
         EXPECT_NE(Dvsctl({verb, At("directory")}).err.find("it is a directory"), std::string::npos) << verb;
         EXPECT_NE(Dvsctl({verb, "/dev/zero"}).err.find("it is a device"), std::string::npos) << verb;
         EXPECT_EQ(Dvsctl({verb, "json:/dev/zero"}).status, 1) << verb;
-        // Documents may come through a pipe: its writer is waited for, not for ever.
+        // Documents may come through a pipe: the wait for its writer is limited.
         EXPECT_EQ(Dvsctl({verb, "json:" + At("fifo"), "--timeout", "0.1"}).status, 3) << verb;
     }
 }

@@ -2,7 +2,7 @@
 #ifndef TESTS_DVSCTL_KERNEL_FIXTURE_H
 #define TESTS_DVSCTL_KERNEL_FIXTURE_H
 
-// The real program against a real emulator process, which holds the small state of states.h.
+// Runs the real program against a real emulator process, which holds the small state of states.h.
 
 #include <cstdlib>
 
@@ -27,19 +27,19 @@ protected:
 
     std::string Socket() const { return At("socket"); }
 
-    /// The program with the emulator as its device.
+    /// Runs the program with the emulator as its device.
     Result Kernel(std::vector<std::string> args, std::string input = {}) const {
         return RunProgram({.args = std::move(args),
                            .input = std::move(input),
                            .environment = {"DVS_EMULATOR=" + Socket(), "DVS_CONFIGSTORE=" + At("store.db")}});
     }
-    /// The same with "kernel" before the words.
+    /// The same, with "kernel" before the words.
     Result Verb(std::vector<std::string> args, std::string input = {}) const {
         args.insert(args.begin(), "kernel");
         return Kernel(std::move(args), std::move(input));
     }
     void Fault(const std::string &fault) const { ASSERT_EQ(Verb({"exec", "", "fault " + fault}).status, 0); }
-    /// The whole state as JSON text: equal when nothing changed.
+    /// The whole state as JSON text, to detect changes.
     std::string Everything() const { return Kernel({"show", "kernel:", "--json", "--raw"}).out; }
 
     dvs::test::EmulatorProcess emulator_;

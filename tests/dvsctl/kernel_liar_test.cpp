@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A module that lies to the program: every verb about the module gets answers that no honest module gives,
-// and fails with a status of its own, soon, with nothing but an error to say.
+// A hostile module: every verb about the module gets invalid replies and must fail quickly, with a documented
+// status and only an error message.
 
 #include <algorithm>
 #include <cerrno>
@@ -19,7 +19,7 @@ namespace {
 using namespace dvs::ctl::test;
 using Words = std::vector<std::string>;
 
-// A module that answers each of its connections with the same bytes, whatever it is asked.
+// A module that sends the same bytes on each connection, regardless of the request.
 class Liar {
 public:
     Liar(const std::string &path, std::string reply) : reply_(std::move(reply)) {
@@ -53,9 +53,9 @@ private:
     std::thread thread_;
 };
 
-constexpr std::uint32_t kSame = 0xfffffffe; ///< stands for the payload's size
+constexpr std::uint32_t kSame = 0xfffffffe; ///< replaced by the payload's size
 
-/// A reply with the header's claims apart from what follows it.
+/// A reply whose header fields can differ from the data that follows.
 struct Reply {
     std::string payload = {};
     std::uint32_t claimed = kSame;
@@ -99,7 +99,7 @@ std::string LongerThanItIs() {
 
 std::string WithoutNul() {
     Buffer state = SmallState();
-    std::fill_n(state.begin() + 16, 128, std::uint8_t{'n'}); // the first switch's id, whole
+    std::fill_n(state.begin() + 16, 128, std::uint8_t{'n'}); // the whole id field of the first switch
     Mend(state);
     return std::string(dvs::form::AsText(state));
 }
@@ -144,14 +144,14 @@ std::vector<Lie> Lies() {
         {"one bit off", Reply{.payload = Flipped()}.Bytes()},
         {"longer than it is", Reply{.payload = LongerThanItIs()}.Bytes()},
         {"zeroes", Reply{.payload = std::string(4096, '\0')}.Bytes()},
-        // Sound as bytes; not what was asked for.
+        // Valid bytes, but not the requested data.
         {"wrong ids", Reply{.payload = WrongIds()}.Bytes()},
         {"no NUL", Reply{.payload = WithoutNul()}.Bytes()},
         {"a state whatever is asked", Reply{.payload = Good()}.Bytes()},
     };
 }
 
-/// A verb; whether it takes an answer's word for it, as only the module can know.
+/// A verb, and whether it must trust a reply because only the module has the data.
 struct Verb {
     Words words;
     bool believes = false;
@@ -197,7 +197,8 @@ const Verb kChanges[] = {
 
 class LyingModule : public ProgramTest {
 protected:
-    // Each verb meets every `stride`-th lie, another part of them than its neighbour: all of both are tried.
+    // Each verb gets every `stride`-th lie, with a different offset than its neighbour. Every verb and every
+    // lie is tried.
     template <std::size_t N> void TellAll(const Verb (&verbs)[N], std::size_t stride) {
         const std::vector<Lie> lies = Lies();
         ASSERT_GE(lies.size(), 20U);
@@ -217,7 +218,7 @@ private:
             return testing::PrintToString(verb.words) + ": " + lie.name + ": " + result.err;
         };
         if (verb.believes && result.status == 0) return;
-        // A sound state is one, whoever's it is.
+        // A valid state is accepted, even another switch's.
         const bool isSound = std::string(lie.name) == "wrong ids" || std::string(lie.name) == "no NUL" ||
                              std::string(lie.name) == "a state whatever is asked";
         if (isSound && result.status == 0) return;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The source kernel:, and everything that can go wrong between the program and the module: no device, a
-// module that refuses, hangs, dies or lies.
+// The source kernel: and all failures between the program and the module: no device, and a module that
+// rejects requests, hangs, dies or sends invalid replies.
 
 #include <csignal>
 

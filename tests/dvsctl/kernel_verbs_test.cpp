@@ -1,6 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every verb about the switching module: what it does, what refuses it, and that a dry run leaves everything
-// as it was.
+// Every verb about the switching module: its effect, its errors, and that a dry run changes nothing.
 
 #include <boost/json/array.hpp>
 #include <boost/json/object.hpp>
@@ -15,11 +14,11 @@ using Words = std::vector<std::string>;
 constexpr const char *kMtu = "com.orbeno.common.portset.mtu";
 constexpr const char *kVlan = "com.orbeno.etherswitch.port.vlan";
 
-/// A changing verb: what makes it succeed, and what it is refused for.
+/// A changing verb: arguments that succeed, and arguments that fail.
 struct ChangeRow {
     Words good;
     Words bad;
-    int status; ///< of the refusal
+    int status; ///< of the failing arguments
 };
 
 const ChangeRow kChanges[] = {
@@ -119,7 +118,7 @@ TEST_F(KernelVerbs, ASwitchLeftWithoutItsVersionPropertyIsWarnedAboutWithTheComm
     EXPECT_NE(saved.err.find("warning: "), std::string::npos) << saved.err;
     EXPECT_EQ(Kernel({"show", "store:"}).status, 7);
 
-    // The command it names, as a shell takes it.
+    // The suggested command, quoted for a shell.
     const std::string mend = "dvsctl kernel prop set 'it'\"'\"'s' com.orbeno.common.version 8 --as number";
     EXPECT_NE(added.err.find(mend), std::string::npos) << added.err;
     for (const char *id : {"it's", "alpha", "beta"})
@@ -130,7 +129,7 @@ TEST_F(KernelVerbs, ASwitchLeftWithoutItsVersionPropertyIsWarnedAboutWithTheComm
 
     const Result cleared = Verb({"prop", "clear", "it's", "com.orbeno.common.version", "--json"});
     EXPECT_EQ(Json(cleared).at("warnings").as_array().size(), 1u);
-    add.insert(add.end(), {"--may-exist", "--json"}); // left as it is
+    add.insert(add.end(), {"--may-exist", "--json"}); // unchanged
     EXPECT_FALSE(Json(Verb(add)).as_object().contains("warnings"));
 }
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The manual page is written by hand; what the command table has must stand in it.
+// The manual page is written by hand; it must name everything in the command table.
 
 #include <cctype>
 #include <fstream>
@@ -14,7 +14,7 @@ namespace {
 
 using namespace dvs::ctl;
 
-// The page as its reader sees it, as far as names go: without font changes, escapes and quotes.
+// The page's text without font changes, escapes and quotes.
 std::string Page() {
     std::ifstream file(DVS_SOURCE_DIR "/docs/dvsctl.1");
     std::ostringstream text;

@@ -30,7 +30,7 @@ std::string ReadToEnd(int fd) {
     for (;;) {
         const ssize_t got = read(fd, piece.data(), piece.size());
         if (got < 0 && errno == EINTR) continue;
-        if (got <= 0) return text; // a terminal whose other side is gone reads as EIO
+        if (got <= 0) return text; // a terminal whose other side is closed reads as EIO
         text.append(piece.data(), static_cast<std::size_t>(got));
     }
 }

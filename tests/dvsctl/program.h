@@ -2,7 +2,7 @@
 #ifndef TESTS_DVSCTL_PROGRAM_H
 #define TESTS_DVSCTL_PROGRAM_H
 
-// Runs the real program the way a shell or a script does, and keeps what came out.
+// Runs the real program like a shell or a script, and captures its output.
 
 #include <string>
 #include <string_view>
@@ -19,26 +19,26 @@ using namespace form;
 using namespace form::test;
 
 struct Result {
-    int status = -1; ///< exit status, or 128 plus the signal that ended it
+    int status = -1; ///< exit status, or 128 plus the terminating signal
     std::string out, err;
-    long peakKilobytes = 0; ///< the most memory that it had at once
+    long peakKilobytes = 0; ///< peak memory
 };
 
 struct Run {
     std::vector<std::string> args = {};
-    std::string input = {};                    ///< on standard input, which then ends
-    std::vector<std::string> environment = {}; ///< "NAME=value", beside a fixed small environment
-    std::string outPath = {}; ///< standard output goes to this file instead ("-": it is closed)
-    bool openInput = false;   ///< standard input is a pipe that nobody closes
+    std::string input = {};                    ///< written to standard input, which is then closed
+    std::vector<std::string> environment = {}; ///< "NAME=value", added to a small fixed environment
+    std::string outPath = {}; ///< file for standard output instead ("-": closed)
+    bool openInput = false;   ///< standard input is a pipe that stays open
 };
 
 Result RunProgram(const Run &run);
 
-/// The program in a terminal of that many rows; its output as the terminal got it (with \r\n line ends).
+/// Runs the program in a terminal of that many rows. The output is the terminal's (with \r\n line ends).
 Result RunInTerminal(const std::vector<std::string> &args, const std::vector<std::string> &environment,
                      int rows = 24);
 
-/// A directory of its own for each test, removed afterwards, with some states in it.
+/// A separate directory for each test, with some states in it; removed after the test.
 class ProgramTest : public testing::Test {
 protected:
     void SetUp() override;
@@ -47,9 +47,9 @@ protected:
     [[nodiscard]] Result Dvsctl(std::vector<std::string> args) const {
         return RunProgram({.args = std::move(args)});
     }
-    /// Path of a file of the test.
+    /// The path of a file in the directory.
     [[nodiscard]] std::string At(std::string_view name) const { return directory_ + "/" + std::string(name); }
-    /// Writes the bytes, padded to what state files need.
+    /// Writes the bytes, padded like a state file.
     void PutState(std::string_view name, Buffer state) const;
     void Put(std::string_view name, std::string_view contents) const;
     [[nodiscard]] std::string Get(std::string_view name) const;
@@ -59,7 +59,7 @@ private:
     std::string directory_;
 };
 
-/// The one JSON document on standard output.
+/// The only JSON document on standard output.
 boost::json::value Json(const Result &result);
 
 } // namespace dvs::ctl::test

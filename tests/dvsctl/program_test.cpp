@@ -39,7 +39,7 @@ TEST_F(Program, HelpsWithEveryVerb) {
     for (const dvs::ctl::Command &command : dvs::ctl::Commands()) {
         EXPECT_NE(overview.out.find(command.name), std::string::npos);
         std::vector<std::string> words;
-        std::istringstream name(command.name); // some are of two words
+        std::istringstream name(command.name); // some names have two words
         for (std::string word; name >> word;)
             words.push_back(word);
         words.emplace_back("--help");

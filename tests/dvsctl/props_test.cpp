@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What `dvsctl props` says of the known properties.
+// The output of `dvsctl props` for the known properties.
 
 #include "program.h"
 

@@ -2,7 +2,7 @@
 #ifndef TESTS_DVSCTL_STORE_FIXTURE_H
 #define TESTS_DVSCTL_STORE_FIXTURE_H
 
-// A state file, a store that holds it, and the program run on them.
+// A state file, a store with the same state, and the program that runs on them.
 
 #include <string>
 #include <utility>
@@ -25,7 +25,7 @@ protected:
         store_ = At("store.db");
     }
 
-    /// Two switches with settings that the store has fields for; `alias` is that of a port.
+    /// Two switches with settings that have fields in the store; `alias` is the alias of a port.
     static Buffer Site(std::string_view alias) {
         const std::vector<NewEntry> global = {
             MakeProperty("com.orbeno.common.alias", Text("production"), 0x10),
@@ -41,7 +41,7 @@ protected:
                                                 MakeSwitch("beta", other, {}, {})});
     }
 
-    /// The program with the test's store as the default one.
+    /// Runs the program with the test's store as the default store.
     [[nodiscard]] Result Ctl(std::vector<std::string> args, std::vector<std::string> more = {}) const {
         more.push_back("DVS_CONFIGSTORE=" + store_);
         return RunProgram({.args = std::move(args), .environment = std::move(more)});
@@ -50,7 +50,7 @@ protected:
         const Result saved = Ctl({"copy", At("site.db"), "store:"});
         ASSERT_EQ(saved.status, 0) << saved.err;
     }
-    /// A second save in which the port has another alias.
+    /// Saves again with another alias of the port.
     void SaveChange(std::string_view alias) const {
         PutState("changed.db", Site(alias));
         const Result saved = Ctl({"copy", At("changed.db"), "store:"});

@@ -13,7 +13,7 @@ using dvs::form::NewEntry;
 using StoreSource = StoreProgram;
 
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping is most of it
+constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping dominates
 #else
 constexpr bool kMemoryCounts = true;
 #endif
@@ -33,7 +33,7 @@ TEST_F(StoreSource, CopySavesAndLoads) {
     Save();
     EXPECT_EQ(Ctl({"verify", "store:"}).status, 0);
     ASSERT_EQ(Ctl({"copy", "store:", At("back.db")}).status, 0);
-    // What came out of a store goes in and out again unchanged.
+    // A state loaded from a store saves and loads again unchanged.
     EXPECT_EQ(Ctl({"copy", At("back.db"), "store:"}).status, 0);
     const Result same = Ctl({"diff", "store:", At("back.db")});
     EXPECT_EQ(same.status, 0) << same.out;
@@ -190,7 +190,7 @@ TEST_F(StoreSource, LoadThatGivesNothingIsAFailure) {
     EXPECT_EQ(Ctl({"copy", "store:", At("out.db")}).status, 7);
 }
 
-// What a save of the most ports of a host may take follows from this.
+// This bounds the memory of a save with a host's maximum number of ports.
 TEST_F(StoreSource, CopyTakesFewTimesTheStatesSize) {
     const long idle = Ctl({"--version"}).peakKilobytes;
     const char *const ports = kMemoryCounts ? "2048" : "64";

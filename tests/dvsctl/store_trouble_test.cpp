@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What dvsctl does when the store is busy, damaged, foreign, newer, or its disk full.
+// dvsctl with a store that is busy, damaged, foreign or newer, or whose disk is full.
 
 #include <sqlite3.h>
 
@@ -22,7 +22,7 @@ class StoreTrouble : public StoreProgram {
 protected:
     using Database = std::unique_ptr<sqlite3, int (*)(sqlite3 *)>;
 
-    /// As the interposer sees it.
+    /// The path as the interposer sees it.
     [[nodiscard]] std::string Directory() const { return std::filesystem::canonical(At(".")); }
     static Database OpenDatabase(const std::string &path) {
         sqlite3 *db = nullptr;
@@ -61,7 +61,7 @@ TEST_F(StoreTrouble, AnotherWriterIsBusyOnceTheTimeIsOver) {
         const Result result = Ctl(verb);
         EXPECT_EQ(result.status, 8) << verb[0] << ' ' << verb[1] << '\n' << result.err;
     }
-    EXPECT_EQ(Ctl({"show", "store:"}).status, 0); // readers wait for nobody
+    EXPECT_EQ(Ctl({"show", "store:"}).status, 0); // readers do not wait
     EXPECT_EQ(Json(Ctl({"copy", At("site.db"), "store:", "--timeout", "0", "--json"})).at("error").at("name"),
               "busy");
     Sql(other, "ROLLBACK");
@@ -130,7 +130,7 @@ TEST_F(StoreTrouble, CheckAndVerifyNameADocumentThatBreaksTheSchema) {
     EXPECT_NE(verified.err.find("max_mtu"), std::string::npos) << verified.err;
 }
 
-// Buffers that the checked save refuses and the plain one takes, emptying the store as it is stated to.
+// Buffers that the checked save rejects. The plain save accepts them and empties the store, as documented.
 struct UnsoundRow {
     const char *what;
     HYP_ReturnStatus refusal; ///< of the checked save
@@ -171,7 +171,7 @@ TEST_F(StoreTrouble, WhatAPlainSaveOfAnUnsoundBufferLostComesBackAndACheckedOneL
                   static_cast<int32_t>(row.refusal));
         EXPECT_EQ(Get("store.db"), before);
 
-        // The plain save takes what does not load for a state without switches.
+        // The plain save treats a buffer that does not load as a state without switches.
         ASSERT_EQ(DVSState_SaveBufToConfigStore(buffer.data(), size), 0);
         EXPECT_EQ(Json(Ctl({"store", "list", "--json"})).at("objects"), boost::json::array());
         const auto events = Json(Ctl({"store", "history", "--json"})).at("events").as_array();

@@ -90,12 +90,12 @@ TEST_F(StoreVerbs, ImportRefusesWithTheFieldAndStoresNothing) {
 }
 
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping is most of it
+constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping dominates
 #else
 constexpr bool kMemoryCounts = true;
 #endif
 
-// However little text there is to each value of it.
+// Applies even to documents with very little text per value.
 TEST_F(StoreVerbs, ImportRefusesWithinTenTimesTheDocumentsSize) {
     constexpr std::size_t size = kMemoryCounts ? 2'000'000 : 100'000;
     const long idle = Dvsctl({"store", "import", At("none.json")}).peakKilobytes;
@@ -136,7 +136,7 @@ TEST_F(StoreVerbs, ImportAfterWhichTheStoreDoesNotLoadSaysSo) {
             << bad.what << ": " << imported.err;
         EXPECT_NE(imported.err.find(bad.named), std::string::npos) << bad.what << ": " << imported.err;
         EXPECT_NE(Ctl({"verify", "store:"}).status, 0) << bad.what;
-        // The desired layer alone is no state.
+        // The desired layer alone is not a state.
         EXPECT_EQ(Ctl({"store", "import", At("document.json"), "--switch", "beta", "--layer", "desired"}).err,
                   "");
     }
@@ -243,7 +243,7 @@ TEST_F(StoreVerbs, SchemaIsWholeOrExplainsAField) {
     const std::string vlan = Dvsctl({"schema", "ports.settings.vlan"}).out;
     EXPECT_NE(vlan.find("vlan_id"), std::string::npos);
     EXPECT_EQ(Dvsctl({"schema", "ports.7.settings.vlan"}).status, 0); // with an instance's id too
-    // As a refusal names it.
+    // The path as an error message names it.
     EXPECT_NE(Dvsctl({"schema", "ports[a/b]/settings/vlan"}).out.find("private VLAN"), std::string::npos);
     EXPECT_EQ(Dvsctl({"schema", "ports[7]"}).status, 0);
     EXPECT_EQ(Dvsctl({"schema", "ports[7"}).status, 4);

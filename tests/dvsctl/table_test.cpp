@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Columns line up, and only those asked for are there.
+// Tables align their columns and print only the requested ones.
 
 #include "tools/dvsctl/cli/table.h"
 

@@ -1,5 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// On a terminal: colour and pager, and the variables that turn them off. Elsewhere: neither.
+// On a terminal, the program uses colour and a pager unless variables turn them off. Elsewhere it uses
+// neither.
 
 #include <gtest/gtest.h>
 
@@ -58,7 +59,7 @@ TEST_F(Terminal, APagerLeftEarlyIsNoFailure) {
 }
 
 TEST_F(Terminal, InterruptsAreThePagersWhileItLives) {
-    // The shell that runs the pager is a child of the program, as with a Ctrl-C at the terminal.
+    // The shell that runs the pager is a child of the program, so it gets the signal as after Ctrl-C.
     const Result result =
         RunInTerminal({"show", At("a.db")}, {"PAGER=kill -INT $PPID; sed s/^/paged:/", "NO_COLOR=1"}, 10);
     EXPECT_EQ(result.status, 0);

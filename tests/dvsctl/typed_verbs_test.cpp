@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Known properties on the way to people: the real program shows, compares and copies them typed.
+// Known properties in typed form: the real program shows, compares and copies them.
 
 #include "program.h"
 
@@ -31,7 +31,7 @@ protected:
         Put("site.json", kSite);
         ASSERT_EQ(Dvsctl({"copy", "json:" + At("site.json"), At("site.db")}).status, 0);
     }
-    // The site with one text replaced by another, as a state file.
+    // The example site, with one text replaced, as a state file.
     void Edited(const std::string &before, const std::string &after) const {
         std::string text = kSite;
         text.replace(text.find(before), before.size(), after);

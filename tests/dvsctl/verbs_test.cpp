@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What the looking verbs print: the tree, the table, the report, the differences, their JSON.
+// The output of the read-only verbs: the tree, the table, the report, the differences, and their JSON.
 
 #include <gtest/gtest.h>
 
@@ -115,7 +115,7 @@ TEST_F(Verbs, VerifyWarnsOfMoreSwitchesThanAnyTableHolds) {
     std::vector<dvs::form::NewEntry> switches;
     for (int i = 0; i < 32; ++i)
         switches.push_back(MakeSwitch("s" + std::to_string(i), {}, {}, {}));
-    switches.push_back(MakeSwitch("s0", {}, {}, {})); // joins the first one
+    switches.push_back(MakeSwitch("s0", {}, {}, {})); // a duplicate of the first one
     PutState("full.db", dvs::form::EncodeList(switches));
     EXPECT_EQ(Dvsctl({"verify", At("full.db")}).err, "");
     switches.push_back(MakeSwitch("one too many", {}, {}, {}));

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The read-only view: every field of every entry with its offset, and each kind of fault at its byte.
+// Tests the read-only view: each field of each entry with its offset, and each kind of fault with its byte.
 
 #include "dvsdata/buffer_view.h"
 
@@ -145,7 +145,7 @@ TEST(BufferView, WalksAnywayBehindAWrongVersionOrChecksum) {
     EXPECT_TRUE(view.AtEnd());
     EXPECT_EQ(view.FirstFault().kind, FaultKind::Version);
     view.Rewind();
-    EXPECT_FALSE(view.Next(&entry)); // The fault counts again.
+    EXPECT_FALSE(view.Next(&entry)); // The fault is reported again.
 }
 
 TEST(BufferView, DoesNotWalkBehindAWrongLength) {

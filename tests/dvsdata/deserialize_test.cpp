@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Reading buffers: which are refused, with which status and message, in which order of checks; and single
-// values. Every buffer lies in a block of exactly its size.
+// Tests reading of whole buffers and of single values: which buffers are rejected, the status and message of
+// each, and the order of the checks. Every buffer lies in a heap block of exactly its size.
 
 #include <gtest/gtest.h>
 
@@ -21,7 +21,7 @@ struct BadBuffer {
     std::function<void(Buffer *)> damage;
     HYP_ReturnStatus status;
     const char *message;
-    HYP_ReturnStatus valueStatus; // of reading one value out of it
+    HYP_ReturnStatus valueStatus; // of reading one value from the buffer
     const char *valueMessage;
 };
 
@@ -215,15 +215,15 @@ TEST(DataDeserialize, WithPropTypeKeepsTypesThatShareABit) {
 TEST(DataDeserialize, IgnoresWhatLiesBehindLengthAndMarker) {
     Buffer buffer = SerializedOf(kTwo);
     buffer.insert(buffer.end(), 40, 0xcc);
-    EXPECT_EQ(ContentOf(Read(buffer).second), kTwo); // behind the header's length
+    EXPECT_EQ(ContentOf(Read(buffer).second), kTwo); // after the header's length
     SetU32(&buffer, 0, static_cast<std::uint32_t>(buffer.size()));
     Mend(&buffer);
-    EXPECT_EQ(ContentOf(Read(buffer).second), kTwo); // behind the marker
+    EXPECT_EQ(ContentOf(Read(buffer).second), kTwo); // after the marker
 }
 
 TEST(DataDeserialize, TakesOddLengthsAndSizes) {
     Buffer buffer = SerializedOf({{"a", "1234"}});
-    buffer.insert(buffer.begin() + 160, 1, 0x77); // One byte more of padding: entry size 149.
+    buffer.insert(buffer.begin() + 160, 1, 0x77); // One extra byte of padding: entry size 149.
     SetU32(&buffer, 0, 165);
     SetU32(&buffer, 12, 149);
     Mend(&buffer);
@@ -246,7 +246,7 @@ TEST(DataDeserialize, WritesZerosForWhatAForeignBufferLeftOpen) {
     const Props props{{"ab", "12345"}};
     Buffer buffer = SerializedOf(props);
     for (std::size_t i = 16 + 3; i < 16 + 128; ++i)
-        buffer[i] = 0xaa; // behind the name's NUL
+        buffer[i] = 0xaa; // after the name's NUL
     for (std::size_t i = 12 + 145; i < 12 + 148; ++i)
         buffer[i] = 0xbb; // padding
     Mend(&buffer);
@@ -281,7 +281,7 @@ TEST(DataDeserialize, MissingMemoryIsNoMemoryWithoutALeftover) {
     for (std::uint64_t n = 1; n <= 42; ++n) {
         const FailingHeap failing(n, FailingHeap::Only);
         const auto [status, list] = Read(buffer);
-        if (n == 35) { // The index of a list that outgrew its handle: done without.
+        if (n == 35) { // The name index is optional: the load succeeds without it.
             EXPECT_EQ(status, HYP_OK);
             EXPECT_EQ(ContentOf(list), props);
             continue;
@@ -318,7 +318,7 @@ TEST(ListInOneBlock, GivesBlocksToWhatIsAddedAndTakesThemBack) {
     ASSERT_EQ(DVSData_Update(list.get(), "a", "longer", 6, 0), HYP_OK);
     EXPECT_EQ(Heap().allocs, 3u);
     ASSERT_EQ(DVSData_Remove(list.get(), "b"), HYP_OK);
-    EXPECT_EQ(Heap().frees, 0u); // it had no block
+    EXPECT_EQ(Heap().frees, 0u); // it had no block of its own
     ASSERT_EQ(DVSData_Remove(list.get(), "d"), HYP_OK);
     EXPECT_EQ(Heap().frees, 1u);
     EXPECT_EQ(ContentOf(list), (Props{{"c", "3"}, {"a", "longer"}}));
@@ -371,7 +371,7 @@ TEST(DataGetPropVal, CopiesTheFirstMatchAndNoMore) {
     EXPECT_EQ(GetValue(buffer, "twin", &value), HYP_OK);
     EXPECT_EQ(value, "first...");
     value = "....";
-    EXPECT_EQ(GetValue(buffer, "a", &value), HYP_OK); // Any type, exactly enough room.
+    EXPECT_EQ(GetValue(buffer, "a", &value), HYP_OK); // The type is ignored; the room is exact.
     EXPECT_EQ(value, "1234");
 }
 
@@ -420,7 +420,7 @@ TEST(DataGetPropVal, ComparesAtMost128Characters) {
     Buffer buffer = SerializedOf({{std::string(127, 'n'), "1234"}});
     std::string value(4, '.');
     EXPECT_EQ(GetValue(buffer, std::string(128, 'n').c_str(), &value), HYP_NOT_FOUND);
-    buffer[16 + 127] = 'n'; // A name field without an end.
+    buffer[16 + 127] = 'n'; // An unterminated name field.
     Mend(&buffer);
     EXPECT_EQ(GetValue(buffer, std::string(128, 'n').c_str(), &value), HYP_OK);
     EXPECT_EQ(GetValue(buffer, std::string(200, 'n').c_str(), &value), HYP_OK);
@@ -435,7 +435,7 @@ TEST(DataGetPropVal, AValueThatLeavesTheBufferIsABadParameter) {
         Mend(&buffer);
         EXPECT_EQ(GetValue(buffer, "a", &value), HYP_BAD_PARAM) << len;
     }
-    SetU32(&buffer, 12 + 136, 12); // Into the marker, which is still the buffer.
+    SetU32(&buffer, 12 + 136, 12); // Into the marker, which is still inside the buffer.
     Mend(&buffer);
     EXPECT_EQ(GetValue(buffer, "a", &value), HYP_OK);
 }

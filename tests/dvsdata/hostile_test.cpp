@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Damaged buffers, thousands of ways, each in a block of exactly its size: both deserializers and the view
-// stay inside, and the view finds a fault exactly where the deserializer refuses.
+// Thousands of damaged buffers, each in a block of exactly its size. Both deserializers and the view must
+// stay inside the block, and the view must report a fault exactly when the deserializer rejects the buffer.
 
 #include <gtest/gtest.h>
 
@@ -30,7 +30,7 @@ Props ViewOf(std::span<const std::uint8_t> bytes, data::Fault *fault) {
     return props;
 }
 
-/// Reads it every way there is; all must agree.
+/// Reads the buffer in every available way; all must agree.
 void Probe(const Buffer &buffer, const std::string &what) {
     const ExactBlock block(buffer);
     const auto [status, list] = Read(buffer, 0xffffffff);
@@ -76,7 +76,7 @@ TEST(DamagedBuffer, TruncatedAtEveryLengthIsRefused) {
         EXPECT_EQ(Read(buffer).first, HYP_BAD_PARAM) << size;
         Probe(buffer, "cut to " + std::to_string(size));
         if (size < 16) continue;
-        SetU32(&buffer, 0, static_cast<std::uint32_t>(size)); // Cut, and consistent about it.
+        SetU32(&buffer, 0, static_cast<std::uint32_t>(size)); // Truncated, with a matching header length.
         Mend(&buffer);
         Probe(buffer, "cut and mended to " + std::to_string(size));
     }

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Nested buffers written into one block are byte for byte what serializing level by level gives, and are read
-// in place as they are read into lists.
+// Nested buffers written into one block equal level-by-level serialization byte for byte. Reading them in
+// place gives the same result as reading them into lists.
 
 #include <gtest/gtest.h>
 
@@ -31,7 +31,7 @@ Buffer LevelByLevel(const Props &inner) {
     return SerializedOf({{"dvs-1", Text(ports), 0x10}, {"dvs-2", Text(SerializedOf({})), 0x10}});
 }
 
-/// The same in one go.
+/// The same in one pass.
 HYP_ReturnStatus WriteNested(DVSData *inner, const Filter &filter, std::span<std::uint8_t> block,
                              bool *complete) {
     const std::uint32_t innerSize = data::SerializedSize(inner, filter);
@@ -128,7 +128,7 @@ TEST(InPlaceList, GivesWhatTheListWouldHold) {
 
 TEST(InPlaceList, SaysWhatTheDeserializerSays) {
     Buffer good = SerializedOf({{"a", "1", 0x10}, {"dropped", "2", 1}, {"b", "3", 0x20}});
-    Buffer late = good; // A fault behind sound entries.
+    Buffer late = good; // A fault after valid entries.
     SetU32(&late, 12 + 144 + 144, 100000);
     Mend(&late);
     Buffer early = good;
@@ -150,7 +150,7 @@ TEST(InPlaceList, SaysWhatTheDeserializerSays) {
         if (status == HYP_OK)
             while (list.Next(&entry)) {
             }
-        EXPECT_TRUE(messages.All().empty()); // Once is enough.
+        EXPECT_TRUE(messages.All().empty()); // The message is printed only once.
     }
 }
 

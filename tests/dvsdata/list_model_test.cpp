@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Lists against the simplest thing that could be one, a vector of properties: random sequences of operations
-// must leave both alike, with the index in each of its forms and with allocations failing.
+// Compares lists with the simplest model, a vector of properties: random sequences of operations must leave
+// both equal, with the index in each of its forms and with failing allocations.
 
 #include <gtest/gtest.h>
 #include <rapidcheck.h>
@@ -34,7 +34,7 @@ struct Model {
     }
 };
 
-/// Few names, so that they meet again; one in a while is long or empty.
+/// Picks from few names, so that they repeat; an occasional one is long or empty.
 std::string AnyName(std::uint32_t range) {
     const auto number = *rc::gen::inRange<std::uint32_t>(0, range);
     if (number == 0) return "";
@@ -135,8 +135,7 @@ TEST(ListModel, ListsReadIntoOneBlock) {
 
 // ---- Allocation failures ----
 
-/// Runs `work` with each allocation failing in turn, until it succeeds. The list must be unchanged by each
-/// failure.
+/// Runs `work` with each allocation failing in turn, until it succeeds. No failure may change the list.
 template <typename Work> std::uint64_t FailEach(const Props &props, Work work) {
     std::uint64_t failures = 0;
     for (std::uint64_t n = 1;; ++n) {

@@ -46,7 +46,7 @@ void *CountingAlloc(std::uint64_t size) {
     ++g_heap.allocs;
     g_heap.sizes.push_back(size);
     void *const block = std::malloc(size);
-    if (block) std::memset(block, 0xa5, size); // Bytes left unset would show.
+    if (block) std::memset(block, 0xa5, size); // Makes unset bytes visible.
     return block;
 }
 

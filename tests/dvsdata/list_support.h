@@ -3,8 +3,7 @@
 #define TESTS_DVSDATA_LIST_SUPPORT_H
 
 // Helpers of the property list tests: an allocator that counts and fails on demand, owners, captured
-// messages, and buffers in blocks of exactly their size, so that the address sanitizer sees the first byte
-// read too far.
+// messages, and buffers in blocks of exactly their size, so that AddressSanitizer reports any overread.
 
 #include <cstdint>
 #include <cstring>
@@ -32,8 +31,8 @@ struct HeapCounts {
 /// Zeroes the counts.
 void ResetHeap();
 
-/// Zeroes the counts and, for as long as it lives, makes requests fail: the `failAt`-th (from 1) and all
-/// later ones, or that one only.
+/// Zeroes the counts. While it lives, the `failAt`-th request (from 1) fails: alone (`Only`), or with all
+/// later ones (`From`).
 class FailingHeap {
 public:
     enum Mode { From, Only };
@@ -71,14 +70,14 @@ Props ContentOf(DVSData *list);
 Props ContentOf(const ListPtr &list);
 void PrintTo(const Prop &prop, std::ostream *out);
 
-/// What the handle's fields promise: the chain ends at the tail, and the sizes add up.
+/// Checks the handle's invariants: the chain ends at the tail, and the sizes add up.
 void ExpectSound(DVSData *list);
 
 // ---- Buffers ----
 
 using Buffer = std::vector<std::uint8_t>;
 
-/// A copy on the heap of exactly that size.
+/// A heap copy of exactly that size.
 class ExactBlock {
 public:
     explicit ExactBlock(std::span<const std::uint8_t> bytes)
@@ -98,21 +97,21 @@ Buffer Serialized(DVSData *list);
 Buffer SerializedOf(const Props &props);
 std::uint32_t U32At(std::span<const std::uint8_t> buffer, std::size_t offset);
 void SetU32(Buffer *buffer, std::size_t offset, std::uint32_t value);
-/// The checksum by its definition, byte for byte, independent of the library's.
+/// The checksum computed by its definition, byte by byte, independently of the library.
 std::uint32_t PlainChecksum(std::span<const std::uint8_t> buffer);
-/// Makes the checksum right again for the length in the header (cut to the bytes there are).
+/// Recomputes the checksum for the length in the header, capped at the buffer's size.
 void Mend(Buffer *buffer);
-/// Deserializes from an exact block; the list is null when refused.
+/// Deserializes from a block of the exact size. Returns a null list on failure.
 std::pair<HYP_ReturnStatus, ListPtr> Read(std::span<const std::uint8_t> bytes,
                                           std::uint32_t typeMask = 0x800000fc);
-/// The same into one block with the handle.
+/// The same, with the entries in one block with the handle.
 std::pair<HYP_ReturnStatus, ListPtr> ReadShared(std::span<const std::uint8_t> bytes,
                                                 std::uint32_t typeMask = 0x800000fc);
 std::string U32Value(std::uint32_t value);
 
 // ---- Messages ----
 
-/// Collects messages at a debug level for as long as it lives.
+/// Collects messages at a debug level while it lives.
 class Messages {
 public:
     explicit Messages(std::int32_t level);

@@ -1,6 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What lists keep, in which order, at which sizes: append, update, remove, lookup, iteration and the
-// accessors.
+// Tests the content, order and sizes of lists: append, update, remove, lookup, iteration and the accessors.
 
 #include <gtest/gtest.h>
 
@@ -84,7 +83,7 @@ TEST(DataAppend, RefusesLengthsWhoseSumWraps) {
 
 TEST(DataAppend, RefusesEntrySizesFromFffffff8On) {
     const ListPtr list = NewList();
-    const FailingHeap failing(1); // An accepted length stops at the allocator.
+    const FailingHeap failing(1); // An accepted length fails in the allocator.
     for (std::uint32_t len = 0xffffff66; len <= 0xffffff6d; ++len)
         EXPECT_EQ(DVSData_Append(list.get(), "n", "", len, 0x20), HYP_BAD_PARAM) << len;
     EXPECT_EQ(DVSData_Append(list.get(), "n", "", 0xffffff65, 0x20), HYP_NO_MEMORY);
@@ -135,7 +134,7 @@ TEST(DataAppend, CutsLongNamesAfter127Characters) {
     EXPECT_EQ(DVSData_Lookup(list.get(), name.substr(0, 126).c_str(), &entry), HYP_NOT_FOUND);
     EXPECT_EQ(DVSData_Remove(list.get(), name.c_str()), HYP_NOT_FOUND);
     EXPECT_EQ(DVSData_Update(list.get(), name.c_str(), "w", 1, 0), HYP_OK);
-    EXPECT_EQ(ContentOf(list).size(), 2u); // Not found, so added once more.
+    EXPECT_EQ(ContentOf(list).size(), 2u); // Not found, so added again.
 }
 
 TEST(DataAppend, ZeroesTheNamesTailAndThePadding) {
@@ -214,7 +213,7 @@ TEST(DataUpdate, LosesTheOldValueWhenMemoryRunsOut) {
     ExpectSound(list.get());
 }
 
-// A value or name taken from the list itself is the natural way to shorten or retype a property.
+// Callers shorten or retype a property by passing a value or name that lies in the list itself.
 TEST(DataUpdate, TakesAShorterPartOfTheOldValue) {
     const ListPtr list = ListOf({{"a", "0123456789"}, {"b", "2"}});
     EXPECT_EQ(DVSData_Update(list.get(), "a", list->head->data + 3, 4, 0), HYP_OK);
@@ -373,7 +372,7 @@ TEST(DataAccessors, GiveTheEntrysFields) {
 TEST(DataIsSamePropType, ComparesBits2To7Only) {
     const ListPtr list = ListOf({{"a", "", 0x80000f13}});
     EXPECT_TRUE(DVSData_IsSamePropType(list->head, 0x10));
-    EXPECT_FALSE(DVSData_IsSamePropType(list->head, 0x13)); // The kind itself is not masked.
+    EXPECT_FALSE(DVSData_IsSamePropType(list->head, 0x13)); // The expected type is not masked.
     EXPECT_FALSE(DVSData_IsSamePropType(list->head, 0x20));
     EXPECT_FALSE(DVSData_IsSamePropType(list->head, 0));
 }

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Messages reach the sink whole, one call each, and the streams again once it is gone.
+// Each message reaches the sink whole, in one call. Without a sink, messages go to the streams again.
 
 #include "dvsdata/log.h"
 
@@ -40,7 +40,7 @@ TEST_F(LogSink, GetsTextAndLevel) {
 
 TEST_F(LogSink, GetsLongMessagesWhole) {
     DVSLog_SetSink(Collect, &messages_);
-    // Through every length at which room on the stack may end.
+    // Covers every length around the size of the stack buffer.
     for (std::size_t size = 0; size < 5000; size += size < 1030 ? 1 : 993) {
         const std::string name(size, 'x');
         messages_.clear();

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every message of the property lists, with its level. The errors of damaged buffers are in
-// deserialize_test.cpp, those of inconsistent lists in serialize_test.cpp.
+// Tests every message of the property lists, with its level. deserialize_test.cpp covers the errors of
+// damaged buffers, serialize_test.cpp those of inconsistent lists.
 
 #include <gtest/gtest.h>
 
@@ -11,7 +11,7 @@ namespace {
 
 using Texts = std::vector<std::string>;
 
-/// What `work` prints at each level from -1 to 3, each of which must extend the one below.
+/// Returns what `work` prints at each level from -1 to 3.
 template <typename Work> std::vector<Texts> AtEveryLevel(Work work) {
     std::vector<Texts> result;
     for (std::int32_t level = -1; level <= 3; ++level) {

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Lists on both sides of the sizes at which the name index changes its form, or is missing: what callers see
-// is that of a plain walk.
+// Lists around the sizes at which the name index changes its form, and lists without an index: callers must
+// see the result of a plain walk.
 
 #include <gtest/gtest.h>
 
@@ -25,7 +25,7 @@ ListPtr ListOfSize(std::uint32_t count) {
     return list;
 }
 
-/// Looks every name of the list up and compares with the first match of a walk.
+/// Looks up every name of the list and compares the result with the first match of a walk.
 void ExpectFindsFirstMatches(DVSData *list) {
     ExpectSound(list);
     for (DVSDataEntry *entry = list->head; entry; entry = entry->next) {
@@ -143,7 +143,7 @@ TEST(NameIndex, WithoutMemoryForItTheListIsWalked) {
     ResetHeap();
     for (std::uint32_t i = 100; i < 200; ++i)
         Append(list.get(), {NameAt(i), "1"});
-    EXPECT_GT(Heap().allocs, 100u); // It is tried again as the list grows.
+    EXPECT_GT(Heap().allocs, 100u); // The allocation is retried as the list grows.
     ExpectFindsFirstMatches(list.get());
 }
 

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Serialization to the byte: sizes, header, filters, the buffer convention, and lists whose books do not
-// agree.
+// Tests serialization byte by byte: sizes, header, filters, the buffer convention, and lists with
+// inconsistent sizes.
 
 #include <gtest/gtest.h>
 
@@ -189,7 +189,7 @@ TEST(DataSerialize, OfAVersionBelowFourWritesAllTheSame) {
     output = {};
     output.status = DVSData_Serialize(list.get(), &output.buf, &output.len, 4);
     EXPECT_EQ(TakeBytes(list.get(), output), old);
-    EXPECT_EQ(messages.All().size(), 1u); // version 4 is no reason for a remark
+    EXPECT_EQ(messages.All().size(), 1u); // version 4 causes no message
 }
 
 TEST(DataSerializeExNamedProp, VolatileLeavesOutTheTypeButKeepsThePersistFlag) {
@@ -251,8 +251,8 @@ TEST(DataSerializeEntry, ComparesWholeNames) {
     EXPECT_EQ(TakeBytes(list.get(), output), SerializedOf({{name, "v"}}));
 }
 
-// A list whose books are wrong is a bug of its owner; it must neither run over the buffer nor leave one
-// behind.
+// Inconsistent sizes are a bug of the list's owner. Serialization must not overrun the buffer and must not
+// leak one.
 class InconsistentList : public testing::Test {
 protected:
     void Expect(const char *message) {
@@ -269,7 +269,7 @@ protected:
         void *buf = own.data();
         auto len = static_cast<std::uint32_t>(own.size());
         EXPECT_EQ(DVSData_Serialize(list_.get(), &buf, &len, 9), HYP_LIMIT_EXCEEDED);
-        EXPECT_EQ(buf, own.data()); // The caller's buffer stays the caller's.
+        EXPECT_EQ(buf, own.data()); // The caller keeps its buffer.
     }
     ListPtr list_ = ListOf({{"a", "1234"}, {"b", "5678"}});
 };

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every system call and every allocation of the stated sequences, failed in turn.
+// Fails every system call and every allocation of the documented sequences in turn.
 
 #include "dvsfile/state_dir.h"
 
@@ -21,7 +21,7 @@ protected:
         options_.prepare = [](fault::Child &child) { DVSLog_SetSink(fault::Child::NoteMessage, &child); };
     }
 
-    /// One write under a plan, over an old file. The report has been checked for leaks.
+    /// One write under a fault plan, over an old file. Checks the report for leaks.
     fault::Report Write(const std::string &plan, bool viaTemp) {
         std::filesystem::remove(path_ + ".tmp");
         Put(path_, Padded(kOld));
@@ -65,12 +65,12 @@ struct WriteRow {
 };
 
 const WriteRow kWriteRows[] = {
-    {"open:1", HYP_OK, "", ""}, // the plain open takes over
+    {"open:1", HYP_OK, "", ""}, // falls back to the plain open
     {"open:1+", HYP_IO_ERROR, "failed to open dvsfile ", " for write, error: "},
     {"truncate:1", HYP_IO_ERROR, "failed to truncate dvsfile ", ", error: "},
     {"write:1", HYP_WRITE_ERROR, "failed to write dvsfile ", ", error: "},
     {"rename:1", HYP_WRITE_ERROR, "failed to rename dvsfile ", ", error: "},
-    {"close:1", HYP_OK, "", ""}, // nothing can be done about it, and nothing is promised
+    {"close:1", HYP_OK, "", ""}, // a failed close is ignored
 };
 
 TEST_F(FileFaults, FailedWriteThroughATemporaryFileNeverTouchesTheOldOne) {

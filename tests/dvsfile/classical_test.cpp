@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The stated sequences of writing and reading: sizes, padding, statuses, messages, and paths that are no
-// plain files.
+// Tests the documented sequences of writing and reading: sizes, padding, statuses, messages, and paths that
+// are not regular files.
 
 #include "dvsfile/state_dir.h"
 

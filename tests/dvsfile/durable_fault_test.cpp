@@ -1,6 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every system call and every allocation of the durable write, failed in turn; and writers killed at each of
-// them.
+// Fails every system call and every allocation of the durable write in turn, and kills writers at each call.
 
 #include "dvsfile/file_internal.h"
 #include "dvsfile/state_dir.h"
@@ -28,8 +27,8 @@ protected:
         options_.prepare = [](fault::Child &child) { DVSLog_SetSink(fault::Child::NoteMessage, &child); };
     }
 
-    /// One write under a plan, over an old file and a stale name. Checks what holds after every failure: old
-    /// or new and whole, nothing leaked, no temporary name.
+    /// One write under a fault plan, over an old file and a stale temporary file. Checks what holds after
+    /// every failure: the file is whole, old or new; nothing leaks; no temporary file remains.
     fault::Report Write(const std::string &plan,
                         std::chrono::milliseconds lockWait = std::chrono::seconds(5)) {
         Put(path_, Padded(kOld));
@@ -68,11 +67,11 @@ struct Row {
 
 const Row kRows[] = {
     {"readlink:1", HYP_IO_ERROR, "failed to open dvsfile ", " for write, error: ", false},
-    // the directory, the scan for stale names (which may fail), the temporary file
+    // the directory; the scan for stale files, which may fail; the temporary file
     {"open:1", HYP_IO_ERROR, "failed to open dvsfile ", " for write, error: ", false},
     {"open:2", HYP_OK, "", "", true},
     {"open:3", HYP_IO_ERROR, "failed to open dvsfile ", " for write, error: ", false},
-    // what is at the path, what the stale name is: both may fail
+    // stat of the path and of the stale file: both may fail
     {"stat:1", HYP_OK, "", "", true},
     {"stat:2", HYP_OK, "", "", true},
     {"unlink:1", HYP_OK, "", "", true},
@@ -116,7 +115,7 @@ TEST_F(DurableFaults, ShortWritesAreContinued) {
     for (const char *count : {"1", "511", "512", "1000"}) {
         SCOPED_TRACE(count);
         for (const char *which : {"1", "2", "1+"}) {
-            if (which[1] == '+' && std::strlen(count) < 3) continue; // a byte at a time takes its while
+            if (which[1] == '+' && std::strlen(count) < 3) continue; // one byte at a time is too slow
             const fault::Report report = Write(std::string("write:") + which + ":short=" + count);
             EXPECT_EQ(report.status, HYP_OK);
             EXPECT_EQ(Contents(path_), Padded(kNew));

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Several processes at one state file: writers wait for each other, readers see whole versions only.
+// Several processes use one state file: writers wait for each other, readers see whole versions only.
 // DVS_TEST_SAVES sets the number of saves per writer.
 
 #include "dvsfile/state_dir.h"
@@ -25,7 +25,7 @@ uint32_t SavesPerWriter() {
     return number;
 }
 
-/// A version that tells about itself: its number, and a size and a fill that follow from it.
+/// A version that can be verified: its number, and a size and a fill derived from the number.
 std::string Version(uint32_t number) {
     std::string bytes(64 + number * 37 % 5000, static_cast<char>('a' + number % 26));
     std::memcpy(bytes.data(), &number, sizeof number);
@@ -82,7 +82,7 @@ TEST_F(DurableRace, AWriterWaitsForTheLocksHolder) {
     EXPECT_EQ(Contents(path_), Padded("new"));
 }
 
-// The one test that really waits: the time is promised.
+// The only test that waits in real time: the limit of 10 s is documented.
 TEST_F(DurableRace, AWriterGivesUpAfterTenSeconds) {
     const int fd = open(dir_.c_str(), O_RDONLY | O_DIRECTORY);
     ASSERT_EQ(flock(fd, LOCK_EX), 0);

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The durable write: results, modes, links, what lies in its way, and the directory's lock.
+// Tests the durable write: results, modes, links, obstacles at the path, and the directory's lock.
 
 #include "dvsfile/file_internal.h"
 #include "dvsfile/state_dir.h"
@@ -22,7 +22,7 @@ protected:
     HYP_ReturnStatus Write(const std::string &path, const std::string &bytes) {
         return DVSFile_WriteDurable(path.c_str(), bytes.data(), static_cast<uint32_t>(bytes.size()));
     }
-    /// A name that a writer of the state file could have left; `tail` tells several apart.
+    /// A temporary name that a writer of the state file could have left; `tail` distinguishes several.
     std::string StaleName(char tail) const { return dir_ + "/.state.dvs-" + std::string(31, '0') + tail; }
 };
 
@@ -105,7 +105,7 @@ TEST_F(DurableWrite, FollowsALinkAndKeepsIt) {
     Put(dir_ + "/real/file", "old");
     fs::create_symlink("real/file", path_);              // relative to the link
     fs::create_symlink(path_, dir_ + "/second");         // absolute, and a chain
-    fs::create_symlink(dir_ + "/real", dir_ + "/alias"); // of a directory: for the system to follow
+    fs::create_symlink(dir_ + "/real", dir_ + "/alias"); // of a directory: the kernel follows it
     for (const std::string &path : {path_, dir_ + "/second", dir_ + "/alias/file"}) {
         ASSERT_EQ(Write(path, "through " + path), HYP_OK);
         EXPECT_EQ(Contents(dir_ + "/real/file"), Padded("through " + path));
@@ -140,7 +140,7 @@ TEST_F(DurableWrite, GivesUpOnAPathThatIsTooLong) {
         << "a link that makes it so";
 }
 
-// ---- what is in the way ----
+// ---- obstacles at the path ----
 
 TEST_F(DurableWrite, WithoutAFolderIsAnIoError) {
     EXPECT_EQ(Write(dir_ + "/none/state", "new"), HYP_IO_ERROR);

@@ -2,7 +2,7 @@
 #ifndef TESTS_DVSFILE_STATE_DIR_H
 #define TESTS_DVSFILE_STATE_DIR_H
 
-// A directory of its own for each test of the state file, with the messages it causes.
+// A separate directory for each test of the state file, with the messages the test causes.
 
 #include "dvs/file.h"
 #include "dvs/log.h"
@@ -45,7 +45,7 @@ protected:
         struct stat info {};
         return lstat(path.c_str(), &info) == 0 ? info.st_mode : 0;
     }
-    /// `bytes` as a state file holds them.
+    /// `bytes` as stored in a state file.
     static std::string Padded(std::string bytes) {
         bytes.resize((bytes.size() + 511) / 512 * 512);
         return bytes;
@@ -57,7 +57,7 @@ protected:
             names.insert(entry.path().filename());
         return names;
     }
-    /// The messages as one text; each came with level -1.
+    /// The messages as one text; checks that each has level -1.
     std::string Messages() const {
         std::string all;
         for (const auto &message : messages_)
@@ -75,7 +75,7 @@ private:
     }
 };
 
-/// What a read hands out, released at the end.
+/// The result of a read, released in the destructor.
 class ReadBack {
 public:
     explicit ReadBack(const std::string &path)

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Temporary names: made anew each time, recognised exactly.
+// Temporary names are new each time and recognised exactly.
 
 #include "dvsfile/temp_name.h"
 

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Damaged states, in blocks of exactly their size: cut at every length, every byte changed, sizes and lengths
-// that lie behind mended checksums at every level. The library, the plain way and the read-only view must
-// judge them alike.
+// Damaged states in blocks of exactly their size: truncated at every length, every byte changed, and wrong
+// sizes and lengths with recomputed checksums at every level. The library, the level-by-level reference and
+// the read-only view must agree on each.
 
 #include <algorithm>
 #include <cstdlib>
@@ -51,7 +51,8 @@ Result Loaded(Load load, const ExactBlock &block) {
     return result;
 }
 
-/// Loads the bytes both ways into an empty table and asks the view; all must agree.
+/// Loads the bytes with the library and with the reference into an empty table and walks them with the view;
+/// all must agree.
 HYP_ReturnStatus JudgedAlike(std::span<const std::uint8_t> bytes) {
     const ExactBlock block(bytes);
     const Result fast = Loaded(DVSState_ConfigDeserialize, block);
@@ -70,7 +71,7 @@ HYP_ReturnStatus JudgedAlike(std::span<const std::uint8_t> bytes) {
     return fast.status;
 }
 
-/// Makes the checksums right again at every level, as far as the sizes lead from one entry to the next.
+/// Recomputes the checksums at every level, as far as the sizes lead from one entry to the next.
 void MendAll(Buffer *state, std::size_t offset, std::size_t size, int levels) {
     if (size < 16) return;
     if (levels > 1) {
@@ -176,7 +177,7 @@ TEST_F(DamagedState, IsJudgedAlikeUnderRandomChanges) {
             case 0:
                 damaged[random() % damaged.size()] = static_cast<std::uint8_t>(random());
                 break;
-            case 1: // a name or type of one entry over another's
+            case 1: // copies a name or type over another entry's
                 std::copy_n(&state_[places.entries[random() % places.entries.size()] + 4], 132,
                             &damaged[places.entries[random() % places.entries.size()] + 4]);
                 break;

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Loading ports, switches and states: what is taken, merged and refused, and every message.
+// Loading ports, switches and states: what is accepted, merged and rejected, and every message.
 
 #include <algorithm>
 
@@ -19,13 +19,13 @@ Prop Nested(const std::string &name, const Props &props) {
     return {name, AsText(SerializedOf(props)), 0x10};
 }
 
-/// A switch's props with `more` behind them.
+/// A switch's properties, followed by `more`.
 Props With(Props props, const Props &more) {
     props.insert(props.end(), more.begin(), more.end());
     return props;
 }
 
-/// The fixed fields but for one.
+/// The fixed fields except one.
 Props Without(const std::string &name) {
     Props props = SwitchProps();
     std::erase_if(props, [&](const Prop &prop) { return prop.name == name; });
@@ -77,7 +77,7 @@ TEST_F(StateDeserialize, TakesPortsOfAnyKindAndTellsEach) {
     EXPECT_EQ(LoadPort(sw, "a", {}), HYP_EXISTS);
     EXPECT_EQ(LoadPort(sw, "z", {{kKind, U32Value(3)}}), HYP_OK);
     EXPECT_EQ(LoadPort(sw, "z", {{kKind, U32Value(3)}}), HYP_OK);
-    EXPECT_EQ(LoadPort(sw, "odd", {{kKind, U32Value(77) + "more"}}), HYP_OK); // kept as it is given
+    EXPECT_EQ(LoadPort(sw, "odd", {{kKind, U32Value(77) + "more"}}), HYP_OK); // kept unchanged
     EXPECT_EQ(messages.Take(),
               (Lines{"Add active DV port a, return Success\n", "DVSStatePortAdd port a type 0[1] exists.\n",
                      "Add active DV port a, return Already exists\n",
@@ -118,7 +118,7 @@ TEST_F(StateDeserialize, CreatesASwitchFromItsFields) {
     EXPECT_EQ(sw->version, 12u);
     EXPECT_EQ(sw->maxPorts, 5u);
     EXPECT_STREQ(sw->className, "other");
-    EXPECT_EQ(sw->globalPropList, nullptr); // absent in the buffer: the switch is left without it
+    EXPECT_EQ(sw->globalPropList, nullptr); // absent in the buffer: the switch has none
     EXPECT_EQ(ContentOf(sw->hostPropList), (Props{{"h", "1"}}));
 }
 
@@ -236,7 +236,7 @@ TEST_F(StateDeserialize, EntriesOfUnknownTypesAreDropped) {
     EXPECT_EQ(ContentOf(sw->ports[0]->portData), (Props{{"kept", "1"}}));
     props = SwitchProps();
     props[0].type = 2;
-    EXPECT_EQ(LoadSwitch("other", props), HYP_NOT_FOUND); // its version is not seen at all
+    EXPECT_EQ(LoadSwitch("other", props), HYP_NOT_FOUND); // its version entry is dropped
 }
 
 TEST_F(StateDeserialize, HostListIsJudgedBeforeTheGlobalOne) {

@@ -1,5 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The plain way of state serialization (level_by_level.h), over the exported list operations.
+// The reference implementation of state serialization (level_by_level.h), built on the exported list
+// operations.
 
 #include "dvsstate/level_by_level.h"
 
@@ -18,7 +19,7 @@ using namespace dvs::state;
 
 namespace {
 
-/// A buffer that a list's serialization made, given back to that list.
+/// Owns a buffer that a list serialized; frees it with that list.
 class ListBuffer {
 public:
     explicit ListBuffer(DVSData *list) : list_(list) {}
@@ -100,7 +101,7 @@ HYP_ReturnStatus PortSerialize(DVSPort *port, void **buf, uint32_t *len) {
     DVSData *list = port->portData;
     if (port->portType == DVS_PORT_ACTIVE || FindEntry(list, kPortKind))
         return DVSData_Serialize(list, buf, len, version);
-    // The kind goes out with the data; the list itself is left as it was found, without a word.
+    // Writes the kind with the data, then restores the list, without messages.
     const int32_t level = std::exchange(dvsdata_debug, -1);
     HYP_ReturnStatus status =
         DVSData_Append(list, kPortKind, &port->portType, sizeof port->portType, kStatePropType);
@@ -239,7 +240,7 @@ HYP_ReturnStatus PortAddDeserialize(DVSwitch *sw, const char *portId, const void
         status = DVSStatePortAdd(sw, portId, data.get(), DVS_PORT_ACTIVE, nullptr);
         Message(kError, "Add active DV port %s, return %s\n", portId, Text(status));
     }
-    if (status == HYP_OK) (void)data.release(); // the port's from here on
+    if (status == HYP_OK) (void)data.release(); // the port owns it from here on
     return status;
 }
 
@@ -290,7 +291,7 @@ HYP_ReturnStatus ConfigDeserialize(const void *buf, uint32_t len) {
         status = SwitchDeserialize(DVSData_Name(entry), data, size);
         if (status == HYP_OK) continue;
         Message(kError, "DVSState_SwitchDeserialize failed %s\n", Text(status));
-        (void)DVSState_ConfigReset(); // the failure that led here is the one to tell
+        (void)DVSState_ConfigReset(); // the first failure is the one to report
         return status;
     }
     return HYP_OK;

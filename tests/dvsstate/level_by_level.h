@@ -2,9 +2,9 @@
 #ifndef TESTS_DVSSTATE_LEVEL_BY_LEVEL_H
 #define TESTS_DVSSTATE_LEVEL_BY_LEVEL_H
 
-// State serialization the plain way: every level a property list of its own, built, serialized and put into
-// the next. The library writes and reads whole states in one go; this is what its bytes, results, messages
-// and their order are held against.
+// A reference implementation of state serialization: each level is a separate property list, built,
+// serialized and appended to the next. The library writes and reads whole states in one pass; tests compare
+// its bytes, results, messages and their order with this one.
 
 #include <cstdint>
 

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Whole states written and read in one go against the plain way, level by level: the same bytes, results,
-// messages in the same order, and the same table.
+// Compares states written and read in one pass with the level-by-level reference: the bytes, results,
+// messages and their order, and the resulting table must be equal.
 
 #include <cstdlib>
 #include <random>

@@ -80,7 +80,7 @@ TEST_F(PortFind, NamesAPortByItsAliasOrUnknown) {
     EXPECT_STREQ(DVS_PortAlias(AddPort(sw, "b", DVS_PORT_ACTIVE, Alias("web"))), "web");
 }
 
-// Slots are visible to callers. A set bit without a port ends every walk, and an index does not know better.
+// Callers can change slots. A set bit without a port ends every walk, with and without an index.
 TEST_F(PortFind, APortWhoseSlotACallerEmptiedIsNotFound) {
     for (const int ports : {4, 200}) {
         const std::string id = "dvs" + std::to_string(ports);

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The port table against a model of a few lines, under random adds, removes, finds and changes of kind and
-// limit; large enough for the index to come into play, with few ids so that kinds and zombies meet.
+// Compares the port table with a simple model under random adds, removes, finds and changes of kind and
+// limit. The table is large enough to use its index. Ids are few, so that kinds and zombies share ids.
 
 #include <algorithm>
 #include <optional>

@@ -37,7 +37,7 @@ TEST_F(PortTable, HoldsOneIdOncePerKindAndHandsOutTheFirst) {
     DVSPort *existing = nullptr;
     EXPECT_EQ(TryAddPort(sw, "p", DVS_PORT_ACTIVE, &existing), HYP_EXISTS);
     EXPECT_EQ(existing, first);
-    // Slot 1 and kind 1 are told in each other's place; a shadow port tells them apart.
+    // The message swaps slot and kind. Both are 1 above; a shadow port shows the swap.
     EXPECT_EQ(TryAddPort(sw, "p", DVS_PORT_SHADOW), HYP_EXISTS);
     EXPECT_EQ(messages.Take(), (Lines{"DVSStatePortAdd port p type 1[1] exists.\n",
                                       "DVSStatePortAdd port p type 2[2] exists.\n"}));
@@ -102,13 +102,13 @@ TEST_F(PortTable, ScansNoFurtherThanTheLimitAndNeverLeavesTheRecord) {
     AddPort(sw, "b");
     sw->maxPorts = 1;
     StateMessages messages(0);
-    EXPECT_EQ(TryAddPort(sw, "b"), HYP_LIMIT_EXCEEDED); // the one that exists stands behind the limit
+    EXPECT_EQ(TryAddPort(sw, "b"), HYP_LIMIT_EXCEEDED); // the existing one is beyond the limit
     EXPECT_EQ(messages.Take(), Lines{"DVSStatePortAdd limit exceeded for port b \n"});
     sw->maxPorts = 1000;
     uwMaxNumActivePortsSystemWide = 1000;
     AddPort(sw, "c");
     AddPort(sw, "d");
-    EXPECT_EQ(TryAddPort(sw, "e"), HYP_LIMIT_EXCEEDED); // four slots, whatever the limits say
+    EXPECT_EQ(TryAddPort(sw, "e"), HYP_LIMIT_EXCEEDED); // four slots, regardless of the limits
     uwMaxNumActivePortsSystemWide = 4;
 }
 
@@ -176,7 +176,7 @@ TEST_F(PortTable, EndsAWalkAtASetBitWithoutAPort) {
     EXPECT_NE(DVSState_PortFind("dvs", "c"), nullptr);
 }
 
-// From 64 slots in use on an index answers; it must be the same table.
+// From 64 used slots, lookups use an index. Results must not change.
 TEST_F(PortTable, AnswersAlikeWithAnIndex) {
     SetHostPorts(300);
     DVSwitch *sw = AddSwitch("dvs");
@@ -190,13 +190,13 @@ TEST_F(PortTable, AnswersAlikeWithAnIndex) {
     EXPECT_EQ(DVSState_PortRemove("dvs", "p5"), HYP_OK);
     AddPort(sw, "p298", DVS_PORT_SHADOW);
     EXPECT_EQ(sw->ports[5]->portType, 2u);
-    sw->ports[5]->portType = DVS_PORT_ACTIVE; // callers may: now it stands before the other of that id
+    sw->ports[5]->portType = DVS_PORT_ACTIVE; // callers may do this: now it precedes the other of that id
     EXPECT_EQ(DVSState_PortFind("dvs", "p298"), sw->ports[5]);
     sw->ports[5]->portType = 0;
     EXPECT_EQ(DVSState_PortFind("dvs", "p298"), sw->ports[298]);
     EXPECT_EQ(DVSState_FindPortByIDAndType(sw, "p298", 0), sw->ports[5]);
     sw->maxPorts = 298;
-    EXPECT_EQ(TryAddPort(sw, "p298"), HYP_OK); // the first one is behind the limit now
+    EXPECT_EQ(TryAddPort(sw, "p298"), HYP_OK); // the first one is now beyond the limit
     EXPECT_STREQ(DVS_PortId(sw->ports[7]), "p298");
     EXPECT_EQ(TryAddPort(sw, "more"), HYP_LIMIT_EXCEEDED);
 }

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Host and global properties and port data: both families over one table of tests, and every message.
+// Host and global properties and port data: one set of tests for both families, and every message.
 
 #include "dvsstate/state_support.h"
 

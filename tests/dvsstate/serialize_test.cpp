@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// State buffers as they are written: what stands where, kinds, filters, messages.
+// Written state buffers: layout, kinds, filters, messages.
 
 #include <cstring>
 
@@ -79,7 +79,7 @@ TEST_F(StateSerialize, AddsTheKindToTheOutputOnly) {
               (Props{{"a", "1"}, {"com.orbeno.common.port.volatile.type", U32Value(3), 0x10}}));
     EXPECT_EQ(ContentOf(port->portData), (Props{{"a", "1"}}));
     Append(port->portData,
-           {"com.orbeno.common.port.volatile.type", U32Value(9), 0x20}); // there: left as it is
+           {"com.orbeno.common.port.volatile.type", U32Value(9), 0x20}); // already present: unchanged
     EXPECT_EQ(EntriesOf(PortBytes(port)), ContentOf(port->portData));
     port->portType = DVS_PORT_ACTIVE;
     EXPECT_EQ(EntriesOf(PortBytes(port)), ContentOf(port->portData));
@@ -115,7 +115,7 @@ TEST_F(StateSerialize, Version99LeavesOutFilteredTypesOfItsOwnLists) {
     const Props entries = EntriesOf(SwitchBytes(sw));
     EXPECT_EQ(EntriesOf(entries[3].value), kept);
     EXPECT_EQ(EntriesOf(entries[4].value), kept);
-    EXPECT_EQ(EntriesOf(entries[5].value), all); // port data is always whole
+    EXPECT_EQ(EntriesOf(entries[5].value), all); // port data is never filtered
 }
 
 TEST_F(StateSerialize, WritesNothingBehindAClassNamesEnd) {

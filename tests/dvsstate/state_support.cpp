@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Helpers declared in state_support.h, over the exported interface and the port table's worker.
+// Helpers declared in state_support.h, built on the exported interface and the port table's worker.
 
 #include "dvsstate/state_support.h"
 

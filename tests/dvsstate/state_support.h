@@ -3,8 +3,8 @@
 #define TESTS_DVSSTATE_STATE_SUPPORT_H
 
 // Helpers of the switch state's tests: switches and ports made in one line, whole states as bytes, captured
-// messages. ctest runs each test in a process of its own; the fixture empties the table for those who run a
-// whole program.
+// messages. ctest runs each test in its own process; the fixture empties the table for runs of a whole
+// program.
 
 #include <cstdint>
 #include <span>
@@ -20,7 +20,7 @@ namespace dvs::test {
 
 constexpr std::uint32_t kVersion = 9;
 
-/// Starts and ends with an empty table and a host limit that was not read yet. Suites are named by
+/// Starts and ends with an empty table and an unread host limit. Name a suite with
 /// `using SwitchTable = dvs::test::StateTest;`.
 class StateTest : public testing::Test {
 protected:
@@ -31,14 +31,14 @@ protected:
 /// Sets the host-wide limit before the first switch reads it.
 void SetHostPorts(std::uint32_t ports);
 
-/// A switch of class "vswitch" that must be accepted.
+/// Adds a switch of class "vswitch"; the add must succeed.
 DVSwitch *AddSwitch(const std::string &id, std::uint32_t version = kVersion);
-/// One held to `maxPorts`.
+/// The same, limited to `maxPorts`.
 DVSwitch *AddLimitedSwitch(const std::string &id, std::uint32_t maxPorts, std::uint32_t version = kVersion);
 
 /// A list on the process heap.
 DVSData *HeapList(const Props &props = {});
-/// A port that must be accepted.
+/// Adds a port; the add must succeed.
 DVSPort *AddPort(DVSwitch *sw, const std::string &id, std::uint32_t kind = DVS_PORT_ACTIVE,
                  const Props &props = {});
 HYP_ReturnStatus TryAddPort(DVSwitch *sw, const std::string &id, std::uint32_t kind = DVS_PORT_ACTIVE,
@@ -48,7 +48,7 @@ std::vector<std::string> PortsOf(DVSwitch *sw);
 std::vector<std::string> SwitchIds();
 std::uint32_t HostPortCount();
 
-/// What a serialization hands out, which must succeed.
+/// The result of a serialization; it must succeed.
 Buffer StateBytes();
 Buffer SwitchBytes(DVSwitch *sw);
 Buffer PortBytes(DVSPort *port);
@@ -62,7 +62,7 @@ std::string AsText(const Buffer &buffer);
 /// Two switches of different classes, seven ports of every kind, properties of several types.
 void BuildExample();
 
-/// Collects messages of the switch state and of property lists, at debug levels of their own, while it lives.
+/// Collects the messages of the switch state and of property lists, each at its own level, while it lives.
 class StateMessages {
 public:
     explicit StateMessages(std::int32_t stateLevel, std::int32_t dataLevel = -1);

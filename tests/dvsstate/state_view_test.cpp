@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The read-only walk over a state: items, paths, offsets, and the verdict over sound states.
+// The read-only walk over a state: items, paths, offsets, and verification of valid states.
 
 #include "dvsstate/state_view.h"
 
@@ -157,7 +157,7 @@ TEST_F(StateViewTest, FindsTheOneRepeatedPortAmongMany) {
     for (int i = 0; i < 3000; i++)
         ports.push_back(Nested(std::to_string(i), {}));
     ports.push_back(
-        Nested("1500", {{kind, U32Value(DVS_PORT_SHADOW), 0x10}})); // another kind is another port
+        Nested("1500", {{kind, U32Value(DVS_PORT_SHADOW), 0x10}})); // a different kind is a different port
     const Props twice = {Nested("s", SwitchWith(ports)), Nested("t", SwitchWith(ports))};
     EXPECT_EQ(VerifyState(SerializedOf(twice)).first.Status(), HYP_OK);
     ports.push_back(Nested("1500", {{kind, U32Value(DVS_PORT_SHADOW), 0x10}}));
@@ -179,7 +179,7 @@ TEST_F(StateViewTest, KeepsToTheHostsLimitsOnlyWhenAsked) {
     Props many;
     for (int i = 0; i < 33; i++)
         many.push_back(Nested("s" + std::to_string(i), SwitchProps()));
-    const auto state = SerializedOf(many); // the verdict's names lie in it
+    const auto state = SerializedOf(many); // the result's names point into it
     const StateVerdict verdict = VerifyState(state, 100);
     EXPECT_STREQ(verdict.first.Text(), "more switches than the table holds");
     EXPECT_EQ(verdict.first.Status(), HYP_LIMIT_EXCEEDED);

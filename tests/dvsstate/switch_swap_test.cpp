@@ -88,7 +88,7 @@ TEST_F(SwitchSwap, StoredCopiesTakeThePlacesOfRemovedSwitches) {
     EXPECT_EQ(DVSState_SwitchFind("a")->version, 12u);
     EXPECT_EQ(DVSState_SwitchFind("b")->version, kVersion);
     EXPECT_EQ(Parked(), Lines{"other"});
-    // What is left over goes, and the table must be saved from that.
+    // Freeing the leftover switches empties the table too.
     DVSState_FreeDVSArray(parked_);
     EXPECT_TRUE(SwitchIds().empty());
 }
@@ -118,7 +118,7 @@ TEST_F(SwitchSwap, RowsWithoutATerminatorAreReadToTheirEnd) {
 
 TEST_F(SwitchSwap, FreeEmptiesTableAndArray) {
     AddPort(AddSwitch("parked"), "p");
-    Update(); // moves nothing by id, and exchanges
+    Update(); // matches no id, so it swaps the arrays
     AddPort(AddSwitch("global"), "p");
     EXPECT_EQ(Parked(), Lines{"parked"});
     DVSState_FreeDVSArray(parked_);

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The whole road: the example agent against an emulator, its save into a store, the store loaded back, and
-// that state in a second emulator, compared property by property by the rules of a round trip.
+// An end-to-end test: the example agent runs against an emulator and saves into a store; the store is loaded
+// into a second emulator; the two states are compared property by property by the round-trip rules.
 
 #include <csignal>
 #include <cstdlib>
@@ -51,8 +51,8 @@ using state_builder::Switch;
 class AgentRoad : public Agent {
 protected:
     AgentRoad() { dvsconfigstore_debug = 0; } // no traces
-    /// Saves the live state with the agent, loads it, and starts a second emulator with that: what the load
-    /// has and what the second emulator then holds must be what the rules say of the live state.
+    /// Saves the live state with the agent, loads it, and starts a second emulator with the result. The
+    /// loaded state and the second emulator's state must be what the rules predict for the live state.
     void Travel() {
         const std::string live = Fetch(DVSHYP_PersistentStateGet).text;
         live_ = Parse(live);
@@ -73,7 +73,7 @@ protected:
         ASSERT_TRUE(second_.Start(socket));
         setenv("DVS_EMULATOR", socket.c_str(), 1);
         ASSERT_EQ(DVSHYP_StateInit(loaded.data(), static_cast<uint32_t>(loaded.size())), HYP_OK);
-        // A state out of a switch table has the class in a field of fixed size.
+        // A state from a switch table has the class in a field of fixed size.
         for (Switch &sw : expected)
             sw.classField = state_builder::Slot(sw.className, 128);
         ExpectSame(expected, Parse(Fetch(DVSHYP_StateGet).text));

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every command through the library against a real emulator process: what it does to the state, and how it
-// refuses.
+// Runs every command through the library against a real emulator process: its effect on the state and its
+// errors.
 
 #include <cstring>
 #include <functional>
@@ -235,7 +235,7 @@ TEST_F(EmulatorCommands, WhatIsKeptBesideTheStateGoesWithItsSwitch) {
 }
 
 TEST_F(EmulatorCommands, ARefusedFetchIsNoMemoryOfTheStateItWasAskedFor) {
-    // The state that did not fit is kept for the larger buffer, until it changes.
+    // A state that did not fit is cached for the retry with a larger buffer, until it changes.
     const auto change = [](const char *name) { return DVSHYP_HostPropSet("s1", name, "v", 1, 16); };
     const auto refuse = [] {
         DVSHYPRequest request{};
@@ -282,7 +282,7 @@ TEST_F(EmulatorCommands, UplinkDataCountsForTheBoundOfTheState) {
     for (; status == HYP_OK && set < 20; set++)
         status = DVSHYP_HostPropSet("s1", ("n" + std::to_string(set)).c_str(), value.data(), 16 << 20, 16);
     EXPECT_EQ(status, HYP_LIMIT_EXCEEDED);
-    EXPECT_EQ(set, 15); // one less than without it
+    EXPECT_EQ(set, 15); // one less than without uplink data
 }
 
 TEST_F(EmulatorCommands, APortWithTheLargestValuesIsFetchedAndAddedAgain) {
@@ -302,8 +302,8 @@ TEST_F(EmulatorCommands, TheWholeStateIsBounded) {
     for (; status == HYP_OK && set < 20; set++)
         status = DVSHYP_HostPropSet("s1", ("n" + std::to_string(set)).c_str(), value.data(), 16 << 20, 16);
     EXPECT_EQ(status, HYP_LIMIT_EXCEEDED);
-    EXPECT_EQ(set, 16); // fifteen fit beside what is there, the sixteenth does not
-    // Setting what is there anew takes no more room.
+    EXPECT_EQ(set, 16); // fifteen more fit, the sixteenth does not
+    // Replacing a value takes no more room.
     for (int i = 0; i < 3; i++)
         EXPECT_EQ(DVSHYP_HostPropSet("s1", "n0", "small", 5, 16), HYP_OK);
 }

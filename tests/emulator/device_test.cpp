@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The embedded device over the emulator's socket: a stream that behaves as a device across threads, forks,
-// restarts and deaths of either side.
+// The embedded device over the emulator's socket: the stream must behave like a device across threads, forks,
+// restarts and the death of either side.
 
 #include <atomic>
 #include <cerrno>
@@ -182,7 +182,7 @@ TEST_F(EmbeddedDevice, AChildOfABusyThreadIsNotHeldUp) {
     usleep(100 * 1000);
     const pid_t child = fork();
     if (child == 0) {
-        alarm(5); // the parent's thread held the descriptor's mutex
+        alarm(5); // the parent's thread may hold the descriptor's mutex
         _exit(DVSHYP_StateCleanup() == HYP_OK ? 0 : 1);
     }
     int status = 0;
@@ -195,7 +195,7 @@ TEST_F(EmbeddedDevice, ADescriptorThatTheProgramReusedIsLeftAlone) {
     const int fd = HostDevice_Open(kPath);
     TempDir directory;
     const int other = open((directory / "file").c_str(), O_RDWR | O_CREAT, 0600);
-    ASSERT_EQ(dup2(other, fd), fd); // as an agent that becomes a daemon may end up
+    ASSERT_EQ(dup2(other, fd), fd); // can happen in an agent that daemonizes
     DVSHYPRequest request{};
     EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::PortFind), &request), -1);
     EXPECT_EQ(errno, EBADF);
@@ -261,11 +261,11 @@ TEST_F(EmbeddedDevice, ClientsKilledInMidRequestHarmNobody) {
     const Bytes kept = Fetch(DVSHYP_HostPropGet, "s", "n");
     EXPECT_TRUE(kept.status == HYP_NOT_FOUND || kept.text == value);
     EXPECT_EQ(OpenDescriptors(), before);
-    // Neither are their connections kept: another process may use as many again.
+    // Their connections are closed too: another process may use as many.
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_OK);
 }
 
-/// Adds ports one after the other while the emulator dies under it and comes back with what it had saved.
+/// Adds ports one after another while the emulator is killed and restarted from its saved state.
 TEST(EmulatorRestarts, NoAddHappensTwiceAndNoLostAnswerIsASuccess) {
     TempDir directory;
     const std::string state = directory / "state";
@@ -288,7 +288,7 @@ TEST(EmulatorRestarts, NoAddHappensTwiceAndNoLostAnswerIsASuccess) {
     for (unsigned i = 0; !done; i++) {
         const std::string port = "p" + std::to_string(i);
         const HYP_ReturnStatus status = AddPort("s", port);
-        // Each id is asked for once, so an add that happened twice would say so.
+        // Each id is added once, so a repeated add would fail visibly.
         EXPECT_NE(status, HYP_EXISTS) << port;
         if (status == HYP_OK)
             certain.push_back(port), added++;

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Starting and ending emulators for tests.
+// Starts and stops emulators for tests.
 
 #include "emulator/emulator_process.h"
 
@@ -25,7 +25,7 @@ int StatusOf(pid_t child) {
     return WIFSIGNALED(status) ? 128 + WTERMSIG(status) : WEXITSTATUS(status);
 }
 
-/// Whether the child comes to its end soon; it is still to be waited for.
+/// Returns whether the child ends soon. Does not reap it.
 bool EndsWithinSeconds(pid_t child, int seconds) {
     for (int i = 0; i < seconds * 500; i++) {
         siginfo_t info{};
@@ -46,7 +46,7 @@ pid_t Spawn(const std::vector<std::string> &words, int out, int err) {
     if (child != 0) return child;
     if (out != -1) dup2(out, 1);
     if (err != -1) dup2(err, 2);
-    std::signal(SIGHUP, SIG_DFL); // whatever the tests were started under
+    std::signal(SIGHUP, SIG_DFL); // the tests may run under nohup
     execv(argv[0], argv.data());
     _exit(127);
 }
@@ -99,7 +99,7 @@ std::string EmulatorProcess::Binary() {
 
 EmulatorProcess::~EmulatorProcess() {
     if (!IsRunning()) return;
-    // Its own way to end, on which sanitizers and coverage report too; but not for as long as clients like.
+    // SIGTERM first: on a normal exit, sanitizers and coverage write their reports. The wait is limited.
     kill(pid_, SIGTERM);
     if (!EndsWithinSeconds(pid_, 2)) kill(pid_, SIGKILL);
     Stop(0);
@@ -147,7 +147,7 @@ int OpenDescriptors() {
     int count = 0;
     for ([[maybe_unused]] const auto &entry : std::filesystem::directory_iterator("/proc/self/fd"))
         count++;
-    return count - 1; // the directory's own
+    return count - 1; // without the descriptor of the directory
 }
 
 unsigned CountFromEnvironment(const char *name, unsigned otherwise) {

@@ -2,7 +2,7 @@
 #ifndef TESTS_EMULATOR_EMULATOR_PROCESS_H
 #define TESTS_EMULATOR_EMULATOR_PROCESS_H
 
-// A dvs-emulator of a test's own: started, waited for until it says that it is ready, told to end.
+// A separate dvs-emulator for a test: starts it, waits for its ready line, stops it.
 
 #include <string>
 #include <vector>
@@ -11,7 +11,7 @@
 
 namespace dvs::test {
 
-/// A directory that goes with its contents.
+/// A temporary directory; removed with its contents in the destructor.
 class TempDir {
 public:
     TempDir();
@@ -27,7 +27,7 @@ private:
 
 /// The outcome of a program that ran to its end.
 struct Finished {
-    int status; // exit status, or 128 and the signal
+    int status; // exit status, or 128 plus the signal
     std::string out;
     std::string err;
 };
@@ -38,17 +38,18 @@ Finished RunProgram(const std::vector<std::string> &argv);
 class EmulatorProcess {
 public:
     EmulatorProcess() = default;
-    /// Ends it with SIGKILL if it still runs.
+    /// Kills it with SIGKILL if it still runs.
     ~EmulatorProcess();
     EmulatorProcess(const EmulatorProcess &) = delete;
     EmulatorProcess &operator=(const EmulatorProcess &) = delete;
 
     static std::string Binary();
 
-    /// Starts it at `socket` with more options and waits for its ready line. False when it ended instead.
+    /// Starts it at `socket` with more options and waits for its ready line. Returns false if it exits
+    /// instead.
     bool Start(const std::string &socket, const std::vector<std::string> &options = {});
 
-    /// Sends a signal and waits for the end; the exit status as in Finished.
+    /// Sends a signal and waits for the exit; the status is as in Finished.
     int Stop(int signal);
     bool IsRunning() const { return pid_ != -1; }
     pid_t Pid() const { return pid_; }
@@ -60,7 +61,7 @@ private:
     std::string readyLine_;
 };
 
-/// An emulator in a directory of its own that this process's device connects to.
+/// An emulator in its own directory; this process's device connects to it.
 class LiveEmulator {
 public:
     explicit LiveEmulator(const std::vector<std::string> &options = {});
@@ -76,10 +77,10 @@ private:
     EmulatorProcess process_;
 };
 
-/// Descriptors this process has open.
+/// The number of this process's open descriptors.
 int OpenDescriptors();
 
-/// A loop's count: the environment variable's, or the default.
+/// A loop count: the value of the environment variable, or the default.
 unsigned CountFromEnvironment(const char *name, unsigned otherwise);
 
 } // namespace dvs::test

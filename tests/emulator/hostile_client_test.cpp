@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Clients that do not keep to the wire form: random and mutated requests, floods, clients that stop in the
-// middle. The emulator lives on and serves its other clients meanwhile.
+// Clients that violate the wire format: random and mutated requests, floods, clients that stop in
+// mid-request. The emulator must keep running and serve its other clients meanwhile.
 
 #include <cstring>
 #include <fstream>
@@ -20,7 +20,7 @@
 namespace dvs::test {
 namespace {
 
-/// One connection below the device: bytes out, a reply in.
+/// A raw connection without the device: sends bytes, receives a reply.
 class RawClient {
 public:
     explicit RawClient(const std::string &socket) : fd_(embedded::ConnectEmulator(socket.c_str())) {}
@@ -33,7 +33,7 @@ public:
         (void)embedded::SendWhole(fd_, &part, 1); // the emulator may have hung up
     }
 
-    /// True when a reply or the end of the connection came within `ms`.
+    /// Returns true when a reply or the end of the connection arrives within `ms`.
     bool Answered(int ms, bool *ended = nullptr) {
         pollfd polled{fd_, POLLIN, 0};
         if (poll(&polled, 1, ms) != 1) return false;
@@ -43,7 +43,7 @@ public:
         return true;
     }
 
-    /// True when a whole answer with this payload comes.
+    /// Returns true when a whole reply with this payload arrives.
     bool Received(const std::string &payload) {
         wire::ReplyHeader header{};
         std::string got(payload.size(), '\0');
@@ -110,7 +110,7 @@ TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
         if (below(3) == 0) parts.record.dataLen = static_cast<uint32_t>(random());
         if (below(3) == 0) parts.header.flags = static_cast<uint32_t>(random());
         std::string bytes = parts.Bytes();
-        // Bytes changed anywhere, the text fields' ends included; now and then a whole stretch, or a cut.
+        // Changes bytes anywhere, also at the ends of text fields; sometimes changes a range or truncates.
         for (uint32_t change = below(8); change > 0; change--)
             bytes[below(static_cast<uint32_t>(bytes.size()))] = static_cast<char>(random());
         if (below(4) == 0) {
@@ -124,7 +124,7 @@ TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
         if (below(4)) (void)client.Answered(1);
         if (i % 50 == 0) {
             Populate();
-            // A request that is still in hand may be a valid removal: this client is served either way.
+            // An in-flight request may be a valid removal, so either result is fine: this client is served.
             const HYP_ReturnStatus status = Fetch(DVSHYP_GlobalPropGet, "s", "name").status;
             ASSERT_TRUE(status == HYP_OK || status == HYP_NOT_FOUND) << i;
             ASSERT_EQ(Exec("fault clear").status, HYP_OK) << i;
@@ -177,22 +177,22 @@ TEST_F(HostileClients, AnnouncedSizesCostNothingUntilTheyArrive) {
     EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s", "name").text, "value");
 }
 
-/// Pages that a process has touched for the first time so far: memory it took, its buffers' copies included.
+/// The minor page faults of a process: a measure of the memory it touched, copies of buffers included.
 uint64_t TouchedPages(pid_t pid) {
     std::ifstream file("/proc/" + std::to_string(pid) + "/stat");
     std::string word;
-    for (int field = 1; field <= 10; field++) // none of these holds a blank: the program's name has none
+    for (int field = 1; field <= 10; field++) // no field contains a space: the program's name has none
         file >> word;
     return std::stoull(word);
 }
 
 TEST_F(HostileClients, ALargeRequestIsNotCopiedWithEachPieceOfIt) {
-    // A buffer that grows with each receive is copied as often: a whole state of this size took minutes.
+    // A buffer that grows with each receive is copied each time; a state of this size then takes minutes.
     const std::string value(32 << 20, 'v');
     const uint64_t pages = value.size() / 4096;
     const uint64_t before = TouchedPages(emulator_.Process().Pid());
     EXPECT_EQ(DVSHYP_StateInit(value.data(), static_cast<uint32_t>(value.size())), HYP_BAD_PARAM);
-    // Twice for buffers that double, and the room that a sanitizer keeps beside them.
+    // Allows for doubling buffers and for a sanitizer's redzones.
     EXPECT_LT(TouchedPages(emulator_.Process().Pid()) - before, 8 * pages);
 }
 
@@ -240,7 +240,7 @@ TEST_F(HostileClients, AClientThatTakesNoAnswersHoldsUpNobody) {
         clients.back()->Send(parts.Bytes());
     }
     EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s", "name").text, value);
-    // What was lent for those answers was copied: changing the value changes none of them.
+    // Pending replies hold copies: changing the value does not change them.
     EXPECT_EQ(DVSHYP_GlobalPropClear("s", "name"), HYP_OK);
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     EXPECT_TRUE(clients.front()->Received(value)) << "as it was when it was asked for";

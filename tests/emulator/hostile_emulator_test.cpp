@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A peer at the emulator's socket that is no honest emulator: the embedded device ends every call, with a
-// failure where there is no answer, and never lets the library go round in circles.
+// A hostile peer at the emulator's socket. The embedded device must end every call, fail calls without a
+// valid reply, and never make the library loop forever.
 
 #include <algorithm>
 #include <atomic>
@@ -23,10 +23,10 @@
 namespace dvs::test {
 namespace {
 
-/// What the peer sends back for a request; empty hangs up.
+/// The peer's reply to a request; empty closes the connection.
 using Script = std::function<std::string(const wire::RequestHeader &, const DVSHYPRequest &)>;
 
-/// Listens in a thread of its own and answers as a script says.
+/// Listens in its own thread and replies according to a script.
 class HostilePeer {
 public:
     explicit HostilePeer(Script script, bool hangsUp = false)
@@ -89,11 +89,11 @@ private:
 
     TempDir directory_;
     Script script_;
-    const bool hangsUp_; // after each answer
+    const bool hangsUp_; // after each reply
     int fd_ = -1;
     std::atomic<unsigned> requests_ = 0;
     std::thread thread_;
-    // Touched by the listening thread alone until it has ended.
+    // Used only by the listening thread until it ends.
     std::vector<int> clients_;
     std::vector<std::thread> servers_;
 };
@@ -109,7 +109,7 @@ std::string Reply(uint32_t status, int error, uint32_t length, const std::string
     return std::string(reinterpret_cast<const char *>(&header), sizeof header) + payload;
 }
 
-/// Every function that talks to the module, receiving or not.
+/// Every function that calls the module.
 std::vector<std::function<HYP_ReturnStatus()>> AllCalls() {
     return {
         [] { return Fetch(DVSHYP_StateGet).status; },
@@ -133,14 +133,14 @@ std::vector<std::function<HYP_ReturnStatus()>> AllCalls() {
     };
 }
 
-constexpr std::size_t kReceivers = 12; // of the above
+constexpr std::size_t kReceivers = 12; // the first of the list above
 
 class HostileEmulator : public testing::Test {
 protected:
     ~HostileEmulator() override { testing::internal::GetCapturedStderr(); }
     HostileEmulator() { testing::internal::CaptureStderr(); }
 
-    /// All calls fail against such a peer.
+    /// Checks that all calls fail against this peer.
     void AllFail(const Script &script, bool receiversOnly = false) {
         HostilePeer peer(script);
         const auto calls = AllCalls();
@@ -196,7 +196,7 @@ TEST_F(HostileEmulator, AsksForOneByteMoreEachTime) {
         return Reply(HYP_LIMIT_EXCEEDED, ENOSPC, std::max(record.dataLen, record.cmdOutLen) + 1, {}, 0);
     });
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_FAILURE);
-    EXPECT_EQ(peer.Requests(), 65U); // the sixty-fifth refusal in a row is one too many
+    EXPECT_EQ(peer.Requests(), 65U); // the limit is 64 consecutive refusals
     EXPECT_EQ(Exec("help").status, HYP_FAILURE);
     EXPECT_EQ(peer.Requests(), 130U);
 }

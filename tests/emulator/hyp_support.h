@@ -2,7 +2,7 @@
 #ifndef TESTS_EMULATOR_HYP_SUPPORT_H
 #define TESTS_EMULATOR_HYP_SUPPORT_H
 
-// The kernel interface in fewer words, for tests: fetched buffers as strings, port data from pairs.
+// Short wrappers of the kernel interface for tests: fetched buffers as strings, port data from pairs.
 
 #include <cstdint>
 #include <cstdlib>
@@ -24,7 +24,7 @@ struct Bytes {
     uint32_t Size() const { return static_cast<uint32_t>(text.size()); }
 };
 
-/// Calls a fetching function with its arguments but the outputs.
+/// Calls a fetching function with its arguments except the outputs.
 template <class Function, class... Arguments> Bytes Fetch(Function function, Arguments... arguments) {
     void *out = nullptr;
     uint32_t outLen = 0;
@@ -49,7 +49,7 @@ inline Bytes Exec(const std::string &command, const char *sw = "") {
     return Fetch(DVSHYP_CmdExec, sw, command.c_str(), nullptr, 0U);
 }
 
-/// A fault of the emulator that hits one command.
+/// An emulator fault that hits one command.
 inline std::string FaultOf(Command command, const std::string &fields) {
     return "command=" + std::to_string(NumberOf(command)) + "," + fields;
 }
@@ -60,7 +60,7 @@ inline void *HeapAlloc(uint64_t size) {
 
 using Pairs = std::vector<std::pair<std::string, std::string>>;
 
-/// A serialized property list; a kind other than active is stated in it.
+/// A serialized property list. It contains the kind unless the kind is active.
 inline std::string PortData(const Pairs &pairs, uint32_t kind = 1) {
     DVSData *list = nullptr;
     if (DVSData_Alloc(&list, HeapAlloc, std::free) != HYP_OK) return {};

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The emulator as a program: its options, its state file, its end, `run`.
+// The emulator as a program: its options, its state file, its termination, and `run`.
 
 #include <algorithm>
 #include <array>
@@ -103,7 +103,7 @@ TEST_F(EmulatorSocket, OfADeadEmulatorIsReplacedOfALivingOneNot) {
     EXPECT_TRUE(first.Start(socket_));
 }
 
-// A socket that nobody listens at, as a killed emulator leaves it.
+// A socket without a listener, as a killed emulator leaves it.
 void LeaveStaleSocket(const std::string &path) {
     std::string why;
     const int fd = emulator::ListenAt(path, &why);
@@ -152,7 +152,7 @@ TEST_F(EmulatorSocket, OfADeadEmulatorGoesToOneOfManyThatStartAtOnce) {
                 threads.emplace_back([&, i] { isServing[i] = starters[i].Start(socket_); });
         }
         ASSERT_EQ(std::ranges::count(isServing, true), 1) << round;
-        // And it is the one at the path: a second look finds it.
+        // The path leads to that emulator: a second connection reaches it.
         EXPECT_NE(Emulator({"--socket", socket_}).err.find("is in use"), std::string::npos);
         for (EmulatorProcess &starter : starters)
             if (starter.IsRunning()) {
@@ -181,7 +181,7 @@ TEST_F(EmulatorSocket, OtherUsersAreTurnedAway) {
     if (geteuid() != 0) GTEST_SKIP() << "another user can be had by root only";
     EmulatorProcess process;
     ASSERT_TRUE(process.Start(socket_));
-    // The modes are opened up, so that it is the check of the peer that is seen.
+    // Opens the modes to everyone, so that only the check of the peer's user can fail.
     ASSERT_EQ(chmod(directory_.Path().c_str(), 0777), 0);
     ASSERT_EQ(chmod(socket_.c_str(), 0777), 0);
     const pid_t child = fork();
@@ -287,7 +287,7 @@ TEST_F(EmulatorState, MaxPortsHoldsForTheHostAndForTheLibrarysLimit) {
     EXPECT_EQ(AddPort("s1", "a"), HYP_OK);
     EXPECT_EQ(AddPort("s1", "b"), HYP_OK);
     EXPECT_EQ(AddPort("s1", "c"), HYP_LIMIT_EXCEEDED);
-    // This process asks the emulator when its own table is first used.
+    // This process reads the limit from the emulator on first use of its own table.
     setenv("DVS_MAX_PORTS", "77", 1);
     ASSERT_EQ(DVSState_SwitchAdd("own", "vswitch", 0, 110), HYP_OK);
     EXPECT_EQ(uwMaxNumActivePortsSystemWide, 2U);
@@ -311,7 +311,7 @@ TEST_F(EmulatorState, SignalsEndItOrderly) {
     }
 }
 
-/// An emulator whose surroundings are not what programs are used to.
+/// An emulator in an unusual process environment.
 class EmulatorSurroundings : public EmulatorState {
 protected:
     ~EmulatorSurroundings() override {
@@ -377,7 +377,7 @@ TEST_F(EmulatorSurroundings, MissingStandardStreamsAreNobodyElses) {
 TEST_F(EmulatorSurroundings, UnderNohupItOutlivesTheTerminal) {
     ASSERT_TRUE(StartAfter([] { std::signal(SIGHUP, SIG_IGN); }));
     kill(pid_, SIGHUP);
-    usleep(50 * 1000); // time to end, if it were to
+    usleep(50 * 1000); // time to exit, if it handled the signal
     EXPECT_TRUE(Serves());
     EXPECT_EQ(End(), 0);
 }

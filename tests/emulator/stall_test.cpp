@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Peers at the emulator's socket that do nothing: no call waits for them for ever. Linked with setsockopt
-// wrapped, so that the half minute of the embedded device is a moment here.
+// Idle peers at the emulator's socket: no call may wait forever. setsockopt is wrapped at link time to
+// shorten the embedded device's timeout of 30 s.
 
 #include <cstring>
 
@@ -27,7 +27,7 @@ extern "C" int __wrap_setsockopt(int fd, int level, int name, const void *value,
 namespace dvs::test {
 namespace {
 
-/// Listens and takes nobody in; one connection finds a place to wait for that.
+/// Listens but never accepts. The backlog has room for one connection.
 class IdlePeer : public testing::Test {
 protected:
     IdlePeer() : fd_(socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0)) {
@@ -39,7 +39,7 @@ protected:
         EXPECT_EQ(listen(fd_, 0), 0);
         setenv("DVS_EMULATOR", path.c_str(), 1);
         testing::internal::CaptureStderr();
-        alarm(20); // what waits for ever ends as a failure
+        alarm(20); // turns a hang into a failure
     }
     ~IdlePeer() override {
         alarm(0);

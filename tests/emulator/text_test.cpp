@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Text commands and faults on demand.
+// Text commands and injected faults.
 
 #include <algorithm>
 #include <cerrno>
@@ -38,7 +38,7 @@ protected:
         return id;
     }
 
-    // Ids of this form hold blanks.
+    // Ids of this form contain spaces.
     static constexpr const char *kSwitch = "00 01 02 03 04 05 06 07-08 09 0a 0b 0c 0d 0e 0f";
     LiveEmulator emulator_;
 };
@@ -103,7 +103,7 @@ TEST_F(TextCommands, AConnectionIdOfTheAgentsIsKept) {
 }
 
 TEST_F(TextCommands, AConnectionIdThatAPortHasIsGivenToNoOther) {
-    // A state that comes back has the ids of a module that counted from 1 as well.
+    // A restored state contains the ids of a module that also counted from 1.
     uint32_t own = 1;
     for (const char *port : {"p1", "p2"}) {
         ASSERT_EQ(AddPort(kSwitch, port), HYP_OK);
@@ -170,12 +170,12 @@ TEST_F(InjectedFaults, SetTheErrnoAlone) {
 TEST_F(InjectedFaults, DelayOneClientAndNoOther) {
     using namespace std::chrono;
     ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "nth=1,delay=300")).status, HYP_OK);
-    ASSERT_EQ(DVSHYP_StateSanitize(), HYP_OK); // the plain calls' connection is made
+    ASSERT_EQ(DVSHYP_StateSanitize(), HYP_OK); // opens the connection of the plain calls
     const auto start = steady_clock::now();
     const pid_t child = fork();
     if (child == 0)
         _exit(Find() == HYP_NOT_FOUND && steady_clock::now() - start >= milliseconds(300) ? 0 : 1);
-    // Whichever of the two is first is delayed; fetches go on meanwhile.
+    // The first of the two is delayed; fetches continue meanwhile.
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_OK);
     EXPECT_LT(steady_clock::now() - start, milliseconds(300));
     int status = 0;

@@ -18,22 +18,22 @@ extern "C" {
 #endif
 
 /*
- * Arms the faults of `plan` in place of those armed before, and starts all counts anew. The text is the one
- * that the environment variable DVS_FAULT takes. 0, or -1 with nothing armed when the plan does not parse.
+ * Arms the faults of `plan`, replaces those armed before, and resets all counts. The text has the format of the
+ * environment variable DVS_FAULT. Returns 0, or -1 with nothing armed if the plan does not parse.
  */
 int fault_arm(const char *plan);
 
-/* Takes all faults back. Counts stay readable. */
+/* Disarms all faults. Counts stay readable. */
 void fault_disarm(void);
 
-/* Calls of a kind ("write", "alloc", …) since the last fault_arm, suspended ones left out; -1 for an unknown
+/* Calls of a kind ("write", "alloc", …) since the last fault_arm, without suspended ones; -1 for an unknown
  * kind. */
 int64_t fault_calls(const char *kind);
 
 /* Faults delivered since the last fault_arm. */
 int64_t fault_hits(void);
 
-/* Heap blocks of the whole process that have been allocated and not yet released. */
+/* Live heap blocks of the whole process. */
 int64_t fault_live_blocks(void);
 
 /* While suspended, the calling thread's calls neither count nor fail. Nests. */

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The interposer itself: every kind fails when it is told to, and at no other time.
+// Tests the interposer: each kind of call fails exactly when its plan says so.
 
 #include "fault/fault.h"
 #include "fault/sweep.h"
@@ -47,8 +47,7 @@ protected:
     int fd_ = -1;
 };
 
-/// One call of each kind that only needs a descriptor of a file, or nothing. -1 with errno, or something
-/// else.
+/// One call of each kind that needs at most a file descriptor. Returns -1 with errno, or another value.
 struct OneCall {
     const char *kind;
     long (*call)(int fd, const char *path);
@@ -268,7 +267,7 @@ TEST(FaultAlloc, EveryWayToAllocateFails) {
     const auto fails = [](auto &&call) {
         fault_arm("alloc:1");
         const bool failed = call();
-        asm volatile("" : : "r"(block) : "memory"); // nothing is optimised away
+        asm volatile("" : : "r"(block) : "memory"); // prevents the compiler from removing the allocation
         const bool met = fault_hits() == 1;
         fault_disarm();
         return failed && met;
@@ -317,7 +316,7 @@ TEST(FaultAlloc, LiveBlocksAreCounted) {
 
 // ---- the sweep ----
 
-/// Three allocations; with `leak`, the first stays behind when a later one fails.
+/// Makes three allocations; with `leak`, leaks the first when a later one fails.
 uint32_t ThreeBlocks(bool leak) {
     void *first = std::malloc(1), *second = first ? std::malloc(2) : nullptr,
          *third = second ? std::malloc(3) : nullptr;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The heap: malloc and its relatives. Blocks are counted as they come and go. In an ordinary build C++'s
-// operators come through here; under a sanitizer they do not, and interpose_new.cpp stands in for them.
+// The heap: malloc and related functions, with a count of live blocks. In an ordinary build C++'s operators
+// call these; under a sanitizer they do not, and interpose_new.cpp replaces them.
 
 #include <array>
 #include <atomic>
@@ -24,7 +24,7 @@ constinit Real<int(void **, std::size_t, std::size_t)> g_posixMemalign("posix_me
 constinit Real<void *(std::size_t, std::size_t)> g_alignedAlloc("aligned_alloc");
 constinit Real<void *(std::size_t, std::size_t)> g_memalign("memalign");
 
-// Looking the real functions up may itself allocate. Those few blocks come from here and are never reused.
+// dlsym may itself allocate. Those few blocks come from this arena and are never reused.
 alignas(std::max_align_t) std::array<char, 16384> g_early;
 std::atomic<std::size_t> g_earlyUsed{0};
 thread_local bool t_lookingUp __attribute__((tls_model("initial-exec"))) = false;
@@ -41,8 +41,8 @@ void *EarlyBlock(std::size_t size) {
     return at + rounded <= g_early.size() ? g_early.data() + at : nullptr;
 }
 
-/// All at once, before the first block is made: looking one up may release what an earlier, failed lookup of
-/// the process has left, and that must not lead back here.
+/// Looks up all functions before the first allocation: a lookup may free the message of an earlier failed
+/// dlsym, which must not recurse into this code.
 void LookUpAll() {
     t_lookingUp = true;
     (void)g_malloc.Get();
@@ -89,7 +89,7 @@ void *calloc(std::size_t num, std::size_t size) {
 
 void free(void *block) {
     if (!block || IsEarly(block) || t_lookingUp)
-        return; // what comes while looking up is a text of some bytes
+        return; // a lookup frees at most a short error text
     NoteBlock(-1);
     LookUp (&g_free)(block);
 }
@@ -97,7 +97,7 @@ void free(void *block) {
 void *realloc(void *block, std::size_t size) {
     if (t_lookingUp) return block ? nullptr : EarlyBlock(size);
     if (AllocFails()) return nullptr;
-    if (IsEarly(block)) { // its size is not kept; what follows it in the arena is as good as any
+    if (IsEarly(block)) { // its size is unknown: copies up to the end of the arena
         void *moved = malloc(size);
         const std::size_t rest =
             g_early.size() - static_cast<std::size_t>(static_cast<char *>(block) - g_early.data());

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Files: what opens, moves, flushes and removes them. Reads and writes are in interpose_io.cpp. The 64
-// variants are names of their own; a library may have been compiled against either. Descriptors are opened
-// before the decision is asked for their path, paths are taken as given.
+// Calls that open, move, flush and remove files. Reads and writes are in interpose_io.cpp. The 64 variants
+// are separate names; a library may be compiled against either. For calls on descriptors, the decision uses
+// the descriptor's path; paths given as arguments are used unchanged.
 
 #include <cerrno>
 #include <cstdarg>
@@ -34,7 +34,7 @@ Subject Fd(int fd) {
     return {.fd = fd};
 }
 
-/// The mode argument that an open has only when it may create.
+/// The mode argument; open has one only when it may create a file.
 mode_t ModeOf(int flags, va_list args) {
     const bool creates = (flags & O_CREAT) != 0 || (flags & O_TMPFILE) == O_TMPFILE;
     return creates ? va_arg(args, mode_t) : 0;
@@ -84,7 +84,7 @@ int openat(int dirFd, const char *path, int flags, ...) {
 int openat64(int dirFd, const char *path, int flags, ...) {
     WITH_MODE(return OpenAt(&g_openat64, dirFd, path, flags, mode));
 }
-// What a fortified build calls when the mode is left out.
+// A fortified build calls these when the mode is omitted.
 int __open_2(const char *path, int flags) {
     return OpenPath(&g_open, path, flags, 0);
 }
@@ -105,7 +105,7 @@ int creat64(const char *path, mode_t mode) {
     return OpenPath(&g_open64, path, O_CREAT | O_WRONLY | O_TRUNC, mode);
 }
 
-// The C library's streams open below the names above. Their allocations keep counting.
+// The C library's streams do not open through the names above. Their allocations still count.
 FILE *fopen(const char *path, const char *mode) {
     static constinit Real<FILE *(const char *, const char *)> real("fopen");
     return Fails(Kind::kOpen, Path(path)) ? nullptr : real(path, mode);
@@ -121,7 +121,7 @@ DIR *opendir(const char *path) {
 
 int close(int fd) {
     static constinit Real<int(int)> real("close");
-    // A close that fails has closed: Linux releases the descriptor first.
+    // A failing close still closes: Linux releases the descriptor first.
     const bool fails = Fails(Kind::kClose, Fd(fd));
     const int error = errno;
     const int result = Call(&real, fd);
@@ -175,7 +175,7 @@ PATH_CALL(Kind::kMkdir, Path(path), mkdir, (const char *path, mode_t mode), path
 PATH_CALL(Kind::kMkdir, Path(path, dirFd), mkdirat, (int dirFd, const char *path, mode_t mode), dirFd, path,
           mode)
 
-/// Only requests for record locks count: the others cannot fail for reasons of the outside.
+/// Counts only requests for record locks: the others do not depend on external state.
 static bool LockFails(int fd, int command) {
     const bool isLock =
         command == F_SETLK || command == F_SETLKW || command == F_OFD_SETLK || command == F_OFD_SETLKW;
@@ -209,7 +209,7 @@ int ioctl(int fd, unsigned long request, ...) {
     return Fails(Kind::kIoctl, Fd(fd)) ? -1 : Call(&real, fd, request, argument);
 }
 
-// Only maps of files count: the heap's own are below the names here, a sanitizer's are not to be touched.
+// Counts only maps of files: the heap's maps bypass these names, and a sanitizer's maps must not fail.
 void *mmap(void *address, size_t length, int protection, int flags, int fd, off_t offset) {
     static constinit Real<void *(void *, size_t, int, int, int, off_t)> real("mmap");
     if (fd >= 0 && Fails(Kind::kMmap, Fd(fd))) return MAP_FAILED;

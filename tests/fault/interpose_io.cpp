@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Transfers: reads and writes of files, sends and receives of sockets. A short count really transfers that
-// much, so that what was transferred is on disk, or with the peer.
+// Transfers: reads and writes of files, sends and receives of sockets. A short count transfers that many
+// bytes for real, to the disk or the peer.
 
 #include <array>
 #include <cerrno>
@@ -22,8 +22,8 @@ using fault::Real;
 
 namespace {
 
-/// A copy of the first elements of a vector, cut to the bytes that a decision leaves. A vector of more
-/// elements than fit is cut there too when it is cut at all: a short count is what was asked for.
+/// A copy of the first elements of a vector, truncated to the bytes of a decision. A truncated vector also
+/// keeps at most as many elements as fit here; the result is a short count either way.
 class CutVector {
 public:
     CutVector(const iovec *vector, std::size_t num, const Decision &decision) : vector_(vector), num_(num) {

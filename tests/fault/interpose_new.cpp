@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// C++'s allocation operators, for sanitizer builds only: a sanitizer brings operators that do not call
-// malloc. These stand in front of them, so that the sanitizer still sees which operator made and which
-// released a block.
+// C++'s allocation operators, for sanitizer builds only: a sanitizer's operators do not call malloc. These
+// wrap them, so that the sanitizer still sees which operator allocated and which freed a block.
 
 #include <cstddef>
 #include <new>

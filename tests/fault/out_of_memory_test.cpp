@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every exported operation of property lists, switch state and state file, with each of its allocations
-// failed in turn: the status is one that is documented for it, nothing leaks, no lock stays held, and what
-// must not change has not. A row per operation; a test compares the rows with the list of exported names.
+// Fails each allocation of every exported operation of property lists, switch state and state file in turn.
+// The operation must return a documented status, leak nothing, hold no lock and change nothing it must not
+// change. The table has one row per operation; a test compares the rows with the list of exported names.
 
 #include <gtest/gtest.h>
 
@@ -54,9 +54,9 @@ struct Bytes {
     }
 };
 
-// What the operations work on: made before a round's fault is armed, released after it.
+// The data that the operations use: created before a round's fault is armed, released after the round.
 struct World {
-    DVSData *list = nullptr; // long enough for whatever long lists keep beside their entries
+    DVSData *list = nullptr; // long enough to have a name index
     DVSwitch *sw = nullptr;
     DVSPort *port = nullptr;
     Bytes listBytes, stateBytes, switchBytes, portBytes;
@@ -118,7 +118,7 @@ bool Same(const Bytes &a, const Bytes &b) {
     return a.len == b.len && std::memcmp(a.data, b.data, a.len) == 0;
 }
 
-/// What a failed operation has changed, as notes.
+/// Notes the changes that a failed operation made.
 void NoteChanges(Child &child) {
     Bytes list = ListBytes(g_world.list), state;
     Must(DVSState_ConfigSerialize(&state.data, &state.len) == HYP_OK);
@@ -150,7 +150,7 @@ bool OnSwitch(DVSwitch *, void *) {
     return false;
 }
 
-/// Runs something that hands out a buffer, and releases it.
+/// Runs an operation that returns a buffer, and frees the buffer.
 template <typename Work> HYP_ReturnStatus WithOut(Work work) {
     void *buf = nullptr;
     uint32_t len = 0;
@@ -166,7 +166,7 @@ template <typename Work> HYP_ReturnStatus WithNewList(Work work) {
     return status;
 }
 
-/// Adds a port with a list made beforehand, which stays the caller's when the add fails.
+/// Adds a port with an existing list; the caller keeps the list when the add fails.
 HYP_ReturnStatus AddPort(Child &child, decltype(&DVSState_PortAdd) add) {
     DVSData *data = nullptr;
     child.Unfaulted([&data] { data = MakeList(); });
@@ -186,8 +186,8 @@ HYP_ReturnStatus Read(decltype(&DVSFile_Read) read) {
 struct Row {
     const char *name;
     HYP_ReturnStatus (*run)(Child &);
-    std::vector<HYP_ReturnStatus> onFault = {}; // empty: the operation makes no allocation at all
-    const char *mayChange = "";                 // what a failed one may leave changed
+    std::vector<HYP_ReturnStatus> onFault = {}; // empty: the operation does not allocate
+    const char *mayChange = "";                 // what a failed operation may change
 };
 
 #define DO(expression) [](Child &) -> HYP_ReturnStatus { return expression; }
@@ -196,12 +196,12 @@ struct Row {
 
 const std::vector<HYP_ReturnStatus> kNoMemory = {HYP_NO_MEMORY};
 const std::vector<HYP_ReturnStatus> kExists = {HYP_EXISTS, HYP_NO_MEMORY};
-// What is done without is no failure: an index, the scan for stale names.
+// Failures of optional allocations are ignored: an index, the scan for stale files.
 const std::vector<HYP_ReturnStatus> kFine = {HYP_OK};
 
 // clang-format off
 const std::vector<Row> kRows = {
-    // property lists; a value of another length takes the old one's place only after that has gone
+    // property lists; for a value of another length, the old entry is removed first
     {"DVSData_Alloc", DO(WithNewList([](DVSData **l) { return DVSData_Alloc(l, HeapAlloc, HeapFree); })), kNoMemory},
     {"DVSData_Free", CALL((DVSData_Free(g_world.list), g_world.list = nullptr, DVSData_Free(g_world.list)))},
     {"DVSData_Append", DO(DVSData_Append(g_world.list, "new", "value", 6, kPropType)), kNoMemory},
@@ -340,7 +340,7 @@ TEST_P(OutOfMemory, LeavesNothingBehind) {
                 EXPECT_EQ(report.status, HYP_OK);
                 return;
             }
-            // Memory that an operation can do without may also be what was missing.
+            // The failed allocation may also have been an optional one.
             EXPECT_TRUE(report.status == HYP_OK || std::ranges::count(row.onFault, report.status) == 1)
                 << std::hex << report.status;
             if (report.status != HYP_OK) {
@@ -358,7 +358,7 @@ TEST_P(OutOfMemory, LeavesNothingBehind) {
 INSTANTIATE_TEST_SUITE_P(Of, OutOfMemory, testing::Range(std::size_t{0}, kRows.size()),
                          [](const auto &row) { return std::string(kRows[row.param].name); });
 
-/// What an operation says about its missing memory, at the level of errors; the same for each allocation.
+/// The error message of an operation that runs out of memory; the same for each allocation.
 void ExpectSaid(HYP_ReturnStatus (*run)(Child &), const std::string &text) {
     fault::Options options;
     options.prepare = Prepare;

@@ -1,6 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Fault plans: their text form, the counters, and the decision about one call. The interpose_*.cpp files ask;
-// tests and the environment tell. Runs inside malloc, hence fixed tables, atomics and raw system calls only.
+// Fault plans: their text form, the counters, and the decision about one call. Tests and the environment set
+// the plan; the interpose_*.cpp files query it. This code runs inside malloc, so it uses only fixed tables,
+// atomics and raw system calls.
 
 #include "fault/plan.h"
 
@@ -71,7 +72,7 @@ std::array<std::atomic<int64_t>, kKindNum> g_calls{};
 std::atomic<int64_t> g_hits{0};
 std::atomic<int64_t> g_blocks{0};
 
-// The interposer may be preloaded; other models of thread-local storage could allocate on first use.
+// The interposer may be preloaded, and other models of thread-local storage may allocate on first use.
 thread_local int t_quiet __attribute__((tls_model("initial-exec"))) = 0;
 
 // ---- text form ----
@@ -168,7 +169,7 @@ bool ParsePlan(std::string_view text, Plan *plan) {
 
 using PathBuffer = std::array<char, 4200>;
 
-/// The path behind a descriptor; empty when there is none.
+/// The path of a descriptor; empty when there is none.
 std::size_t PathOfFd(int fd, PathBuffer *out) {
     std::array<char, 32> link{"/proc/self/fd/"};
     std::array<char, 12> digits{};
@@ -216,7 +217,7 @@ bool Matches(const Plan &plan, Kind kind, const Subject &subject) {
     return plan.path[0] == '\0' || !hasFile || IsUnder(subject, plan.path.data());
 }
 
-/// The same calls fail for the same seed, whatever else the process does in between.
+/// The same calls fail for the same seed, regardless of the process's other calls.
 bool IsChosen(const Plan &plan, uint64_t call) {
     uint64_t x = plan.seed * 0x9e3779b97f4a7c15u + call;
     x = (x ^ (x >> 30)) * 0xbf58476d1ce4e5b9u;

@@ -2,8 +2,8 @@
 #ifndef TESTS_FAULT_PLAN_H
 #define TESTS_FAULT_PLAN_H
 
-// What the interposed functions ask before they call the real one. Nothing here allocates, locks or calls an
-// interposed function: it all runs inside malloc.
+// Decisions for the interposed functions, which query them before they call the real function. This code runs
+// inside malloc, so it does not allocate, lock or call an interposed function.
 
 #include <cstddef>
 #include <cstdint>
@@ -36,7 +36,7 @@ enum class Kind : unsigned {
     kNum
 };
 
-/// The file a call is about, as far as it is about one: a path relative to `dirFd`, or a descriptor.
+/// The file of a call, if it has one: a path relative to `dirFd`, or a descriptor.
 struct Subject {
     int dirFd = -1;
     const char *path = nullptr;
@@ -47,7 +47,7 @@ struct Subject {
 struct Decision {
     enum class What { kPass, kFail, kShort } what = What::kPass;
     int error = 0;         // kFail
-    std::size_t bytes = 0; // kShort: at most so many
+    std::size_t bytes = 0; // kShort: the maximum to transfer
 
     [[nodiscard]] bool Fails() const { return what == What::kFail; }
     [[nodiscard]] std::size_t Cut(std::size_t length) const {
@@ -55,17 +55,16 @@ struct Decision {
     }
 };
 
-/// Counts the call and says what becomes of it. A plan that kills the process does it here.
+/// Counts the call and decides about it. A plan that kills the process does it here.
 Decision Decide(Kind kind, const Subject &subject);
 
-/// True, with errno set, when the call is to fail.
+/// Returns true, with errno set, when the call must fail.
 bool Fails(Kind kind, const Subject &subject);
 
-/// A block has come into being (+1) or gone (-1).
+/// Counts a block: allocated (+1) or freed (-1).
 void NoteBlock(int change);
 
-/// Keeps the calls made meanwhile by the calling thread out of the counts: what an interposed function itself
-/// calls.
+/// While it lives, the calling thread's calls do not count. For calls made by an interposed function itself.
 class Quiet {
 public:
     Quiet();

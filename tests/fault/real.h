@@ -2,8 +2,8 @@
 #ifndef TESTS_FAULT_REAL_H
 #define TESTS_FAULT_REAL_H
 
-// The function an interposed one stands in front of: the next of that name in the search order, which is the
-// C library's, or a sanitizer's in front of it.
+// The function that an interposed one wraps: the next of that name in the search order, from the C library or
+// from a sanitizer's runtime.
 
 #include <atomic>
 #include <cstdlib>
@@ -28,7 +28,7 @@ public:
             const Quiet quiet;
             function = reinterpret_cast<Function *>(dlsym(RTLD_NEXT, name_));
             if (!function)
-                std::abort(); // this system has no such function: nobody can have called it in earnest
+                std::abort(); // this system has no such function, so no valid caller exists
             function_.store(function, std::memory_order_release);
         }
         return function;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Rounds of one scenario in forked children (sweep.h). A child tells its result through a pipe and leaves
-// with _exit, so that neither the parent's buffers nor its test framework run twice.
+// Runs rounds of one scenario in forked children (sweep.h). A child sends its result through a pipe and exits
+// with _exit, so that the parent's buffers are not flushed twice and its test framework does not run twice.
 
 #include "fault/sweep.h"
 
@@ -21,7 +21,7 @@
 #include "fault/fault.h"
 
 #ifdef DVS_COVERAGE
-extern "C" void __gcov_dump(void); // the counters, which _exit would drop
+extern "C" void __gcov_dump(void); // _exit would lose the coverage counters
 #endif
 
 namespace fault {
@@ -30,7 +30,7 @@ namespace {
 
 constexpr std::size_t kNotesSize = 8192;
 
-/// What goes through the pipe in front of the notes.
+/// The header that precedes the notes in the pipe.
 struct Wire {
     uint32_t status;
     int64_t hits;

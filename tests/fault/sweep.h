@@ -2,17 +2,17 @@
 #ifndef TESTS_FAULT_SWEEP_H
 #define TESTS_FAULT_SWEEP_H
 
-// Runs a scenario over and over, each time in a forked child and with the fault one call later, until it
-// meets none:
+// Runs a scenario repeatedly, each time in a forked child and with the fault one call later, until a round
+// meets no fault:
 //
 //     fault::Sweep("write:%:ENOSPC", [](fault::Child &child) { return DVSFile_Write(path, buf, len); },
 //                  [](uint64_t k, const fault::Report &report) { EXPECT_EQ(report.status, HYP_WRITE_ERROR);
 //                  });
 //
 // The `%` of the plan (README.md) becomes 1, 2, 3, …; a plan without one runs once. The scenario runs with
-// the fault armed; what it needs is made before, in the parent, or through Child::Unfaulted. Its result, and
-// what it did to heap, descriptors and locks, comes back as a Report; `check` runs in the parent, so that
-// EXPECT_… works in it. A child that crashes or hangs fails the test by itself.
+// the fault armed; prepare its data before, in the parent, or through Child::Unfaulted. A Report returns its
+// result and its effect on heap, descriptors and locks. `check` runs in the parent, so that EXPECT_… works in
+// it. A child that crashes or hangs fails the test.
 
 #include <cstdint>
 #include <functional>
@@ -23,26 +23,26 @@ namespace fault {
 struct Report {
     uint32_t status = 0;      // what the scenario returned
     int64_t hits = 0;         // faults that the scenario met; 0 in the last round only
-    int64_t leakedBlocks = 0; // heap blocks the scenario left behind
+    int64_t leakedBlocks = 0; // heap blocks that the scenario leaked
     int leakedFds = 0;        // descriptors the scenario left open
     bool lockHeld = false;    // Child::CheckLock found a lock that another thread cannot get
-    bool crashed = false;     // ended by a signal, by a timeout or by an exit of its own
+    bool crashed = false;     // ended by a signal, a timeout or its own exit
     std::string notes;        // what Child::Note collected
 };
 
 class Child {
 public:
-    /// Runs `work` without faults and outside the counts of calls; its allocations still have to be balanced.
+    /// Runs `work` without faults and without counting its calls. Its allocations must still be balanced.
     void Unfaulted(const std::function<void()> &work);
 
-    /// Keeps a text for the report, up to 8 KiB in all. Allocates nothing.
+    /// Adds a text to the report, up to 8 KiB in all. Does not allocate.
     void Note(const char *text);
 
-    /// A sink for DVSLog_SetSink with this Child as argument: notes every message.
+    /// A sink for DVSLog_SetSink, with this Child as argument, that notes every message.
     static void NoteMessage(int level, const char *text, void *child);
 
-    /// Called by Sweep after each round, without faults, for each lock to look at: takes and releases it in a
-    /// thread of its own. A lock that it does not get within five seconds is held.
+    /// Sweep calls this after each round, without faults, for each lock to check: takes and releases it in a
+    /// separate thread. A lock that it does not get within 5 s is held.
     void CheckLock(const std::function<void()> &take, const std::function<void()> &release);
 
 private:
@@ -57,23 +57,23 @@ struct Options {
     uint64_t maxRounds = 20000;
     // Of one round.
     unsigned timeoutSeconds = 60;
-    // Run in the child before the scenario and after it, without faults. Heap blocks and descriptors are
-    // counted around all three, so what the first makes the last has to release.
+    // Run in the child before and after the scenario, without faults. Heap blocks and descriptors are counted
+    // around all three, so the last must release what the first creates.
     std::function<void(Child &)> prepare;
     std::function<void(Child &)> conclude;
-    // Go through the three once beforehand, so that what the process keeps from a first use is no leak.
+    // Runs all three once beforehand, so that one-time allocations of the process do not count as leaks.
     bool warmUp = false;
 };
 
 using Scenario = std::function<uint32_t(Child &)>;
 using Check = std::function<void(uint64_t k, const Report &)>;
 
-/// Runs the rounds and gives their number, the last one without a fault included. Fails the test when the
-/// plan does not parse, a child crashes, or the faults do not come to an end within `maxRounds`.
+/// Runs the rounds and returns their number, including the last one without a fault. Fails the test when the
+/// plan does not parse, a child crashes, or faults still occur after `maxRounds`.
 uint64_t Sweep(const std::string &plan, const Scenario &scenario, const Check &check,
                const Options &options = {});
 
-/// A number from an environment variable; `fallback` when it is not set or is not one.
+/// A number from an environment variable; `fallback` when it is unset or not a number.
 uint64_t FromEnvironment(const char *variable, uint64_t fallback);
 
 } // namespace fault

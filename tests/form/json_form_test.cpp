@@ -1,6 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The JSON form: nothing is lost on the way there and back, and what is wrong in a document is named by its
-// place.
+// The JSON form: conversion to JSON and back loses nothing, and errors name their place in the document.
 
 #include "form/json/codec.h"
 
@@ -114,7 +113,7 @@ TEST(JsonForm, KeepsEveryValue) {
 }
 
 TEST(JsonForm, KeepsEveryShortValue) {
-    // All values of one byte, and of two bytes from a set that holds every kind of byte.
+    // All values of one byte, and of two bytes from a set with every kind of byte.
     std::vector<NewEntry> properties;
     for (int i = 0; i < 256; ++i)
         properties.push_back(MakeProperty("p", Raw(std::string(1, static_cast<char>(i)))));
@@ -176,7 +175,7 @@ TEST(JsonForm, KeepsMissingAndUnusualFields) {
 TEST(JsonForm, KeepsDuplicates) {
     const NewEntry p = MakeProperty("twice", Number(1)), q = MakeProperty("twice", Text("other"), 0x10);
     ExpectSurvives(StateOf({MakeSwitch("s", {p, q, p}, {}, {}), MakeSwitch("s", {}, {}, {})}));
-    // A second field of one name is a port to every reader.
+    // Every reader treats a second field of the same name as a port.
     ExpectSurvives(OneSwitch(FieldsAnd({MakeList("maxPorts", {p}), MakeList("className", {})})));
 }
 
@@ -196,10 +195,10 @@ TEST(JsonForm, KeepsPortKindsHoweverTheyAreWritten) {
         {p, kind(Number(2))},       // as the library writes it
         {kind(Number(2)), p},       // not at the end
         {p, kind(Number(3), 0x20)}, // of another type
-        {p, kind(Number(1))},       // active, said aloud
-        {p, kind(Number(9))},       // no known kind
+        {p, kind(Number(1))},       // active, stated explicitly
+        {p, kind(Number(9))},       // an unknown kind
         {p, kind(Number(4)), kind(Number(2))},
-        {p, kind(Number(2), 1)}, // a load passes over it: active
+        {p, kind(Number(2), 1)}, // a load ignores it: active
         {p, kind(Number(4), 1), kind(Number(2))},
         {p, kind(Raw("\2\0\0\0x"s))}, // longer than its number
         {kind(Number(4))},
@@ -247,8 +246,8 @@ TEST(JsonForm, KeepsRandomStates) {
 }
 
 TEST(JsonForm, DropsOnlyBytesWithoutMeaning) {
-    // What the format leaves unspecified does not come back: name tails, padding, the reserved field, what
-    // stands behind an end marker. Everything else does.
+    // Bytes that the format leaves unspecified are dropped: name tails, padding, the reserved field, bytes
+    // after an end marker. Everything else is kept.
     Buffer state = SmallState();
     const Buffer clean = state;
     state[10] = 0x77;           // reserved

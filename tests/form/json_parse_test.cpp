@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The strict parser: what it refuses, and that it says where.
+// The strict parser: what it rejects, and the place that it reports.
 
 #include "form/json/parse.h"
 

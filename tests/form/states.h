@@ -2,7 +2,7 @@
 #ifndef TESTS_FORM_STATES_H
 #define TESTS_FORM_STATES_H
 
-// States for the tests of the command line, put together entry by entry.
+// States for the tests of the command line, built entry by entry.
 
 #include <cstdint>
 #include <string>
@@ -30,7 +30,7 @@ NewEntry MakeSwitch(std::string id, std::vector<NewEntry> global, std::vector<Ne
 /// Two switches, four ports (one of them a shadow), eight properties.
 Buffer SmallState();
 
-/// The checksums of the state's buffer, and of each buffer inside, made right again after a change.
+/// Recomputes the checksums of the state's buffer and of each nested buffer after a change.
 void Mend(Buffer &state);
 
 } // namespace dvs::form::test

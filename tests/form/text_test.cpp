@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Text on its way to a terminal, and name patterns.
+// Text for a terminal, and name patterns.
 
 #include "form/text.h"
 
@@ -115,7 +115,7 @@ TEST(Glob, MatchesWholeNames) {
 }
 
 TEST(Glob, ManyStarsTakeNoTime) {
-    // Exponential where a star tries every split for every star before it: this would not end.
+    // An exponential matcher, which tries every split for every star, would not finish.
     std::string pattern;
     for (int i = 0; i < 60; ++i)
         pattern += "a*";

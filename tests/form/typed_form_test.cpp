@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The typed form of known properties in documents: written where it loses nothing, read back as these bytes,
-// and refused by path and field where it is wrong.
+// The typed form of known properties in documents: written where it loses nothing, read back as the same
+// bytes, and rejected by path and field where it is wrong.
 
 #include <gtest/gtest.h>
 
@@ -33,7 +33,7 @@ Buffer PortState(const std::string &name, const Buffer &value) {
         std::vector<NewEntry>{MakeSwitch("s", {}, {}, {MakeList("7", {MakeProperty(name, value, 0x10)})})});
 }
 
-// A state of one port with one property, as people write it.
+// A state of one port with one property, as a user writes it.
 std::string Document(const std::string &property) {
     return R"({"switches": [{"id": "s", "version": 8, "class": "etherswitch", "max_ports": 512, "global": [],
         "host": [], "ports": [{"id": "7", "properties": [)" +
@@ -78,7 +78,7 @@ TEST(TypedForm, LeavesValuesThatReadWellAsTheyAre) {
 }
 
 TEST(TypedForm, KeepsBytesThatItWouldNotGiveBack) {
-    // The reserved field of the record has no place in a tree.
+    // The typed form has no member for the record's reserved field.
     const Buffer value = Raw("\0\0\x64\0\x01\0\0\0"s);
     const json::object property = Written(PortState(kVlan, value));
     EXPECT_EQ(property.at("value").at("hex"), "0000640001000000");
@@ -116,7 +116,7 @@ TEST(TypedForm, IsReadInsteadOfBytes) {
 }
 
 TEST(TypedForm, FollowsTheSwitchesVersion) {
-    // Overlay switches have the version texts of others, and numbers of their own.
+    // Overlay switches use the same version texts as others, with different numbers.
     for (const std::uint32_t version : {8u, 108u}) {
         const std::string text =
             R"({"switches": [{"id": "s", "version": )" + std::to_string(version) +
@@ -173,7 +173,7 @@ TEST(TypedForm, SaysWhereFieldsBelong) {
 }
 
 TEST(TypedForm, RefusesWhatWouldReadBackOtherwise) {
-    // The record counts bytes: three bits are none.
+    // The record counts bytes; three bits are not a whole byte.
     const Error error = Refusal(Named(
         kShaper, R"("typed": {"average_bandwidth": 8003, "peak_bandwidth": 8000, "burst_size": 8000})"));
     EXPECT_NE(error.path.find("average_bandwidth"), std::string::npos) << error.path;

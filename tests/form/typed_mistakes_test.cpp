@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Mistakes that people make in typed values: each is refused by its whole place, with what is wrong there.
+// Common mistakes in typed values: each is rejected with its full path and the reason.
 
 #include <gtest/gtest.h>
 
@@ -10,7 +10,7 @@ namespace {
 
 using namespace dvs::form;
 
-// Of the port's list; the place of every error begins with it.
+// In the port's list; the path of every error begins with it.
 constexpr std::string_view kPlace = "$.switches[0].ports[0].properties[0].typed";
 
 void ExpectRefusal(const std::string &name, const std::string &typed, const std::string &place,

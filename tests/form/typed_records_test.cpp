@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Types whose road through the store loses something by design: what people read and write of them is whole.
+// Types that lose data in a round trip through the store by design: their typed form is complete.
 
 #include <gtest/gtest.h>
 
@@ -40,7 +40,7 @@ std::map<std::string, std::string> Fields(const char *key, const Built &built, s
     return fields;
 }
 
-// What is written reads back as it was given, and builds these bytes again.
+// A written value reads back unchanged and builds the same bytes.
 void ExpectWhole(const char *key, const char *text, std::uint32_t version = 8) {
     const Built built = Build(key, text, version);
     ASSERT_TRUE(built.ok) << built.field << " " << built.reason;

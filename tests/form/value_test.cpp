@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// How values look, and bytes as digits and back.
+// The display form of values, and bytes as digits and back.
 
 #include "form/value.h"
 
@@ -61,8 +61,8 @@ TEST(Value, ShowsListsOfNames) {
     const std::string uplinks = Slots(2, {"uplink1", "uplink2"}, 81), keys = Slots(1, {"17"}, 48);
     EXPECT_EQ(ShowValue(AsBytes(uplinks), false), "[\"uplink1\", \"uplink2\"]");
     EXPECT_EQ(ShowValue(AsBytes(keys), false), "[\"17\"]");
-    EXPECT_EQ(LookAt(AsBytes(Slots(3, {"uplink1", "uplink2"}, 81))).form, ValueForm::Raw); // the count lies
-    EXPECT_EQ(LookAt(AsBytes(Slots(1, {"a\0b"s}, 48))).form, ValueForm::Raw); // rest behind the NUL
+    EXPECT_EQ(LookAt(AsBytes(Slots(3, {"uplink1", "uplink2"}, 81))).form, ValueForm::Raw); // wrong count
+    EXPECT_EQ(LookAt(AsBytes(Slots(1, {"a\0b"s}, 48))).form, ValueForm::Raw); // bytes after the NUL
     EXPECT_EQ(LookAt(AsBytes(Slots(1, {std::string(48, 'x')}, 48))).form, ValueForm::Raw); // no NUL
     EXPECT_EQ(LookAt(AsBytes(Slots(1, {""}, 48))).form, ValueForm::Raw);
 }
@@ -74,7 +74,7 @@ TEST(Value, CutsLongOnesUnlessAskedForAll) {
     EXPECT_EQ(ShowValue(AsBytes(bytes), true).size(), 299u + std::string(" (100 bytes)").size());
     const std::string text = std::string(119, 'a') + "ä" + std::string(500, 'b') + '\0';
     const std::string cut = ShowValue(AsBytes(text), false);
-    EXPECT_TRUE(IsUtf8(cut)); // not cut inside a character
+    EXPECT_TRUE(IsUtf8(cut)); // not truncated inside a character
     EXPECT_NE(cut.find("(622 bytes)"), std::string::npos);
 }
 

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Fuzz target of everything that reads a serialized list: both deserializers, the in-place reader and the
-// view, which must agree. The first byte says whether the header is mended first, so that the fuzzer need not
-// guess checksums.
+// Fuzz target of all readers of serialized lists: both deserializers, the in-place reader and the view, which
+// must agree. The first byte says whether to recompute the header first, so that the fuzzer need not guess
+// checksums.
 //
 //     cmake --preset clang -DDVS_BUILD_FUZZERS=ON && cmake --build --preset clang --target data_fuzz
 //     build/clang/bin/data_fuzz -max_total_time=300 -max_len=4096 tests/golden
@@ -41,7 +41,7 @@ void WalkNested(dvs::data::Bytes bytes, std::size_t offset, int depth) {
         if (depth > 0) WalkNested(entry.value, entry.ValueOffset(), depth - 1);
 }
 
-/// What the library writes of a list must read back as the same list.
+/// A list that the library writes must read back as the same list.
 void RoundTrip(DVSData *list) {
     void *buf = nullptr;
     std::uint32_t len = 0;

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Fuzz target of the converters: a property's bytes are saved into an object, loaded again and described. The
-// first three bytes say which property, on which kind of switch; the rest is the value. Mutations are made by
-// the property's record, so that the fuzzer need not guess counts and offsets.
+// Fuzz target of the converters: saves a property's bytes into an object, loads them again and describes
+// them. The first three bytes select the property and the kind of switch; the rest is the value. Mutations
+// follow the property's record, so that the fuzzer need not guess counts and offsets.
 //
 //     cmake --preset clang -DDVS_BUILD_FUZZERS=ON && cmake --build --preset clang --target property_fuzz
 //     build/clang/bin/property_fuzz -max_total_time=300 -max_len=8192
@@ -45,8 +45,7 @@ void *Allocate(std::uint64_t size) {
     return std::malloc(size);
 }
 
-// Both directions over a fresh object. A filter whose texts do not fit ends the process on load, as it
-// should.
+// Both directions over a fresh object. A filter whose texts do not fit aborts the process on load by design.
 void Convert(const Choice &choice, const std::uint8_t *value, std::size_t size) {
     configstore::Object *object = nullptr;
     if (configstore::CreateObject("switches", "network_vds", "qel", "fuzz", "{}", &object)) std::abort();
@@ -84,7 +83,7 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t *data, std::size_t size
     return 0;
 }
 
-// Half of the mutations are the fuzzer's own; the others make a new value by the record, sound or with lies.
+// Half of the mutations are the fuzzer's own; the others build a new value from the record, valid or damaged.
 extern "C" std::size_t LLVMFuzzerCustomMutator(std::uint8_t *data, std::size_t size, std::size_t maxSize,
                                                unsigned seed) {
     if (seed % 2 || size < kHeadSize || maxSize < kHeadSize) return LLVMFuzzerMutate(data, size, maxSize);

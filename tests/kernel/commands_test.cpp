@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every command: its number and every byte of its record, and the search by external id.
+// Tests the number and every byte of the record of each command, and the search by external id.
 
 #include <cerrno>
 #include <cstring>
@@ -18,7 +18,7 @@ const char kValue[] = "value";
 
 struct CommandRow {
     const char *name;
-    int number; // as the module knows it: written out, so that a renumbered command shows
+    int number; // a literal, so that the test detects a renumbered command
     std::function<HYP_ReturnStatus()> call;
     std::string record; // without the addresses and length of a receive buffer
     bool fetches;

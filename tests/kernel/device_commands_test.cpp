@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The table of device commands: lookups by number, and its copy in docs/emulator.md.
+// Tests the table of device commands: lookups by number, and the copy of the table in docs/emulator.md.
 
 #include <fstream>
 #include <sstream>

@@ -42,7 +42,7 @@ void FakeDevice::Reset() {
     calls.clear();
     opened = closed = 0;
     openedPaths.clear();
-    // Descriptors stay open: the library keeps the one of its plain calls.
+    // Descriptors stay open: the library caches the one of its plain calls.
 }
 
 int FakeDevice::Open(const char *path) {
@@ -104,7 +104,7 @@ int FakeDevice::Answer(int request, DVSHYPRequest *record, const Step &step) {
 }
 
 RecordBytes::RecordBytes() : bytes_(424, '\0') {
-    Word(256, 0x0bad0001); // preset by every sender
+    Word(256, 0x0bad0001); // every sender presets this
 }
 
 RecordBytes &RecordBytes::Text(std::size_t offset, const std::string &text) {

@@ -2,8 +2,8 @@
 #ifndef TESTS_KERNEL_FAKE_DEVICE_H
 #define TESTS_KERNEL_FAKE_DEVICE_H
 
-// A scripted switching module behind platform/device.h: it notes every call with all bytes of its record, and
-// answers as a test says. Test programs that link it leave the embedded device out.
+// A scripted switching module that implements platform/device.h. It records every call with all bytes of its
+// record and replies as the test specifies. Test programs that link it omit the embedded device.
 
 #include <cerrno>
 #include <cstdint>
@@ -21,25 +21,25 @@ namespace dvs::test {
 
 using device::Command;
 
-/// One ioctl as the module saw it going in.
+/// One ioctl as the module received it.
 struct DeviceCall {
     int fd;
     int request;
     std::string record; // 424 bytes
-    std::string value;  // what `data` held, where it is a value
+    std::string value;  // the contents of `data` when it is a value
 };
 
-/// One answer: what becomes of the record, the errno, the bytes written.
+/// One reply: the changes to the record, the errno, the bytes written.
 struct Step {
     int error = 0;       // 0: the call succeeds
-    int64_t status = -1; // -1: left as preset
-    int64_t length = -1; // dataLen or cmdOutLen; -1: left
-    std::string reply;   // copied into the receive buffer, as much as its capacity allows
+    int64_t status = -1; // -1: keeps the preset
+    int64_t length = -1; // dataLen or cmdOutLen; -1: unchanged
+    std::string reply;   // copied into the receive buffer, up to its capacity
 };
 
 class FakeDevice {
 public:
-    /// The one that HostDevice_* answer for; emptied between tests.
+    /// The instance behind HostDevice_*; reset between tests.
     static FakeDevice &Get();
     void Reset();
 
@@ -47,8 +47,8 @@ public:
     int openError = ENOENT;  // while not present
     std::deque<Step> script; // consumed first
     std::map<Command, std::string>
-        replies;                    // then: the value this command returns, with a module's growing sizes
-    std::map<Command, Step> always; // then: the answer to each of this command
+        replies;                    // then: this command's value, with size negotiation as in a module
+    std::map<Command, Step> always; // then: the reply to each call of this command
 
     std::vector<DeviceCall> calls;
     std::set<int> open;
@@ -65,8 +65,7 @@ private:
     int nextFd_ = 1000;
 };
 
-/// Writes fields at their offsets into a record of zeroes; built by hand, apart from the library's record
-/// type.
+/// Writes fields at their offsets into a zeroed record. Does not use the library's record type.
 class RecordBytes {
 public:
     RecordBytes();
@@ -79,7 +78,7 @@ private:
     std::string bytes_;
 };
 
-/// The messages of the library while it lives, as "level:text".
+/// Collects the library's messages while it lives, as "level:text".
 class MessageLog {
 public:
     MessageLog();

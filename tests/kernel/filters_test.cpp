@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The name filters over property lists, each entry judged by itself.
+// The name filters of property lists. Each entry is filtered independently.
 
 #include <cstdlib>
 

@@ -1,7 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A module that lies: for each function that receives, many kinds of answer that no honest module gives.
-// Nothing is read or written outside a buffer, nothing leaks, the table is empty afterwards, and a failure
-// hands nothing out.
+// A hostile module: each receiving function gets many kinds of invalid reply. The library must not read or
+// write outside a buffer, must not leak, must leave the table empty, and must return no data on failure.
 
 #include <cerrno>
 #include <cstring>
@@ -20,7 +19,7 @@ namespace {
 
 struct Receiver {
     const char *name;
-    Command command; // what the module is asked first
+    Command command; // the first command sent to the module
     std::function<HYP_ReturnStatus(void **)> call;
     bool givesList;
 };
@@ -76,14 +75,14 @@ std::vector<Receiver> Receivers() {
     };
 }
 
-/// A call that hands nothing out: the module has a status to give, and all that it writes is refused.
+/// A call without output data: the module may only return a status; any data it writes is rejected.
 struct Sender {
     const char *name;
     Command command;
     std::function<HYP_ReturnStatus()> call;
 };
 
-// Not constant, and as large as its length says: a module may write to it all the same.
+// Not constant, and as large as its stated length: a hostile module may write to it.
 char g_value[64];
 
 std::vector<Sender> Senders() {
@@ -135,7 +134,7 @@ std::string WrongIds() {
 }
 
 std::string WithoutNul(std::string state) {
-    // A switch id that fills its whole field; the name's tail is outside the sum for the first 16 bytes only.
+    // A switch id that fills its whole field. The checksum excludes only the first 16 bytes of the name.
     std::memset(state.data() + 16, 'n', 16);
     return state;
 }
@@ -189,7 +188,7 @@ protected:
     void Try(const Receiver &receiver, const std::deque<Step> &steps, const std::string &what) {
         device.Reset();
         device.script = steps;
-        // Whatever else is asked meanwhile, a version say, is answered with a lie as well.
+        // Any other request, such as one for the version, gets an invalid reply too.
         for (const Command command :
              {Command::StateGet, Command::GlobalPropGet, Command::PortStateGet, Command::CmdExec})
             device.always[command] = {EIO, HYP_BAD_PARAM, 0, {}};
@@ -271,7 +270,7 @@ TEST_F(HostileModule, MutatedStatesAndPortsAreTakenOrRefused) {
         for (unsigned change = 1 + random() % 4; change > 0; change--)
             reply[random() % reply.size()] = static_cast<char>(random());
         if (random() % 4 == 0) reply.resize(random() % reply.size());
-        // Half of them with a sum that fits, so that what lies behind it is reached.
+        // Half of them get a valid checksum, so that the code after the checksum test is reached.
         uint32_t sum = 0;
         for (std::size_t at = 32; at + 4 <= reply.size(); at += 4) {
             uint32_t word = 0;

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// When the lock "dvshyp" is held: taken once the module's state is fetched, given up once the table it was
-// loaded into is empty again, whatever happens between; and not taken at all by what needs no table. The
-// runtime's lock functions are wrapped at link time.
+// Tests how long the lock "dvshyp" is held. It is taken after the module's state is fetched and released
+// after the table is empty again, on every path. Functions that need no table do not take it. The runtime's
+// lock functions are wrapped at link time.
 
 #include <cerrno>
 #include <functional>
@@ -27,7 +27,7 @@ namespace {
 
 using Strings = std::vector<std::string>;
 
-/// What the wrapped functions note, while `watching`.
+/// The calls that the wrapped functions record while `watching`.
 struct Watch {
     bool watching = false;
     MXUserRecLock *hyp = nullptr;
@@ -35,7 +35,7 @@ struct Watch {
     Strings events;
 
     void Note(const std::string &what) {
-        watching = false; // looking at the table takes the other lock
+        watching = false; // reading the table takes the other lock
         const std::string calls = " after call " + std::to_string(FakeDevice::Get().calls.size());
         events.push_back(what + calls + (TableIsEmpty() ? ", table empty" : ", table in use"));
         watching = true;
@@ -78,7 +78,7 @@ protected:
         return g_watch.events;
     }
 
-    /// Taken before anything is loaded, given up with the table empty, both once.
+    /// The lock is taken once, before the load, and released once, with the table empty.
     static Strings Span(int calls = 1) {
         return {"taken after call 1, table empty",
                 "given up after call " + std::to_string(calls) + ", table empty"};
@@ -109,7 +109,7 @@ protected:
     struct Row {
         const char *name;
         std::function<HYP_ReturnStatus(const char *sw)> call;
-        int calls; // to the device when the switch is there
+        int calls; // device calls when the switch exists
     };
     std::vector<Row> Rows() {
         return {

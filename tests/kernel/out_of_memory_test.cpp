@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every function of the kernel interface that allocates, with each of its allocations failed in turn: a
-// status of its own, nothing handed out, nothing leaked, no lock held, the table empty. And the one block
-// that does stay allocated.
+// Fails each allocation of every kernel interface function in turn. Each call must return its documented
+// status and no data, leak nothing, hold no lock, and leave the table empty. Also tests the one block that
+// stays allocated by design.
 
 #include <algorithm>
 #include <cerrno>
@@ -23,7 +23,7 @@ namespace {
 
 using device::Command;
 
-/// What the module answers, by command; it allocates nothing while faults are armed.
+/// The module's replies by command. It allocates nothing while faults are armed.
 std::map<Command, std::string> g_replies;
 
 struct Row {
@@ -117,12 +117,12 @@ TEST(KernelWithoutMemory, EveryOperationFailsCleanly) {
                 return status;
             },
             [&](uint64_t k, const fault::Report &report) {
-                // Inside serialization every failure is "exists"; a failed query for the version is ignored.
+                // Serialization maps every failure to HYP_EXISTS. A failed version query is ignored.
                 const bool expected = report.status == HYP_NO_MEMORY || report.status == HYP_EXISTS ||
                                       (report.status == HYP_OK && std::strstr(row.name, "Vendor"));
                 EXPECT_TRUE(report.hits == 0 ? report.status == HYP_OK : expected)
                     << row.name << " " << k << ": " << std::hex << report.status;
-                // The state file's contents stay allocated where they do not load; see KernelLeaks below.
+                // State file contents that do not load stay allocated; see KernelLeaks below.
                 const bool fromFile = std::strstr(row.name, "WithFile") != nullptr;
                 EXPECT_LE(report.leakedBlocks, fromFile && report.hits > 0 ? 1 : 0) << row.name << " " << k;
                 EXPECT_EQ(report.leakedFds, 0) << row.name << " " << k;
@@ -134,7 +134,7 @@ TEST(KernelWithoutMemory, EveryOperationFailsCleanly) {
     }
 }
 
-/// The only line of its own that a command prints, and the only one without a line end.
+/// This is the only line that a command prints itself, and the only one without a newline.
 TEST(KernelWithoutMemory, CmdExecSaysThatItsBufferIsMissing) {
     Serve();
     g_size = 77;
@@ -162,7 +162,7 @@ TEST(KernelWithoutMemory, CmdExecSaysThatItsBufferIsMissing) {
     EXPECT_EQ(refused, 1U);
 }
 
-/// A fetch says nothing, and tells the size that it could not get.
+/// A fetch prints nothing and returns the size that it failed to allocate.
 TEST(KernelWithoutMemory, AFetchTellsTheSizeOfItsMissingBuffer) {
     Serve();
     fault::Options options;
@@ -189,7 +189,7 @@ TEST(KernelWithoutMemory, AFetchTellsTheSizeOfItsMissingBuffer) {
         options);
 }
 
-/// Stated behaviour: where the state file's contents do not load, they stay allocated.
+/// Documented behaviour: state file contents that do not load stay allocated.
 TEST(KernelLeaks, TheContentsOfAStateFileThatDoesNotLoadStayAllocated) {
     Serve();
     const TempDir directory;

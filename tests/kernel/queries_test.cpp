@@ -25,7 +25,7 @@ protected:
 
     using Query = std::function<HYP_ReturnStatus(DVSData **)>;
 
-    /// The names in the list a query hands out, or its status as the only one.
+    /// The names in the list that a query returns, or its status as the only element.
     Strings Names(const Query &query) {
         DVSData *list = nullptr;
         const HYP_ReturnStatus status = query(&list);
@@ -89,8 +89,8 @@ TEST_F(Queries, VendorListsAskTheModuleForTheVersion) {
 }
 
 TEST_F(Queries, NamesThatGoAboveVersion106StayAt106) {
-    // Of the two names that go above 106 teaming never gets that far: it is below "com.orbeno.vswitch.", of
-    // which only the exact name of the exception survives.
+    // Two names are omitted above 106. An earlier filter already removes teaming: of the names below
+    // "com.orbeno.vswitch.", it keeps only the exact name of the exception.
     StateBuilder state;
     state.Switch("s");
     for (const char *name :

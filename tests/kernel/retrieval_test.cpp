@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The persistent state: what of the module's live state is kept, with and without a state file.
+// The persistent state: which parts of the module's live state are kept, with and without a state file.
 
 #include <cerrno>
 #include <cstring>
@@ -24,7 +24,7 @@ class Retrieval : public testing::Test, protected FakeDeviceTest {
 protected:
     ~Retrieval() override { EXPECT_TRUE(TableIsEmpty()); }
 
-    /// The persistent state of what the module serves.
+    /// The persistent state of the state that the module serves.
     std::string Persist(const char *stateFile = nullptr, HYP_ReturnStatus expected = HYP_OK) {
         void *out = nullptr;
         uint32_t outLen = 0;

@@ -2,7 +2,7 @@
 #ifndef TESTS_KERNEL_STATE_SUPPORT_H
 #define TESTS_KERNEL_STATE_SUPPORT_H
 
-// States for the fake module to serve, built in the process's own table, which is empty again afterwards.
+// States for the fake module to serve, built in the process's own table. The table is emptied afterwards.
 
 #include <string>
 #include <vector>
@@ -41,11 +41,11 @@ public:
     StateBuilder &Port(const std::string &id, const std::string &port, const Pairs &pairs = {},
                        uint32_t kind = 1);
 
-    /// The state, or the state of one switch; the table is empty afterwards.
+    /// The state, or the state of one switch. Empties the table.
     std::string Serialize();
 };
 
-/// A serialized state loaded into the table for as long as this lives.
+/// Keeps a serialized state loaded in the table while it lives.
 class LoadedState {
 public:
     explicit LoadedState(const std::string &state);

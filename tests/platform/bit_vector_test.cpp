@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Bit vectors against std::vector<bool>, at and around the boundaries of their 64-bit words.
+// Compares bit vectors with std::vector<bool>, at and around the boundaries of their 64-bit words.
 
 #include "platform/runtime.h"
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The port limit's sources in their order, and what each refuses.
+// The sources of the port limit in their order of precedence, and the values that each rejects.
 
 #include "platform/kit.h"
 

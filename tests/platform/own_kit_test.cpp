@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A program with a system-information interface of its own: all of platform/kit.h is defined here, and the
-// static archives bring the rest.
+// A program with its own system-information interface: it defines all of platform/kit.h and takes the rest
+// from the static archives.
 
 #include "platform/kit.h"
 
@@ -50,8 +50,8 @@ protected:
     std::string said_;
 };
 
-// The limit is read once in a process, and each of these is a process of its own under ctest; run together,
-// the failures come first.
+// The limit is read once per process. ctest runs each test in its own process; for runs of the whole program,
+// the failing reads come first.
 
 TEST_F(OwnKit, AFailedSignatureCheckFailsTheFirstAdd) {
     g_signatureStatus = HYP_NOT_SUPPORTED;

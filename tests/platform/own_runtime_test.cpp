@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A program with a host runtime of its own: the whole of platform/runtime.h is defined here, and the static
-// archives bring the rest. That this links at all is the first half of the test.
+// A program with its own host runtime: it defines all of platform/runtime.h and takes the rest from the
+// static archives. Linking is the first half of the test.
 
 #include "platform/runtime.h"
 
@@ -33,7 +33,7 @@ std::string g_logged;
 uint32_t g_logLevel;
 int g_held;
 int g_created;
-bool g_bitsStay = false; // clearing a bit comes to nothing
+bool g_bitsStay = false; // clearing a bit has no effect
 uint32_t g_bitsAsked;
 
 } // namespace
@@ -163,8 +163,8 @@ DVSData *NewData() {
     return data;
 }
 
-// A port is looked for from the first marked slot on, and a marked slot without a port ends that. Where the
-// vector forgets nothing, every port but the first is thus out of reach.
+// A port lookup starts at the first marked slot and ends at a marked slot without a port. If clearing a bit
+// has no effect, only the first port can be removed.
 TEST(OwnRuntime, WhoseBitsStayLeavesASwitchWithThePortsThatCannotGo) {
     ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 9), HYP_OK);
     for (int i = 0; i < 100; i++)

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A program with status texts of its own (platform/status_text.h); the static archives bring the rest.
+// A program with its own status texts (platform/status_text.h); the rest comes from the static archives.
 
 #include "platform/status_text.h"
 

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Recursive locks: one per storage whoever makes it, recursion, exclusion, and the checks of debug builds.
+// Recursive locks: one per storage regardless of the creator, recursion, exclusion, and debug-build checks.
 
 #include "platform/runtime.h"
 

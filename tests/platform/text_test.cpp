@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Formatted blocks, the checked copy, error texts, status texts and the host's log.
+// Formatted text blocks, the checked copy, error texts, status texts and the host's log.
 
 #include "platform/runtime.h"
 #include "platform/status_text.h"

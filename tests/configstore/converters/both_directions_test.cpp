@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every converter in both directions, byte for byte, on a switch of each class: one row a key, with a value,
-// what a save makes of it in the store, and what a load makes of that. The odd cases are in the tests of the
-// families; here it is checked that no key and no converter is missing.
+// Every converter in both directions, byte for byte, on a switch of each class. One row per key: a value, the
+// stored form after a save, and the loaded value. Special cases are in the tests of the families; this test
+// checks that every key and every converter is covered.
 
 #include <set>
 #include <sstream>
@@ -14,7 +14,7 @@ namespace {
 
 constexpr const char *kClasses[] = {"etherswitch", "vswitch", "cswitch"};
 
-// What is loaded on a switch of each class.
+// The loaded value on a switch of each class.
 struct Loaded {
     Properties on[3];
 };
@@ -38,7 +38,7 @@ Loaded Mtu(uint32_t mtu) {
     loaded.on[1]["com.orbeno.vswitch.mtu"] = Bytes().U32(mtu);
     return loaded;
 }
-// Only cswitches, of the three at this version, have the vswitch key.
+// At this version, only cswitches have the vswitch key.
 Loaded PrivateVlans(const Bytes &value) {
     const char *key = "com.orbeno.etherswitch.pvlanMap";
     return {{{{key, value}}, {{key, value}}, {{"com.orbeno.vswitch.pvlanMap", value}}}};
@@ -57,7 +57,7 @@ Bytes LoadedTeaming(uint32_t policy) {
     return Uplinks(Bytes().U32(policy).U32(0x2a0).U32(0).U32(0x2a));
 }
 
-// One session from port 10 to port 12 and the other way round; what the load makes of its head and ports.
+// One session from port 10 to port 12 and in reverse; the loaded head and ports.
 Bytes Session(uint32_t length, uint32_t flags, uint16_t receive, uint16_t transmit) {
     return Bytes()
         .Text("key", 32)
@@ -91,7 +91,7 @@ Bytes LoadedMirrorTable() {
     return table.Zeros(7 * 36);
 }
 
-// What saves of the two leave in the store; the rows have the rest of it.
+// The lines that both saves leave in the store; the rows contain the rest.
 const std::string kSession =
     "~[key] {}\n"
     "~[key]/key = \"key\"\n"
@@ -139,8 +139,8 @@ struct Row {
     uint32_t type, propClass;
     const char *key;
     Bytes value;
-    const char *place;   // of what is saved, and in its lines the `~`
-    std::string content; // after the save
+    const char *place;   // the place of the saved object; replaces `~` in its lines
+    std::string content; // the store's lines after the save
     Loaded loaded;
     bool isForVswitchesOnly = false; // etherswitches save nothing
 };
@@ -372,7 +372,7 @@ const std::vector<Row> kRows = {
 };
 
 struct BothDirections : ConverterTest {
-    // The saved lines, without those of the objects on the way.
+    // The saved lines, without those of the objects on the path.
     [[nodiscard]] std::string Content(const std::string &place) const {
         std::string lines;
         std::istringstream dump(fake_store::Dump(object));
@@ -383,7 +383,7 @@ struct BothDirections : ConverterTest {
         }
         return lines;
     }
-    // The class, the version and the flag are there before the save, so they load as well.
+    // The class, the version and the flag exist before the save, so they load too.
     static bool IsSaved(const std::string &path) {
         return !path.starts_with("/product") && path != "/ovl_enabled";
     }
@@ -416,7 +416,7 @@ TEST_F(BothDirections, OfEveryKeyOnEveryClass) {
 TEST_F(BothDirections, HaveARowForEveryKeyAndConverter) {
     std::set<std::string> keys;
     std::set<uint32_t> types = {22, 30,
-                                33}; // unmapped_test.cpp has those of the rows "DEFAULT"; 30 is nobody's
+                                33}; // unmapped_test.cpp covers the "DEFAULT" rows; 30 is unassigned
     for (const Row &row : kRows) {
         keys.insert(row.key);
         types.insert(row.type);

@@ -75,7 +75,7 @@ void ConverterTest::BecomeSwitch(const char *className, const char *version, boo
 }
 
 int32_t ConverterTest::Save(uint32_t propClass, const std::string &key, const std::vector<uint8_t> &value) {
-    // A null block for no bytes, as a list would hand it out.
+    // A null block for an empty value, as a list returns it.
     const std::unique_ptr<uint8_t[]> block(value.empty() ? nullptr : new uint8_t[value.size()]);
     if (block) std::memcpy(block.get(), value.data(), value.size());
     return SaveProp(object, key.c_str(), block.get(), static_cast<uint32_t>(value.size()), propClass, 0x20);
@@ -93,7 +93,7 @@ Properties ConverterTest::Load(uint32_t propClass, configstore::Object *trafficR
     EXPECT_EQ(HYP_OK, DVSData_Deserialize(&innerHandle, entry->data, entry->dataLen, Allocate, std::free));
     const List inner(innerHandle);
     for (const DVSDataEntry *each = innerHandle->head; each; each = each->next) {
-        // Unmapped properties keep the type they were saved with.
+        // Unmapped properties keep their saved type.
         if (std::strcmp(each->name, "DEFAULT") != 0) {
             EXPECT_EQ(16u, each->propType) << each->name;
         }

@@ -2,8 +2,8 @@
 #ifndef TESTS_CONFIGSTORE_CONVERTERS_CONVERTER_FIXTURE_H
 #define TESTS_CONFIGSTORE_CONVERTERS_CONVERTER_FIXTURE_H
 
-// What the tests of converters share: an object of the store double, values built field by field, a save of
-// one property and a load of all, through the frame as everybody calls it.
+// Helpers of the converter tests: an object of the store double, values built field by field, a save of one
+// property and a load of all properties through the public frame.
 
 #include <gtest/gtest.h>
 
@@ -42,33 +42,33 @@ private:
 
 using Properties = std::map<std::string, std::vector<uint8_t>>;
 
-/// A switch's or port's object of its own. Everything handed out is back when the test ends.
+/// A separate switch or port object. Checks at the end of the test that all handles are released.
 class ConverterTest : public testing::Test {
 protected:
     ConverterTest();
     ~ConverterTest() override;
 
-    /// The class code by the class's name, the object's "product" as a save leaves it, and the width of port
-    /// records.
+    /// Sets the class code from the class name, the object's "product" as after a save, and the port record
+    /// width.
     void BecomeSwitch(const char *className, const char *version = "7.0.3", bool overlay = false);
 
-    /// SaveProp of a copy of the value in a block of just its size.
+    /// Calls SaveProp with a copy of the value in a block of exactly its size.
     int32_t Save(uint32_t propClass, const std::string &key, const std::vector<uint8_t> &value);
 
-    /// LoadProps; the status is kept in loadStatus. Every property must have the type 16.
+    /// Calls LoadProps and keeps its status in loadStatus. Every property must have type 16.
     Properties Load(uint32_t propClass, configstore::Object *trafficResources = nullptr);
-    /// The one property of a load; empty and absent are told apart.
+    /// The only property of a load; distinguishes empty from absent.
     std::optional<std::vector<uint8_t>> LoadOne(uint32_t propClass, const std::string &key);
 
     /// The object's members as text, without those that BecomeSwitch made.
     [[nodiscard]] std::string Dump() const;
 
-    /// A sub-object on the way from the root, created where it is absent. "name[id]" is an instance.
+    /// The sub-object at a path from the root; absent objects are created. "name[id]" is an instance.
     configstore::Object *Sub(const std::string &path);
 
     configstore::Object *object = nullptr;
     int32_t loadStatus = 0;
-    std::string messages; // what would have been printed so far
+    std::string messages; // the messages so far
 };
 
 } // namespace converter_test

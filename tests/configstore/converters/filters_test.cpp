@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Traffic filters of a port: variable sizes, the overlapping load, and the copies that end the process.
+// Traffic filters of a port: variable sizes, the overlapping load, and the copies that abort the process.
 
 #include "configstore/converters/converter_fixture.h"
 
@@ -63,7 +63,7 @@ TEST_F(Filters, LaterFiltersAreLoadedOverEarlierParameters) {
                           .U32(2)
                           .Add(Filter(1, "one", 1, {std::string(100, 'p')}))
                           .Add(Filter(2, "two", 0, {"q"}))));
-    // The second filter begins where the first one's parameter stands, and the end stays as it was.
+    // The second filter overwrites the first one's parameter; the end of the value is unchanged.
     Bytes expected = Bytes().U32(2).Add(Filter(1, "one", 1, {std::string(100, 'p')})).Zeros(52 + 260);
     const Bytes second = Filter(2, "two", 0, {"q"});
     for (const auto &[from, to] :
@@ -131,7 +131,7 @@ TEST_F(Filters, RefusesCountsBeyondTheValue) {
 
 TEST_F(Filters, TextsWithoutNulEndWithTheValue) {
     Bytes value = Bytes().U32(1).Add(Filter(1, std::string(40, 'a'), 0x01010101, {std::string(256, 'p')}));
-    // The agent's name runs on through the count (1, 0, 0, 0) and stops there.
+    // The agent's name continues into the count (1, 0, 0, 0) and ends there.
     ASSERT_EQ(0, Save(kPort, kKey, value));
     EXPECT_NE(std::string::npos, Dump().find("agent_name = \"" + std::string(40, 'a') + "\\x01\"\n"));
     EXPECT_NE(std::string::npos, Dump().find("parameters[] = \"" + std::string(256, 'p') + "\"\n"));
@@ -140,7 +140,7 @@ TEST_F(Filters, TextsWithoutNulEndWithTheValue) {
 TEST_F(Filters, ListsThatBecomeReadableLateFindNoRoom) {
     Stored("1", "1", {"a", "b"});
     const auto whole = LoadOne(kPort, kKey);
-    // The first read of the parameters is the one that makes room.
+    // The first read of the parameters allocates their room.
     for (int call = 1; call < 40; ++call) {
         fake_store::FailCall(call, configstore::IO_ERROR);
         const auto loaded = LoadOne(kPort, kKey);

@@ -1,8 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Values nobody should write, for every row of the tables: any length, any bytes, counts and indexes that
-// lie, texts without end. Each is in a block of just its size, so that the sanitizers see every byte read too
-// far; and documents nobody should store, for a store without limits. DVS_HOSTILE_VALUES sets how many of
-// each are tried.
+// Hostile values for every row of the tables: any length, any bytes, wrong counts and indexes, unterminated
+// texts. Each lies in a block of exactly its size, so that sanitizers report any overread. Also hostile
+// documents, in a store without limits. DVS_HOSTILE_VALUES sets the number of each.
 
 #include <cstdlib>
 
@@ -45,7 +44,7 @@ struct Hostile : ConverterTest {
     ~Hostile() override { dvsconfigstore_debug = 10; }
 
     void Renew(const char *className, bool wide) {
-        fake_store::Reset(); // the double keeps a record of all its calls
+        fake_store::Reset(); // the double records all its calls
         configstore::DestroyObject(object);
         ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "id", "{}", &object));
         BecomeSwitch(className, "7.0.3", wide);
@@ -54,7 +53,7 @@ struct Hostile : ConverterTest {
     // Saves, and describes, and loads what got into the store.
     void Try(const Row &row, const std::vector<uint8_t> &value) {
         const int32_t status = Save(row.propClass, row.entry->key, value);
-        // The store refuses texts that are none, and an instance with an empty id beside others.
+        // The store rejects invalid texts, and an instance with an empty id among others.
         ASSERT_TRUE(status == 0 || status == -1 || status == configstore::BAD_PARAMETER ||
                     status == configstore::SCHEMA_VIOLATION)
             << row.entry->key << status;
@@ -106,7 +105,7 @@ TEST_F(Hostile, LyingValuesAreRefusedOrBounded) {
 // --- Documents ---
 
 struct HostileDocument : Hostile {
-    // Longest texts by type: of filters, what does not end the process.
+    // The longest texts by type; for filters, the longest that does not abort the process.
     std::string Text(const StoreField &form, ConverterType type) {
         if (form.domain && !generator.OneIn(4)) {
             const char *text = form.domain->texts[generator.Below(form.domain->textCount)];
@@ -118,7 +117,7 @@ struct HostileDocument : Hostile {
 
     void Member(configstore::Object *parent, const StoreField &form, const char *name, ConverterType type) {
         if (generator.OneIn(8)) return;
-        if (generator.OneIn(20)) { // something else than a reader expects
+        if (generator.OneIn(20)) { // not what a reader expects
             (void)configstore::SetValueInt(parent, name, -1);
             return;
         }

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Mirror sessions: what a save writes by session type, and what a load makes of it.
+// Mirror sessions: what a save writes for each session type, and what a load returns.
 
 #include "configstore/converters/mirror.h"
 
@@ -109,7 +109,7 @@ TEST_F(Mirror, OnlyAPacketLengthThatIsNotSetIsSaved) {
         session.flags = 0x10;
         EXPECT_EQ(Table({session}), LoadOne(kGlobal, kEtherswitch));
     }
-    // What others wrote there is read.
+    // A length that another writer stored is loaded.
     ASSERT_EQ(0, configstore::SetValueUint32(Sub("settings/vspans[s1]"), "mirrored_packet_length", 64));
     Session session;
     session.packetLength = 64;
@@ -207,8 +207,8 @@ TEST_F(Mirror, FlagsAndNumbersComeBackAsStated) {
     session.nanosec = 1;
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Table({session})));
     session.flags =
-        0x20 | 0x04 | 0x03 | 0x08; // legacy mode is gone, 0x03 for 0x01, and the VLAN id is said to be set
-    session.receiveTypes = 0x6;    // PNIC, and that there is any
+        0x20 | 0x04 | 0x03 | 0x08; // no legacy mode, 0x03 for 0x01, and the VLAN id marked as set
+    session.receiveTypes = 0x6;    // PNIC, and the bit for any type
     session.transmitTypes = 0xf;
     EXPECT_EQ(Table({session}), LoadOne(kGlobal, kEtherswitch));
 }
@@ -223,7 +223,7 @@ TEST_F(Mirror, LoadedGroupsCountAsDestinationsAndTransmitSourcesReplaceReceiveSo
     value.Add(Port(0, "r1")).Add(Port(0, "r2")).Add(Port(0, "r3")).Add(Port(0, "t1"));
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, value));
     session.flags = 0x10;
-    session.destinations = 1; // that of the transmit sources
+    session.destinations = 1; // the count of the transmit sources
     session.receive = session.transmit = 0;
     // Each of the three port objects counts all six keys.
     Bytes expected = Table({session}, 18).Add(Port(0, "d1")).Add(Port(0, "d2"));
@@ -284,7 +284,7 @@ TEST_F(Mirror, OverlayVersionsHaveWidePortRecords) {
         session.destinations = 1;
         const std::string name(40, 'k');
         ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Table({session}).Add(Port(0, name, row.wide))));
-        dvsWidePortRecords = !row.wide; // a load asks the switch
+        dvsWidePortRecords = !row.wide; // a load reads the width from the switch
         session.flags = 0x10;
         session.destinations = 0;
         const std::string kept = row.wide ? name : name.substr(0, 32);
@@ -371,7 +371,7 @@ TEST_F(Mirror, LongKeysAndNamesAreCut) {
     expected.key = std::string(31, 'k');
     expected.name = std::string(80, 'n');
     expected.type = 0;
-    expected.flags = 0x37 & ~0x08; // nothing says that the session is enabled, stripped, allowed or legacy
+    expected.flags = 0x37 & ~0x08; // no field sets enabled, stripped, allowed or legacy
     EXPECT_EQ(Table({expected}), LoadOne(kGlobal, kEtherswitch));
 }
 
@@ -382,7 +382,7 @@ TEST_F(Mirror, ThePortAreaHoldsWhatIsWrittenWhateverTheSizePassCounts) {
         for (int i = 0; i < 4; ++i)
             ASSERT_EQ(0, configstore::AppendValueString(sub, "port_keys", ports));
     }
-    // A list of its own hides those below from the size pass.
+    // A list in the object itself hides the lists below it from the size pass.
     ASSERT_EQ(0, configstore::SetValueEmptyList(Sub("settings/vspans[s1]"), "port_keys"));
     const auto loaded = LoadOne(kGlobal, kEtherswitch);
     ASSERT_TRUE(loaded);

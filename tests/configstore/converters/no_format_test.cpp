@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// A switch address that cannot be formatted, which only a failing system function brings about. The program is
-// linked with --wrap=inet_ntop.
+// A switch address that cannot be formatted, which requires a failing system function. The program is linked
+// with --wrap=inet_ntop.
 
 #include <arpa/inet.h>
 

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Loads without memory for their value: each says so in its own words, and all but two fail. The program is
-// linked with --wrap=calloc, the call that values are allocated with.
+// Loads that cannot allocate their value: each prints its own message, and all but two fail. The program is
+// linked with --wrap=calloc, the function that allocates values.
 
 #include <cstdlib>
 

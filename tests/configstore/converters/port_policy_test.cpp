@@ -17,7 +17,7 @@ constexpr const char *kTxUplink[] = {"com.orbeno.etherswitch.port.txUplink",
                                      "com.orbeno.vswitch.port.txUplink"};
 constexpr const char *kClasses[] = {"etherswitch", "vswitch", "cswitch"};
 
-// Which of a pair of keys belongs to a class.
+// Returns which of a pair of keys belongs to a class.
 int FamilyOf(const char *className) {
     return std::string(className) == "etherswitch" ? 0 : 1;
 }
@@ -174,7 +174,7 @@ TEST_F(PortPolicy, ShapingDividesWithSignAndTakesUnreadableLimitsForZero) {
     ASSERT_EQ(0, configstore::SetValueBool(policy, "enabled", false));
     EXPECT_EQ(Bytes().U64(static_cast<uint64_t>(-1)).U64(0).U64(0),
               LoadOne(kPort, "com.orbeno.common.port.shaper.input"));
-    // More than fits comes back without its upper bits.
+    // A value that is too large loses its upper bits.
     ASSERT_EQ(0, Save(kPort, "com.orbeno.common.port.shaper.input",
                       Bytes().U64(1ULL << 62).U64(1ULL << 60).U64(1ULL << 59)));
     const auto loaded = LoadOne(kPort, "com.orbeno.common.port.shaper.input");
@@ -273,7 +273,7 @@ TEST_F(PortPolicy, PoliciesOfOtherTypesInTheStoreAreSkippedOrFailed) {
     const struct {
         const char *leaf;
         int32_t expected;
-    } rows[] = {{"vlan", configstore::SCHEMA_VIOLATION}, // the path of the priority's row leads into it
+    } rows[] = {{"vlan", configstore::SCHEMA_VIOLATION}, // the path of the priority's row leads through it
                 {"in_shaping_policy", 0},
                 {"mac_management_policy", 0},
                 {"lacp_policy", 0},

@@ -98,7 +98,7 @@ TEST_F(PrivateVlan, MissingFieldsFailTheLoadWithTheirStatus) {
     }
 }
 
-// The row itself: in a load of all rows the version's own row would fail first.
+// Loads the row alone: in a load of all rows, the version's row fails first.
 TEST_F(PrivateVlan, ASwitchWithoutClassOrVersionDoesNotLoad) {
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Entry(1, 2, 3)));
     const auto load = [&] {

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Random sound values of every key, saved and loaded on switches of every kind, against the model of a round
-// trip. DVS_ROUND_TRIPS sets how many values each key gets on each switch.
+// Saves and loads random valid values of every key on switches of every kind, and compares the result with
+// the model of a round trip. DVS_ROUND_TRIPS sets the number of values per key and switch.
 
 #include <cstdlib>
 
@@ -15,7 +15,7 @@ namespace {
 
 struct KindOfSwitch {
     const char *className, *version;
-    uint32_t number; // of the version, with the flag
+    uint32_t number; // the version number with the overlay flag
     bool isOverlay;
 };
 constexpr KindOfSwitch kSwitches[] = {
@@ -33,8 +33,7 @@ struct RoundTrip : ConverterTest {
     RoundTrip() { dvsconfigstore_debug = -1; }
     ~RoundTrip() override { dvsconfigstore_debug = 10; }
 
-    // The class, the version and the overlay flag are in the object before anything is saved, so they load as
-    // well.
+    // The class, the version and the overlay flag exist in the object before the save, so they load too.
     Properties LoadTested(uint32_t propClass, const std::string &key) {
         Properties loaded = Load(propClass);
         for (const char *always : {"com.orbeno.common.version", "com.orbeno.common.portset.ovl"}) {

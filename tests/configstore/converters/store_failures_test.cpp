@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Every store call of every save and load failed in turn: the failure is the result, or the call is one whose
-// result is stated not to matter. Nothing is leaked either way.
+// Fails every store call of every save and load in turn. The failure must be the result, unless the call's
+// result is documented as ignored. Nothing may leak either way.
 
 #include <algorithm>
 #include <set>
@@ -20,9 +20,9 @@ using dvs::ConverterType;
 using dvs::ConverterTypeOf;
 using enum ConverterType;
 
-constexpr int32_t kStaged = 777; // a status of nobody else
+constexpr int32_t kStaged = 777; // a status that no other code returns
 
-// Calls whose failure a converter swallows, or turns into -1. Columns: type, whether it is a save, function,
+// Calls whose failure a converter ignores or maps to -1. Columns: type, whether it is a save, function,
 // result.
 struct Exception {
     ConverterType type;
@@ -32,7 +32,7 @@ struct Exception {
 };
 constexpr Exception kExceptions[] = {
     // clang-format off
-    {kLinkDiscovery,         true,  "GetSubObject",           -1}, // an object that cannot be had is the library's own failure
+    {kLinkDiscovery,         true,  "GetSubObject",           -1}, // a missing object is the library's own failure
     {kLinkDiscovery,         true,  "CreateSubObject",        -1},
     {kMirrorSessions,        true,  "SetValueBool",            0}, // normal traffic and legacy mode
     {kMirrorSessions,        true,  "SetValueUint32",          0}, // sampling rate
@@ -41,7 +41,7 @@ constexpr Exception kExceptions[] = {
     {kEtherswitchTeaming,    true,  "CreateSubObject",         0},
     {kUplinkNames,           true,  "SetValueEmptyList",       0},
     {kVswitchPortVlan,       true,  "SetValueUint16",          0},
-    {kEtherswitchPrivateVlans,false, "GetSubObject",           -1}, // of the version reader, as the next three
+    {kEtherswitchPrivateVlans,false, "GetSubObject",           -1}, // the version reader's, like the next three
     {kEtherswitchPrivateVlans,false, "GetValueStr",            -1},
     {kVswitchPrivateVlans,   false, "GetSubObject",           -1},
     {kVswitchPrivateVlans,   false, "GetValueStr",            -1},
@@ -118,7 +118,7 @@ struct StoreFailures : ConverterTest {
         configstore::DestroyObject(object);
         ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "id", "{}", &object));
         const bool isVswitch = std::string(row.key).find(".vswitch.") != std::string::npos;
-        // The private VLANs of the vswitch key need more than the class.
+        // The private VLANs of the vswitch key need more members than the class.
         BecomeSwitch(ConverterTypeOf(row) == kVswitchPrivateVlans ? "cswitch"
                      : isVswitch                                  ? "vswitch"
                                                                   : "etherswitch");
@@ -139,7 +139,7 @@ struct StoreFailures : ConverterTest {
         return status;
     }
 
-    // Runs with the first call failing, then the second and so on, until a run has no such call.
+    // Fails the first call, then the second and so on, until a run has no such call.
     template <typename Run> void FailEach(const DVSProp2ConfigEntry &row, bool isSave, Run run) {
         for (int call = 1;; ++call) {
             if (isSave) Renew(row);
@@ -163,7 +163,7 @@ TEST_F(StoreFailures, AreTheResultOrStatedNotToMatter) {
     for (const uint32_t propClass : {kGlobal, kHost, kPort}) {
         for (const auto *row = GetConfigMap(static_cast<int>(propClass)); row->key; ++row) {
             const auto *record = dvs::layout::RecordOf(propClass, row->key, false);
-            if (!record) continue; // the DEFAULT rows have tests of their own
+            if (!record) continue; // unmapped_test.cpp covers the DEFAULT rows
             for (int i = 0; i < 8; ++i) {
                 auto value = generator.Sound(*record);
                 if (ConverterTypeOf(*row) == kSwitchVersion) value = Bytes().U32(9);

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Teaming policies of both families: the fields byte by byte, and what a round trip does to them.
+// Teaming policies of both families: the fields byte by byte, and their changes in a round trip.
 
 #include "configstore/converters/teaming.h"
 
@@ -77,7 +77,7 @@ TEST_F(Teaming, SavesEachBehaviourBitUnderItsName) {
 TEST_F(Teaming, ThreeActiveAndTwoStandbyNamesFillTheFirstFiveSlots) {
     ASSERT_EQ(0, Save(kPort, kEtherswitchPort, kFull.Value()));
     Policy expected = kFull;
-    // What was written into the failure criteria is looked for beside them, and found by nobody.
+    // The save writes members into the failure criteria; the load looks for them outside and finds nothing.
     expected.failureFlags |= 0x200;
     expected.percentage = expected.fullDuplex = 0;
     expected.speed = 0;
@@ -142,7 +142,7 @@ TEST_F(Teaming, SpeedKeepsItsLowByteAndIsReadBesideTheCriteria) {
     ASSERT_EQ(0, configstore::SetValueUint16(policy, "percentage", 0x1234));
     ASSERT_EQ(0, configstore::SetValueBool(policy, "full_duplex", true));
     Policy expected;
-    // Without the object of the criteria none of the three is read.
+    // Without the criteria object, none of the three is read.
     EXPECT_EQ(expected.Value(), LoadOne(kPort, kEtherswitchPort));
     Sub("settings/uplink_teaming_policy/failure_criteria");
     expected.failureFlags = 0x200;
@@ -190,7 +190,7 @@ TEST_F(Teaming, CountsBeyondTheValueAreRefused) {
         EXPECT_EQ(-1, Save(kPort, kEtherswitchPort, lying)) << active;
     }
     EXPECT_EQ("/settings {}\n", Dump());
-    // What a save reads ends with the last counted name.
+    // A save reads up to the last counted name.
     value.resize(24 + 5 * kNameSize);
     EXPECT_EQ(0, Save(kPort, kEtherswitchPort, value));
     value.pop_back();
@@ -241,7 +241,7 @@ TEST_F(Teaming, EtherswitchDoesWithoutItsCriteriaAndVswitchFails) {
     for (const bool isVswitch : {false, true}) {
         BecomeSwitch(isVswitch ? "vswitch" : "etherswitch");
         (void)configstore::DeleteSubObject(object, "settings", "");
-        // In the way of the sub-object.
+        // A value in place of the sub-object.
         ASSERT_EQ(0,
                   configstore::SetValueBool(Sub("settings/uplink_teaming_policy"), "failure_criteria", true));
         const int32_t expected = isVswitch ? configstore::SCHEMA_VIOLATION : 0;

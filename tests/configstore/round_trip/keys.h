@@ -2,8 +2,9 @@
 #ifndef TESTS_CONFIGSTORE_ROUND_TRIP_KEYS_H
 #define TESTS_CONFIGSTORE_ROUND_TRIP_KEYS_H
 
-// The mapped keys as the model sees them: in the order of a load, with the place in the store that some share
-// and the switches that load them. A table of its own; a test compares its keys with the library's.
+// The model's table of mapped keys: in load order, with their place in the store, which several keys may
+// share, and the switches that load them. The table is independent; a test compares its keys with the
+// library's.
 
 #include <cstdint>
 #include <span>

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// What a round trip makes of a mirror session table (values.h). The whole table is predicted at once, because
-// the ports of all sessions share an area; which rules that follows is then told by the fields that changed.
+// Predicts the round trip of a mirror session table (values.h). The table is predicted as a whole, because
+// the ports of all sessions share an area; the changed fields then determine the rules.
 
 #include <algorithm>
 #include <cstring>
@@ -18,7 +18,7 @@ struct StoredSession {
     std::vector<std::string> keys[3], uplinks; // destinations, receive and transmit sources
 };
 
-// What a save leaves of a session's port records; *port is the next record's place.
+// The stored form of a session's port records after a save; *port is the place of the next record.
 StoredSession Stored(const Value &value, std::size_t session, std::size_t *port, std::size_t size) {
     StoredSession stored;
     const uint32_t type = NumberAt(value, session + 116);
@@ -52,7 +52,7 @@ uint32_t Connectees(uint32_t bits) {
     return (bits & 0xb) | (bits & 0xb ? 4 : 0);
 }
 
-// The fields of a session's record that do not depend on its ports.
+// Fills the fields of a session's record that do not depend on its ports.
 void LoadFields(const Value &value, std::size_t s, Value *loaded) {
     PutText(loaded, s, 32, TextAt(value, s, 32));
     PutText(loaded, s + 32, 84, TextAt(value, s + 32, 81));
@@ -65,8 +65,8 @@ void LoadFields(const Value &value, std::size_t s, Value *loaded) {
     PutText(loaded, s + 148, 68, "");
 }
 
-// The port area while the sessions write into it. A shorter name over a longer one leaves the longer one's
-// end behind its NUL, and a name of wide records runs over its narrow one.
+// The port area while the sessions are written to it. A shorter name over a longer one leaves the longer
+// name's end after its NUL. A name from wide records overflows a narrow record.
 struct Area {
     Value bytes;
     std::size_t recordSize;
@@ -77,7 +77,8 @@ struct Area {
         const std::size_t length = std::min(name.size(), bytes.size() - at - 5);
         PutText(&bytes, at + 4, length + 1, name.substr(0, length));
     }
-    // Destinations, then both kinds of sources at one place behind them; the index after the destinations.
+    // Writes the destinations, then both kinds of sources at the same place after them. Returns the index
+    // after the destinations.
     std::size_t PlaceSession(const StoredSession &stored, std::size_t index) {
         for (const auto &name : stored.keys[0])
             Place(index++, 0, name);
@@ -143,7 +144,7 @@ constexpr FlagRule kFlagRules[] = {{0x03, Rule::kNormalTraffic},
                                    {0x10, Rule::kLegacyMode},
                                    {0xffffffc0, Rule::kUnknownBits}};
 
-// Adds the rules of the regions that differ, and makes them alike in *before.
+// Adds the rules of the regions that differ and copies those regions to *before.
 void Explain(std::size_t start, std::span<const Region> regions, const Value &after, Value *before,
              Rules *rules) {
     for (const Region &region : regions) {

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The round trip of a list of properties (model.h): by place for the keys that have one, by kind for the
-// others. What the model does not know makes it throw: two properties of one name in a switch's list, and two
-// that share a place in which they would mix.
+// The round trip of a list of properties (model.h): by place for keys that have one, by kind for the others.
+// The model throws for cases it does not cover: two properties of one name in a switch's list, and two
+// properties that share a place where they would mix.
 
 #include "configstore/round_trip/model.h"
 
@@ -43,12 +43,12 @@ bool Loads(const SwitchTraits &sw, LoadsOn loads) {
     case LoadsOn::kPrivateVlanOther:
         return isOther;
     case LoadsOn::kUplinkPorts:
-        return false; // behind all others
+        return false; // after all others
     }
     return false;
 }
 
-// The rule by which a value comes back under another key than its own.
+// The rule that moves a value to another key.
 Rule RuleOfPlace(std::string_view place) {
     if (place == "mtu") return Rule::kMtuUnderEveryKey;
     return place == "pvlans" ? Rule::kPrivateVlanKey : Rule::kKeyOfTheFamily;
@@ -57,12 +57,12 @@ bool Mixes(std::string_view place) {
     return place == "vlan" || place == "teaming" || place == "sessions";
 }
 
-// One of the lists in which properties without a key of the table are kept.
+// A list that keeps properties whose key is not in the table.
 struct Unmapped {
     bool (*takes)(const Prop &prop);
     std::size_t position; // among the lists of a load
     bool isText;
-    std::optional<uint32_t> type; // after a load; its own without
+    std::optional<uint32_t> type; // the type after a load; if empty, unchanged
     bool comesBack = true;
 };
 bool IsOpaque(const Prop &prop) {
@@ -86,7 +86,7 @@ bool IsRuleset(const Prop &prop) {
 bool IsPlainOpaque(const Prop &prop) {
     return IsOpaque(prop) && IsPlain(prop);
 }
-// In the order in which a save tries them.
+// In the order that a save tries them.
 const std::vector<Unmapped> kUnmapped[] = {
     {{IsOpaque, 1, false, kOpaqueType},
      {IsExtra, 2, true, kType},
@@ -184,7 +184,7 @@ private:
         if (prop.key != key.name) kept.rules.insert(RuleOfPlace(key.place));
         fate_.kept.push_back(kept);
     }
-    // What comes of a place that no property was saved to.
+    // The result of a place without a saved property.
     void LoadOfNothing(const Key &key) {
         const std::string_view place = key.place;
         if (place == "vlan" && places_["priority"])

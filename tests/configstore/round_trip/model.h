@@ -2,10 +2,10 @@
 #ifndef TESTS_CONFIGSTORE_ROUND_TRIP_MODEL_H
 #define TESTS_CONFIGSTORE_ROUND_TRIP_MODEL_H
 
-// What a sound state is after it was saved into a store and loaded back, by the documented rules: a small
-// model of its own that knows keys, places and classes, but no store and no converter. Every property of the
-// state before is either the same after, or changed or dropped by rules with names; what is new has a rule
-// too. Tests compare what the library loads with what is expected here.
+// Predicts a valid state after a save into a store and a load, by the documented rules. The model is
+// independent: it has keys, places and classes, but no store and no converter. Every property stays the same,
+// or named rules change or drop it; every new property has a rule too. Tests compare the library's result
+// with the prediction.
 
 #include <optional>
 #include <string>
@@ -16,36 +16,36 @@
 
 namespace round_trip {
 
-/// A property whose type word has none of these bits is not read from a state.
+/// A state load drops a property whose type word has none of these bits.
 inline constexpr uint32_t kReadTypes = 0x800000fc;
 
-/// What the converters are told of the switch whose properties they handle.
+/// The facts about a switch that the converters of its properties get.
 struct SwitchTraits {
     std::string className;
-    uint32_t savedVersion = 0;  // of the switch record
-    uint32_t loadedVersion = 0; // as it is read back
+    uint32_t savedVersion = 0;  // from the switch record
+    uint32_t loadedVersion = 0; // as read back
     bool isOverlay = false;
     [[nodiscard]] bool IsEtherswitch() const { return className != "vswitch" && className != "cswitch"; }
 };
 
-/// What becomes of one list of properties.
+/// The result of a round trip for one list of properties.
 struct ListFate {
     struct Kept {
         state_builder::Prop after;
-        std::vector<std::size_t> from; // the properties before that it is made of
+        std::vector<std::size_t> from; // the original properties it is made of
         Rules rules;
     };
     struct Gone {
         std::size_t from;
         Rule rule;
     };
-    std::vector<Kept> kept; // in the order of a load
+    std::vector<Kept> kept; // in load order
     std::vector<Gone> gone;
     [[nodiscard]] state_builder::Props After() const;
 };
 
-/// The fate of a list of the class. `pools` are what the load gives an uplink port; `switchName` is the name
-/// that the save gives a switch whose own properties have none.
+/// Predicts the round trip of a list of the class. `pools` are the pools that the load adds to an uplink
+/// port. `switchName` is the name that the save gives a switch without one.
 struct ListContext {
     SwitchTraits sw;
     uint32_t propClass = 0;
@@ -54,16 +54,15 @@ struct ListContext {
 };
 ListFate FateOf(const ListContext &context, const state_builder::Props &before);
 
-/// What is wrong with a fate, as sentences: properties that are in it twice or not at all, and changes that
-/// no rule explains.
+/// The errors in a prediction, as sentences: duplicated or missing properties, and changes without a rule.
 std::vector<std::string> Unexplained(const state_builder::Props &before, const ListFate &fate);
 
-/// The whole state. Fails the running test where a change is unexplained, or where the state has what the
-/// model does not know (see model.cpp); nothing is passed over.
+/// Predicts the whole state. Fails the running test if a change has no rule or if the state contains a case
+/// that the model does not cover (see model.cpp).
 std::vector<state_builder::Switch> AfterRoundTrip(const std::vector<state_builder::Switch> &before,
                                                   uint32_t hostLimit, Ledger *ledger);
 
-/// Where two states differ, one line a field or property.
+/// The differences of two states, one line per field or property.
 std::vector<std::string> Differences(const std::vector<state_builder::Switch> &expected,
                                      const std::vector<state_builder::Switch> &actual);
 

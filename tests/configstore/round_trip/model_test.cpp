@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The model of a round trip is checked itself: it knows every key, it owns up to what it changes, and the
-// documentation has its rules.
+// Tests the model of a round trip: it covers every key, names a rule for every change, and its rules are in
+// the documentation.
 
 #include <fstream>
 #include <set>
@@ -21,7 +21,7 @@ using state_builder::U32;
 
 namespace {
 
-// The store's places have names of the model's own; whether keys share one is the tables' business too.
+// The model has its own names for places in the store; keys must share a place exactly as in the tables.
 TEST(RoundTripKeys, AreThoseOfTheTablesInTheirOrder) {
     for (const uint32_t propClass : {0u, 1u, 2u}) {
         std::vector<std::string> rows;
@@ -32,7 +32,7 @@ TEST(RoundTripKeys, AreThoseOfTheTablesInTheirOrder) {
             for (uint32_t i = 0; i < row->depth; ++i)
                 path += std::string("/") + row->path[i];
             const bool isRepeated = keysOfPath[path].contains(row->key);
-            // The instances of this list are named by the keys themselves.
+            // The keys themselves name the instances of this list.
             keysOfPath[path == "/health_checks" ? path + row->key : path].insert(row->key);
             if (!isRepeated) rows.push_back(row->key + std::string(" ") + std::to_string(row->converterType));
         }
@@ -52,7 +52,7 @@ TEST(RoundTripKeys, AreThoseOfTheTablesInTheirOrder) {
     }
 }
 
-// Every row of the table of changes names one rule, or several; every rule has its row.
+// Every row of the table of changes names at least one rule; every rule has a row.
 TEST(RoundTripRules, AreThoseOfTheDocumentation) {
     std::ifstream file(DVS_SOURCE_DIR "/docs/config-store.md");
     std::string line;
@@ -60,7 +60,7 @@ TEST(RoundTripRules, AreThoseOfTheDocumentation) {
     std::set<std::string> documented;
     while (std::getline(file, line)) {
         if (line.starts_with("## ")) isInside = line == "## What a round trip changes";
-        // The table ends at the first line that is no row.
+        // The table ends at the first line that is not a row.
         if (documented.size() && !line.starts_with("| ")) isInside = false;
         if (!isInside || !line.starts_with("| ") || line.starts_with("| rule ")) continue;
         const std::string cell = line.substr(0, line.find('|', 1));
@@ -129,7 +129,7 @@ TEST(RoundTripModel, RefusesWhatItDoesNotKnow) {
     const Value vlan(8);
     const Props both = {{"com.orbeno.etherswitch.port.vlan", vlan}, {"com.orbeno.vswitch.port.vlan", vlan}};
     EXPECT_THROW(FateOf(vswitch, both), std::logic_error);
-    EXPECT_NO_THROW(FateOf(etherswitch, both)); // which saves the one only
+    EXPECT_NO_THROW(FateOf(etherswitch, both)); // which saves only one of them
     Ledger ledger;
     EXPECT_THROW(AfterRoundTrip({{.id = "x", .global = {}, .host = {}, .ports = {}}}, 64, &ledger),
                  std::logic_error);

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Random sound states (random_state.h), by the records that the library has of its values.
+// Random valid states (random_state.h), built from the library's records of its values.
 
 #include "configstore/round_trip/random_state.h"
 
@@ -30,14 +30,14 @@ constexpr uint32_t kOtherTypes[] = {0x10, 0x18, 0x20, 0x28, 0x08, 0x04, 0x02};
 void Set(Value *value, std::size_t at, uint8_t byte) {
     if (at < value->size()) (*value)[at] = byte;
 }
-// A byte behind the NUL of the last slot's text, where there is one.
+// Sets a byte after the NUL of the last slot's text, if there is room.
 void DirtySlot(Value *value, std::size_t slot) {
     if (value->size() < 4 + slot) return;
     const std::size_t at = value->size() - slot;
     if (TextAt(*value, at, slot).size() < slot - 1) value->back() = 'x';
 }
 
-// What a sound value may also be: bytes that mean nothing, numbers and texts without a name.
+// Unusual but valid values: unused bytes, unknown numbers and texts.
 void Dirty(dvs::ConverterType type, Value *value) {
     using enum dvs::ConverterType;
     switch (type) {
@@ -106,8 +106,8 @@ void Shuffle(Props *props, Generator *random) {
 constexpr const char *kOtherNames[] = {"com.orbeno.extraconfig.", "com.orbeno.port.extraConfig.", "com.acme.",
                                        "net."};
 
-// About two thirds of the keys, each place once but for those that keep the last one, and a few without a
-// row.
+// About two thirds of the keys, each place once except places that keep the last value, and a few keys
+// without a row.
 Props RandomList(uint32_t propClass, bool isWide, Generator *random) {
     std::map<std::string, std::vector<const Key *>> places;
     for (const Key &key : KeysOf(propClass))

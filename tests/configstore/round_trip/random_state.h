@@ -2,8 +2,8 @@
 #ifndef TESTS_CONFIGSTORE_ROUND_TRIP_RANDOM_STATE_H
 #define TESTS_CONFIGSTORE_ROUND_TRIP_RANDOM_STATE_H
 
-// Random sound states with everything that a round trip changes: keys of both families, odd type words, bytes
-// behind texts, properties that no row names, ports of all kinds.
+// Random valid states with everything that a round trip changes: keys of both families, unusual type words,
+// bytes after texts, properties without a row, ports of all kinds.
 
 #include <string>
 #include <vector>

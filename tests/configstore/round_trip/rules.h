@@ -2,9 +2,9 @@
 #ifndef TESTS_CONFIGSTORE_ROUND_TRIP_RULES_H
 #define TESTS_CONFIGSTORE_ROUND_TRIP_RULES_H
 
-// The rules by which a state changes when it is saved into the store and loaded back: each has a name, and
-// docs/config-store.md has a row for each name ("What a round trip changes"). The model (model.h) says which
-// of them apply where; a ledger counts, so that a rule that nothing ever meets is found.
+// The rules that describe how a save and a load change a state. Each has a name, and docs/config-store.md has
+// a row for each name ("What a round trip changes"). The model (model.h) says where each applies; a ledger
+// counts them, so that a test finds rules that never apply.
 
 #include <cstdint>
 #include <map>
@@ -69,7 +69,7 @@ enum class Rule : uint8_t {
     kCount,
 };
 
-/// The name that the documentation has.
+/// The rule's name in the documentation.
 const char *NameOf(Rule rule);
 
 /// How often each rule applied.
@@ -77,7 +77,7 @@ class Ledger {
 public:
     void Note(Rule rule) { ++count_[rule]; }
     void Add(const Ledger &other);
-    /// The names of the rules that never did.
+    /// The names of the rules that never applied.
     [[nodiscard]] std::vector<std::string> Idle() const;
 
 private:

@@ -52,7 +52,7 @@ private:
         }
         return {};
     }
-    // What is left of a list when a save begins.
+    // The properties of a list that remain when a save begins.
     static Props Read(Props props) {
         std::erase_if(props, [](const Prop &prop) { return (prop.type & kReadTypes) == 0; });
         return props;
@@ -86,7 +86,7 @@ private:
         return {before.className, before.version, after.version, isOverlay_};
     }
 
-    // One port of each id, with the properties of all that have it.
+    // One port per id, with the properties of all ports of that id.
     std::vector<Port> Merged(const std::vector<Port> &ports) {
         std::vector<Port> merged;
         for (const Port &port : ports) {
@@ -124,7 +124,7 @@ private:
     bool isOverlay_ = false;
 };
 
-// The property, and of its value what is around its first difference to the other's.
+// The property, with the part of its value around its first difference to the other.
 std::string Show(const Prop *prop, const Prop *other) {
     if (!prop) return "nothing";
     const Value none;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The steps of a round trip, value by value (values.h). A table names the steps of each converter type; a
-// step changes the value or leaves it as it is, and its rule counts where it did.
+// The steps of a round trip for each value (values.h). A table names the steps of each converter type. A step
+// may change the value; its rule counts if it does.
 
 #include "configstore/round_trip/values.h"
 
@@ -37,7 +37,7 @@ void PutNumber(Value *value, std::size_t at, uint32_t number, std::size_t width 
 void Clear(Value *value, std::size_t at, std::size_t size) {
     std::fill_n(value->begin() + static_cast<std::ptrdiff_t>(at), size, uint8_t{0});
 }
-// A slot's bytes behind the NUL of its text.
+// Clears a slot's bytes after the NUL of its text.
 void ClearTail(Value *value, std::size_t at, std::size_t size) {
     const std::size_t text = TextAt(*value, at, size).size();
     Clear(value, at + text, size - text);
@@ -74,7 +74,7 @@ template <std::size_t At, uint32_t Bits> bool KeepBits(Value *value, const Surro
     return true;
 }
 
-// "true" with its NUL, and in most properties a byte more; "false" without.
+// "true" has its NUL, and in most properties an extra byte; "false" has none.
 template <std::size_t TrueSize> bool TrueOrFalse(Value *value, const Surroundings &) {
     if (Starts(*value, "true"))
         Become(value, "true\0f", TrueSize);
@@ -177,7 +177,7 @@ bool AlwaysOrNormal(Value *value, const Surroundings &) {
     return true;
 }
 
-// A trunk has ranges and no id, all others an id and no ranges.
+// A trunk has ranges and no id; all others have an id and no ranges.
 bool OneKindOfVlan(Value *value, const Surroundings &) {
     const uint32_t flags = NumberAt(*value, 0, 2);
     PutNumber(value, 0, flags & 1 ? 1 : flags & 2, 2);
@@ -195,7 +195,7 @@ bool TrunkOfNothing(Value *value, const Surroundings &) {
     return true;
 }
 
-// Bits as a signed 64-bit number: what is beyond it is lost on the way.
+// The store keeps bits as a signed 64-bit number; higher bits are lost.
 bool BitsFit(Value *value, const Surroundings &) {
     for (std::size_t at = 0; at < 24; at += 8) {
         uint64_t bytes = 0;
@@ -235,14 +235,14 @@ bool NumberedFromZero(Value *value, const Surroundings &) {
     });
     return true;
 }
-// The n-th filter stands behind the heads of those before it, over their parameters.
+// The n-th filter follows the heads of the filters before it and overwrites their parameters.
 bool OneBehindTheOther(Value *value, const Surroundings &) {
     Value placed(value->size(), 0);
     const auto copy = [&](std::size_t from, std::size_t to, std::size_t size) {
         std::copy_n(value->begin() + static_cast<std::ptrdiff_t>(from), size,
                     placed.begin() + static_cast<std::ptrdiff_t>(to));
     };
-    // Of a text, what it is long: the rest of its field stays what the filter before made of it.
+    // Copies only the text and its NUL: the rest of the field keeps the bytes of the filter before.
     const auto text = [&](std::size_t from, std::size_t to, std::size_t most) {
         copy(from, to, TextAt(*value, from, most).size() + 1);
     };
@@ -282,7 +282,7 @@ const std::vector<Step> kSecurity = {{Rule::kUnknownBits, KeepBits<0, 7>}};
 const std::vector<Step> kPrivateVlans = {{Rule::kEmptyIsGone, HasPrivateVlans},
                                          {Rule::kUnusedBytes, WholePrivateVlans}};
 
-// The steps by converter type, in their order.
+// The steps by converter type, in order of the types.
 const std::map<ConverterType, std::vector<Step>> kSteps = {
     {kNumber, kNumberSteps},
     {kText, {{Rule::kTextEnds, CutText}}},

@@ -1,8 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The whole road through the embedded store: a state is saved, checked, and loaded back, and each field and
-// property of what comes back is what the rules of a round trip say (model.h). The states: the examples, what
-// `dvsctl generate` makes for each class of switch, and random ones. DVS_ROAD_SEEDS sets how many of the
-// latter.
+// Full round trips through the embedded store: saves a state, checks it, loads it back, and compares each
+// field and property with the model's prediction (model.h). The states are the examples, states of `dvsctl
+// generate` for each class of switch, and random ones. DVS_ROAD_SEEDS sets the number of random states.
 
 #include <cstdlib>
 #include <filesystem>
@@ -46,7 +45,7 @@ protected:
         std::ifstream file(path, std::ios::binary);
         return Bytes(std::istreambuf_iterator<char>(file), {});
     }
-    // A state out of dvsctl, which takes the file's name last.
+    // A state from dvsctl, which takes the file name last.
     Bytes FromDvsctl(std::vector<std::string> arguments) {
         const std::string path = directory_ / "state.db";
         std::filesystem::remove(path);
@@ -72,7 +71,7 @@ protected:
         return state_builder::State(switches);
     }
 
-    /// Saves and loads; what comes back must be as expected.
+    /// Saves and loads; the loaded state must match the model.
     void Travel(const Bytes &state) {
         ASSERT_FALSE(state.empty());
         const auto expected = AfterRoundTrip(state_builder::Parse(state), kHostLimit, &ledger_);

@@ -30,7 +30,7 @@ TEST(EmbeddedTranscript, OfAWholeState) {
         Load(true);
         Save(State({switches[3]}));
         Load();
-        // The schema refuses it: a port's "name" is a text of the store's own limit.
+        // The schema rejects it: the store limits the length of a port's "name".
         Switch sw = switches[3];
         sw.ports.push_back({std::string(60, 'k'), {{"com.orbeno.common.port.alias", Text("long key")}}});
         Save(State({sw}));

@@ -2,7 +2,7 @@
 #ifndef TESTS_CONFIGSTORE_TRANSCRIPT_STEPS_H
 #define TESTS_CONFIGSTORE_TRANSCRIPT_STEPS_H
 
-// The steps that scenarios are made of. Each notes what it returned.
+// The steps of scenarios. Each records its result.
 
 #include <cstdlib>
 

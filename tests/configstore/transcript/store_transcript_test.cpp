@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Transcripts of saves and loads on the store double, which takes what the embedded store refuses: damaged
-// fields, names of any length, and calls that fail.
+// Transcripts of saves and loads on the store double, which accepts what the embedded store rejects: damaged
+// fields, names of any length, and failing calls.
 
 #include <algorithm>
 #include <set>
@@ -74,7 +74,7 @@ Switch Small(const std::string &id) {
     return sw;
 }
 
-// A switch's object as a save leaves it; its scenario changes it.
+// A switch's object after a save; the scenario changes it.
 std::unique_ptr<Object> Saved(const Switch &sw) {
     const int32_t levels[] = {dvsconfigstore_debug, dvs_debug, dvsdata_debug};
     dvsconfigstore_debug = dvs_debug = dvsdata_debug = -1;
@@ -96,7 +96,7 @@ void SetText(Object *object, const char *name, const std::string &text) {
     EXPECT_EQ(0, configstore::SetValueStr(object, name, text.c_str()));
 }
 
-// What a scenario does with the small switch's object before it is loaded.
+// Loads the small switch's object after a scenario's change to it.
 void LoadChanged(const char *what, const std::function<void(Object *)> &change) {
     Note("%s", what);
     Start();
@@ -169,7 +169,7 @@ TEST(Transcript, OfBuffersThatDoNotLoad) {
     });
 }
 
-// --- Values that converters refuse. ---
+// --- Values that converters reject. ---
 
 TEST(Transcript, OfShortValues) {
     const auto switches = Parse(WholeState());
@@ -212,10 +212,9 @@ TEST(Transcript, OfUnknownVersions) {
     });
 }
 
-// --- Objects that loaders refuse. ---
+// --- Objects that loaders reject. ---
 
-// Calls `damage` with each member of the tree in turn: it changes the member, the load runs, and the member
-// is put back.
+// Calls `visit` with each member of the tree in turn.
 using Item = std::pair<std::string, std::unique_ptr<Object>>;
 void Walk(Object *node, const std::function<void(Object *, std::size_t)> &visit) {
     for (std::size_t i = 0; i < node->items.size(); ++i) {
@@ -233,7 +232,7 @@ void LoadWithEachFieldDamaged(const Switch &sw) {
         store.Put(object.get());
         Load();
     };
-    // Elements of a list are visited with their list; a list of another kind is what damages it.
+    // List elements are not visited; the list is replaced by one of another kind.
     Walk(object.get(), [&](Object *parent, std::size_t i) {
         if (parent->kind == fake_store::Kind::Texts || parent->kind == fake_store::Kind::Numbers) return;
         const std::string name = parent->items[i].first;
@@ -270,7 +269,7 @@ TEST_P(TranscriptOfDamage, OfEachField) {
     std::erase_if(ofClass, [&](const Switch &sw) { return sw.className != className; });
     ASSERT_GE(ofClass.size(), 2u);
     ExpectSame("damaged_" + className, Together({0, 1, 10}), [&] {
-        // The generated switch has sound values, the random one has odd ones.
+        // The generated switch has usual values, the random one has unusual ones.
         for (Switch sw : {ofClass.front(), ofClass.back()}) {
             sw.ports.resize(1);
             LoadWithEachFieldDamaged(sw);
@@ -332,7 +331,7 @@ TEST(Transcript, OfPortsOfOneKey) {
     });
 }
 
-// Vendors' properties of one port.
+// Vendor properties of one port.
 void LoadManyProperties(int others) {
     LoadChanged("properties that meet in one name", [&](Object *object) {
         Object *data = Sub(Sub(object, "ports", "p2"), "data");
@@ -391,7 +390,7 @@ TEST(Transcript, OfIncompleteSwitches) {
     });
 }
 
-// --- Store calls that fail. ---
+// --- Failing store calls. ---
 
 constexpr const char *kCalls[] = {"GetStore",
                                   "BeginTransaction",

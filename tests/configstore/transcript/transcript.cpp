@@ -28,8 +28,8 @@ namespace transcript {
 namespace {
 
 struct Transcript {
-    std::string messages; // of standard output or of the sink
-    std::string system;   // of syslog and the host's log
+    std::string messages; // from standard output or the sink
+    std::string system;   // from syslog and the host's log
 };
 
 Transcript *g_recorded = nullptr;
@@ -46,7 +46,7 @@ std::string Formatted(const char *format, va_list args) {
     return text;
 }
 
-// Durations differ from run to run.
+// Replaces durations, which differ from run to run.
 std::string WithoutTimes(std::string text) {
     for (std::size_t at = text.find("ime: "); at != std::string::npos; at = text.find("ime: ", at)) {
         at += 5;
@@ -68,7 +68,7 @@ void Sink(int level, const char *text, void *) {
     if (g_recorded->messages.back() != '\n') g_recorded->messages += "$\n";
 }
 
-// Standard output in a file until the end of the scope.
+// Redirects standard output to a file until the end of the scope.
 class Redirected {
 public:
     explicit Redirected(std::string *text) : text_(text), file_(std::tmpfile()) {
@@ -142,7 +142,7 @@ std::string GoldenPath(const std::string &name) {
     return DVS_SOURCE_DIR "/tests/configstore/transcript/golden/" + name + ".txt";
 }
 
-// True when the golden files are being rewritten instead.
+// Returns true when this run rewrites the golden files.
 bool Rewritten(const std::string &name, const std::string &text) {
     if (!std::getenv("DVS_RECORD_TRANSCRIPTS")) return false;
     WriteFile(GoldenPath(name), text);

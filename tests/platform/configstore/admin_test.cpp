@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The operators' functions: listing, import and export, history, restoring, backup, check.
+// The administration functions: list, import and export, history, restore, backup, check.
 
 #include "platform/configstore/support.h"
 

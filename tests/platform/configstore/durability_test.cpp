@@ -1,8 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Whole or not at all: saves that are killed, that meet failing system calls, and that meet each other. The
-// last of these over every backend.
-// STORE_KILL_ROUNDS and STORE_RACE_SAVES set how many; STORE_FAULT_STEP=1 and STORE_MEMORY_STEP=1 fail each
-// call.
+// Saves are atomic when killed, when system calls fail, and under concurrency. The concurrency tests run over
+// every backend. STORE_KILL_ROUNDS and STORE_RACE_SAVES set the counts; STORE_FAULT_STEP=1 and
+// STORE_MEMORY_STEP=1 fail every call.
 
 #include "platform/configstore/support.h"
 
@@ -23,7 +22,7 @@ using namespace store_test;
 
 namespace {
 
-/// A document in which every port tells which save it belongs to.
+/// A document in which every port is tagged with its save.
 std::string Tagged(int ports, const std::string &tag) {
     std::string json = R"({"name":")" + tag + R"(","ports":{)";
     for (int port = 0; port < ports; port++)
@@ -32,7 +31,7 @@ std::string Tagged(int ports, const std::string &tag) {
     return json + "}}";
 }
 
-/// The tag of a whole document; empty for none, "mixed" for one of several saves.
+/// The tag of a whole document; empty without one, "mixed" for a mixture of saves.
 std::string TagOf(const std::string &json, int ports) {
     if (json.empty()) return {};
     const std::size_t start = json.find("\"name\":\"") + 8;
@@ -40,7 +39,7 @@ std::string TagOf(const std::string &json, int ports) {
     return json == Tagged(ports, tag) ? tag : "mixed";
 }
 
-/// One save as the library makes it; the first status that is not OK.
+/// One save with the library's sequence of calls. Returns the first status that is not OK.
 int32_t SaveOnce(const std::string &path, const std::string &json) {
     Store *raw = nullptr;
     int32_t status = admin::Open(path, false, &raw);
@@ -97,7 +96,7 @@ TEST_F(StoreDurability, KilledSaveLeavesTheOldOrTheNewWhole) {
         const std::string now = "round" + std::to_string(round);
         EXPECT_TRUE(after == before || after == now) << after;
         if (WIFEXITED(status)) {
-            EXPECT_EQ(after, now); // it said that the save was done
+            EXPECT_EQ(after, now); // the child reported a completed save
         }
         (after == now ? changed : kept)++;
         before = after;
@@ -162,7 +161,7 @@ TEST_F(StoreDurability, FailingSystemCallsGiveAnErrorAndLeaveTheOldOrTheNewWhole
             [&](fault::Child &) { return static_cast<uint32_t>(SaveOnce(path_, json)); },
             [&](uint64_t round, const fault::Report &report) {
                 SCOPED_TRACE(round);
-                EXPECT_LT(report.status, 100U); // cancelling always works
+                EXPECT_LT(report.status, 100U); // cancelling always succeeds
                 EXPECT_EQ(report.leakedFds, 0);
                 const std::string after = StoredTag(kPorts);
                 const bool whole = after == "new" || (after == "old" && report.status != OK);
@@ -253,7 +252,7 @@ TEST_P(StoreConcurrency, ContentionIsAnsweredByTheCallsAfterBegin) {
         EXPECT_EQ(CommitTransaction(second.get()), BUSY);
         EXPECT_EQ(CancelTransaction(second.get()), OK);
         const Failure *const failure = admin::LastFailure(second.get());
-        ASSERT_NE(failure, nullptr); // of the begin; the refused calls and the cancel leave it
+        ASSERT_NE(failure, nullptr); // recorded by the begin; the rejected calls and the cancel keep it
         EXPECT_EQ(failure->status, BUSY);
         EXPECT_EQ(failure->sqliteCode, GetParam() == In::File ? SQLITE_BUSY : 0);
     }

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Database files that nobody vouches for: each is refused or read, never followed into harm, and what is
-// refused is left as it was. STORE_FLIP_ROUNDS sets how many damaged copies are looked at.
+// Untrusted database files: each is read or rejected without harm, and a rejected file is left unchanged.
+// STORE_FLIP_ROUNDS sets the number of damaged copies.
 
 #include "platform/configstore/support.h"
 
@@ -26,7 +26,7 @@ void WriteFile(const std::string &path, const std::string &bytes) {
 
 class StoreHostileDatabase : public StoreTest {
 protected:
-    /// Opening gives the status and names the file; the file's bytes stay.
+    /// Opening returns the status, names the file and leaves the file's bytes unchanged.
     void ExpectRefused(int32_t wanted, const std::string &why) {
         const bool file = std::filesystem::is_regular_file(path_);
         const std::string before = file ? ReadFile(path_) : "";
@@ -42,7 +42,7 @@ protected:
         }
     }
 
-    /// A good store's bytes, in one file.
+    /// The bytes of a valid store, in one file.
     std::string GoodStore() {
         {
             const StorePtr store = Open();
@@ -59,7 +59,8 @@ protected:
         return ReadFile(path_);
     }
 
-    /// Uses every function on whatever the file is. Everything may be refused, with the file's name.
+    /// Calls every function on the file, whatever it contains. Each may fail with an error that names the
+    /// file.
     void Exercise() {
         Store *store = nullptr;
         Failure failure;
@@ -97,7 +98,7 @@ TEST_F(StoreHostileDatabase, RandomDamage) {
     const char *const wanted = std::getenv("STORE_FLIP_ROUNDS");
     const int rounds = wanted ? std::atoi(wanted) : 60;
     const std::string good = GoodStore();
-    // The pages of a small store are mostly empty: damage is done where something stands.
+    // The pages of a small store are mostly empty, so only used bytes are damaged.
     std::vector<std::size_t> used;
     for (std::size_t at = 0; at < good.size(); at++) {
         if (good[at] != 0) used.push_back(at);
@@ -109,7 +110,7 @@ TEST_F(StoreHostileDatabase, RandomDamage) {
         if (round % 4 == 3) {
             bad.resize(random() % bad.size());
         } else {
-            // A few bytes anywhere, or many close together.
+            // Changes a few bytes anywhere, or many close together.
             const std::size_t from = random() % used.size();
             for (uint64_t flips = round % 4 == 2 ? 200 : 1 + random() % 8; flips > 0; flips--) {
                 const std::size_t behind = round % 4 == 2 ? random() % 300 : random();

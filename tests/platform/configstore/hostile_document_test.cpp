@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Documents that nobody meant well with: refused with the reason and the place, nothing stored, memory in
-// proportion. STORE_HOSTILE_MB sets the size of the large ones.
+// Hostile documents: each is rejected with the reason and the place, nothing is stored, and memory stays
+// proportional to the input. STORE_HOSTILE_MB sets the size of the large ones.
 
 #include "platform/configstore/support.h"
 
@@ -15,7 +15,7 @@ using namespace store_test;
 namespace {
 
 #if defined(__SANITIZE_ADDRESS__) || defined(__SANITIZE_THREAD__)
-constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping is most of it
+constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping dominates
 #else
 constexpr bool kMemoryCounts = true;
 #endif
@@ -30,7 +30,7 @@ std::string Repeat(const std::string &text, std::size_t times) {
 
 class StoreHostileDocument : public StoreTest {
 protected:
-    /// Neither way into the store takes the document, and both say why.
+    /// Both ways into the store reject the document and report why.
     void ExpectRefused(const std::string &json, const std::string &why) {
         SCOPED_TRACE(json.substr(0, 80));
         const StorePtr store = Open();
@@ -97,13 +97,13 @@ TEST_F(StoreHostileDocument, WhatIsNotAnObject) {
 }
 
 TEST_F(StoreHostileDocument, TextsWithNulBytesFromOutsideEndThere) {
-    // A C text cannot hold one: what follows is not looked at.
+    // A C string ends at its first NUL; the bytes after it are ignored.
     Object *object = nullptr;
     ASSERT_EQ(CreateObject(kKey, kGroup, kComponent, "sw1", "{}\0{{{{", &object), OK);
     DestroyObject(object);
 }
 
-/// Peak memory of a child that does `work`, beyond what it had before, in bytes.
+/// The growth of a child's peak memory while it does `work`, in bytes.
 long PeakOf(const std::function<void()> &work) {
     int ends[2];
     EXPECT_EQ(pipe(ends), 0);

@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Large blocks from the system, a few of which stay with the process.
+// Large blocks from the system; the process caches a few of them.
 
 #include "platform/embedded/configstore/huge_pages.h"
 

@@ -173,7 +173,7 @@ TEST(StoreFilter, DescendsIntoSingletonsWhereTheMemberIsAbsentDepthFirst) {
     EXPECT_EQ(Ids(object.get(), "things", &status), (std::vector<std::string>{"deep", "later", "last"}));
 }
 
-// What was made by calls comes back from the store as text that the schema does not describe.
+// Objects built by calls can be stored as text that the schema does not describe.
 TEST(StoreFilter, DescendsIntoUnknownSingletonsOfADocumentToo) {
     const std::string document =
         R"({"own":{"things":{"a":{}},"number":1},"other":{"below":{"things":{"b":{},"c":{"x":1}}}},)"
@@ -191,7 +191,7 @@ TEST(StoreFilter, DescendsIntoUnknownSingletonsOfADocumentToo) {
                                  R"("text":"things","list":["things"],"one":{"b\"y\u0001":{"e":{}}}})");
 }
 
-// A search remembers what kinds of objects cannot lead to its key; an unknown singleton can, wherever it is.
+// A search caches which kinds of objects cannot lead to its key. An unknown singleton always can.
 TEST(StoreFilter, DescendsIntoUnknownSingletonsThatCameAfterASearch) {
     const ObjectPtr object = NewSwitch(R"({"ports":{"p":{"settings":{"blocked":true}}}})");
     Object *const port = Sub(object.get(), "ports", "p");
@@ -207,7 +207,7 @@ TEST(StoreFilter, DescendsIntoUnknownSingletonsThatCameAfterASearch) {
     FreeSubObjectArray(found);
 }
 
-// The switch's settings have sessions of their own, a port's have none: one search may ask both.
+// The switch's settings have sessions, a port's settings have none. One search may visit both.
 TEST(StoreFilter, RemembersWhatCannotLeadToItsKeyByKindOfObject) {
     const ObjectPtr object = NewSwitch(R"({"settings":{"vspans":{"s":{}}},"ports":{"p":{"settings":{}}}})");
     Object *const port = Sub(object.get(), "ports", "p");

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The quick reader for documents as the store writes them, held against the general reader: white space in
-// front of a document is what sends it to the latter.
+// Compares the fast reader, which handles documents in the store's own format, with the general reader.
+// Leading white space forces the general reader.
 
 #include <optional>
 
@@ -56,7 +56,7 @@ constexpr const char *kDocuments[] = {
     R"({"name":"a",})",
     R"({"ports":{"1":{}})",
     R"({"ports":{"1":{}}}})",
-    "{\"name\":\"\xf4\x8f\xbb\xbf\"}", // stands for a byte
+    "{\"name\":\"\xf4\x8f\xbb\xbf\"}", // replaced by a byte
     "{\"name\":\"\xc3\"}",
     "}",
     "",
@@ -68,7 +68,7 @@ std::shared_ptr<const Buffer> Kept(const std::string &text) {
     return kept;
 }
 
-/// What the look at a document for a rewrite finds: nothing, or the document with its lists read after all.
+/// The result of scanning a document for a rewrite: nothing, or the document with its deferred lists read.
 std::optional<std::string> ReadOutlined(const std::string &json) {
     Tree tree({Layer::Current, kKey, kGroup, kComponent, "sw1"});
     Outline outline;
@@ -79,7 +79,7 @@ std::optional<std::string> ReadOutlined(const std::string &json) {
     return FindViolation(&tree) ? "a violation" : Json(&tree.root);
 }
 
-/// Looking through a document may leave it to the reader, but never overlooks anything.
+/// The scan may leave a document to the reader but must never miss an error.
 void ExpectOverlooksNothing(const std::string &json) {
     const std::optional<std::string> outlined = ReadOutlined(json);
     if (outlined) {
@@ -87,7 +87,7 @@ void ExpectOverlooksNothing(const std::string &json) {
     }
 }
 
-// All that ports are mostly made of, so that it need not be read: escapes, characters beyond ASCII, lists.
+// Typical contents of ports, which the scan skips: escapes, characters beyond ASCII, lists.
 constexpr const char *kPorts =
     R"({"name":"a","ports":{"1":{"name":"q\"\\\/\n\r\t\b\f grün 中","connection_cookie":4294967295,"settings":)"
     R"({"blocked":false,"vlan":{"trunk_vlan_ids":{},"vlan_id":5},"in_shaping_policy":{"enabled":true,"peak_bandwidth":-8}}},)"

@@ -1,7 +1,7 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The schema: every field described, every limit enforced at Set with the field's path, and the compiled
-// check of one mind with a general JSON Schema validator. STORE_ORACLE_ROUNDS sets how many random documents
-// they are asked about.
+// The schema describes every field, and Set enforces every limit and reports the field's path. The compiled
+// check must agree with a general JSON Schema validator; STORE_ORACLE_ROUNDS sets the number of random
+// documents.
 
 #include "platform/configstore/support.h"
 
@@ -37,7 +37,7 @@ std::string RandomText(Random *random, uint64_t maxBytes) {
     std::string text;
     while (text.size() < size)
         text += kPieces[Below(random, std::size(kPieces))];
-    if (Below(random, 2) == 0) text.resize(size); // may cut a character in two
+    if (Below(random, 2) == 0) text.resize(size); // may split a character
     return text;
 }
 
@@ -164,7 +164,7 @@ void ForEachField(const Visit &visit) {
         FindSchema(kKey, kGroup), "", [](const std::string &value) { return value; }, visit);
 }
 
-/// Set's verdict on a document and the record of it.
+/// The status of Set for a document, and its failure record.
 int32_t Verdict(Store *store, const std::string &document, std::string *why) {
     const ObjectPtr object = NewSwitch(document);
     const int32_t status = Set(store, object.get(), "EXTERNAL");
@@ -207,7 +207,7 @@ TEST_F(StoreSchema, WrongTypeAtEveryPathIsRefusedByItsPath) {
         if (field->type == FieldType::Any) return;
         for (const std::string value :
              {"null", "true", "7", "2.5", "\"@\"", "[]", "[{}]", "{}", "{\"a\":1}"}) {
-            // What is right for the type, or breaks a field below this one, is not this field's fault.
+            // Skips values of the right type and values that violate a field below this one.
             const bool container = field->type == FieldType::Object || field->type == FieldType::Instances;
             const bool fits = (value == "true" && field->type == FieldType::Bool) ||
                               (value == "7" && field->type == FieldType::Integer) ||
@@ -249,7 +249,7 @@ TEST_F(StoreSchema, TextsAreHeldToTheirBytes) {
     ForEachField([&](const Field *field, const std::string &path, const auto &around) {
         if (field->maxBytes > 1000) return;
         limits++;
-        // Two bytes a character: what counts is bytes.
+        // Two bytes per character: limits count bytes.
         std::string most;
         while (most.size() + 2 <= field->maxBytes)
             most += "\xc3\xa9";

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Stores and transactions, over every backend: a commit is visible, a cancelled change is not, and every status
-// once.
+// Stores and transactions, over every backend: a commit is visible, a cancelled change is not, and every
+// status once.
 
 #include "platform/configstore/support.h"
 
@@ -19,7 +19,7 @@ protected:
         EXPECT_EQ(admin::History(store, &entries), OK);
         return entries;
     }
-    /// The revision that brought the object's present document.
+    /// The revision that stored the object's current document.
     static int64_t RevisionOf(Store *store, const std::string &id) {
         std::vector<admin::Entry> entries;
         EXPECT_EQ(admin::List(store, &entries), OK);
@@ -179,7 +179,7 @@ TEST_F(StoreFile, FileAndDirectoryAreForTheOwnerOnly) {
     }
 }
 
-/// The store that GetStore opens, which the environment names.
+/// The store that GetStore opens; the environment names it.
 StorePtr OpenHosts(const std::string &path) {
     setenv("DVS_CONFIGSTORE", path.c_str(), 1);
     Store *store = nullptr;
@@ -193,7 +193,7 @@ TEST_F(StoreFile, MemoryDatabaseIsOnePerProcess) {
     EXPECT_FALSE(std::filesystem::exists(":memory:"));
     Store *other = nullptr;
     ASSERT_EQ(admin::OpenInMemory(&other), OK);
-    EXPECT_EQ(Stored(StorePtr(other).get()), ""); // a store of its own
+    EXPECT_EQ(Stored(StorePtr(other).get()), ""); // a separate store
 }
 
 TEST_F(StoreFile, PathIsReadWithEachStore) {

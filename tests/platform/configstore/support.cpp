@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The config store's test support (support.h).
+// Helpers of the config store's tests (support.h).
 
 #include "platform/configstore/support.h"
 
@@ -17,7 +17,7 @@
 
 namespace {
 
-// In place of the host's log. Without allocations, which some tests count.
+// Replaces the host's log. Does not allocate, because some tests count allocations.
 char g_hostLog[1 << 14];
 std::size_t g_hostLogSize = 0;
 

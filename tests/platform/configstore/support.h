@@ -2,8 +2,8 @@
 #ifndef TESTS_PLATFORM_CONFIGSTORE_SUPPORT_H
 #define TESTS_PLATFORM_CONFIGSTORE_SUPPORT_H
 
-// What the config store's tests share: owners for the client interface's handles, a store in a directory of
-// the test's own or in memory, and the host's log.
+// Helpers of the config store's tests: owners for the client interface's handles, a store in the test's own
+// directory or in memory, and the host's log.
 
 #include <cstdint>
 #include <iosfwd>
@@ -37,41 +37,41 @@ struct SpecFree {
 };
 using SpecPtr = std::unique_ptr<configstore::FilterSpec, SpecFree>;
 
-/// A switch object from a document; null, with a failed expectation, when it is refused.
+/// A switch object from a document; null, with a failed expectation, when it is rejected.
 ObjectPtr NewSwitch(const std::string &json = "{}", const char *id = "sw1");
 SpecPtr NewSpec(const char *key, const char *id = "");
-/// The sub-object, made if it has to be; null, with a failed expectation, when it cannot.
+/// The sub-object, created if absent; null, with a failed expectation, on failure.
 configstore::Object *Sub(configstore::Object *parent, const char *name, const char *id = "");
 /// The document that an object would be stored as.
 std::string Json(const configstore::Object *object);
-/// A text value, or a note of the status in angle brackets.
+/// A text value, or the status in angle brackets.
 std::string Text(configstore::Object *object, const char *name);
 std::vector<std::string> Texts(configstore::Object *object, const char *name);
-/// The ids of what a filter spec finds; empty, with *status set, when it finds nothing.
+/// The ids of the objects that a filter spec finds; empty, with *status set, when it finds nothing.
 std::vector<std::string> Ids(configstore::Object *object, const char *key, int32_t *status,
                              const char *id = "");
 /// The current objects' ids, in the order of the listing.
 std::vector<std::string> StoredIds(configstore::Store *store);
 
-/// What went to the host's log since the last call.
+/// The lines written to the host's log since the last call.
 std::string TakeHostLog();
 
 /// The text of the store's last failure; empty if there is none.
 std::string LastFailure(const configstore::Store *store);
 
-/// A store in a file of a directory of the test's own, which is removed with everything in it.
+/// A store in a file in the test's own directory, which the destructor removes.
 class StoreTest : public testing::Test {
 protected:
     void SetUp() override;
     void TearDown() override;
-    /// Opens the store once more, expecting that it can be.
+    /// Opens the store again; this must succeed.
     virtual StorePtr Open();
-    /// Stores a switch in a transaction of its own, expecting that it can be.
+    /// Stores a switch in its own transaction; this must succeed.
     void Save(configstore::Store *store, const std::string &json, const char *id = "sw1",
               const char *source = "EXTERNAL");
     /// The stored document; empty when there is none.
     std::string Stored(configstore::Store *store, const char *id = "sw1");
-    /// One number from the database, read with a connection of the test's own.
+    /// One number from the database, read over a separate connection.
     int64_t Number(const std::string &sql);
     void Run(const std::string &sql);
 
@@ -82,7 +82,7 @@ protected:
 enum class In { File, Memory };
 void PrintTo(In in, std::ostream *out);
 
-/// For what holds of every backend: a store in a file, or in memory.
+/// For tests that apply to every backend: a store in a file, or in memory.
 class AnyStoreTest : public StoreTest, public testing::WithParamInterface<In> {
 protected:
     StorePtr Open() override;

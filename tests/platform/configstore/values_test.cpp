@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Typed values: what is set reads back, what is of another type or does not fit is refused, what is not there
-// is 6.
+// Typed values: a set value reads back, a value of another type or range is rejected, and an absent value
+// gives status 6.
 
 #include "platform/configstore/support.h"
 
@@ -168,7 +168,7 @@ TEST(StoreValues, ATextThatMightBeBase64IsNoBinaryValueWhereItWasSetAsAText) {
     EXPECT_EQ(GetValueBinary(o, "set", &data, &len), SCHEMA_VIOLATION);
     EXPECT_EQ(data, nullptr);
     EXPECT_EQ(len, 7U);
-    // A document does not tell the two apart where the schema knows nothing.
+    // Where the schema has no entry, a document does not distinguish the two.
     EXPECT_EQ(Text(o, "read"), "text");
     ASSERT_EQ(GetValueBinary(o, "read", &data, &len), OK);
     EXPECT_EQ(len, 3U);
