@@ -266,7 +266,7 @@ void EmitWholeState(const SwitchSizes &sizes) {
         if (dvsSwitchTable[slot]) ListLines::Write(dvsSwitchTable[slot]->switchId, sizes[slot]);
 }
 
-HYP_ReturnStatus NoStateList(HYP_ReturnStatus status) {
+HYP_ReturnStatus StateListFailed(HYP_ReturnStatus status) {
     Message(kError, "DVSState_ConfigSerialize, alloc failed\n");
     return status;
 }
@@ -282,7 +282,7 @@ HYP_ReturnStatus SerializeTable(void **buf, uint32_t *len) {
     }
     OutputBlock block(buf, len, StateAlloc, std::free);
     HYP_ReturnStatus status = block.Reserve(stateSize);
-    if (status != HYP_OK) return NoStateList(status);
+    if (status != HYP_OK) return StateListFailed(status);
     data::EmitAllocated(data::kMinBufferSize);
     data::ImageWriter writer(block.Bytes());
     status = WriteSwitches(writer, sizes);
@@ -299,7 +299,7 @@ HYP_ReturnStatus SerializeTable(void **buf, uint32_t *len) {
 HYP_ReturnStatus SerializeDuplicates(void **buf, uint32_t *len) {
     OwnedList state;
     const HYP_ReturnStatus status = NewList(state);
-    if (status != HYP_OK) return NoStateList(status);
+    if (status != HYP_OK) return StateListFailed(status);
     for (DVSwitch *sw : dvsSwitchTable) {
         if (!sw) continue;
         void *nested = nullptr;

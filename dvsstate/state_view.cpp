@@ -76,7 +76,7 @@ constexpr FieldCheck kFieldChecks[] = {
     {kMaxPortsEntry, StateFaultKind::MaxPortsMissing, StateFaultKind::MaxPortsShort},
 };
 
-StatePath Below(StatePath path, std::string_view name) {
+StatePath ChildPath(StatePath path, std::string_view name) {
     path.names[path.depth++] = name;
     return path;
 }
@@ -100,7 +100,7 @@ void StateView::Descend(StateItem *item, Bytes bytes, std::size_t offset) {
     (void)level.view.WalkAnyway(); // if it returns false, the level has no entries
 }
 
-void StateView::GiveSwitch(StateItem *item) {
+void StateView::FillSwitch(StateItem *item) {
     item->kind = StateItemKind::Switch;
     Descend(item, item->entry.value, item->entry.ValueOffset());
     Level &level = levels_[depth_ - 1];
@@ -114,7 +114,7 @@ void StateView::GiveSwitch(StateItem *item) {
     for (const FixedEntry list : {kHostEntry, kGlobalEntry}) {
         if (item->fault || fixed[list].offset == kNoEntry) continue;
         item->fault = BufferFault(data::VerifyBuffer(fixed[list].value, fixed[list].ValueOffset()),
-                                  Below(item->path, kFixedEntries[list]));
+                                  ChildPath(item->path, kFixedEntries[list]));
     }
     for (const FieldCheck &check : kFieldChecks) {
         if (item->fault) return;
@@ -122,12 +122,13 @@ void StateView::GiveSwitch(StateItem *item) {
         if (entry.offset == kNoEntry) {
             item->fault = {check.missing, item->entry.offset, item->path, {}};
         } else if (check.tooShort != StateFaultKind::None && !U32Of(entry)) {
-            item->fault = {check.tooShort, entry.offset, Below(item->path, kFixedEntries[check.entry]), {}};
+            item->fault = {
+                check.tooShort, entry.offset, ChildPath(item->path, kFixedEntries[check.entry]), {}};
         }
     }
 }
 
-void StateView::GiveMember(StateItem *item) {
+void StateView::FillMember(StateItem *item) {
     const auto &offsets = levels_[1].fieldOffsets;
     const auto found = std::ranges::find(offsets, item->entry.offset);
     const auto index = static_cast<std::size_t>(found - offsets.begin());
@@ -146,7 +147,7 @@ void StateView::GiveMember(StateItem *item) {
         if (kind) {
             item->portKind = *kind;
         } else if (!item->fault) {
-            item->fault = {StateFaultKind::PortKindShort, entry.offset, Below(item->path, kPortKind), {}};
+            item->fault = {StateFaultKind::PortKindShort, entry.offset, ChildPath(item->path, kPortKind), {}};
         }
         return;
     }
@@ -178,9 +179,9 @@ bool StateView::Next(StateItem *item) {
     else if (item->dropped)
         item->kind = StateItemKind::Other;
     else if (depth_ == 1)
-        GiveSwitch(item);
+        FillSwitch(item);
     else
-        GiveMember(item);
+        FillMember(item);
     return true;
 }
 

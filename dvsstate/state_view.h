@@ -133,8 +133,8 @@ private:
     };
 
     void Descend(StateItem *item, data::Bytes bytes, std::size_t offset);
-    void GiveSwitch(StateItem *item);
-    void GiveMember(StateItem *item);
+    void FillSwitch(StateItem *item);
+    void FillMember(StateItem *item);
     [[nodiscard]] StatePath PathTo(std::size_t depth, std::string_view name) const;
 
     data::Bytes bytes_;

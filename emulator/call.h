@@ -37,7 +37,7 @@ struct Payload {
     uint32_t size = 0;
     Block owned;
 
-    bool IsLent() const { return size > 0 && !owned; }
+    bool IsBorrowed() const { return size > 0 && !owned; }
 };
 
 struct Answer {

@@ -128,7 +128,7 @@ bool Connection::Send(const wire::ReplyHeader &header, Payload payload) {
     if (!sending_) return true;
     if (!budget_->Take(Counted(out_.size))) return false;
     outReserved_ = Counted(out_.size);
-    if (!out_.IsLent()) return true;
+    if (!out_.IsBorrowed()) return true;
     Block copy(std::malloc(out_.size));
     if (!copy) return false;
     std::memcpy(copy.get(), out_.data, out_.size);

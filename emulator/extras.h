@@ -16,7 +16,7 @@ namespace dvs::emulator {
 
 struct PortExtras {
     bool linkUp = false;
-    bool gaveConnectionId = false; // assigned when the link came up; removed when it goes down
+    bool assignedConnectionId = false; // assigned when the link came up; removed when it goes down
     std::map<int32_t, std::vector<char>> uplinks;
 };
 

@@ -104,7 +104,7 @@ bool Parse(std::string_view text, Fault *fault, std::string *why) {
         *why = "bad field \"" + std::string(field) + "\"";
         return false;
     }
-    if (fault->Refuses() || fault->drop != Drop::No || fault->delay.count() > 0) return true;
+    if (fault->Fails() || fault->drop != Drop::No || fault->delay.count() > 0) return true;
     *why = "no effect given: add status=, errno=, delay= or drop";
     return false;
 }

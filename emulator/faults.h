@@ -35,7 +35,7 @@ struct Fault {
     Drop drop = Drop::No;
     uint64_t seen = 0; // matching requests so far
 
-    bool Refuses() const { return status || error; }
+    bool Fails() const { return status || error; }
 };
 
 class Faults {

@@ -13,7 +13,7 @@
 
 #include "dvsstate/port_table.h"
 #include "dvsstate/switch_table.h"
-#include "emulator/give.h"
+#include "emulator/reply_value.h"
 
 namespace dvs::emulator {
 
@@ -261,7 +261,7 @@ HYP_ReturnStatus Module::CheckRoom(uint64_t size) {
     return HYP_OK;
 }
 
-void Module::Forget(const char *switchName, const char *portId) {
+void Module::RemoveExtras(const char *switchName, const char *portId) {
     const auto sw = extras_.find(std::string_view(switchName));
     if (sw == extras_.end()) return;
     const auto port = sw->second.ports.find(std::string_view(portId));
@@ -312,7 +312,7 @@ HYP_ReturnStatus Module::StateGet(const Call &call, Answer *answer) {
         if (status != HYP_OK) return status;
         state.reset(serialized);
     }
-    const HYP_ReturnStatus status = Give(call, state.get(), fetchedStateSize_, answer);
+    const HYP_ReturnStatus status = ReplyWith(call, state.get(), fetchedStateSize_, answer);
     // After a failure the client immediately retries with the returned size.
     if (status == HYP_OK)
         answer->payload.owned = std::move(state);

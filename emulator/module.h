@@ -93,7 +93,7 @@ private:
     /// The same for a property's value, which also has its own limit.
     HYP_ReturnStatus CheckValue(uint64_t size);
     PortExtras &ExtrasOf(DVSPort *port);
-    void Forget(const char *switchName, const char *portId);
+    void RemoveExtras(const char *switchName, const char *portId);
 
     const std::string stateFile_;
     const bool sync_;

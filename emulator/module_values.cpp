@@ -4,8 +4,8 @@
 #include <charconv>
 #include <cstring>
 
-#include "emulator/give.h"
 #include "emulator/module.h"
+#include "emulator/reply_value.h"
 
 namespace {
 
@@ -14,13 +14,13 @@ using dvs::emulator::Call;
 
 using ReadProp = HYP_ReturnStatus (*)(DVSwitch *, const char *, void **, uint32_t *);
 
-HYP_ReturnStatus GiveProp(const Call &call, ReadProp read, Answer *answer) {
+HYP_ReturnStatus ReplyWithProp(const Call &call, ReadProp read, Answer *answer) {
     DVSwitch *sw = DVSState_SwitchFind(call.record.switchName);
     if (!sw) return HYP_NOT_FOUND;
     void *value = nullptr;
     uint32_t size = 0;
     const HYP_ReturnStatus status = read(sw, call.record.propName, &value, &size);
-    return status == HYP_OK ? dvs::emulator::Give(call, value, size, answer) : status;
+    return status == HYP_OK ? dvs::emulator::ReplyWith(call, value, size, answer) : status;
 }
 
 DVSPort *FindPort(const Call &call) {
@@ -45,10 +45,10 @@ namespace dvs::emulator {
 // Switch properties
 
 HYP_ReturnStatus Module::GlobalPropGet(const Call &call, Answer *answer) {
-    const HYP_ReturnStatus status = GiveProp(call, DVSState_GlobalPropRead, answer);
+    const HYP_ReturnStatus status = ReplyWithProp(call, DVSState_GlobalPropRead, answer);
     if (status != HYP_NOT_FOUND || std::strcmp(call.record.propName, kSwitchVersionProp) != 0) return status;
     DVSwitch *sw = DVSState_SwitchFind(call.record.switchName);
-    return sw ? Give(call, &sw->version, sizeof sw->version, answer) : status;
+    return sw ? ReplyWith(call, &sw->version, sizeof sw->version, answer) : status;
 }
 
 HYP_ReturnStatus Module::GlobalPropSet(const Call &call, Answer *) {
@@ -63,7 +63,7 @@ HYP_ReturnStatus Module::GlobalPropClear(const Call &call, Answer *) {
 }
 
 HYP_ReturnStatus Module::HostPropGet(const Call &call, Answer *answer) {
-    return GiveProp(call, DVSState_HostPropRead, answer);
+    return ReplyWithProp(call, DVSState_HostPropRead, answer);
 }
 
 HYP_ReturnStatus Module::HostPropSet(const Call &call, Answer *) {
@@ -90,7 +90,7 @@ HYP_ReturnStatus Module::PortAdd(const Call &call, Answer *) {
 
 HYP_ReturnStatus Module::PortRemove(const Call &call, Answer *) {
     const HYP_ReturnStatus status = DVSState_PortRemove(call.record.switchName, call.record.portId);
-    if (status == HYP_OK) Forget(call.record.switchName, call.record.portId);
+    if (status == HYP_OK) RemoveExtras(call.record.switchName, call.record.portId);
     return status;
 }
 
@@ -106,7 +106,7 @@ HYP_ReturnStatus Module::PortStateGet(const Call &call, Answer *answer) {
     HYP_ReturnStatus status = DVSState_PortSerialize(port, &serialized, &size);
     if (status != HYP_OK) return status;
     Block state(serialized);
-    status = Give(call, serialized, size, answer);
+    status = ReplyWith(call, serialized, size, answer);
     answer->payload.owned = std::move(state);
     return status;
 }
@@ -117,7 +117,7 @@ HYP_ReturnStatus Module::PortDataGet(const Call &call, Answer *answer) {
     void *value = nullptr;
     uint32_t size = 0;
     const HYP_ReturnStatus status = DVSState_PortDataGet(port, call.record.propName, &value, &size);
-    return status == HYP_OK ? Give(call, value, size, answer) : status;
+    return status == HYP_OK ? ReplyWith(call, value, size, answer) : status;
 }
 
 HYP_ReturnStatus Module::PortDataSet(const Call &call, Answer *) {
@@ -158,7 +158,7 @@ HYP_ReturnStatus Module::UplinkDataGet(const Call &call, Answer *answer) {
     const auto &uplinks = ExtrasOf(port).uplinks;
     const auto found = uplinks.find(uplink);
     if (found == uplinks.end()) return HYP_NOT_FOUND;
-    return Give(call, found->second.data(), static_cast<uint32_t>(found->second.size()), answer);
+    return ReplyWith(call, found->second.data(), static_cast<uint32_t>(found->second.size()), answer);
 }
 
 } // namespace dvs::emulator

@@ -58,22 +58,22 @@ const Row *FindRow(std::string_view name) {
     return nullptr;
 }
 
-bool Wrong(std::string text, std::string *why) {
+bool UsageError(std::string text, std::string *why) {
     *why = std::move(text);
     return false;
 }
 
 bool Complete(Options *options, std::string *why) {
     if (options->mode == Mode::Help || options->mode == Mode::Version) return true;
-    if (options->sync && options->state.empty()) return Wrong("--sync requires --state", why);
+    if (options->sync && options->state.empty()) return UsageError("--sync requires --state", why);
     if (options->mode == Mode::Run) {
-        if (options->command.empty()) return Wrong("run requires a command after --", why);
+        if (options->command.empty()) return UsageError("run requires a command after --", why);
         options->command.push_back(nullptr);
         return true;
     }
     const char *fromEnvironment = secure_getenv("DVS_EMULATOR");
     if (options->socket.empty() && fromEnvironment) options->socket = fromEnvironment;
-    return !options->socket.empty() || Wrong("--socket PATH is missing", why);
+    return !options->socket.empty() || UsageError("--socket PATH is missing", why);
 }
 
 } // namespace
@@ -91,9 +91,9 @@ bool ParseOptions(int argc, char **argv, Options *options, std::string *why) {
             break;
         }
         const Row *row = FindRow(word);
-        if (!row) return Wrong("unknown option \"" + std::string(word) + "\"", why);
+        if (!row) return UsageError("unknown option \"" + std::string(word) + "\"", why);
         const bool valued = !row->value.empty();
-        if (valued && i + 1 == argc) return Wrong(std::string(word) + " requires a value", why);
+        if (valued && i + 1 == argc) return UsageError(std::string(word) + " requires a value", why);
         if (!row->set(options, valued ? argv[++i] : "", why)) return false;
     }
     return Complete(options, why);

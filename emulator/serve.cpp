@@ -51,7 +51,7 @@ bool IgnoresHangup() {
 }
 
 /// Returns a descriptor that becomes readable on a termination signal.
-int EndSignals() {
+int TerminationSignals() {
     // The reader of the ready line may be gone.
     std::signal(SIGPIPE, SIG_IGN);
     sigset_t signals;
@@ -83,7 +83,7 @@ void PrintError(const std::string &text) {
 
 int Serve(const Options &options, const std::function<void()> &ready) {
     OpenStandardStreams();
-    const int stopFd = EndSignals();
+    const int stopFd = TerminationSignals();
     if (!InitPortLimit(options.maxPorts)) return kExitUsage;
     Module module(options.state, options.sync);
     module.FaultTable() = options.faults;

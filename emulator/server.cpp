@@ -165,7 +165,7 @@ bool Server::ServeClient(Connection *client, short events, Clock::time_point now
         if (client->delayed && client->delayed->due <= now) {
             Fault fault = std::move(client->delayed->fault);
             client->delayed.reset();
-            return CarryOut(client, fault) && ServeRequests(client);
+            return ExecuteRequest(client, fault) && ServeRequests(client);
         }
         if (events & POLLIN) return client->Receive() && ServeRequests(client);
         if (events & POLLOUT) return client->Flush() && (client->IsSending() || ServeRequests(client));
@@ -191,16 +191,16 @@ bool Server::ServeRequests(Connection *client) {
             client->delayed = {Clock::now() + fault->delay, *fault};
             return true;
         }
-        if (!CarryOut(client, fault.value_or(Fault{}))) return false;
+        if (!ExecuteRequest(client, fault.value_or(Fault{}))) return false;
     }
     return true;
 }
 
-bool Server::CarryOut(Connection *client, const Fault &fault) {
+bool Server::ExecuteRequest(Connection *client, const Fault &fault) {
     if (fault.drop == Drop::Before) return false;
     const Call call = client->Request();
     Answer answer;
-    if (fault.Refuses()) {
+    if (fault.Fails()) {
         answer.status = fault.status.value_or(call.record.status);
         answer.error = fault.error.value_or(ErrnoOf(answer.status));
         answer.dataLen = call.record.dataLen;

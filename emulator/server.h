@@ -38,7 +38,7 @@ private:
     void FinishRequests();
     [[nodiscard]] bool ServeClient(Connection *client, short events, Clock::time_point now);
     [[nodiscard]] bool ServeRequests(Connection *client);
-    [[nodiscard]] bool CarryOut(Connection *client, const Fault &fault);
+    [[nodiscard]] bool ExecuteRequest(Connection *client, const Fault &fault);
     [[nodiscard]] bool AnswerLimits(Connection *client);
     [[nodiscard]] int NextTimeout() const;
 

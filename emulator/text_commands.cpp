@@ -10,8 +10,8 @@
 #include <unordered_set>
 #include <vector>
 
-#include "emulator/give.h"
 #include "emulator/module.h"
+#include "emulator/reply_value.h"
 
 namespace dvs::emulator {
 
@@ -235,15 +235,15 @@ HYP_ReturnStatus Module::LinkUp(DVSPort *port) {
     if (ConnectionId(port) != 0) return HYP_OK;
     const uint32_t id = NextConnectionId();
     const HYP_ReturnStatus status = DVSState_PortDataSet(port, kConnectionIdProp, &id, sizeof id, 0);
-    extras.gaveConnectionId = status == HYP_OK;
+    extras.assignedConnectionId = status == HYP_OK;
     return status;
 }
 
 HYP_ReturnStatus Module::LinkDown(DVSPort *port) {
     PortExtras &extras = ExtrasOf(port);
     extras.linkUp = false;
-    if (!extras.gaveConnectionId) return HYP_OK;
-    extras.gaveConnectionId = false;
+    if (!extras.assignedConnectionId) return HYP_OK;
+    extras.assignedConnectionId = false;
     const HYP_ReturnStatus status = DVSState_PortDataClear(port, kConnectionIdProp);
     // The agent may have cleared it.
     return status == HYP_NOT_FOUND ? static_cast<HYP_ReturnStatus>(HYP_OK) : status;

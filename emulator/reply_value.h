@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-#ifndef EMULATOR_GIVE_H
-#define EMULATOR_GIVE_H
+#ifndef EMULATOR_REPLY_VALUE_H
+#define EMULATOR_REPLY_VALUE_H
 
 // Puts a fetched value into a reply; also the property names that the module itself uses.
 
@@ -15,7 +15,7 @@ inline constexpr const char *kSwitchVersionProp = "com.orbeno.common.version";
 inline constexpr const char *kConnectionIdProp = "com.orbeno.common.port.connectid";
 
 /// Replies to a fetch with a value, or with the size that its buffer needs.
-[[nodiscard]] inline HYP_ReturnStatus Give(const Call &call, const void *value, uint32_t size,
+[[nodiscard]] inline HYP_ReturnStatus ReplyWith(const Call &call, const void *value, uint32_t size,
                                            Answer *answer) {
     answer->dataLen = size;
     if (size > call.record.dataLen) return HYP_LIMIT_EXCEEDED;
