@@ -86,8 +86,10 @@ HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, 
 
 } // namespace
 
-HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
-                        std::uint32_t propType) {
+/// Append(), as part of the exported function: the call costs as much as the checks.
+[[gnu::always_inline]] inline HYP_ReturnStatus AppendHere(DVSData *list, std::string_view name,
+                                                          const void *data, std::uint32_t dataLen,
+                                                          std::uint32_t propType) {
     const std::uint32_t serialSize = EntrySize(dataLen);
     if (dataLen > serialSize) [[unlikely]] {
         Emit(kDetail, "Datalen %u, serial size %u for prop %.*s will cause unsigned operation warp\n",
@@ -111,6 +113,11 @@ HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, 
     if (Emits(kDetail)) [[unlikely]]
         EmitAdded(name, list->serialSize);
     return HYP_OK;
+}
+
+HYP_ReturnStatus Append(DVSData *list, std::string_view name, const void *data, std::uint32_t dataLen,
+                        std::uint32_t propType) {
+    return AppendHere(list, name, data, dataLen, propType);
 }
 
 void RemoveAfter(DVSData *list, DVSDataEntry *previous) {
@@ -144,6 +151,8 @@ HYP_ReturnStatus DVSData_Alloc(DVSData **list, DVSDataAllocFn allocFn, DVSDataFr
 void DVSData_Free(DVSData *list) {
     if (!list) return;
     ListRecord &record = RecordOf(list);
+    // Before the entries: freed after them, its block would make the heap return memory to the system a second time.
+    record.names.Drop(list);
     std::uint8_t *const places = PlacesOf(list);
     const auto placesSize = static_cast<std::size_t>(record.roomEnd - places);
     if (placesSize == 0) {
@@ -157,14 +166,13 @@ void DVSData_Free(DVSData *list) {
         list->head = entry->next;
         FreeEntry(list, entry);
     }
-    record.names.Drop(list);
     Allow(places, placesSize);
     list->freeFn(list);
 }
 
 HYP_ReturnStatus DVSData_Append(DVSData *list, const char *name, const void *data, uint32_t dataLen,
                                 uint32_t propType) {
-    return Append(list, name, data, dataLen, propType);
+    return AppendHere(list, name, data, dataLen, propType);
 }
 
 HYP_ReturnStatus DVSData_Update(DVSData *list, const char *name, const void *data, uint32_t dataLen,

@@ -11,6 +11,7 @@
 #include <emmintrin.h>
 #endif
 
+#include "base/hash.h"
 #include "dvsdata/list_internal.h"
 
 namespace dvs::data {
@@ -22,118 +23,104 @@ std::string_view NameOf(const DVSDataEntry *entry) {
     return {entry->name, ::strnlen(entry->name, kMaxNameLen)};
 }
 
-/// Eight bytes per step; the last step may overlap the previous one. A multiplication spreads them, so that
-/// every bit of a name affects the bits that are used.
 std::uint32_t Hash(std::string_view name) {
-    constexpr std::uint64_t kSpread = 0x9e3779b97f4a7c15u;
-    std::uint64_t hash = name.size() * kSpread;
-    const auto mix = [&hash](const char *at, std::size_t size) {
-        std::uint64_t word = 0;
-        std::memcpy(&word, at, size);
-        hash = (hash ^ word) * kSpread;
-        hash ^= hash >> 29;
-    };
-    constexpr std::size_t kStep = sizeof hash;
-    if (name.size() < kStep) {
-        mix(name.data(), name.size());
-    } else {
-        for (std::size_t at = 0; at + kStep < name.size(); at += kStep)
-            mix(name.data() + at, kStep);
-        mix(name.data() + name.size() - kStep, kStep);
-    }
-    return static_cast<std::uint32_t>(hash >> 32);
+    return static_cast<std::uint32_t>(base::HashText(name));
 }
 
 } // namespace
 
-/// Chains of nodes, all in one block: the table, `size` buckets, `size` nodes.
+/// A hash table in one block: this record, `size` nodes, `size` buckets. A bucket is a chain of nodes in list order that
+/// closes on itself: the bucket holds its last node, which links to its first.
 struct alignas(8) NameIndex::Table {
-    struct Bucket {
-        std::uint32_t first, last;
-    };
     struct Node {
         DVSDataEntry *entry;
         std::uint32_t hash;
         std::uint32_t next; // in the chain or in the free list
     };
+    static constexpr std::uint64_t kMaxSize = std::uint64_t{1} << 31;
 
     std::uint32_t size; // a power of two
     std::uint32_t used; // nodes ever allocated
     std::uint32_t free; // head of the free list
     bool inListOrder;   // nodes are in list order: none was ever freed
 
-    static std::uint64_t BlockSize(std::uint32_t size) {
-        return sizeof(Table) + std::uint64_t{size} * (sizeof(Bucket) + sizeof(Node));
+    static std::uint64_t BlockSize(std::uint64_t size) {
+        return sizeof(Table) + size * (sizeof(Node) + sizeof(std::uint32_t));
     }
-    Bucket &BucketOf(std::uint32_t hash) { return Buckets()[hash & (size - 1)]; }
-    Node *Nodes() { return reinterpret_cast<Node *>(Buckets() + size); }
-    [[nodiscard]] const Node *Nodes() const { return const_cast<Table *>(this)->Nodes(); }
+    [[nodiscard]] const Node *Nodes() const { return reinterpret_cast<const Node *>(this + 1); }
+    [[nodiscard]] bool HasNewNode() const { return used < size; }
     [[nodiscard]] bool IsFull() const { return used == size && free == kNone; }
 
-    void Clear(std::uint32_t newSize) {
+    /// A node for each entry. Nodes of the smaller table are copied, so that their names need not be read again.
+    void Fill(DVSData *list, std::uint32_t newSize, const Table *smaller) {
         size = newSize;
         used = 0;
         free = kNone;
         inListOrder = true;
-        std::memset(static_cast<void *>(Buckets()), 0xff, size * sizeof(Bucket)); // kNone everywhere
-    }
-
-    /// Adds a node for each entry. Reuses the hashes of the smaller table without reading the names again.
-    void Fill(DVSData *list, std::uint32_t newSize, const Table *smaller) {
-        Clear(newSize);
+        std::memset(static_cast<void *>(Lasts()), 0xff, size * sizeof(std::uint32_t)); // kNone everywhere
         const DVSDataEntry *last = nullptr;
         if (smaller && smaller->inListOrder) {
-            for (std::uint32_t i = 0; i < smaller->used; ++i)
-                Add(smaller->Nodes()[i].entry, smaller->Nodes()[i].hash);
-            if (smaller->used) last = smaller->Nodes()[smaller->used - 1].entry;
+            while (used < smaller->used)
+                AddNew(smaller->Nodes()[used].entry, smaller->Nodes()[used].hash);
+            if (used) last = Nodes()[used - 1].entry;
         }
         for (DVSDataEntry *entry = last ? last->next : list->head; entry; entry = entry->next)
-            Add(entry, Hash(NameOf(entry)));
+            AddNew(entry, Hash(NameOf(entry)));
     }
 
-    void Add(DVSDataEntry *entry, std::uint32_t hash) {
-        std::uint32_t index = free;
-        if (index != kNone)
-            free = Nodes()[index].next;
-        else
-            index = used++;
-        Nodes()[index] = {entry, hash, kNone};
-        Bucket &bucket = BucketOf(hash);
-        if (bucket.first == kNone)
-            bucket.first = index;
-        else
-            Nodes()[bucket.last].next = index;
-        bucket.last = index;
+    /// There must be a node that was never handed out.
+    void AddNew(DVSDataEntry *entry, std::uint32_t hash) { Append(entry, hash, used++); }
+
+    /// There must be a node that was given back.
+    void AddAgain(DVSDataEntry *entry, std::uint32_t hash) {
+        const std::uint32_t index = free;
+        free = Nodes()[index].next;
+        Append(entry, hash, index);
     }
 
     void Remove(const DVSDataEntry *entry, std::uint32_t hash) {
-        Bucket &bucket = BucketOf(hash);
-        std::uint32_t previous = kNone, index = bucket.first;
-        while (index != kNone && Nodes()[index].entry != entry) {
+        std::uint32_t &last = LastOf(hash);
+        if (last == kNone) return;
+        std::uint32_t previous = last, index = Nodes()[last].next;
+        while (Nodes()[index].entry != entry) {
+            if (index == last) return;
             previous = index;
             index = Nodes()[index].next;
         }
-        if (index == kNone) return;
-        Node &node = Nodes()[index];
-        (previous == kNone ? bucket.first : Nodes()[previous].next) = node.next;
-        if (bucket.last == index) bucket.last = previous;
-        node.next = free;
+        Nodes()[previous].next = Nodes()[index].next;
+        if (index == last) last = previous == index ? kNone : previous;
+        Nodes()[index].next = free;
         free = index;
         inListOrder = false;
     }
 
     DVSDataEntry *Find(std::string_view name) {
-        const std::uint32_t hash = Hash(name);
-        for (std::uint32_t index = BucketOf(hash).first; index != kNone;) {
+        const std::uint32_t hash = Hash(name), last = LastOf(hash);
+        if (last == kNone) return nullptr;
+        for (std::uint32_t index = Nodes()[last].next;; index = Nodes()[index].next) {
             const Node &node = Nodes()[index];
             if (node.hash == hash && NameMatches(node.entry->name, name)) return node.entry;
-            index = node.next;
+            if (index == last) return nullptr;
         }
-        return nullptr;
     }
 
 private:
-    Bucket *Buckets() { return reinterpret_cast<Bucket *>(this + 1); }
+    Node *Nodes() { return reinterpret_cast<Node *>(this + 1); }
+    std::uint32_t *Lasts() { return reinterpret_cast<std::uint32_t *>(Nodes() + size); }
+    std::uint32_t &LastOf(std::uint32_t hash) { return Lasts()[hash & (size - 1)]; }
+
+    /// Fills the node and puts it at the end of its chain. In an empty chain the node precedes itself; which it is
+    /// cannot be predicted, so it is no branch.
+    void Append(DVSDataEntry *entry, std::uint32_t hash, std::uint32_t index) {
+        std::uint32_t &last = LastOf(hash);
+        Nodes()[index] = {entry, hash, index};
+        const std::uint32_t isEmpty = -std::uint32_t{last == kNone};
+        Node &before = Nodes()[(last & ~isEmpty) | (index & isEmpty)];
+        const std::uint32_t first = before.next;
+        before.next = index;
+        Nodes()[index].next = first;
+        last = index;
+    }
 };
 
 DVSDataEntry *NameIndex::Find(const DVSData *list, std::string_view name) const {
@@ -189,9 +176,16 @@ void NameIndex::RemoveShort(const DVSDataEntry *entry) {
 }
 
 void NameIndex::AddedLong(DVSData *list, DVSDataEntry *entry, std::string_view name) {
+    if (mode_ != Mode::Hashed || !table_->HasNewNode()) [[unlikely]]
+        return AddedFull(list, entry, name);
+    ++count_;
+    table_->AddNew(entry, Hash(name));
+}
+
+void NameIndex::AddedFull(DVSData *list, DVSDataEntry *entry, std::string_view name) {
     ++count_;
     if (mode_ == Mode::Hashed && !table_->IsFull())
-        table_->Add(entry, Hash(name));
+        table_->AddAgain(entry, Hash(name));
     else if (mode_ != Mode::Walk || std::has_single_bit(count_)) // Retry after a failed allocation.
         BuildTable(list);
 }
@@ -210,11 +204,12 @@ void NameIndex::Removing(DVSData *list, DVSDataEntry *entry) {
 }
 
 void NameIndex::BuildTable(DVSData *list) {
-    const std::uint64_t size = std::bit_ceil(std::uint64_t{count_} + 1);
+    // Small tables grow fourfold: building the steps between them again costs more than the unused memory.
+    constexpr std::uint64_t kQuickGrowth = 1024;
+    std::uint64_t size = std::bit_ceil(std::uint64_t{count_} + 1);
+    if (table_ && size < kQuickGrowth) size *= 2;
     auto *const table =
-        size > UINT32_MAX
-            ? nullptr
-            : static_cast<Table *>(list->allocFn(Table::BlockSize(static_cast<std::uint32_t>(size))));
+        size > Table::kMaxSize ? nullptr : static_cast<Table *>(list->allocFn(Table::BlockSize(size)));
     if (table) table->Fill(list, static_cast<std::uint32_t>(size), table_);
     Drop(list);
     table_ = table;

@@ -55,10 +55,12 @@ private:
     /// One byte derived from the end of a name, where names differ most.
     static std::uint8_t Print(std::string_view name) {
         std::uint32_t word = 0;
-        if (name.size() >= sizeof word) [[likely]]
+        if (name.size() >= sizeof word) [[likely]] {
             word = Load32(name.data() + name.size() - sizeof word);
-        else
-            std::memcpy(&word, name.data(), name.size());
+        } else {
+            for (const char c : name)
+                word = word << 8 | static_cast<std::uint8_t>(c);
+        }
         return static_cast<std::uint8_t>(((word + static_cast<std::uint32_t>(name.size())) * 0x9e3779b1u) >>
                                          24);
     }
@@ -68,6 +70,7 @@ private:
         ++count_;
     }
     void AddedLong(DVSData *list, DVSDataEntry *entry, std::string_view name);
+    void AddedFull(DVSData *list, DVSDataEntry *entry, std::string_view name);
     void RemoveShort(const DVSDataEntry *entry);
     void BuildTable(DVSData *list);
     void BuildShort(DVSData *list);

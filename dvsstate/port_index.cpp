@@ -4,9 +4,8 @@
 #include "dvsstate/port_index.h"
 
 #include <algorithm>
-#include <cstring>
 
-#include "dvsdata/format.h"
+#include "base/hash.h"
 #include "dvsstate/switch_record.h"
 
 namespace dvs::state {
@@ -14,31 +13,6 @@ namespace dvs::state {
 namespace {
 
 constexpr uint32_t kFirstBucketNum = 2 * kWalkedSlots;
-
-/// Packs up to seven bytes into a word, some in the middle twice; different inputs of one size differ.
-uint64_t ShortWord(const char *text, std::size_t size) {
-    const auto byte = [text](std::size_t at) { return uint64_t{static_cast<unsigned char>(text[at])}; };
-    if (size >= 4) return dvs::data::Load32(text) | uint64_t{dvs::data::Load32(text + size - 4)} << 32;
-    return size == 0 ? 0 : byte(0) | byte(size / 2) << 8 | byte(size - 1) << 16;
-}
-
-uint32_t HashOf(std::string_view id) {
-    // Eight bytes per step; an odd multiplier and a shift mix them. Ids that collide on purpose cost as much
-    // as a walk.
-    constexpr uint64_t kMultiplier = 0x9e3779b97f4a7c15;
-    uint64_t hash = id.size();
-    const auto mix = [&hash](uint64_t word) {
-        hash = (hash ^ word) * kMultiplier;
-        hash ^= hash >> 32;
-    };
-    for (; id.size() >= sizeof hash; id.remove_prefix(sizeof hash)) {
-        uint64_t word = 0;
-        std::memcpy(&word, id.data(), sizeof word);
-        mix(word);
-    }
-    mix(ShortWord(id.data(), id.size()));
-    return static_cast<uint32_t>(hash);
-}
 
 DVSPort *&BucketFor(DVSwitch *sw, uint32_t hash) {
     return BucketsOf(sw)[hash & (FrontOf(sw).bucketNum - 1)];
@@ -88,7 +62,7 @@ void Rebuild(DVSwitch *sw, uint32_t bucketNum) {
 
 } // namespace
 
-PortKey::PortKey(std::string_view portId) : id(portId), hash(HashOf(portId)) {}
+PortKey::PortKey(std::string_view portId) : id(portId), hash(static_cast<uint32_t>(base::HashText(portId))) {}
 
 DVSPort *IndexFind(DVSwitch *sw, const PortKey &key, uint32_t kind) {
     DVSPort *port = BucketFor(sw, key.hash);
