@@ -143,7 +143,7 @@ void WriteNode(const Object &node, Buffer *out);
 void WriteChildren(const Object &container, Buffer *out) {
     char separator = '{';
     for (const Object *child = FirstChild(&container); child; child = child->next, separator = ',') {
-        if (child->described && child->field->wordNum > 0) {
+        if (child->described && child->field->IsShort()) {
             char *const at = out->Room(1 + sizeof child->field->words);
             *at = separator;
             std::memcpy(at + 1, child->field->words.data(), sizeof child->field->words);

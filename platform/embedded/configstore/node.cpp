@@ -239,8 +239,12 @@ char *Grow(Tree *tree, PackedList *list, std::size_t more) {
 
 } // namespace
 
+char *AppendRoom(Tree *tree, PackedList *list, std::size_t size) {
+    return Grow(tree, list, size + 1);
+}
+
 void AppendText(Tree *tree, PackedList *list, std::string_view text) {
-    char *const at = Grow(tree, list, text.size() + 1);
+    char *const at = AppendRoom(tree, list, text.size());
     if (!text.empty()) std::memcpy(at, text.data(), text.size());
     at[text.size()] = '\0';
 }

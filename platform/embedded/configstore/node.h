@@ -237,6 +237,8 @@ bool TreatAsInstances(Tree *tree, Object *node);
 
 PackedList *NewList(Tree *tree);
 void AppendText(Tree *tree, PackedList *list, std::string_view text);
+/// Appends a text of that size, which the caller writes with its NUL.
+char *AppendRoom(Tree *tree, PackedList *list, std::size_t size);
 void AppendInteger(Tree *tree, PackedList *list, int64_t value);
 [[nodiscard]] int64_t IntegerAt(const PackedList *list, std::size_t index);
 

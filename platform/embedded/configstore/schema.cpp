@@ -74,15 +74,12 @@ const Field *Shape::FindAnew(const char *name) const {
 
 void Shape::Add(Field field) {
     field.prefix = '"' + field.name + "\":";
-    constexpr std::size_t kWord = sizeof field.words[0];
-    const std::size_t words = (field.prefix.size() + kWord - 1) / kWord;
-    if (words <= Field::kMaxWords) {
-        field.wordNum = static_cast<uint32_t>(words);
+    if (field.IsShort()) {
         std::memcpy(field.words.data(), field.prefix.data(), field.prefix.size());
-        const std::string ones(field.prefix.size(), '\xff');
-        std::memcpy(field.masks.data(), ones.data(), ones.size());
+        std::memset(field.masks.data(), 0xff, field.prefix.size());
     }
     field.index = fields_.size();
+    field.bit = uint64_t{1} << field.index;
     field.mark = uint32_t{1} << field.index % 31;
     static_assert(kUndescribedMark == uint32_t{1} << 31);
     owned_.push_back(std::move(field));

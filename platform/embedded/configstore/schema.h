@@ -45,14 +45,32 @@ struct Field {
     uint64_t maxItems = UINT64_MAX; // of a list, or instances; imports only
     const Shape *shape = nullptr;
     std::size_t index = 0; // among the fields of the shape that has it
+    uint64_t bit = 0;      // of that index
     uint32_t mark = 0;     // the bit by which an object tells whether it may have such a member
-    std::string prefix;    // the name as a document writes it: "name":
     uint32_t number = 0;   // among the fields and shapes of the schema, from 1
-    // The prefix once more, for comparing it word by word; no words when it is longer than that.
-    static constexpr std::size_t kMaxWords = 5;
+    std::string prefix;    // the name as a document writes it: "name":
+
+    // A short prefix once more, for comparing it in few steps, with a mask of the bytes that count.
+    static constexpr std::size_t kMaxWords = 6;
     std::array<uint64_t, kMaxWords> words{};
-    std::array<uint64_t, kMaxWords> masks{}; // of what counts in the words
-    uint32_t wordNum = 0;
+    std::array<uint64_t, kMaxWords> masks{};
+
+    [[nodiscard]] bool IsShort() const { return prefix.size() <= sizeof words; }
+    /// Whether the prefix, which must be short, stands at `at`. False close to the text's last byte.
+    [[nodiscard]] bool StandsAt(const char *at, const char *last) const {
+        if (last - at < static_cast<std::ptrdiff_t>(sizeof words)) return false;
+        using Pair = uint64_t __attribute__((vector_size(16)));
+        const auto difference = [this, at](std::size_t i) {
+            Pair text, word, mask;
+            std::memcpy(&text, at + i * sizeof(Pair), sizeof text);
+            std::memcpy(&word, &words[2 * i], sizeof word);
+            std::memcpy(&mask, &masks[2 * i], sizeof mask);
+            return (text ^ word) & mask;
+        };
+        static_assert(kMaxWords == 6);
+        const Pair all = difference(0) | difference(1) | difference(2);
+        return (all[0] | all[1]) == 0;
+    }
 };
 
 /// The fields of one kind of object, found by name.
