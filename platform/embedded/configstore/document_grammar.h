@@ -231,9 +231,9 @@ private:
         return sink_.Put(node, field, value) ? at + (value ? 4 : 5) : nullptr;
     }
 
-    [[nodiscard]] bool Literal(const char *at, std::string_view word) const {
-        return static_cast<std::size_t>(last_ - at) >= word.size() &&
-               std::memcmp(at, word.data(), word.size()) == 0;
+    template <std::size_t kSize> [[nodiscard]] bool Literal(const char *at, const char (&word)[kSize]) const {
+        constexpr std::size_t kLength = kSize - 1; // known to the compiler, which needs no call then
+        return last_ - at >= static_cast<std::ptrdiff_t>(kLength) && std::memcmp(at, word, kLength) == 0;
     }
 
     static bool IsNumber(char c) { return c == '-' || (c >= '0' && c <= '9'); }

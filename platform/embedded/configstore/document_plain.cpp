@@ -257,7 +257,6 @@ bool ReadPlainDocument(std::string_view text, Tree *tree) {
     TreeSink sink(tree);
     if (ReadRoot(text, tree, &sink)) return true;
     MakeObject(&tree->root);
-    tree->tables = nullptr; // no list has an index yet
     tree->suspect = false;
     return false;
 }

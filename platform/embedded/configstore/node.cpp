@@ -6,6 +6,7 @@
 
 #include <bit>
 #include <cstring>
+#include <utility>
 
 namespace configstore {
 
@@ -58,8 +59,8 @@ void DropIndex(InstanceTable *table) {
     table->slotCount = 0;
 }
 
-/// An index is a convenience: without the memory for it, lists are walked.
-void BuildIndex(InstanceTable *table) {
+/// If allocation fails, no index is kept; lookups walk the list.
+void BuildIndex(Tree *tree, InstanceTable *table) {
     const std::size_t slotCount = std::bit_ceil(table->count * 2);
     auto **const slots = static_cast<Object **>(std::calloc(slotCount, sizeof(Object *)));
     if (!slots) return;
@@ -68,6 +69,9 @@ void BuildIndex(InstanceTable *table) {
     table->slotCount = slotCount;
     for (Object *instance = table->first; instance; instance = instance->next)
         Insert(table, instance);
+    if (table->isInTree) return;
+    table->isInTree = true;
+    table->nextInTree = std::exchange(tree->tables, table);
 }
 
 } // namespace
@@ -105,7 +109,7 @@ Object *FindMember(Object *object, std::string_view name) {
 
 Object *FindInstance(Object *list, std::string_view id) {
     InstanceTable *const table = list->table;
-    if (!table->slots && table->count > kIndexFrom) BuildIndex(table);
+    if (!table->slots && table->count > kIndexFrom) BuildIndex(TreeOf(list), table);
     if (!table->slots) {
         for (Object *instance = table->first; instance; instance = instance->next) {
             if (NameOf(instance) == id) return instance;
@@ -159,15 +163,14 @@ Object *AddInstance(Tree *tree, Object *list, std::string_view id) {
         Insert(table, instance);
     } else {
         DropIndex(table); // the old one must not outlive a failure to build the larger one
-        BuildIndex(table);
+        BuildIndex(tree, table);
     }
     return instance;
 }
 
 void MakeInstances(Tree *tree, Object *node) {
     auto *const table = static_cast<InstanceTable *>(tree->arena.Allocate(sizeof(InstanceTable)));
-    *table = {nullptr, nullptr, 0, nullptr, 0, tree->tables};
-    tree->tables = table;
+    *table = {};
     node->kind = Kind::Instances;
     node->table = table;
 }

@@ -72,9 +72,10 @@ struct InstanceTable {
     Object *first;
     Object *last;
     std::size_t count;
-    Object **slots;        // null until the list is long, and after a removal
-    std::size_t slotCount; // a power of two, at most three quarters full
-    InstanceTable *nextInTree;
+    Object **slots;            // null until the list is long, and after a removal
+    std::size_t slotCount;     // a power of two, at most three quarters full
+    InstanceTable *nextInTree; // of the tree's tables
+    bool isInTree;             // among them
 };
 
 struct Object {
@@ -107,7 +108,7 @@ struct Tree {
     Object root; // first: a root handle is its tree's address
     Arena arena;
     const Shape *shape = nullptr;
-    InstanceTable *tables = nullptr;
+    InstanceTable *tables = nullptr;    // those that have, or had, an index
     bool suspect = false;               // some node was bad once
     bool hasUnknown = false;            // some object had a member without a field once
     std::shared_ptr<const Buffer> text; // that its Later nodes are in
@@ -130,9 +131,6 @@ struct Tree {
 /// What a filter spec selects by.
 struct FilterSpec {
     std::string key, group, component, instance;
-    /// A shape below which no field has the key's name, found by a search before: searches of one load ask
-    /// the same of thousands of objects. Any thread may put in another at any time.
-    mutable const Shape *notBelow = nullptr;
 };
 
 // Walking.

@@ -2,10 +2,11 @@
 // Objects, sub-objects and filter specs of the client interface (platform/configstore.h): a thin face over
 // the tree of node.h.
 
-#include <atomic>
+#include <algorithm>
 #include <cstdlib>
 #include <memory>
 #include <sys/random.h>
+#include <utility>
 
 #include "platform/embedded/configstore/document.h"
 #include "platform/embedded/configstore/log.h"
@@ -14,6 +15,38 @@
 namespace configstore {
 
 namespace {
+
+/// Handles found, in the block that the caller gets.
+class Handles {
+public:
+    Handles() = default;
+    ~Handles() { std::free(static_cast<void *>(data_)); }
+    Handles(const Handles &) = delete;
+    Handles &operator=(const Handles &) = delete;
+    void Reserve(std::size_t more) {
+        if (capacity_ - count_ < more) Grow(more);
+    }
+    void Add(Object *handle, std::size_t times = 1) {
+        Reserve(times);
+        count_ = static_cast<std::size_t>(std::fill_n(data_ + count_, times, handle) - data_);
+    }
+    [[nodiscard]] std::size_t Count() const { return count_; }
+    [[nodiscard]] Object *First() const { return data_[0]; }
+    Object **Release() { return std::exchange(data_, nullptr); }
+
+private:
+    void Grow(std::size_t more) {
+        const std::size_t capacity = std::max(count_ * 2, count_ + more);
+        void *const data = std::realloc(static_cast<void *>(data_), capacity * sizeof(Object *));
+        if (!data) throw std::bad_alloc();
+        data_ = static_cast<Object **>(data);
+        capacity_ = capacity;
+    }
+
+    Object **data_ = nullptr;
+    std::size_t count_ = 0;
+    std::size_t capacity_ = 0;
+};
 
 std::string_view IdOf(const char *instanceId) {
     return instanceId ? std::string_view(instanceId) : std::string_view();
@@ -106,42 +139,37 @@ bool LeadsOn(Object *child, std::string_view key) {
 }
 
 /// What a filter spec selects on one object that has a member of its key.
-int32_t SelectMember(Object *member, const FilterSpec &spec, std::vector<Object *> *found) {
+int32_t SelectMember(Object *member, const FilterSpec &spec, Handles *found) {
     if (member->kind == Kind::Raw && !Expand(TreeOf(member), member)) return OK;
     if (member->kind == Kind::TextList) {
         // The elements have nothing to tell but how many they are: each is the list's own handle.
-        found->insert(found->end(), member->list->count, member);
+        found->Add(member, member->list->count);
         return OK;
     }
     if (!AsInstances(member)) return OK;
     if (!spec.instance.empty()) {
         Object *const instance = FindInstance(member, spec.instance);
         if (instance && !AsObject(instance)) return SCHEMA_VIOLATION;
-        if (instance) found->push_back(instance);
+        if (instance) found->Add(instance);
         return OK;
     }
+    found->Reserve(member->table->count);
     for (Object *instance = member->table->first; instance; instance = instance->next) {
         if (!AsObject(instance)) return SCHEMA_VIOLATION;
-        found->push_back(instance);
+        found->Add(instance);
     }
     return OK;
 }
 
-/// Whether members of the key's name may stand in singletons below the object, for all that its shape tells.
-bool MayLeadOn(Object *object, const FilterSpec &spec) {
+/// Whether members of the key's name may stand in singletons below the object.
+bool MayLeadOn(Object *object, std::string_view key) {
     const Shape *const shape = ShapeOf(object);
-    if (!shape) return true;
-    const std::atomic_ref<const Shape *> known(spec.notBelow);
-    if (known.load(std::memory_order_relaxed) != shape) {
-        if (shape->HasBelow(spec.key)) return true;
-        known.store(shape, std::memory_order_relaxed);
-    }
-    return TreeOf(object)->hasUnknown;
+    return !shape || shape->HasBelow(key) || TreeOf(object)->hasUnknown;
 }
 
-int32_t Select(Object *object, const FilterSpec &spec, std::vector<Object *> *found) {
+int32_t Select(Object *object, const FilterSpec &spec, Handles *found) {
     if (Object *const member = FindMember(object, spec.key)) return SelectMember(member, spec, found);
-    if (!MayLeadOn(object, spec)) return OK;
+    if (!MayLeadOn(object, spec.key)) return OK;
     for (Object *child = object->members.first; child; child = child->next) {
         if (!LeadsOn(child, spec.key)) continue;
         if (const int32_t status = Select(child, spec, found); status != OK) return status;
@@ -155,15 +183,15 @@ bool DeleteSelected(Object *object, const FilterSpec &spec) {
             RemoveChild(object, member);
             return true;
         }
-        std::vector<Object *> found;
+        Handles found;
         if (SelectMember(member, spec, &found) != OK) {
             // Something among the instances is not one; deleting them all gets rid of that as well.
             if (!spec.instance.empty()) return false;
-            found.push_back(member);
+            found.Add(member);
         }
-        if (found.empty()) return false;
+        if (found.Count() == 0) return false;
         if (member->kind == Kind::Instances && !spec.instance.empty()) {
-            RemoveInstance(object, member, found.front());
+            RemoveInstance(object, member, found.First());
         } else {
             if (member->kind == Kind::Instances) RemoveAllChildren(member);
             RemoveChild(object, member);
@@ -254,15 +282,12 @@ int32_t DeleteSubObject(Object *parent, const char *name, const char *instanceId
 int32_t GetSubObjectInstances(Object *parent, const FilterSpec *spec, Object ***objects, int32_t *count) {
     if (!IsObject(parent) || !spec || !objects || !count) return BAD_PARAMETER;
     return Guarded([&]() -> int32_t {
-        std::vector<Object *> found;
+        Handles found;
         if (const int32_t status = Select(parent, *spec, &found); status != OK) return status;
-        if (found.empty()) return NOT_FOUND;
-        if (found.size() > INT32_MAX) return FAILED;
-        auto **const array = static_cast<Object **>(std::malloc(found.size() * sizeof(Object *)));
-        if (!array) return NO_MEMORY;
-        std::memcpy(static_cast<void *>(array), found.data(), found.size() * sizeof(Object *));
-        *objects = array;
-        *count = static_cast<int32_t>(found.size());
+        if (found.Count() == 0) return NOT_FOUND;
+        if (found.Count() > INT32_MAX) return FAILED;
+        *count = static_cast<int32_t>(found.Count());
+        *objects = found.Release();
         return OK;
     });
 }

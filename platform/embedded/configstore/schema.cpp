@@ -20,8 +20,8 @@ namespace configstore {
 
 namespace json = boost::json;
 
-std::size_t Shape::Hash(std::string_view name) {
-    // The names of one shape differ in length, first or last bytes nearly always; what collides is compared.
+std::size_t FieldIndex::Hash(std::string_view name) {
+    // Names of one schema differ in length, first or last bytes nearly always; what collides is compared.
     uint64_t first = 0;
     uint64_t last = 0;
     if (name.size() >= 8) {
@@ -38,26 +38,40 @@ std::size_t Shape::Hash(std::string_view name) {
     return static_cast<std::size_t>(mixed >> 32);
 }
 
-const Field *Shape::Find(std::string_view name) const {
-    if (slots_.empty()) return nullptr;
+std::size_t FieldIndex::PlaceOf(std::string_view name) const {
     const std::size_t mask = slots_.size() - 1;
-    for (std::size_t at = Hash(name) & mask; slots_[at]; at = (at + 1) & mask) {
-        if (slots_[at]->name == name) return slots_[at];
-    }
-    return nullptr;
+    std::size_t at = Hash(name) & mask;
+    while (slots_[at] && slots_[at]->name != name)
+        at = (at + 1) & mask;
+    return at;
 }
 
-bool Shape::HasBelow(std::string_view name) const {
+const Field *FieldIndex::Find(std::string_view name) const {
+    return slots_.empty() ? nullptr : slots_[PlaceOf(name)];
+}
+
+void FieldIndex::Add(const Field *field) {
+    if (Find(field->name)) return;
+    if (++count_ * 2 > slots_.size()) {
+        std::vector<const Field *> old(std::max<std::size_t>(8, slots_.size() * 2), nullptr);
+        old.swap(slots_);
+        for (const Field *known : old)
+            if (known) slots_[PlaceOf(known->name)] = known;
+    }
+    slots_[PlaceOf(field->name)] = field;
+}
+
+void Shape::IndexBelow() {
     std::vector<const Shape *> shapes = {this}; // one may lead back to another
     for (std::size_t i = 0; i < shapes.size(); i++) {
         for (const Field *field : shapes[i]->fields_) {
-            if (!field->shape) continue;
-            if (field->shape->Find(name)) return true;
-            if (std::find(shapes.begin(), shapes.end(), field->shape) == shapes.end())
-                shapes.push_back(field->shape);
+            const Shape *const shape = field->shape;
+            if (!shape) continue;
+            for (const Field *below : shape->fields_)
+                below_.Add(below);
+            if (std::find(shapes.begin(), shapes.end(), shape) == shapes.end()) shapes.push_back(shape);
         }
     }
-    return false;
 }
 
 const Field *Shape::FindAnew(const char *name) const {
@@ -84,20 +98,7 @@ void Shape::Add(Field field) {
     static_assert(kUndescribedMark == uint32_t{1} << 31);
     owned_.push_back(std::move(field));
     fields_.push_back(&owned_.back());
-    Rehash();
-}
-
-void Shape::Rehash() {
-    std::size_t size = 8;
-    while (size < fields_.size() * 2)
-        size *= 2;
-    slots_.assign(size, nullptr);
-    for (const Field *field : fields_) {
-        std::size_t at = Hash(field->name) & (size - 1);
-        while (slots_[at])
-            at = (at + 1) & (size - 1);
-        slots_[at] = field;
-    }
+    index_.Add(fields_.back());
 }
 
 class CompiledSchema {
@@ -105,6 +106,8 @@ public:
     explicit CompiledSchema(std::string_view text)
         : document_(json::parse(json::string_view(text.data(), text.size()))) {
         root_ = ShapeOf(document_);
+        for (Shape &shape : shapes_)
+            shape.IndexBelow();
         document_ = nullptr;
     }
     [[nodiscard]] const Shape *Root() const { return root_; }

@@ -73,12 +73,27 @@ struct Field {
     }
 };
 
+/// Fields by name.
+class FieldIndex {
+public:
+    [[nodiscard]] const Field *Find(std::string_view name) const;
+    /// Adds a field unless there is one of that name.
+    void Add(const Field *field);
+
+private:
+    static std::size_t Hash(std::string_view name);
+    [[nodiscard]] std::size_t PlaceOf(std::string_view name) const;
+
+    std::size_t count_ = 0;
+    std::vector<const Field *> slots_; // open addressing, a power of two, at most half full
+};
+
 /// The fields of one kind of object, found by name.
 class Shape {
 public:
     static constexpr std::size_t kMaxFields = 64; // a reader marks what it has seen in one 64-bit word
 
-    [[nodiscard]] const Field *Find(std::string_view name) const;
+    [[nodiscard]] const Field *Find(std::string_view name) const { return index_.Find(name); }
     /// The same for a name that is asked for again and again, as those that stand in the code are: where a
     /// text stood before, the same text mostly stands again.
     [[nodiscard]] const Field *FindAgain(const char *name) const {
@@ -88,9 +103,11 @@ public:
         return FindAnew(name);
     }
     /// Whether a field of a field's shape, or of one further down, has the name.
-    [[nodiscard]] bool HasBelow(std::string_view name) const;
+    [[nodiscard]] bool HasBelow(std::string_view name) const { return below_.Find(name) != nullptr; }
     [[nodiscard]] const std::vector<const Field *> &Fields() const { return fields_; }
     void Add(Field field);
+    /// Collects the names for HasBelow, once all shapes have their fields.
+    void IndexBelow();
     void SetNumber(uint32_t number) { number_ = number; }
     [[nodiscard]] uint32_t Number() const { return number_; }
 
@@ -100,13 +117,12 @@ private:
     }
     /// By the second guess, then by the name.
     [[gnu::noinline]] const Field *FindAnew(const char *name) const;
-    static std::size_t Hash(std::string_view name);
-    void Rehash();
 
     uint32_t number_ = 0; // as a field's
     std::deque<Field> owned_;
     std::vector<const Field *> fields_;
-    std::vector<const Field *> slots_; // open addressing, a power of two, at most half full
+    FieldIndex index_; // of them
+    FieldIndex below_; // of the fields of the fields' shapes, and so on
     static constexpr unsigned kGuessBits = 8;
     /// By the address of the name. Guesses only: any thread may put in another at any time.
     mutable std::array<std::atomic<const Field *>, std::size_t{1} << kGuessBits> guesses_{};
