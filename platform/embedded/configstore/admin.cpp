@@ -79,7 +79,7 @@ int32_t Open(const std::string &path, bool readOnly, Store **store, Failure *fai
 int32_t OpenInMemory(Store **store) {
     if (!store) return BAD_PARAMETER;
     return Guarded([&] {
-        auto opened = std::make_unique<Store>("in memory", FailureKeeper::Log::No);
+        auto opened = std::make_unique<Store>(":memory:", FailureKeeper::Log::No);
         opened->backend = OpenMemory(NewMemoryDatabase(), &opened->failures);
         *store = opened.release();
         return OK;

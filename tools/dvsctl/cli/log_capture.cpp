@@ -37,7 +37,15 @@ void LogCapture::SetVerbose(bool verbose) {
 }
 
 std::vector<std::string> LogCapture::Take() {
-    return std::exchange(messages_, {});
+    std::vector<std::string> texts;
+    for (Message &message : std::exchange(messages_, {}))
+        texts.push_back(std::move(message.text));
+    return texts;
+}
+
+std::vector<std::string> LogCapture::TakeErrors() {
+    std::erase_if(messages_, [](const Message &message) { return message.level < 0; });
+    return Take();
 }
 
 void LogCapture::Receive(int level, const char *text, void *self) {
@@ -48,7 +56,7 @@ void LogCapture::Receive(int level, const char *text, void *self) {
     if (capture.verbose_) std::fprintf(stderr, "libdvs: %s\n", form::Escape(line).c_str());
     if (level > 0) return;
     if (capture.messages_.size() == kMostKept) capture.messages_.erase(capture.messages_.begin());
-    capture.messages_.push_back(std::move(line));
+    capture.messages_.push_back({level, std::move(line)});
 }
 
 } // namespace dvs::ctl

@@ -22,14 +22,20 @@ public:
     /// With `verbose`, messages are printed as well, traces among them.
     void SetVerbose(bool verbose);
 
-    /// The error messages since the last call, oldest first (at most the last few).
+    /// The messages since the last call, without traces, oldest first (at most the last few).
     std::vector<std::string> Take();
+    /// The same without those that the library prints at any level, which are no errors as a rule.
+    std::vector<std::string> TakeErrors();
 
 private:
     static void Receive(int level, const char *text, void *self);
 
     const std::int32_t storeLevel_; // of the config store's messages, as it was
-    std::vector<std::string> messages_;
+    struct Message {
+        int level;
+        std::string text;
+    };
+    std::vector<Message> messages_;
     bool verbose_ = false;
 };
 

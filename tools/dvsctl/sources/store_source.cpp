@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
 // store: and store-desired: the host's configuration store. Reading is the library's load, writing its
-// checked save, so that a copy is what an agent's save or load would be. Stands on store/.
+// checked save, so that a copy is what an agent's save or load would be.
 
 #include <cstdlib>
 #include <malloc.h>
@@ -8,7 +8,8 @@
 
 #include <fmt/format.h>
 
-#include "dvs/configstore.h"
+#include "configstore/load.h"
+#include "configstore/save.h"
 #include "dvs/status.h"
 #include "form/encode.h"
 #include "form/model.h"
@@ -27,9 +28,6 @@ namespace {
 
 // Statuses of the library itself begin here; smaller ones are the store's.
 constexpr std::int32_t kFirstLibraryStatus = HYP_FAILURE;
-
-// What a save tells the system's log about its times is no cause of anything.
-constexpr const char *kTimingText = "DVSState_SaveBufToConfigStore_ByInstance";
 
 struct FreeBuffer {
     void operator()(void *buffer) const { std::free(buffer); }
@@ -75,7 +73,7 @@ public:
         const OpenStore store(context, path_, true); // tells what is wrong with it, and changes nothing
         if (desired_) RefuseUnequalLayers(store);
         try {
-            return StateBytes{Load(context), {}};
+            return StateBytes{Load(context, store.get()).Copy(), {}};
         } catch (Error &error) {
             // For looks at what would be replaced, switches that do not load are damage like any other.
             if (mode == ReadMode::Tolerant && error.kind == ErrorKind::Store) error.isDamage = true;
@@ -85,19 +83,19 @@ public:
 
     void Write(Context &context, Bytes state) override {
         RefuseDesired();
-        AwaitTurn(context, path_, "cannot save to the config store");
+        const OpenStore store(context, path_, false);
+        store.AwaitTurn(context, "cannot save to the config store");
         const Progress progress(context, "saving " + ShowCount(CountState(ParseState(state))));
         GiveBackFreedMemory();
-        PointLibraryAt(path_);
-        Save(context, state);
-        (void)LoadSaved(context, state);
+        Save(context, store.get(), state);
+        (void)LoadSaved(context, store.get(), state);
     }
 
     std::vector<std::uint8_t> Plan(Context &context, Bytes state) override {
         RefuseDesired();
         const ScratchStore scratch(context, path_);
-        Save(context, state);
-        if (const auto loaded = LoadSaved(context, state)) return loaded->Copy();
+        Save(context, scratch.get(), state);
+        if (const auto loaded = LoadSaved(context, scratch.get(), state)) return loaded->Copy();
         return {state.begin(), state.end()}; // what it would hold, although nobody could read it
     }
 
@@ -140,32 +138,26 @@ private:
                 .Try("dvsctl store list shows both layers");
     }
 
-    std::vector<std::uint8_t> Load(Context &context) {
-        PointLibraryAt(path_);
-        return LoadHere(context).Copy();
-    }
-
     // The state that has just been saved, as the store gives it back. A save takes states that no load does:
     // then nothing, and a warning.
-    std::optional<LibraryBuffer> LoadSaved(Context &context, Bytes state) {
+    std::optional<LibraryBuffer> LoadSaved(Context &context, configstore::Store *store, Bytes state) {
         GiveBackFreedMemory();
         try {
-            return LoadHere(context);
+            return Load(context, store);
         } catch (const Error &error) {
             if (error.kind != ErrorKind::Busy) context.out.Warn(UnloadableWarning(ParseState(state), error));
             return std::nullopt;
         }
     }
 
-    LibraryBuffer LoadHere(Context &context) {
-        (void)context.log.Take(); // what was said before has been told
-        const configstore::MessageCollector messages;
+    LibraryBuffer Load(Context &context, configstore::Store *store) {
+        (void)context.log.Take(); // earlier messages have been reported
         void *out = nullptr;
         std::uint32_t length = 0;
-        const std::int32_t status = DVSState_LoadFromConfigStoreAsBuf(&out, &length, desired_);
+        const std::int32_t status = config::LoadState(store, desired_, &out, &length);
         LibraryBuffer loaded{std::unique_ptr<void, FreeBuffer>(out), length};
         if (status == 0 && out) return loaded;
-        Error error = Failure(context, status, "cannot load the switches of the config store", messages);
+        Error error = Failure(context, store, status, "cannot load the switches of the config store");
         if (status == 0) error.why = "the load ended at a switch that it could not load, and gave nothing";
         if (error.kind == ErrorKind::Malformed || error.kind == ErrorKind::NotThere ||
             error.kind == ErrorKind::Failed)
@@ -174,30 +166,22 @@ private:
         throw Error(error);
     }
 
-    void Save(Context &context, Bytes state) const {
+    void Save(Context &context, configstore::Store *store, Bytes state) const {
         // The state was narrowed to the one switch then.
         std::optional<std::string> single;
         if (context.options.switchId) single = std::string(ParseState(state).switches.at(0).name);
         (void)context.log.Take();
-        for (;;) {
-            const configstore::MessageCollector messages;
-            const std::int32_t status = DVSState_SaveBufToConfigStoreChecked(
-                state.data(), static_cast<std::uint32_t>(state.size()), single ? single->c_str() : nullptr);
-            if (status == 0) return;
-            if (status != configstore::BUSY || context.deadline.IsOver())
-                throw Error(Failure(context, status, "the config store refuses the state", messages));
-        }
+        const std::int32_t status =
+            config::SaveStateChecked(store, state.data(), static_cast<std::uint32_t>(state.size()),
+                                     single ? single->c_str() : nullptr);
+        if (status != 0) throw Error(Failure(context, store, status, "the config store refuses the state"));
     }
 
-    Error Failure(Context &context, std::int32_t status, std::string title,
-                  const configstore::MessageCollector &messages) const {
-        Error error = StoreError(status, std::move(title), path_, messages.Text());
+    Error Failure(Context &context, const configstore::Store *store, std::int32_t status,
+                  std::string title) const {
+        Error error = StoreError(status, std::move(title), path_, admin::LastFailure(store));
         error.source = Name();
-        if (status < 0 && !messages.Text().empty()) {
-            error.kind =
-                ErrorKind::Store; // the library has one status of its own for a store that does not open
-            error.why = "the config store cannot be opened";
-        } else if (status < 0) {
+        if (status < 0) {
             error.kind = ErrorKind::Malformed;
             error.why = "a value is not one that the config store can express";
         } else if (status >= kFirstLibraryStatus) {
@@ -206,8 +190,8 @@ private:
                                                                                    : ErrorKind::Malformed;
             error.why = HYP_ReturnStatusToString(library);
         }
-        for (std::string &message : context.log.Take())
-            if (message.find(kTimingText) == std::string::npos) error.messages.push_back(std::move(message));
+        for (std::string &message : context.log.TakeErrors())
+            error.messages.push_back(std::move(message));
         return error;
     }
 

@@ -4,7 +4,6 @@
 #include "tools/dvsctl/store/access.h"
 
 #include <charconv>
-#include <cstdlib>
 #include <ctime>
 
 #include <boost/json/object.hpp>
@@ -59,27 +58,19 @@ std::string StoreName(const std::string &path) {
     return "store:" + path;
 }
 
-void PointLibraryAt(const std::string &path) {
-    if (setenv("DVS_CONFIGSTORE", path.c_str(), 1) != 0) throw std::bad_alloc();
-}
-
 ErrorKind StoreErrorKind(std::int32_t status) {
     const StatusRow *row = RowOf(status);
     return row ? row->kind : ErrorKind::Store;
 }
 
-Error StoreError(std::int32_t status, std::string title, const std::string &path, const std::string &cause) {
+Error StoreError(std::int32_t status, std::string title, const std::string &path,
+                 const configstore::Failure *failure) {
     Error error(StoreErrorKind(status), std::move(title));
     error.source = StoreName(path);
     error.why = admin::StatusText(status);
-    if (!cause.empty()) error.messages.push_back(cause);
+    if (failure) error.messages.push_back(configstore::Text(*failure));
     if (const StatusRow *row = RowOf(status)) error.next = row->next;
     return error;
-}
-
-Error StoreError(std::int32_t status, std::string title, const std::string &path,
-                 const configstore::Failure *failure) {
-    return StoreError(status, std::move(title), path, failure ? configstore::Text(*failure) : std::string());
 }
 
 Error NoStoreError(const std::string &path) {
@@ -102,31 +93,33 @@ OpenStore::OpenStore(Context &context, const std::string &path, bool readOnly) :
     if (const std::int32_t status = admin::Open(path, readOnly, &store_, &failure); status != configstore::OK)
         throw Error(StoreError(status, "cannot open the config store", path_,
                                failure.status != 0 ? &failure : nullptr));
-    if (readOnly) Relieve();
+    if (readOnly) ReopenWritable();
     admin::SetBusyTimeout(store_, context.deadline.MillisecondsLeft());
 }
 
-// The last one to leave a database removes its log files, but a connection that cannot write leaves them. Now
-// that the file is known to be a store, one that could write is as good, and tidier; it is not told to.
-void OpenStore::Relieve() {
-    configstore::Store *tidy = nullptr;
-    if (access(path_.c_str(), W_OK) != 0 || admin::Open(path_, false, &tidy) != configstore::OK) return;
+// The last connection to a database removes its log files when it closes, unless it is read-only. The file is known
+// to be a store by now, so a connection that could write does no harm.
+void OpenStore::ReopenWritable() {
+    configstore::Store *writable = nullptr;
+    if (access(path_.c_str(), W_OK) != 0 || admin::Open(path_, false, &writable) != configstore::OK) return;
     configstore::DestroyStore(store_);
-    store_ = tidy;
+    store_ = writable;
 }
 
 void OpenStore::Require(std::int32_t status, const char *title) const {
     if (status != configstore::OK) throw Error(StoreError(status, title, path_, admin::LastFailure(store_)));
 }
 
-void AwaitTurn(Context &context, const std::string &path, const char *title) {
-    const OpenStore store(context, path, false);
-    const Progress progress(context, "waiting for other writers of " + path);
-    std::int64_t revision = 0;
-    std::int32_t status = configstore::BeginTransaction(store.get());
-    if (status == configstore::OK) status = admin::LatestRevision(store.get(), &revision);
-    (void)configstore::CancelTransaction(store.get()); // nothing has been written
-    store.Require(status, title);
+void OpenStore::AwaitTurn(Context &context, const char *title) const {
+    {
+        const Progress progress(context, "waiting for other writers of " + path_);
+        std::int64_t revision = 0;
+        std::int32_t status = configstore::BeginTransaction(store_);
+        if (status == configstore::OK) status = admin::LatestRevision(store_, &revision);
+        (void)configstore::CancelTransaction(store_); // nothing has been written
+        Require(status, title);
+    }
+    admin::SetBusyTimeout(store_, context.deadline.MillisecondsLeft());
 }
 
 std::vector<admin::Entry> OpenStore::List() const {

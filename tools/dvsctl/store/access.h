@@ -3,8 +3,8 @@
 #define DVSCTL_STORE_ACCESS_H
 
 // How dvsctl gets at a config store: which database is meant, opening it with the time that --timeout leaves,
-// and store statuses as errors with the store's own words as their cause. Stands on the operators' functions
-// (platform/embedded/configstore/admin.h); the store sources and the store verbs stand on this.
+// and store statuses as errors with the store's record of the failure as their cause. Used by the store sources
+// and the store verbs; uses the operators' functions (platform/embedded/configstore/admin.h).
 
 #include <cstdint>
 #include <optional>
@@ -13,7 +13,6 @@
 #include <vector>
 
 #include "platform/embedded/configstore/admin.h"
-#include "platform/embedded/configstore/log.h"
 #include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
@@ -27,15 +26,10 @@ std::string StorePathOf(std::string_view given);
 /// "store:PATH".
 std::string StoreName(const std::string &path);
 
-/// Makes `path` the store that the library's own functions open from now on.
-void PointLibraryAt(const std::string &path);
-
 /// The exit status for a store status other than 0.
 ErrorKind StoreErrorKind(std::int32_t status);
 
-/// The error for a store status other than 0; `cause` is what the store said meanwhile, or empty.
-Error StoreError(std::int32_t status, std::string title, const std::string &path, const std::string &cause);
-/// The same; `failure` is the store's record of it, or null.
+/// The error for a store status other than 0; `failure` is the store's record of it, or null.
 Error StoreError(std::int32_t status, std::string title, const std::string &path,
                  const configstore::Failure *failure);
 
@@ -59,6 +53,10 @@ public:
 
     /// Throws the error for a status other than 0.
     void Require(std::int32_t status, const char *title) const;
+    /// Waits for other writers as long as --timeout allows, with a line of progress; throws the error of a store
+    /// that cannot be written. Another writer may come in afterwards: the store's calls wait for it as long as is
+    /// left.
+    void AwaitTurn(Context &context, const char *title) const;
 
     [[nodiscard]] std::vector<admin::Entry> List() const;
     [[nodiscard]] std::vector<admin::Entry> History() const;
@@ -70,15 +68,11 @@ public:
                                                           std::int64_t revision) const;
 
 private:
-    void Relieve();
+    void ReopenWritable();
 
     configstore::Store *store_ = nullptr;
     std::string path_;
 };
-
-/// Makes sure that the store can be written, and waits for other writers as long as --timeout allows: the
-/// library's own wait is fixed, and others may come in between, so that callers repeat a call that is BUSY.
-void AwaitTurn(Context &context, const std::string &path, const char *title);
 
 /// The layer that --layer names, the current one by default. Throws Error(Usage).
 admin::Layer LayerOf(const Options &options);

@@ -62,9 +62,8 @@ std::vector<ObjectChange> PlanUpgrade(Context &context, const std::string &path,
     std::vector<ObjectChange> plan;
     for (ScratchStore::Object &object : scratch.Objects())
         plan.push_back({object.address, ReadDocument(object.document), std::nullopt});
-    const configstore::MessageCollector messages;
-    const std::int32_t status = RetrieveUpgradeInfoFrom(file.c_str());
-    if (status != 0) throw Error(StoreError(status, kUpgradeTitle, path, messages.Text()));
+    const std::int32_t status = config::UpgradeFromFile(scratch.get(), file.c_str());
+    if (status != 0) throw Error(StoreError(status, kUpgradeTitle, path, admin::LastFailure(scratch.get())));
     for (const ScratchStore::Object &object : scratch.Objects()) {
         ObjectChange *known = nullptr;
         for (ObjectChange &change : plan)
@@ -159,15 +158,9 @@ Exit RunStoreUpgrade(Context &context) {
     const LoadedState loaded = LoadState(context, *file);
     std::vector<ObjectChange> plan = PlanUpgrade(context, path, options.source);
     if (!options.dryRun) {
-        AwaitTurn(context, path, kUpgradeTitle);
-        PointLibraryAt(path);
-        for (;;) {
-            const configstore::MessageCollector messages;
-            const std::int32_t status = RetrieveUpgradeInfoFrom(options.source.c_str());
-            if (status == configstore::OK) break;
-            if (status != configstore::BUSY || context.deadline.IsOver())
-                throw Error(StoreError(status, kUpgradeTitle, path, messages.Text()));
-        }
+        const OpenStore store(context, path, false);
+        store.AwaitTurn(context, kUpgradeTitle);
+        store.Require(config::UpgradeFromFile(store.get(), options.source.c_str()), kUpgradeTitle);
     }
     WriteReport(context, {"store upgrade", path,
                           fmt::format("carried the identity of the switches in {} over to {}",

@@ -3,7 +3,7 @@
 #define DVSCTL_STORE_SCRATCH_H
 
 // A copy of a store's present objects in memory, for --dry-run: the library's own save runs on it, so that
-// what is shown is what would happen, refusals included, and the real store is only read.
+// what is shown is what would happen, refusals included. The real store is only read.
 
 #include <string>
 #include <vector>
@@ -14,12 +14,13 @@ namespace dvs::ctl {
 
 class ScratchStore {
 public:
-    /// Copies what the store at `path` holds now (nothing, where there is none) and points the library at the
-    /// copy until it is destroyed. One at a time. Throws Error.
+    /// Copies what the store at `path` holds now; nothing if there is none. Throws Error.
     ScratchStore(Context &context, const std::string &path);
-    ~ScratchStore();
+    ~ScratchStore() { configstore::DestroyStore(store_); }
     ScratchStore(const ScratchStore &) = delete;
     ScratchStore &operator=(const ScratchStore &) = delete;
+
+    [[nodiscard]] configstore::Store *get() const { return store_; }
 
     struct Object {
         admin::Address address;
@@ -29,6 +30,8 @@ public:
     [[nodiscard]] std::vector<Object> Objects() const;
 
 private:
+    void Require(std::int32_t status) const;
+
     std::string path_;
     configstore::Store *store_ = nullptr;
 };
