@@ -6,6 +6,7 @@
 #include <cstring>
 #include <memory>
 
+#include "dvsdata/buffer_check.h"
 #include "dvsdata/emit.h"
 #include "dvsdata/list_internal.h"
 #include "dvsdata/list_record.h"
@@ -13,12 +14,6 @@
 
 namespace dvs::data {
 namespace {
-
-/// An entry with checked sizes.
-struct Place {
-    const std::uint8_t *at;
-    std::uint32_t size, dataLen;
-};
 
 std::string_view StoredName(const std::uint8_t *at) {
     const std::uint8_t *const field = at + kNameOffset;
@@ -29,40 +24,19 @@ bool IsAligned(std::size_t value) {
     return value % 4 == 0;
 }
 
-[[gnu::cold]] HYP_ReturnStatus BadLengths(std::uint32_t dataLen, std::uint32_t size) {
-    Emit(kError, "bad data: data block not serialized correctly %u/%u\n", dataLen, size);
-    return HYP_BAD_PARAM;
+/// The entry at `offset`, which is not behind the end of the buffer. HYP_NOT_FOUND at the end marker.
+inline HYP_ReturnStatus EntryAt(Bytes buf, std::uint32_t offset, CheckedEntry *entry) {
+    Fault fault;
+    const Step step = CheckEntry(buf, offset, entry, &fault);
+    if (step == Step::Entry) [[likely]]
+        return HYP_OK;
+    return step == Step::End ? static_cast<HYP_ReturnStatus>(HYP_NOT_FOUND) : Refuse(fault);
 }
 
-/// Reads the entry at `offset`, which must not be past the buffer's end. HYP_NOT_FOUND at the end marker.
-inline HYP_ReturnStatus PlaceAt(Bytes buf, std::uint32_t offset, Place *place) {
-    const std::uint32_t remaining = static_cast<std::uint32_t>(buf.size()) - offset;
-    if (remaining < kMarkerSize) [[unlikely]]
-        return NoMarker();
-    const std::uint8_t *const at = buf.data() + offset;
-    const std::uint32_t size = Load32(at + kEntrySizeOffset);
-    if (size == 0) return HYP_NOT_FOUND;
-    if (size > remaining) [[unlikely]]
-        return BlockTooLarge(size);
-    // The room check rejects every size below 143, so also an entry without a whole fixed part.
-    const std::uint32_t dataLen = remaining >= kEntryFixedSize ? Load32(at + kDataLenOffset) : 0;
-    if (dataLen > size || size - dataLen < kMinEntryRoom) [[unlikely]]
-        return BadLengths(dataLen, size);
-    *place = {at, size, dataLen};
-    return HYP_OK;
-}
-
-void EmitReading(Place place) {
-    const std::string_view name = StoredName(place.at);
+void EmitReading(CheckedEntry entry) {
+    const std::string_view name = StoredName(entry.at);
     Emit(kEntry, "deserializing %.*s: %u/%u data/serial bytes %d flag\n", static_cast<int>(name.size()),
-         name.data(), place.dataLen, place.size, Load32(place.at + kPropTypeOffset));
-}
-
-HYP_ReturnStatus CheckVersion(Bytes buf) {
-    const std::uint16_t version = Load16(buf.data() + kVersionOffset);
-    if (version == kFormatVersion) return HYP_OK;
-    Emit(kError, "Bad data: expected header version %d, actual %d\n", kFormatVersion, version);
-    return HYP_BAD_PARAM;
+         name.data(), entry.dataLen, entry.size, Load32(entry.at + kPropTypeOffset));
 }
 
 /// True if the known sum, over `given` bytes, covers exactly this buffer.
@@ -77,21 +51,20 @@ struct FreeList {
 /// Up to this value length, an entry's size cannot wrap.
 constexpr std::uint32_t kMaxPlainLen = UINT32_MAX / 2;
 
-/// Appends an entry whose image can be copied as is: one copy, plus zeros for the bytes the format leaves
-/// open.
-inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
-    const NameField field(place.at + kNameOffset);
-    const std::string_view name(reinterpret_cast<const char *>(place.at + kNameOffset), field.Len());
-    if (place.dataLen > kMaxPlainLen || Emits(kDetail)) [[unlikely]]
-        return Append(list, name, place.at + kEntryFixedSize, place.dataLen,
-                      Load32(place.at + kPropTypeOffset));
-    const std::uint32_t serialSize = EntrySize(place.dataLen);
+/// Append() of an entry in its serialized form: one copy, and zeros for what the format leaves open.
+inline HYP_ReturnStatus AppendImage(DVSData *list, CheckedEntry image) {
+    const NameField field(image.at + kNameOffset);
+    const std::string_view name(reinterpret_cast<const char *>(image.at + kNameOffset), field.Len());
+    if (image.dataLen > kMaxPlainLen || Emits(kDetail)) [[unlikely]]
+        return Append(list, name, image.at + kEntryFixedSize, image.dataLen,
+                      Load32(image.at + kPropTypeOffset));
+    const std::uint32_t serialSize = EntrySize(image.dataLen);
     DVSDataEntry *const entry = NewPlace(list, serialSize);
     if (!entry) [[unlikely]]
         return HYP_NO_MEMORY;
     ClearPadding(entry, serialSize);
-    std::memcpy(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset, place.at,
-                std::size_t{kEntryFixedSize} + place.dataLen);
+    std::memcpy(reinterpret_cast<std::uint8_t *>(entry) + kImageOffset, image.at,
+                std::size_t{kEntryFixedSize} + image.dataLen);
     if (!field.IsPlain()) [[unlikely]]
         std::memset(entry->name + name.size(), 0, kNameSize - name.size());
     entry->serialSize = serialSize; // may differ from the image
@@ -99,33 +72,29 @@ inline HYP_ReturnStatus AppendImage(DVSData *list, Place place) {
     return HYP_OK;
 }
 
-/// The room that the entries of a valid buffer need in a list's own block. Returns 0, so that each entry gets
-/// its own block, for a faulty buffer (its faults are then reported as usual) and if messages print for each
-/// entry.
+/// The size of the entries of a sound buffer in the list's own block. 0 for a faulty buffer, whose entries get a block
+/// each until the fault is reached, and when messages about every entry are on.
 std::uint64_t RoomFor(Bytes buf, std::uint32_t typeMask) {
     if (Emits(kDetail)) return 0;
     std::uint64_t room = 0;
-    for (std::size_t offset = kHeaderSize, size = 0; buf.size() - offset >= kEntryFixedSize; offset += size) {
-        const std::uint8_t *const at = buf.data() + offset;
-        size = Load32(at + kEntrySizeOffset);
-        const std::uint32_t dataLen = Load32(at + kDataLenOffset);
-        if (size == 0) return room;
-        if (size > buf.size() - offset || dataLen > size || size - dataLen < kMinEntryRoom) return 0;
-        if (Load32(at + kPropTypeOffset) & typeMask) room += PlaceSize(EntrySize(dataLen));
+    CheckedEntry entry{};
+    Fault fault;
+    for (std::size_t offset = kHeaderSize;; offset += entry.size) {
+        const Step step = CheckEntry(buf, offset, &entry, &fault);
+        if (step != Step::Entry) return step == Step::End ? room : 0;
+        if (Load32(entry.at + kPropTypeOffset) & typeMask) room += PlaceSize(EntrySize(entry.dataLen));
     }
-    return room;
 }
 
 HYP_ReturnStatus AppendAll(DVSData *list, Bytes buf, std::uint32_t typeMask) {
-    Place place{};
+    CheckedEntry entry{};
     HYP_ReturnStatus status;
-    // The offset never passes the end: each entry's size was checked against the remaining bytes.
-    for (std::uint32_t offset = kHeaderSize; (status = PlaceAt(buf, offset, &place)) == HYP_OK;
-         offset += place.size) {
+    for (std::uint32_t offset = kHeaderSize; (status = EntryAt(buf, offset, &entry)) == HYP_OK;
+         offset += entry.size) {
         if (Emits(kEntry)) [[unlikely]]
-            EmitReading(place);
-        if ((Load32(place.at + kPropTypeOffset) & typeMask) == 0) continue;
-        status = AppendImage(list, place);
+            EmitReading(entry);
+        if ((Load32(entry.at + kPropTypeOffset) & typeMask) == 0) continue;
+        status = AppendImage(list, entry);
         if (status != HYP_OK) [[unlikely]]
             return status;
     }
@@ -134,53 +103,60 @@ HYP_ReturnStatus AppendAll(DVSData *list, Bytes buf, std::uint32_t typeMask) {
 
 } // namespace
 
-HYP_ReturnStatus CheckLengths(Bytes *buf) {
-    const auto bufLen = static_cast<std::uint32_t>(buf->size());
+HYP_ReturnStatus Refuse(const Fault &fault) {
+    switch (fault.kind) {
+    case FaultKind::None:
+        break;
+    case FaultKind::TooShort:
+        Emit(kError, "bad data: buffer size %d smaller than minimum header size\n", fault.found);
+        break;
+    case FaultKind::LengthTooSmall:
+        Emit(kError, "bad data: data size %d in header smaller than minimum header size\n", fault.found);
+        break;
+    case FaultKind::LengthTooLarge:
+        Emit(kError, "bad data: buffer size %d smaller than size %d in header\n", fault.expected,
+             fault.found);
+        break;
+    case FaultKind::Version:
+        Emit(kError, "Bad data: expected header version %d, actual %d\n", fault.expected, fault.found);
+        break;
+    case FaultKind::Checksum:
+        Emit(kError, "bad chksum: expected 0x%x, actual 0x%x\n", fault.found, fault.expected);
+        break;
+    case FaultKind::EntryTooLarge:
+        Emit(kError, "bad data: data length smaller than data block size %d\n", fault.found);
+        break;
+    case FaultKind::EntryLengths:
+        Emit(kError, "bad data: data block not serialized correctly %u/%u\n", fault.found, fault.expected);
+        break;
+    case FaultKind::NoMarker:
+        Emit(kError, "bad data: not end with 4 (zero) marker bytes\n");
+        break;
+    }
+    return fault.Status();
+}
+
+HYP_ReturnStatus CutToLength(Bytes *buf) {
     if (Emits(kDetail)) [[unlikely]]
-        Emit(kDetail, "Deserialize data, length = %d\n", bufLen);
-    if (bufLen < kMinBufferSize) {
-        Emit(kError, "bad data: buffer size %d smaller than minimum header size\n", bufLen);
-        return HYP_BAD_PARAM;
-    }
-    const std::uint32_t total = Load32(buf->data() + kTotalLengthOffset);
-    if (total < kMinBufferSize) {
-        Emit(kError, "bad data: data size %d in header smaller than minimum header size\n", total);
-        return HYP_BAD_PARAM;
-    }
-    if (total > bufLen) {
-        Emit(kError, "bad data: buffer size %d smaller than size %d in header\n", bufLen, total);
-        return HYP_BAD_PARAM;
-    }
-    *buf = buf->first(total);
+        Emit(kDetail, "Deserialize data, length = %d\n", static_cast<std::uint32_t>(buf->size()));
+    if (const Fault fault = CheckLengths(*buf)) [[unlikely]]
+        return Refuse(fault);
+    *buf = buf->first(Load32(buf->data() + kTotalLengthOffset));
     return HYP_OK;
-}
-
-HYP_ReturnStatus CheckChecksum(Bytes buf, std::uint32_t computed) {
-    const std::uint32_t stored = Load32(buf.data() + kChecksumOffset);
-    if (computed == stored) return HYP_OK;
-    Emit(kError, "bad chksum: expected 0x%x, actual 0x%x\n", stored, computed);
-    return HYP_BAD_CHECKSUM;
-}
-
-HYP_ReturnStatus BlockTooLarge(std::uint32_t size) {
-    Emit(kError, "bad data: data length smaller than data block size %d\n", size);
-    return HYP_BAD_PARAM;
-}
-
-HYP_ReturnStatus NoMarker() {
-    Emit(kError, "bad data: not end with 4 (zero) marker bytes\n");
-    return HYP_BAD_PARAM;
 }
 
 HYP_ReturnStatus BufferReader::Open(Bytes buf, KnownSum known, PartSums parts) {
     *this = {};
     buf_ = buf;
-    if (const HYP_ReturnStatus status = CheckLengths(&buf_); status != HYP_OK) return status;
-    if (const HYP_ReturnStatus status = CheckVersion(buf_); status != HYP_OK) return status;
+    if (const HYP_ReturnStatus status = CutToLength(&buf_); status != HYP_OK) return status;
+    if (const Fault fault = CheckVersion(buf_)) return Refuse(fault);
     offset_ = kHeaderSize;
-    if (IsSumOf(buf_, known, buf.size()))
-        return CheckChecksum(buf_, known.sum - Sum(buf_.first(kUnsummedSize)));
-    return CheckChecksum(buf_, parts == PartSums::Yes ? SumParts() : Checksum(buf_));
+    const std::uint32_t computed = IsSumOf(buf_, known, buf.size())
+                                       ? known.sum - Sum(buf_.first(kUnsummedSize))
+                                   : parts == PartSums::Yes ? SumParts()
+                                                            : Checksum(buf_);
+    const Fault fault = CheckChecksum(buf_, computed);
+    return fault ? Refuse(fault) : static_cast<HYP_ReturnStatus>(HYP_OK);
 }
 
 // Assumes the entries are valid before they are checked, and sums each value separately. If that fails, it
@@ -210,19 +186,19 @@ std::uint32_t BufferReader::SumParts() {
 HYP_ReturnStatus BufferReader::Next(EntryRef *entry) {
     offset_ += size_;
     size_ = 0;
-    Place place{};
-    if (const HYP_ReturnStatus status = PlaceAt(buf_, offset_, &place); status != HYP_OK) return status;
-    size_ = place.size;
+    CheckedEntry checked{};
+    if (const HYP_ReturnStatus status = EntryAt(buf_, offset_, &checked); status != HYP_OK) return status;
+    size_ = checked.size;
     *entry = {offset_,
-              place.size,
-              StoredName(place.at),
-              Load32(place.at + kPropTypeOffset),
-              Bytes(place.at + kEntryFixedSize, place.dataLen),
+              checked.size,
+              StoredName(checked.at),
+              Load32(checked.at + kPropTypeOffset),
+              Bytes(checked.at + kEntryFixedSize, checked.dataLen),
               {}};
     if (index_ < numParts_) entry->sum = {true, parts_[index_]};
     ++index_;
     if (Emits(kEntry) && !quiet_) [[unlikely]]
-        EmitReading(place);
+        EmitReading(checked);
     return HYP_OK;
 }
 
@@ -261,11 +237,11 @@ bool InPlaceList::Next(EntryRef *entry) {
 HYP_ReturnStatus ReadList(DVSData **list, Bytes buf, DVSDataAllocFn allocFn, DVSDataFreeFn freeFn,
                           std::uint32_t typeMask, KnownSum known, EntryBlocks blocks) {
     const std::size_t given = buf.size();
-    if (const HYP_ReturnStatus status = CheckLengths(&buf); status != HYP_OK) return status;
-    if (const HYP_ReturnStatus status = CheckVersion(buf); status != HYP_OK) return status;
+    if (const HYP_ReturnStatus status = CutToLength(&buf); status != HYP_OK) return status;
+    if (const Fault fault = CheckVersion(buf)) return Refuse(fault);
     const std::uint32_t checksum =
         IsSumOf(buf, known, given) ? known.sum - Sum(buf.first(kUnsummedSize)) : Checksum(buf);
-    if (const HYP_ReturnStatus status = CheckChecksum(buf, checksum); status != HYP_OK) return status;
+    if (const Fault fault = CheckChecksum(buf, checksum)) return Refuse(fault);
     DVSData *handle = nullptr;
     const std::uint64_t room = blocks == EntryBlocks::Shared ? RoomFor(buf, typeMask) : 0;
     if (NewList(&handle, allocFn, freeFn, room) != HYP_OK) return HYP_NO_MEMORY;

@@ -1,80 +1,18 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The read-only cursor of buffer_view.h. Its checks are in the order of the deserializer's
-// (buffer_reader.cpp); a test compares the two on damaged buffers.
+// The read-only cursor of buffer_view.h: the checks of buffer_check.h, with offsets from the outermost bytes.
 
 #include "dvsdata/buffer_view.h"
 
 #include <algorithm>
-#include <array>
-#include <cstdio>
 #include <cstring>
 
+#include "dvsdata/buffer_check.h"
+
 namespace dvs::data {
-namespace {
-
-struct FaultRow {
-    const char *text;
-    HYP_ReturnStatus status;
-    const char *numbers; // format of found and expected
-};
-
-// In the order of FaultKind.
-constexpr std::array<FaultRow, 9> kFaults{{
-    {"no fault", HYP_OK, ""},
-    {"fewer bytes than a header and an end marker", HYP_BAD_PARAM, " (%u bytes, at least %u needed)"},
-    {"total length in the header is too small", HYP_BAD_PARAM, " (%u, at least %u needed)"},
-    {"total length in the header exceeds the buffer", HYP_BAD_PARAM, " (%u, the buffer has %u bytes)"},
-    {"unknown format version", HYP_BAD_PARAM, " (%u instead of %u)"},
-    {"checksum does not match", HYP_BAD_CHECKSUM, " (0x%x stored, 0x%x computed)"},
-    {"entry runs past the end of its buffer", HYP_BAD_PARAM, " (size %u, %u bytes left)"},
-    {"entry size and value length do not fit each other", HYP_BAD_PARAM, " (value length %u, entry size %u)"},
-    {"end marker is missing", HYP_BAD_PARAM, " (%u bytes left, %u needed)"},
-}};
-
-const FaultRow &Row(FaultKind kind) {
-    return kFaults[static_cast<std::size_t>(kind)];
-}
-
-Fault CheckHeader(Bytes bytes, const HeaderView &header, std::size_t base) {
-    const auto size = static_cast<std::uint32_t>(bytes.size());
-    if (bytes.size() < kMinBufferSize)
-        return {FaultKind::TooShort, base + bytes.size(), size, kMinBufferSize};
-    const std::size_t length = base + kTotalLengthOffset;
-    if (header.totalLength < kMinBufferSize)
-        return {FaultKind::LengthTooSmall, length, header.totalLength, kMinBufferSize};
-    if (header.totalLength > bytes.size())
-        return {FaultKind::LengthTooLarge, length, header.totalLength, size};
-    if (header.version != kFormatVersion)
-        return {FaultKind::Version, base + kVersionOffset, header.version, kFormatVersion};
-    return {};
-}
-
-} // namespace
-
-const char *Fault::Text() const {
-    return Row(kind).text;
-}
-
-HYP_ReturnStatus Fault::Status() const {
-    return Row(kind).status;
-}
-
-bool Fault::Describe(std::span<char> out) const {
-    if (out.empty()) return false;
-    int length = std::snprintf(out.data(), out.size(), "%s", Text());
-    const auto used = static_cast<std::size_t>(length);
-    if (used < out.size()) {
-#pragma GCC diagnostic push
-#pragma GCC diagnostic ignored "-Wformat-nonliteral" // One of the rows above.
-        length += std::snprintf(out.data() + used, out.size() - used, Row(kind).numbers, found, expected);
-#pragma GCC diagnostic pop
-    }
-    return static_cast<std::size_t>(length) < out.size();
-}
-
 std::string_view EntryView::Name() const {
+    if (nameField.empty()) return {};
     const auto *const text = reinterpret_cast<const char *>(nameField.data());
-    return {text, ::strnlen(text, nameField.empty() ? 0 : kMaxNameLen)};
+    return {text, ::strnlen(text, kMaxNameLen)};
 }
 
 BufferView::BufferView(Bytes bytes, std::size_t baseOffset) : bytes_(bytes), base_(baseOffset) {
@@ -82,21 +20,21 @@ BufferView::BufferView(Bytes bytes, std::size_t baseOffset) : bytes_(bytes), bas
     if (!bytes.empty()) std::memcpy(fields, bytes.data(), std::min<std::size_t>(bytes.size(), kHeaderSize));
     header_ = {Load32(fields + kTotalLengthOffset), Load32(fields + kChecksumOffset),
                Load16(fields + kVersionOffset), Load16(fields + kReservedOffset)};
-    headerFault_ = CheckHeader(bytes, header_, base_);
-    if (headerFault_.kind == FaultKind::None || headerFault_.kind == FaultKind::Version) {
+    headerFault_ = CheckLengths(bytes);
+    if (!headerFault_) {
         bytes_ = bytes.first(header_.totalLength);
         computedChecksum_ = Checksum(bytes_);
-        if (headerFault_.kind == FaultKind::None && computedChecksum_ != header_.checksum)
-            headerFault_ = {FaultKind::Checksum, base_ + kChecksumOffset, header_.checksum,
-                            computedChecksum_};
+        headerFault_ = CheckVersion(bytes_);
+        if (!headerFault_) headerFault_ = CheckChecksum(bytes_, computedChecksum_);
     }
-    walking_ = headerFault_.kind == FaultKind::None;
+    if (headerFault_) headerFault_.offset += base_;
+    walking_ = !headerFault_;
     fault_ = headerFault_;
 }
 
 bool BufferView::WalkAnyway() {
-    walking_ = headerFault_.kind == FaultKind::None || headerFault_.kind == FaultKind::Version ||
-               headerFault_.kind == FaultKind::Checksum;
+    walking_ =
+        !headerFault_ || headerFault_.kind == FaultKind::Version || headerFault_.kind == FaultKind::Checksum;
     return walking_;
 }
 
@@ -104,40 +42,30 @@ void BufferView::Rewind() {
     offset_ = kHeaderSize;
     atEnd_ = false;
     fault_ = headerFault_;
-    if (headerFault_.kind == FaultKind::None) walking_ = true;
-}
-
-bool BufferView::Stop(FaultKind kind, std::size_t offset, std::uint32_t found, std::uint32_t expected) {
-    if (fault_.kind == FaultKind::None) fault_ = {kind, base_ + offset, found, expected};
-    walking_ = false;
-    return false;
+    if (!headerFault_) walking_ = true;
 }
 
 bool BufferView::Next(EntryView *entry) {
     if (!walking_) return false;
-    // `offset_` never passes the end: each entry's size is checked against the remaining bytes before the
-    // step.
-    const auto remaining = static_cast<std::uint32_t>(bytes_.size() - offset_);
-    if (remaining < kMarkerSize) return Stop(FaultKind::NoMarker, offset_, remaining, kMarkerSize);
-    const Bytes rest = bytes_.subspan(offset_);
-    const std::uint32_t size = Load32(rest.data() + kEntrySizeOffset);
-    if (size == 0) {
-        atEnd_ = true;
+    CheckedEntry checked;
+    Fault fault;
+    const Step step = CheckEntry(bytes_, offset_, &checked, &fault);
+    if (step != Step::Entry) {
         walking_ = false;
+        atEnd_ = step == Step::End;
+        fault.offset += base_;
+        if (step == Step::Fault && !fault_) fault_ = fault;
         return false;
     }
-    if (size > remaining) return Stop(FaultKind::EntryTooLarge, offset_, size, remaining);
-    const std::uint32_t dataLen = remaining >= kEntryFixedSize ? Load32(rest.data() + kDataLenOffset) : 0;
-    if (dataLen > size || size - dataLen < kMinEntryRoom)
-        return Stop(FaultKind::EntryLengths, offset_, dataLen, size);
-
+    const Bytes rest = bytes_.subspan(offset_);
     entry->offset = base_ + offset_;
-    entry->size = size;
-    entry->propType = Load32(rest.data() + kPropTypeOffset);
+    entry->size = checked.size;
+    entry->propType = Load32(checked.at + kPropTypeOffset);
     entry->nameField = rest.subspan(kNameOffset, kNameSize);
-    entry->value = rest.subspan(kEntryFixedSize, dataLen);
-    entry->padding = rest.subspan(kEntryFixedSize + dataLen, size - kEntryFixedSize - dataLen);
-    offset_ += size;
+    entry->value = rest.subspan(kEntryFixedSize, checked.dataLen);
+    entry->padding =
+        rest.subspan(kEntryFixedSize + checked.dataLen, checked.size - kEntryFixedSize - checked.dataLen);
+    offset_ += checked.size;
     return true;
 }
 

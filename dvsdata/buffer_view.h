@@ -2,53 +2,26 @@
 #ifndef DVSDATA_BUFFER_VIEW_H
 #define DVSDATA_BUFFER_VIEW_H
 
-// A read-only cursor over the bytes of a serialized list, for display, verification, export and fuzzing. It
-// allocates nothing, prints nothing, skips no type and ignores host limits. It finds exactly the faults for
-// which DVSData_DeserializeWithPropType rejects a buffer, the first one first, with their location.
+// A read-only cursor over the bytes of a serialized list, for displays, verification, export and fuzzing. It allocates
+// nothing, prints nothing, skips no type and applies no host limits. It finds exactly the faults for which
+// DVSData_DeserializeWithPropType refuses a buffer, and reports the first one with its offset.
 //
 //     BufferView view(bytes);
 //     EntryView entry;
 //     while (view.Next(&entry)) { ... }
 //     if (!view.Ok()) report(view.FirstFault());
 //
-// A value may itself be a buffer: BufferView(entry.value, entry.ValueOffset()) reads it, with offsets that
-// still count from the start of the outermost bytes.
+// A value may be a buffer itself: BufferView(entry.value, entry.ValueOffset()) walks it, with offsets that still count
+// from the start of the outermost bytes.
 
 #include <cstddef>
 #include <cstdint>
-#include <span>
 #include <string_view>
 
+#include "dvsdata/buffer_fault.h"
 #include "dvsdata/format.h"
 
 namespace dvs::data {
-
-enum class FaultKind : std::uint8_t {
-    None,
-    TooShort,       // fewer bytes than an empty list; at the end of the bytes
-    LengthTooSmall, // the header's total length is smaller than an empty list's; at that field
-    LengthTooLarge, // the header's total length exceeds the bytes; at that field
-    Version,        // another format version; at that field
-    Checksum,       // at that field
-    EntryTooLarge,  // an entry's size runs past the buffer's end; at the entry
-    EntryLengths,   // an entry's size has no room for its fixed part and value; at the entry
-    NoMarker        // no room for an end marker after the last entry; where it should start
-};
-
-struct Fault {
-    FaultKind kind = FaultKind::None;
-    std::size_t offset = 0;     // of the byte, from the start of the outermost bytes
-    std::uint32_t found = 0;    // the wrong number: a length, version, checksum or size
-    std::uint32_t expected = 0; // the expected number or bound
-
-    /// A short description of the fault; static.
-    [[nodiscard]] const char *Text() const;
-    /// The status of the deserializer for this fault; HYP_OK for None.
-    [[nodiscard]] HYP_ReturnStatus Status() const;
-    /// Writes "<text> (found ..., expected ...)" into `out`, truncated to its size and NUL-terminated; false
-    /// if truncated.
-    bool Describe(std::span<char> out) const;
-};
 
 struct EntryView {
     std::size_t offset = 0; // of the entry, from the start of the outermost bytes
@@ -62,7 +35,7 @@ struct EntryView {
     [[nodiscard]] std::string_view Name() const;
     [[nodiscard]] std::uint32_t DataLen() const { return static_cast<std::uint32_t>(value.size()); }
     [[nodiscard]] std::size_t ValueOffset() const { return offset + kEntryFixedSize; }
-    /// True if the size is the one a list would write.
+    /// Has the size with which a list would write it.
     [[nodiscard]] bool IsUsualSize() const { return size == EntrySize(DataLen()); }
 };
 
@@ -82,29 +55,27 @@ public:
 
     [[nodiscard]] const HeaderView &Header() const { return header_; }
     [[nodiscard]] std::size_t BaseOffset() const { return base_; }
-    /// The computed checksum; 0 if the lengths are faulty.
+    /// The checksum of the bytes; 0 when the lengths are faulty.
     [[nodiscard]] std::uint32_t ComputedChecksum() const { return computedChecksum_; }
 
-    /// Returns the next entry; false at the end marker or a fault, and after either.
+    /// Returns the next entry; false at the end marker, at a fault, and after either.
     bool Next(EntryView *entry);
     /// Returns to the first entry.
     void Rewind();
 
-    /// True if no fault has been found so far.
-    [[nodiscard]] bool Ok() const { return fault_.kind == FaultKind::None; }
-    /// True if the end marker was reached without a fault.
+    /// No fault so far.
+    [[nodiscard]] bool Ok() const { return !fault_; }
+    /// The end marker was reached without a fault.
     [[nodiscard]] bool AtEnd() const { return atEnd_; }
     [[nodiscard]] const Fault &FirstFault() const { return fault_; }
-    /// Bytes up to and including the end marker; later bytes are ignored. Meaningful only if AtEnd().
+    /// Bytes up to and including the end marker; the bytes after it are not checked. Valid when AtEnd().
     [[nodiscard]] std::size_t UsedSize() const { return offset_ + kMarkerSize; }
 
-    /// Walks the entries of a buffer with a wrong version or checksum, to display damaged data. Returns false
-    /// for any other fault. The fault stays the same unless the walk finds one before it.
+    /// Allows walking the entries of a buffer whose version or checksum is wrong, for displays of damaged data. False
+    /// when the header has another fault. The header's fault stays the first one.
     bool WalkAnyway();
 
 private:
-    bool Stop(FaultKind kind, std::size_t offset, std::uint32_t found, std::uint32_t expected);
-
     Bytes bytes_;
     std::size_t base_ = 0;
     HeaderView header_;

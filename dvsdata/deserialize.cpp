@@ -4,6 +4,7 @@
 
 #include <cstring>
 
+#include "dvsdata/buffer_check.h"
 #include "dvsdata/emit.h"
 #include "dvsdata/list_internal.h"
 
@@ -30,17 +31,18 @@ HYP_ReturnStatus CopyValue(const std::uint8_t *at, std::size_t room, const char 
     return HYP_OK;
 }
 
-// Laxer than a list's reader: an entry's size and value length need not agree. All reads stay in the buffer.
+// Less strict than a list's reader: an entry's size and value length need not agree. No byte outside the buffer is read.
 HYP_ReturnStatus FindValue(Bytes buf, const char *name, void *propVal, std::uint32_t propValSize) {
     const std::string_view wanted(name);
     for (std::size_t offset = kHeaderSize;;) {
+        std::uint32_t size = 0;
+        Fault fault;
+        const Step step = CheckEntrySize(buf, offset, &size, &fault);
+        if (step == Step::End) return HYP_NOT_FOUND;
+        if (step == Step::Fault) return Refuse(fault);
         const std::size_t remaining = buf.size() - offset;
-        if (remaining < kMarkerSize) return NoMarker();
-        const std::uint8_t *const at = buf.data() + offset;
-        const std::uint32_t size = Load32(at + kEntrySizeOffset);
-        if (size == 0) return HYP_NOT_FOUND;
-        if (size > remaining) return BlockTooLarge(size);
         if (remaining < kEntryFixedSize) return HYP_BAD_PARAM;
+        const std::uint8_t *const at = buf.data() + offset;
         const auto *const field = reinterpret_cast<const char *>(at + kNameOffset);
         if (Emits(kEntry)) [[unlikely]]
             Emit(kEntry, "deserializing %.*s: %u/%u data/serial bytes %d flag\n", static_cast<int>(kNameSize),
@@ -71,14 +73,12 @@ HYP_ReturnStatus DVSData_DeserializeGetPropVal(const void *buf, uint32_t bufLen,
                                                void *propVal, uint32_t propValSize) {
     if (!buf || !name || !propVal) return HYP_BAD_PARAM;
     Bytes bytes = AsBytes(buf, bufLen);
-    if (const HYP_ReturnStatus status = CheckLengths(&bytes); status != HYP_OK) return status;
-    // This call checks the checksum before the version, unlike the calls that build a list.
-    if (const HYP_ReturnStatus status = CheckChecksum(bytes, Checksum(bytes)); status != HYP_OK)
-        return status;
-    const std::uint16_t version = Load16(bytes.data() + kVersionOffset);
-    if (version != kFormatVersion) {
-        Emit(kError, "Unsupported DVS data version %u\n", version);
-        return HYP_BAD_PARAM;
+    if (const HYP_ReturnStatus status = CutToLength(&bytes); status != HYP_OK) return status;
+    // Unlike the list readers, this function checks the checksum before the version, and has a message of its own.
+    if (const Fault fault = CheckChecksum(bytes, Checksum(bytes))) return Refuse(fault);
+    if (const Fault fault = CheckVersion(bytes)) {
+        Emit(kError, "Unsupported DVS data version %u\n", fault.found);
+        return fault.Status();
     }
     return FindValue(bytes, name, propVal, propValSize);
 }

@@ -14,6 +14,7 @@
 #include <string_view>
 
 #include "dvs/data.h"
+#include "dvsdata/buffer_fault.h"
 #include "dvsdata/format.h"
 #include "dvsdata/open_buffer.h"
 
@@ -168,16 +169,11 @@ struct EntryRef {
     KnownSum sum; // of the value, if the buffer was opened with PartSums
 };
 
-// The checks shared by all readers, each with its message.
+/// Prints the library's message about a fault and returns its status.
+[[gnu::cold]] HYP_ReturnStatus Refuse(const Fault &fault);
 
-/// Cuts `buf` to the length in its header. HYP_BAD_PARAM.
-[[nodiscard]] HYP_ReturnStatus CheckLengths(Bytes *buf);
-/// HYP_BAD_CHECKSUM if `computed` differs from the header's checksum.
-[[nodiscard]] HYP_ReturnStatus CheckChecksum(Bytes buf, std::uint32_t computed);
-/// HYP_BAD_PARAM: an entry that runs past the end.
-[[nodiscard]] HYP_ReturnStatus BlockTooLarge(std::uint32_t size);
-/// HYP_BAD_PARAM: no room for an end marker after an entry.
-[[nodiscard]] HYP_ReturnStatus NoMarker();
+/// Cuts `buf` to the length its header says. HYP_BAD_PARAM.
+[[nodiscard]] HYP_ReturnStatus CutToLength(Bytes *buf);
 
 enum class PartSums : bool { No, Yes };
 
