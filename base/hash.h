@@ -2,8 +2,8 @@
 #ifndef BASE_HASH_H
 #define BASE_HASH_H
 
-// The hash of a text for the tables in memory. Not for bytes that leave the process, and no protection against texts
-// that are made to collide.
+// A text hash for in-memory tables. Do not store or send it; it does not protect against texts that collide
+// on purpose.
 
 #include <cstddef>
 #include <cstdint>
@@ -35,8 +35,8 @@ inline std::uint64_t Fold(std::uint64_t a, std::uint64_t b) {
 
 } // namespace hash
 
-/// All 64 bits are well mixed: tables may use any of them. 16 bytes a step; the last step reads bytes again instead of
-/// reading fewer.
+/// All 64 bits are well mixed, so tables may use any of them. 16 bytes per step; the last step overlaps the
+/// previous one instead of reading fewer bytes.
 [[nodiscard]] inline std::uint64_t HashText(std::string_view text) {
     constexpr std::uint64_t kFirst = 0x9e3779b97f4a7c15, kSecond = 0xd1b54a32d192ed03;
     const char *at = text.data();

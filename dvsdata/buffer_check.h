@@ -2,11 +2,12 @@
 #ifndef DVSDATA_BUFFER_CHECK_H
 #define DVSDATA_BUFFER_CHECK_H
 
-// The checks of a serialized list, for its readers and its view. Each finds a fault and prints nothing. Offsets count
-// from the start of the buffer.
+// The checks of a serialized list, for its readers and its view. Each finds a fault and prints nothing.
+// Offsets count from the start of the buffer.
 //
-// No byte outside the given ones is read. Callers check the lengths first, cut the bytes to the header's total length,
-// and then walk: every step checks an entry's size against the bytes left before the walk moves past the entry.
+// No byte outside the given ones is read. Callers check the lengths first, cut the bytes to the header's
+// total length, and then walk: every step checks an entry's size against the bytes left before the walk moves
+// past the entry.
 
 #include <cstddef>
 #include <cstdint>
@@ -63,12 +64,12 @@ inline Step CheckEntrySize(Bytes buffer, std::size_t offset, std::uint32_t *size
     return Step::Fault;
 }
 
-/// The same, and that the entry has room for its fixed part and its value. EntryLengths too.
+/// The same, and checks that the entry has room for its fixed part and its value. Also EntryLengths.
 inline Step CheckEntry(Bytes buffer, std::size_t offset, CheckedEntry *entry, Fault *fault) {
     std::uint32_t size = 0;
     if (const Step step = CheckEntrySize(buffer, offset, &size, fault); step != Step::Entry) return step;
     const std::uint8_t *const at = buffer.data() + offset;
-    // The room check refuses every size below 143, hence also an entry without a whole fixed part.
+    // The room check rejects every size below 143, so also an entry without a whole fixed part.
     const std::uint32_t dataLen = buffer.size() - offset >= kEntryFixedSize ? Load32(at + kDataLenOffset) : 0;
     if (dataLen > size || size - dataLen < kMinEntryRoom) [[unlikely]] {
         *fault = {FaultKind::EntryLengths, offset, dataLen, size};

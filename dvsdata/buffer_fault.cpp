@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// Words and statuses of the faults of buffer_fault.h.
+// Texts and statuses of the faults of buffer_fault.h.
 
 #include "dvsdata/buffer_fault.h"
 
@@ -12,7 +12,7 @@ namespace {
 struct FaultRow {
     const char *text;
     HYP_ReturnStatus status;
-    const char *numbers; // how found and expected are shown
+    const char *numbers; // format of found and expected
 };
 
 // In the order of FaultKind.

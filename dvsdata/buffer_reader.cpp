@@ -24,7 +24,7 @@ bool IsAligned(std::size_t value) {
     return value % 4 == 0;
 }
 
-/// The entry at `offset`, which is not behind the end of the buffer. HYP_NOT_FOUND at the end marker.
+/// Reads the entry at `offset`, which must not be past the buffer's end. HYP_NOT_FOUND at the end marker.
 inline HYP_ReturnStatus EntryAt(Bytes buf, std::uint32_t offset, CheckedEntry *entry) {
     Fault fault;
     const Step step = CheckEntry(buf, offset, entry, &fault);
@@ -72,8 +72,8 @@ inline HYP_ReturnStatus AppendImage(DVSData *list, CheckedEntry image) {
     return HYP_OK;
 }
 
-/// The size of the entries of a sound buffer in the list's own block. 0 for a faulty buffer, whose entries get a block
-/// each until the fault is reached, and when messages about every entry are on.
+/// The room that the entries of a valid buffer need in the list's own block. Returns 0 for a faulty buffer,
+/// whose entries get their own blocks until the fault is reached, and if messages print for every entry.
 std::uint64_t RoomFor(Bytes buf, std::uint32_t typeMask) {
     if (Emits(kDetail)) return 0;
     std::uint64_t room = 0;

@@ -2,17 +2,17 @@
 #ifndef DVSDATA_BUFFER_VIEW_H
 #define DVSDATA_BUFFER_VIEW_H
 
-// A read-only cursor over the bytes of a serialized list, for displays, verification, export and fuzzing. It allocates
-// nothing, prints nothing, skips no type and applies no host limits. It finds exactly the faults for which
-// DVSData_DeserializeWithPropType refuses a buffer, and reports the first one with its offset.
+// A read-only cursor over the bytes of a serialized list, for displays, verification, export and fuzzing. It
+// allocates nothing, prints nothing, skips no type and applies no host limits. It finds exactly the faults
+// for which DVSData_DeserializeWithPropType rejects a buffer, and reports the first one with its offset.
 //
 //     BufferView view(bytes);
 //     EntryView entry;
 //     while (view.Next(&entry)) { ... }
 //     if (!view.Ok()) report(view.FirstFault());
 //
-// A value may be a buffer itself: BufferView(entry.value, entry.ValueOffset()) walks it, with offsets that still count
-// from the start of the outermost bytes.
+// A value may be a buffer itself: BufferView(entry.value, entry.ValueOffset()) walks it, with offsets that
+// still count from the start of the outermost bytes.
 
 #include <cstddef>
 #include <cstdint>
@@ -35,7 +35,7 @@ struct EntryView {
     [[nodiscard]] std::string_view Name() const;
     [[nodiscard]] std::uint32_t DataLen() const { return static_cast<std::uint32_t>(value.size()); }
     [[nodiscard]] std::size_t ValueOffset() const { return offset + kEntryFixedSize; }
-    /// Has the size with which a list would write it.
+    /// True if the size is the one a list would write.
     [[nodiscard]] bool IsUsualSize() const { return size == EntrySize(DataLen()); }
 };
 
@@ -55,7 +55,7 @@ public:
 
     [[nodiscard]] const HeaderView &Header() const { return header_; }
     [[nodiscard]] std::size_t BaseOffset() const { return base_; }
-    /// The checksum of the bytes; 0 when the lengths are faulty.
+    /// The checksum of the bytes; 0 if the lengths are faulty.
     [[nodiscard]] std::uint32_t ComputedChecksum() const { return computedChecksum_; }
 
     /// Returns the next entry; false at the end marker, at a fault, and after either.
@@ -63,16 +63,16 @@ public:
     /// Returns to the first entry.
     void Rewind();
 
-    /// No fault so far.
+    /// True if no fault has been found so far.
     [[nodiscard]] bool Ok() const { return !fault_; }
-    /// The end marker was reached without a fault.
+    /// True if the end marker was reached without a fault.
     [[nodiscard]] bool AtEnd() const { return atEnd_; }
     [[nodiscard]] const Fault &FirstFault() const { return fault_; }
-    /// Bytes up to and including the end marker; the bytes after it are not checked. Valid when AtEnd().
+    /// Bytes up to and including the end marker; later bytes are not checked. Valid only if AtEnd().
     [[nodiscard]] std::size_t UsedSize() const { return offset_ + kMarkerSize; }
 
-    /// Allows walking the entries of a buffer whose version or checksum is wrong, for displays of damaged data. False
-    /// when the header has another fault. The header's fault stays the first one.
+    /// Allows walking the entries of a buffer with a wrong version or checksum, to display damaged data.
+    /// Returns false if the header has another fault. The header's fault stays the first one.
     bool WalkAnyway();
 
 private:

@@ -31,7 +31,8 @@ HYP_ReturnStatus CopyValue(const std::uint8_t *at, std::size_t room, const char 
     return HYP_OK;
 }
 
-// Less strict than a list's reader: an entry's size and value length need not agree. No byte outside the buffer is read.
+// Less strict than a list's reader: an entry's size and value length need not agree. No byte outside the
+// buffer is read.
 HYP_ReturnStatus FindValue(Bytes buf, const char *name, void *propVal, std::uint32_t propValSize) {
     const std::string_view wanted(name);
     for (std::size_t offset = kHeaderSize;;) {
@@ -74,7 +75,7 @@ HYP_ReturnStatus DVSData_DeserializeGetPropVal(const void *buf, uint32_t bufLen,
     if (!buf || !name || !propVal) return HYP_BAD_PARAM;
     Bytes bytes = AsBytes(buf, bufLen);
     if (const HYP_ReturnStatus status = CutToLength(&bytes); status != HYP_OK) return status;
-    // Unlike the list readers, this function checks the checksum before the version, and has a message of its own.
+    // Unlike the list readers, this function checks the checksum before the version, with its own message.
     if (const Fault fault = CheckChecksum(bytes, Checksum(bytes))) return Refuse(fault);
     if (const Fault fault = CheckVersion(bytes)) {
         Emit(kError, "Unsupported DVS data version %u\n", fault.found);

@@ -29,8 +29,8 @@ std::uint32_t Hash(std::string_view name) {
 
 } // namespace
 
-/// A hash table in one block: this record, `size` nodes, `size` buckets. A bucket is a chain of nodes in list order that
-/// closes on itself: the bucket holds its last node, which links to its first.
+/// A hash table in one block: this record, `size` nodes, `size` buckets. A bucket is a chain of nodes in list
+/// order that closes on itself: the bucket holds its last node, which links to its first.
 struct alignas(8) NameIndex::Table {
     struct Node {
         DVSDataEntry *entry;
@@ -51,7 +51,8 @@ struct alignas(8) NameIndex::Table {
     [[nodiscard]] bool HasNewNode() const { return used < size; }
     [[nodiscard]] bool IsFull() const { return used == size && free == kNone; }
 
-    /// A node for each entry. Nodes of the smaller table are copied, so that their names need not be read again.
+    /// A node for each entry. Nodes of the smaller table are copied, so that their names need not be read
+    /// again.
     void Fill(DVSData *list, std::uint32_t newSize, const Table *smaller) {
         size = newSize;
         used = 0;
@@ -68,10 +69,10 @@ struct alignas(8) NameIndex::Table {
             AddNew(entry, Hash(NameOf(entry)));
     }
 
-    /// There must be a node that was never handed out.
+    /// Requires a node that was never used.
     void AddNew(DVSDataEntry *entry, std::uint32_t hash) { Append(entry, hash, used++); }
 
-    /// There must be a node that was given back.
+    /// Requires a node in the free list.
     void AddAgain(DVSDataEntry *entry, std::uint32_t hash) {
         const std::uint32_t index = free;
         free = Nodes()[index].next;
@@ -109,8 +110,8 @@ private:
     std::uint32_t *Lasts() { return reinterpret_cast<std::uint32_t *>(Nodes() + size); }
     std::uint32_t &LastOf(std::uint32_t hash) { return Lasts()[hash & (size - 1)]; }
 
-    /// Fills the node and puts it at the end of its chain. In an empty chain the node precedes itself; which it is
-    /// cannot be predicted, so it is no branch.
+    /// Fills the node and appends it to its chain. In an empty chain the node is its own predecessor. This is
+    /// computed without a branch, because it is unpredictable.
     void Append(DVSDataEntry *entry, std::uint32_t hash, std::uint32_t index) {
         std::uint32_t &last = LastOf(hash);
         Nodes()[index] = {entry, hash, index};
@@ -204,7 +205,7 @@ void NameIndex::Removing(DVSData *list, DVSDataEntry *entry) {
 }
 
 void NameIndex::BuildTable(DVSData *list) {
-    // Small tables grow fourfold: building the steps between them again costs more than the unused memory.
+    // Small tables grow fourfold: rebuilding the sizes in between costs more than the unused memory.
     constexpr std::uint64_t kQuickGrowth = 1024;
     std::uint64_t size = std::bit_ceil(std::uint64_t{count_} + 1);
     if (table_ && size < kQuickGrowth) size *= 2;
