@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: Apache-2.0
-# installed_copy.sh CMAKE BUILD_DIR LIBDIR CC SOURCE [FLAGS…]: an installed copy is enough to compile, link and run a
-# C program against, in the way a package of the library would be used.
+# installed_copy.sh CMAKE BUILD_DIR LIBDIR CC SOURCE [FLAGS…]: a C program compiles, links and
+# runs against an installed copy alone, as with a package of the library.
 set -eu
 cmake=$1 build=$2 libdir=$3 cc=$4 source=$5
 shift 5

@@ -1,7 +1,7 @@
 #!/bin/sh
 # SPDX-License-Identifier: Apache-2.0
-# installed_package.sh CMAKE BUILD_DIR LIBDIR CC SOURCE [FLAGS…]: an installed copy, moved elsewhere, is found by other
-# people's builds: by find_package, and by pkg-config where there is one.
+# installed_package.sh CMAKE BUILD_DIR LIBDIR CC SOURCE [FLAGS…]: other builds find an installed copy that was
+# moved elsewhere, with find_package and, if available, with pkg-config.
 set -eu
 cmake=$1 build=$2 libdir=$3 cc=$4 source=$5
 shift 5
@@ -35,7 +35,7 @@ echo "find_package: found, linked and run"
 command -v pkg-config >/dev/null || exit 0
 export PKG_CONFIG_PATH="$work/prefix/$libdir/pkgconfig"
 pkg-config --exists 'libdvs >= 1.0'
-# shellcheck disable=SC2046 # the flags are words
+# shellcheck disable=SC2046 # splits the flags into words on purpose
 "$cc" -std=c11 "$@" $(pkg-config --cflags libdvs) "$source" -o "$work/program" $(pkg-config --libs libdvs) \
     "-Wl,-rpath,$work/prefix/$libdir" "-Wl,-rpath-link,$work/prefix/$libdir"
 "$work/program"

@@ -27,7 +27,7 @@ std::optional<std::string> Decode(std::string_view text) {
     return bytes;
 }
 
-TEST(Base64, KnownVectorsBothWays) {
+TEST(Base64, KnownVectorsInBothDirections) {
     const struct {
         std::string_view bytes, text;
     } rows[] = {
@@ -47,7 +47,7 @@ TEST(Base64, KnownVectorsBothWays) {
     }
 }
 
-TEST(Base64, OnlyTheCanonicalFormIsDecoded) {
+TEST(Base64, DecodesTheCanonicalFormOnly) {
     for (const std::string_view text : {
              "Z", "Zg", "Zm9", "Zg=",         // not padded
              "Zg===", "Z===", "====", "=",    // padded too much

@@ -1,12 +1,12 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Holds the library (through codec_probe) against dvscodec.py.
+"""Compares the library (through codec_probe) with dvscodec.py.
 
     codec_test.py PROBE GOLDEN_DIR [--count N] [--seed N] [--write-golden]
 
-Generates and mutates N buffers (default 3,000, or DVS_CODEC_COUNT) and demands that both sides agree: on accepting or
-refusing, on the status, on every entry and on single values; then does the same for the checked-in golden files, and
-demands that both sides still write those files to the byte.
+Generates and mutates N buffers (default 3,000, or DVS_CODEC_COUNT) and checks that both sides agree: on accepting or
+rejecting, on the status, on every entry and on single values. Then does the same for the checked-in golden files, and
+checks that both sides still write those files byte for byte.
 """
 
 import argparse
@@ -50,7 +50,7 @@ def entry_offsets(buffer):
 
 
 def mutate(rng, buffer):
-    """One kind of damage; the checksum is mended as often as not."""
+    """Applies one kind of damage; recomputes the checksum half of the time."""
     buffer = bytearray(buffer)
     kind = rng.randrange(7)
     offsets = list(entry_offsets(buffer)) or [12]
@@ -107,7 +107,7 @@ def expect_value(buffer, name, room):
 
 
 def entries_of(buffer):
-    """All of them, of type 0 as well, which no mask keeps: only for buffers that decode."""
+    """All entries, also those of type 0, which no mask keeps. Only for buffers that decode."""
     entries, at = [], 12
     while (size := struct.unpack_from("<I", buffer, at)[0]) != 0:
         _, name, kind, length = dvscodec.FIXED.unpack_from(buffer, at)
@@ -117,7 +117,7 @@ def entries_of(buffer):
 
 
 def expect_view(buffer, answer):
-    """The offset is the view's own business unless the buffer is sound."""
+    """Compares offsets only for valid buffers: the offset of a fault is specific to the view."""
     try:
         dvscodec.decode(buffer)
     except Refused as refused:
@@ -126,7 +126,7 @@ def expect_view(buffer, answer):
 
 
 def requests_for(rng, buffer):
-    """Pairs of request line and what the answer must be (a text, or a function of the answer)."""
+    """Pairs of a request line and its expected reply (a text, or a function of the reply)."""
     mask = rng.choice([dvscodec.DEFAULT_MASK, dvscodec.DEFAULT_MASK, 0xFFFFFFFF, 0x10, 0])
     name, room = rng.choice(NAMES), rng.choice([0, 4, 300])
     yield f"decode {mask} {to_hex(buffer)}", expect_decode(buffer, mask)
@@ -218,7 +218,7 @@ def check_golden(probe, folder, write):
 
 
 def check_document(folder):
-    """The worked example's hex lines in the document are the golden file."""
+    """The hex lines of the document's worked example equal the golden file."""
     path = os.path.join(folder, "..", "..", "docs", "buffer-format.md")
     with open(path, encoding="utf-8") as file:
         rows = re.findall(r"^[0-9a-f]{8}  ((?:[0-9a-f]{2} ?)+)$", file.read(), re.MULTILINE)

@@ -1,11 +1,11 @@
 # SPDX-License-Identifier: Apache-2.0
-"""Serialized property lists in plain Python, written from docs/buffer-format.md and not from the library.
+"""Serialized property lists in plain Python, written from docs/buffer-format.md independently of the library.
 
-It exists so that the library and its own tools cannot agree on the same mistake: the driver beside it holds the two
-against each other. Standard library only.
+An independent implementation catches mistakes that the library and its tools share; codec_test.py compares the two.
+It uses the standard library only.
 
-A list is a Python list of Entry. `encode` gives the one form that the library writes; `decode` accepts and refuses
-what the library's deserializer does, with the same status; `get_value` is the search for one value.
+A list is a Python list of Entry. `encode` returns the only form that the library writes. `decode` accepts and rejects
+the same buffers as the library's deserializer, with the same status. `get_value` looks up one value.
 """
 
 import struct
@@ -25,7 +25,7 @@ Entry = namedtuple("Entry", "name type value")
 
 
 class Refused(Exception):
-    """The buffer is not accepted; `status` says why."""
+    """The buffer is rejected; `status` says why."""
 
     def __init__(self, status, why):
         super().__init__(f"{why} (0x{status:08x})")
@@ -33,7 +33,7 @@ class Refused(Exception):
 
 
 def checksum(buffer):
-    """Of a whole buffer as long as its header says: everything behind its first 32 bytes, added up."""
+    """The sum of all bytes after the first 32, for a whole buffer of the length in its header."""
     whole = len(buffer) // 4 * 4
     total = sum(word for (word,) in struct.iter_unpack("<I", buffer[32:whole])) if whole > 32 else 0
     total += sum(buffer[max(whole, 32):])
@@ -85,7 +85,7 @@ def _checksum(buffer):
 
 
 def decode(buffer, mask=DEFAULT_MASK):
-    """The entries that a list made of the buffer holds. Raises Refused."""
+    """The entries of a list read from the buffer. Raises Refused."""
     buffer = _lengths(bytes(buffer))
     _version(buffer)
     _checksum(buffer)

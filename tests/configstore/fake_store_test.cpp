@@ -24,7 +24,7 @@ struct FakeStore : testing::Test {
     Object *object = nullptr;
 };
 
-TEST_F(FakeStore, KeepsNothingOfACancelledTransaction) {
+TEST_F(FakeStore, DiscardsACancelledTransaction) {
     ASSERT_EQ(OK, Set(store, object, "EXTERNAL"));
     const std::string before = fake_store::Dump();
     ASSERT_EQ(OK, BeginTransaction(store));
@@ -35,7 +35,7 @@ TEST_F(FakeStore, KeepsNothingOfACancelledTransaction) {
     EXPECT_NE("", before);
 }
 
-TEST_F(FakeStore, HandsOutCopies) {
+TEST_F(FakeStore, ReturnsCopies) {
     ASSERT_EQ(OK, Set(store, object, "EXTERNAL"));
     Object *copy = nullptr;
     ASSERT_EQ(OK, Get(store, "k", "g", "c", "id", &copy));
@@ -44,7 +44,7 @@ TEST_F(FakeStore, HandsOutCopies) {
     DestroyObject(copy);
 }
 
-TEST_F(FakeStore, SelectsInstancesOfSingletonsBelowWhereTheMemberIsAbsent) {
+TEST_F(FakeStore, DescendsIntoSingletonsWhereTheMemberIsAbsent) {
     Object *sub = nullptr;
     Object *instance = nullptr;
     ASSERT_EQ(OK, CreateSubObject(object, "sub", "", &sub));
@@ -64,7 +64,7 @@ TEST_F(FakeStore, SelectsInstancesOfSingletonsBelowWhereTheMemberIsAbsent) {
     DestroyFilterSpecObject(spec);
 }
 
-TEST_F(FakeStore, RefusesOtherTypesAndNumbersThatDoNotFit) {
+TEST_F(FakeStore, RejectsOtherTypesAndNumbersOutOfRange) {
     ASSERT_EQ(OK, SetValueLong(object, "n", 70000));
     uint16_t small = 0;
     bool flag = false;
@@ -75,7 +75,7 @@ TEST_F(FakeStore, RefusesOtherTypesAndNumbersThatDoNotFit) {
     EXPECT_EQ(BAD_PARAMETER, SetValueStr(object, "s", nullptr));
 }
 
-TEST_F(FakeStore, FailsTheCallItIsTold) {
+TEST_F(FakeStore, FailsTheRequestedCall) {
     fake_store::FailCall(2, IO_ERROR);
     EXPECT_EQ(OK, SetValueInt(object, "a", 1));
     EXPECT_EQ(IO_ERROR, SetValueInt(object, "b", 1));

@@ -56,12 +56,12 @@ TEST_F(PropFrame, SavesAnUnknownPortKeyThroughThePortDefaultRow) {
               Content());
 }
 
-TEST_F(PropFrame, TakesOtherClassesForGlobal) {
+TEST_F(PropFrame, TreatsUnknownClassesAsGlobal) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n"), 7));
     EXPECT_EQ(" {}\n/name = \"n\"\n", Content());
 }
 
-TEST_F(PropFrame, LoadsOtherClassesFromTheGlobalTable) {
+TEST_F(PropFrame, LoadsUnknownClassesFromTheGlobalTable) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
     for (const uint32_t propClass : {3u, 7u, 0xffffffffu}) {
         EXPECT_EQ(Props({{"com.orbeno.common.alias", Text("n"), 0x10}}), Load(propClass)) << propClass;
@@ -69,13 +69,13 @@ TEST_F(PropFrame, LoadsOtherClassesFromTheGlobalTable) {
     }
 }
 
-TEST_F(PropFrame, TakesANullValueForAnEmptyOneWhateverItsLength) {
+TEST_F(PropFrame, TreatsANullValueOfAnyLengthAsEmpty) {
     EXPECT_EQ(0, SaveProp(object, "com.orbeno.common.alias", nullptr, 5, DVS_PROP_CLASS_GLOBAL, 0x10));
     EXPECT_EQ(" {}\n/name = \"\"\n", Content());
     EXPECT_EQ(-1, SaveProp(object, "com.orbeno.common.portset.mtu", nullptr, 4, DVS_PROP_CLASS_GLOBAL, 0x10));
 }
 
-TEST_F(PropFrame, KeepsKeysOfOtherClassesApart) {
+TEST_F(PropFrame, KeepsKeysOfOtherClassesSeparate) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n"), DVS_PROP_CLASS_HOST));
     EXPECT_NE(std::string::npos, Content().find("/data/vendor_specific_host_member_config"));
 }
@@ -100,7 +100,7 @@ TEST_F(PropFrame, SkipsADeepRowWhosePathIsAbsent) {
     EXPECT_EQ(" {}\n/settings {}\n", Content()) << "a load creates nothing";
 }
 
-TEST_F(PropFrame, RefusesTheUnassignedTypeInBothDirections) {
+TEST_F(PropFrame, RejectsTheUnassignedTypeInBothDirections) {
     const RowChange change(&dvsGlobalProp2Config[0], WithType(dvsGlobalProp2Config[0], 30));
     EXPECT_EQ(-1, Save("com.orbeno.common.alias", Text("n")));
     EXPECT_EQ("Unknow prop type: 30\nSet prop: com.orbeno.common.alias failed\n", errors);
@@ -112,7 +112,7 @@ TEST_F(PropFrame, RefusesTheUnassignedTypeInBothDirections) {
               errors);
 }
 
-TEST_F(PropFrame, RefusesATypeBehindTheLast) {
+TEST_F(PropFrame, RejectsATypeAfterTheLast) {
     const RowChange change(&dvsGlobalProp2Config[0], WithType(dvsGlobalProp2Config[0], 37));
     EXPECT_EQ(-1, Save("com.orbeno.common.alias", Text("n")));
     EXPECT_EQ("Unknow prop type: 37\nSet prop: com.orbeno.common.alias failed\n", errors);
@@ -145,7 +145,7 @@ TEST_F(PropFrame, LoadsTablesOfAnyLength) {
     EXPECT_EQ(expected, loaded) << messages;
 }
 
-TEST_F(PropFrame, NoticesAChangedKey) {
+TEST_F(PropFrame, DetectsAChangedKey) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
     const RowChange change(&dvsGlobalProp2Config[0], WithKey(dvsGlobalProp2Config[0], "com.example.new"));
     ASSERT_EQ(0, Save("com.example.new", Text("m")));
@@ -154,7 +154,7 @@ TEST_F(PropFrame, NoticesAChangedKey) {
     EXPECT_NE(std::string::npos, Content().find("/data/vendor_specific_config[com.orbeno.common.alias]"));
 }
 
-TEST_F(PropFrame, NoticesAKeyThatIsRewrittenInPlace) {
+TEST_F(PropFrame, DetectsAKeyRewrittenInPlace) {
     char key[] = "com.example.one";
     const RowChange change(&dvsGlobalProp2Config[0], WithKey(dvsGlobalProp2Config[0], key));
     ASSERT_EQ(0, Save("com.example.one", Text("1")));
@@ -163,7 +163,7 @@ TEST_F(PropFrame, NoticesAKeyThatIsRewrittenInPlace) {
     EXPECT_EQ(" {}\n/name = \"2\"\n", Content());
 }
 
-TEST_F(PropFrame, NoticesAnEarlierRowOfTheSameKey) {
+TEST_F(PropFrame, DetectsAnEarlierRowOfTheSameKey) {
     ASSERT_EQ(0, Save("com.orbeno.common.resv.threshold", U32(7)));
     const RowChange change(&dvsGlobalProp2Config[0],
                            WithKey(dvsGlobalProp2Config[0], "com.orbeno.common.resv.threshold"));
@@ -171,14 +171,14 @@ TEST_F(PropFrame, NoticesAnEarlierRowOfTheSameKey) {
     EXPECT_NE(std::string::npos, Content().find("/name = \"x\"\n"));
 }
 
-TEST_F(PropFrame, NoticesAnEarlierDefaultRow) {
+TEST_F(PropFrame, DetectsAnEarlierDefaultRow) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
     const RowChange change(&dvsGlobalProp2Config[0], dvsGlobalProp2Config[28]);
     ASSERT_EQ(0, Save("com.orbeno.common.resv.threshold", Text("x")));
     EXPECT_NE(std::string::npos, Content().find("[com.orbeno.common.resv.threshold]/value = \"x\"\n"));
 }
 
-TEST_F(PropFrame, NoticesAnEarlierEndRow) {
+TEST_F(PropFrame, DetectsAnEarlierEndRow) {
     ASSERT_EQ(0, Save("com.orbeno.common.resv.threshold", U32(7)));
     const RowChange change(&dvsGlobalProp2Config[0], dvsGlobalProp2Config[29]);
     EXPECT_EQ(-1, Save("com.orbeno.common.resv.threshold", U32(7)));
@@ -187,7 +187,7 @@ TEST_F(PropFrame, NoticesAnEarlierEndRow) {
               errors);
 }
 
-TEST_F(PropFrame, NoticesAnotherTableOfAClass) {
+TEST_F(PropFrame, DetectsAnotherTableOfAClass) {
     ASSERT_EQ(0, Save("com.orbeno.common.alias", Text("n")));
     DVSProp2ConfigEntry table[2] = {{"com.example.only", {"only"}, 1, 1, 16, 0}, {}};
     dvsConfigMaps[0] = table;
@@ -197,7 +197,7 @@ TEST_F(PropFrame, NoticesAnotherTableOfAClass) {
     dvsConfigMaps[0] = dvsGlobalProp2Config;
 }
 
-TEST_F(PropFrame, StaysInsideARowOfAbsurdDepth) {
+TEST_F(PropFrame, StaysInsideARowWhoseDepthIsTooLarge) {
     auto row = dvsGlobalProp2Config[0];
     row.depth = 0xffffffff;
     const RowChange change(&dvsGlobalProp2Config[0], row);
@@ -207,7 +207,7 @@ TEST_F(PropFrame, StaysInsideARowOfAbsurdDepth) {
     EXPECT_EQ(0, status);
 }
 
-TEST_F(PropFrame, TakesTheFirstNameOfARowWithoutDepth) {
+TEST_F(PropFrame, UsesTheFirstNameOfARowWithoutDepth) {
     auto row = dvsGlobalProp2Config[0];
     row.depth = 0;
     const RowChange change(&dvsGlobalProp2Config[0], row);
@@ -227,7 +227,7 @@ TEST_F(PropFrame, GetOrCreateFindsWithoutCreating) {
     EXPECT_EQ("", errors);
 }
 
-TEST_F(PropFrame, GetOrCreateReportsWhatFails) {
+TEST_F(PropFrame, GetOrCreateReportsFailures) {
     configstore::Object *found = object;
     fake_store::FailFunction("GetSubObject", configstore::IO_ERROR);
     EXPECT_EQ(8, GetOrCreateSubObject(true, object, "sub", nullptr, &found));
@@ -291,7 +291,7 @@ TEST_F(PropFrame, LoadEndsAtAFieldOfAnotherType) {
               errors);
 }
 
-TEST_F(PropFrame, LoadTakesAConvertersNotFoundForAFailure) {
+TEST_F(PropFrame, LoadTreatsAConvertersNotFoundAsAFailure) {
     // The policy's object exists, its mode does not.
     configstore::Object *policy = Sub(Sub(object, "settings"), "lacp_policy");
     ASSERT_EQ(0, configstore::SetValueBool(policy, "enabled", true));
@@ -323,7 +323,7 @@ TEST_F(PropFrame, EveryFailingStoreCallFailsTheSaveWithItsStatus) {
 
 // --- Traffic resources of ports. ---
 
-TEST_F(PropFrame, GivesPortsTheTrafficResourcesOfTheirSwitch) {
+TEST_F(PropFrame, LoadsTheSwitchsTrafficResourcesIntoPorts) {
     configstore::Object *resources = nullptr;
     ASSERT_EQ(0, configstore::CreateObject("k", "g", "c", "i", "{}", &resources));
     Sub(Sub(resources, "traffic_resources", "pool"), "allocation");

@@ -50,7 +50,7 @@ DVSProp2ConfigEntry TextRow(const char *key, const char *leaf) {
     return row;
 }
 
-TEST_F(PropSaverTest, FindsTheRowsThatAWalkFinds) {
+TEST_F(PropSaverTest, FindsTheSameRowsAsAWalk) {
     for (int kind = 0; kind < 3; ++kind) {
         using enum dvs::ConverterType;
         const auto defaultType = kind == DVS_PROP_CLASS_PORT ? kPortDefault : kSwitchDefault;
@@ -67,7 +67,7 @@ TEST_F(PropSaverTest, FindsTheRowsThatAWalkFinds) {
     }
 }
 
-TEST_F(PropSaverTest, WritesWhatSavesOneByOneWrite) {
+TEST_F(PropSaverTest, WritesTheSameAsSingleSaves) {
     const Props props = {
         {"com.orbeno.common.port.block", Text("true")},        {"com.orbeno.common.port.connectid", U32(5)},
         {"com.orbeno.etherswitch.port.vlan", Bytes(8)},        {"com.orbeno.vswitch.port.priority", U32(1)},
@@ -82,7 +82,7 @@ TEST_F(PropSaverTest, WritesWhatSavesOneByOneWrite) {
     EXPECT_EQ(many, Content());
 }
 
-TEST_F(PropSaverTest, FailsAsSavesOneByOneFail) {
+TEST_F(PropSaverTest, FailsLikeSingleSaves) {
     EXPECT_EQ(-1, SaveMany({{"com.orbeno.common.portset.mtu", Bytes(3)}}));
     EXPECT_EQ("Set prop: com.orbeno.common.portset.mtu failed\n", errors);
     errors.clear();
@@ -101,7 +101,7 @@ TEST_F(PropSaverTest, FailsAsSavesOneByOneFail) {
     EXPECT_EQ("Unknow prop: other\nSet prop: other failed\n", errors);
 }
 
-TEST_F(PropSaverTest, ASaverTakesTheTableAsItIsWhenItIsMade) {
+TEST_F(PropSaverTest, SaverUsesTheTableOfItsCreation) {
     char key[] = "com.example.one";
     OwnTable table(
         {TextRow("com.example.zero", "zero"), TextRow(key, "one"), TextRow("com.example.two", "two")});
@@ -120,7 +120,7 @@ TEST_F(PropSaverTest, ASaverTakesTheTableAsItIsWhenItIsMade) {
     EXPECT_EQ(-1, SaveMany({{"com.example.two", Text("6")}}));
 }
 
-TEST_F(PropSaverTest, WalksATableThatIsTooLargeForItsIndex) {
+TEST_F(PropSaverTest, WalksATableTooLargeForItsIndex) {
     std::vector<std::string> keys;
     for (int i = 0; i < 200; ++i)
         keys.push_back("com.example.key" + std::to_string(i));
@@ -138,7 +138,7 @@ TEST_F(PropSaverTest, WalksATableThatIsTooLargeForItsIndex) {
     EXPECT_EQ(0, SaveMany({{longKey, Text("x")}}));
 }
 
-TEST_F(PropSaverTest, ForgetsASubObjectThatARowOfItsOwnMayReplace) {
+TEST_F(PropSaverTest, DoesNotCacheASubObjectThatARowMayReplace) {
     DVSProp2ConfigEntry below = {"below", {"sub", "leaf"}, 2, 1, 16, 0};
     DVSProp2ConfigEntry list = {"list", {"sub"}, 1, 20, 16, 0};
     OwnTable table({below, list});
@@ -148,7 +148,7 @@ TEST_F(PropSaverTest, ForgetsASubObjectThatARowOfItsOwnMayReplace) {
     EXPECT_EQ(4, SaveMany({{"list", U32(1) + Slot("x", 81)}, {"below", Text("2")}}));
 }
 
-TEST_F(PropSaverTest, AddsItsTime) {
+TEST_F(PropSaverTest, AddsItsTimeToTheCounter) {
     dvsConfigStoreTimeMs = 5;
     ASSERT_EQ(0, SaveMany({{"com.orbeno.common.alias", Text("x")}}));
     EXPECT_GE(dvsConfigStoreTimeMs, 5);

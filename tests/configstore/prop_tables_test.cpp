@@ -72,7 +72,7 @@ TEST(PropTables, RowsAreWellFormed) {
     }
 }
 
-TEST(PropTables, KeysAreUniqueButForTheRepeatedRow) {
+TEST(PropTables, KeysAreUniqueExceptTheRepeatedRow) {
     for (int kind = 0; kind < 3; ++kind) {
         std::set<std::string> keys;
         std::vector<std::string> repeated;

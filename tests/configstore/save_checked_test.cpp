@@ -27,32 +27,32 @@ struct SaveCheckedTest : StoreTest {
         for (const char *id : {static_cast<const char *>(nullptr), "a"}) {
             EXPECT_EQ(static_cast<int32_t>(expected), SaveChecked(buf, id));
             EXPECT_EQ(before, fake_store::Dump());
-            EXPECT_NE(nullptr, DVSState_SwitchFind("mine")) << "the table is not touched";
+            EXPECT_NE(nullptr, DVSState_SwitchFind("mine")) << "the table must not change";
         }
     }
     std::string before;
 };
 
-TEST_F(SaveCheckedTest, SavesASoundBuffer) {
+TEST_F(SaveCheckedTest, SavesAValidBuffer) {
     ASSERT_EQ(0, SaveChecked(State({Small("a", "new")})));
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#a/name = \"new\"\n"));
     EXPECT_EQ(std::string::npos, fake_store::Dump().find("#b"));
 }
 
-TEST_F(SaveCheckedTest, SavesOneSwitchOfASoundBuffer) {
+TEST_F(SaveCheckedTest, SavesOneSwitchOfAValidBuffer) {
     ASSERT_EQ(0, SaveChecked(State({Small("a", "new")}), "a"));
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#a/name = \"new\"\n"));
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#b/name = \"old\"\n"));
 }
 
-TEST_F(SaveCheckedTest, RefusesADamagedBuffer) {
+TEST_F(SaveCheckedTest, RejectsADamagedBuffer) {
     Bytes damaged = State({Small("a")});
     damaged[200] ^= 1;
     ExpectRefused(damaged, HYP_BAD_CHECKSUM);
     EXPECT_TRUE(Said("State is not saved to configstore: ")) << messages;
 }
 
-TEST_F(SaveCheckedTest, RefusesATruncatedBufferAtEveryLength) {
+TEST_F(SaveCheckedTest, RejectsABufferTruncatedAtAnyLength) {
     const Bytes whole = State({Small("a")});
     for (std::size_t size = 0; size < whole.size(); size += 7) {
         const Bytes cut(whole.begin(), whole.begin() + static_cast<std::ptrdiff_t>(size));
@@ -64,7 +64,7 @@ TEST_F(SaveCheckedTest, RefusesATruncatedBufferAtEveryLength) {
     EXPECT_EQ(before, fake_store::Dump());
 }
 
-TEST_F(SaveCheckedTest, RefusesABufferThatIsDamagedDeepInside) {
+TEST_F(SaveCheckedTest, RejectsABufferThatIsDamagedDeepInside) {
     // Only the innermost checksum is wrong, so the value of a port is not a valid buffer.
     Switch sw = Small("a");
     Bytes state = State({sw});
@@ -75,7 +75,7 @@ TEST_F(SaveCheckedTest, RefusesABufferThatIsDamagedDeepInside) {
     ExpectRefused(state, HYP_BAD_CHECKSUM);
 }
 
-TEST_F(SaveCheckedTest, RefusesMoreSwitchesThanTheTableHolds) {
+TEST_F(SaveCheckedTest, RejectsMoreSwitchesThanTheTableHolds) {
     std::vector<Switch> many;
     for (int i = 0; i < 33; ++i)
         many.push_back(Small("s" + std::to_string(i)));
@@ -84,7 +84,7 @@ TEST_F(SaveCheckedTest, RefusesMoreSwitchesThanTheTableHolds) {
     EXPECT_EQ(0, SaveChecked(State(many)));
 }
 
-TEST_F(SaveCheckedTest, RefusesMorePortsThanTheHostHas) {
+TEST_F(SaveCheckedTest, RejectsMorePortsThanTheHostAllows) {
     uwMaxNumActivePortsSystemWide = 4;
     Switch sw = Small("a");
     for (int i = 2; i <= 5; ++i)
@@ -96,23 +96,23 @@ TEST_F(SaveCheckedTest, RefusesMorePortsThanTheHostHas) {
     uwMaxNumActivePortsSystemWide = 65536;
 }
 
-TEST_F(SaveCheckedTest, RefusesPortsThatComeTwice) {
+TEST_F(SaveCheckedTest, RejectsDuplicatePorts) {
     Switch sw = Small("a");
     sw.ports.push_back(sw.ports[0]);
     ExpectRefused(State({sw}), HYP_EXISTS);
 }
 
-TEST_F(SaveCheckedTest, RefusesASwitchIdThatIsTooLong) {
+TEST_F(SaveCheckedTest, RejectsASwitchIdThatIsTooLong) {
     ExpectRefused(State({Small(std::string(64, 'x'))}), HYP_BAD_PARAM);
 }
 
-TEST_F(SaveCheckedTest, PassesAFailureOfTheStoreOn) {
+TEST_F(SaveCheckedTest, ReturnsAFailureOfTheStore) {
     fake_store::FailFunction("Set", configstore::SCHEMA_VIOLATION);
     EXPECT_EQ(4, SaveChecked(State({Small("a", "new")})));
     EXPECT_EQ(before, fake_store::Dump());
 }
 
-TEST_F(SaveCheckedTest, AsksTheHostForItsLimitWhereNobodyHas) {
+TEST_F(SaveCheckedTest, ReadsTheHostsLimitIfUnread) {
     uwMaxNumActivePortsSystemWide = 0;
     setenv("DVS_MAX_PORTS", "no number", 1);
     ExpectRefused(State({Small("a")}), HYP_BAD_PARAM);

@@ -102,7 +102,7 @@ TEST_F(SaveDurability, KilledAtARandomMomentLeavesTheOldContentOrTheNew) {
         const std::string now = LoadTag(kPorts);
         EXPECT_TRUE(now == held || now == tag) << "round " << round << ": " << now;
         if (WIFEXITED(ended) && WEXITSTATUS(ended) == 0) {
-            EXPECT_EQ(tag, now) << "a save that has returned is there";
+            EXPECT_EQ(tag, now) << "a completed save must be stored";
         }
         EXPECT_EQ("ok", IntegrityOf(path));
         held = now;
@@ -140,7 +140,7 @@ TEST_F(SaveDurability, TwoSaversAtOnceAndAReaderSeeWholeSavesOnly) {
     EXPECT_EQ("ok", IntegrityOf(path));
 }
 
-TEST_F(SaveDurability, AFailingWriteSyncOrTruncateLeavesTheOldContentOrTheNew) {
+TEST_F(SaveDurability, FailingWriteSyncOrTruncateLeavesTheOldOrTheNew) {
     constexpr int kPorts = 64;
     const Bytes before = Tagged(kPorts, "before");
     const Bytes after = Tagged(kPorts, "after");

@@ -65,7 +65,7 @@ void FailEachCall(const char *id) {
         const std::string failed = fake_store::CallName(first + call);
         SCOPED_TRACE(failed + ", call " + std::to_string(call));
         if (result == 0) {
-            EXPECT_TRUE(IsHarmless(failed) || failed == "SetValueEmptyList") << "succeeded all the same";
+            EXPECT_TRUE(IsHarmless(failed) || failed == "SetValueEmptyList") << "the save must fail";
             continue;
         }
         EXPECT_EQ(before, fake_store::Dump());
@@ -85,12 +85,12 @@ void FailEachCall(const char *id) {
     EXPECT_GT(call, 60);
 }
 
-TEST_F(SaveFaults, EveryStoreCallInTurnLeavesTheStoreAsItWas) {
+TEST_F(SaveFaults, EachFailingStoreCallKeepsTheStore) {
     dvsconfigstore_debug = -1;
     FailEachCall(nullptr);
 }
 
-TEST_F(SaveFaults, EveryStoreCallInTurnOfASaveByIdLeavesTheStoreAsItWas) {
+TEST_F(SaveFaults, EachFailingStoreCallOfASaveByIdKeepsTheStore) {
     dvsconfigstore_debug = -1;
     FailEachCall("a");
 }
@@ -126,7 +126,7 @@ TEST_F(SaveFaults, WithoutATransactionTheCheckedSaveKeepsTheSame) {
 }
 
 // Saves into the caller's store clean up on every path.
-TEST_F(SaveFaults, IntoAnOpenStoreNothingIsKept) {
+TEST_F(SaveFaults, SaveIntoAnOpenStoreLeavesNothing) {
     configstore::Store *store = nullptr;
     ASSERT_EQ(0, configstore::GetStore(&store));
     const Bytes state = State(After());
@@ -155,13 +155,13 @@ TEST_F(SaveFaults, IntoAnOpenStoreNothingIsKept) {
     configstore::DestroyStore(store);
 }
 
-TEST_F(SaveFaults, AFailedListingIsTheResult) {
+TEST_F(SaveFaults, ReturnsTheStatusOfAFailedListing) {
     fake_store::FailFunction("GetInstances", configstore::CORRUPT);
     EXPECT_EQ(7, Save(After()));
     EXPECT_EQ("CancelTransaction", fake_store::CallName(fake_store::Calls()));
 }
 
-TEST_F(SaveFaults, AnObjectThatCannotBeReadIsNotOverwritten) {
+TEST_F(SaveFaults, DoesNotOverwriteAnUnreadableObject) {
     ASSERT_EQ(0, Save(Before()));
     const std::string before = fake_store::Dump();
     fake_store::FailFunction("Get", configstore::CORRUPT);
@@ -170,14 +170,14 @@ TEST_F(SaveFaults, AnObjectThatCannotBeReadIsNotOverwritten) {
     EXPECT_EQ(before, fake_store::Dump());
 }
 
-TEST_F(SaveFaults, AnObjectThatCannotBeCreatedIsMinusOne) {
+TEST_F(SaveFaults, ReturnsMinusOneWhenAnObjectCannotBeCreated) {
     fake_store::FailFunction("CreateObject", configstore::NO_MEMORY);
     EXPECT_EQ(-1, Save(After()));
     EXPECT_TRUE(Said("Get/Create dvs_switch:a failed\n"));
     EXPECT_EQ("", fake_store::Dump());
 }
 
-TEST_F(SaveFaults, AFailedCommitIsCancelledAndReportedTwice) {
+TEST_F(SaveFaults, FailedCommitIsCancelledAndReportedTwice) {
     ASSERT_EQ(0, Save(Before()));
     const std::string before = fake_store::Dump();
     system.clear();
@@ -191,7 +191,7 @@ TEST_F(SaveFaults, AFailedCommitIsCancelledAndReportedTwice) {
               system[3].find("End DVSState_SaveBufToConfigStore_ByInstance with error, configStore time: "));
 }
 
-TEST_F(SaveFaults, AFailedCancelIsNotTheResult) {
+TEST_F(SaveFaults, IgnoresTheStatusOfAFailedCancel) {
     fake_store::FailFunction("CancelTransaction", configstore::IO_ERROR);
     EXPECT_EQ(0, Save(After()));
     auto bad = After();
@@ -199,7 +199,7 @@ TEST_F(SaveFaults, AFailedCancelIsNotTheResult) {
     EXPECT_EQ(-1, Save(bad));
 }
 
-TEST_F(SaveFaults, ClearingIgnoresWhatIsNotThereAndNothingElse) {
+TEST_F(SaveFaults, ClearingIgnoresOnlyAbsentMembers) {
     ASSERT_EQ(0, Save(Before()));
     for (const char *call : {"RemoveValue", "DeleteSubObject", "DeleteSubObjectInstances"}) {
         fake_store::FailFunction(call, configstore::NOT_FOUND);
@@ -209,7 +209,7 @@ TEST_F(SaveFaults, ClearingIgnoresWhatIsNotThereAndNothingElse) {
     }
 }
 
-TEST_F(SaveFaults, AnObjectWithoutUuidFailsASaveOfAll) {
+TEST_F(SaveFaults, ObjectWithoutUuidFailsASaveOfAll) {
     fake_store::Reset();
     configstore::Store *store = nullptr;
     configstore::Object *object = nullptr;

@@ -82,15 +82,15 @@ TEST_F(SaveTest, ReportsStartAndTimesToSyslog) {
                              "End DVSState_SaveBufToConfigStore_ByInstance, configStore time: %lldm%c", &ms,
                              &end));
     EXPECT_GE(ms, 0);
-    EXPECT_LT(ms, 1'000'000'000) << "set back at the start";
-    EXPECT_EQ(0, dvsConfigStoreTimeMs) << "and after the report";
+    EXPECT_LT(ms, 1'000'000'000) << "reset at the start";
+    EXPECT_EQ(0, dvsConfigStoreTimeMs) << "reset after the report";
     system.clear();
     ASSERT_EQ(0, Save({Small("a")}, "a"));
-    ASSERT_EQ(2u, system.size()) << "nothing is listed";
+    ASSERT_EQ(2u, system.size()) << "no switch is listed";
     EXPECT_EQ("Start DVSState_SaveBufToConfigStore_ByInstance, swId:[a]", system[0]);
 }
 
-TEST_F(SaveTest, OfAllDeletesTheObjectsOfSwitchesThatAreGone) {
+TEST_F(SaveTest, OfAllDeletesObjectsOfRemovedSwitches) {
     ASSERT_EQ(0, Save({Small("a"), Small("b")}));
     ASSERT_EQ(0, Save({Small("b")}));
     EXPECT_EQ(std::string::npos, fake_store::Dump().find("#a"));
@@ -106,7 +106,7 @@ TEST_F(SaveTest, ByIdTouchesNoOtherObject) {
     EXPECT_NE(std::string::npos, dump.find("#c/name = \"old\"\n"));
 }
 
-TEST_F(SaveTest, ByAnIdThatNeitherSideHoldsChangesNothingAndCommitsAnEmptyTransaction) {
+TEST_F(SaveTest, ByAnUnknownIdCommitsAnEmptyTransaction) {
     ASSERT_EQ(0, Save({Small("a")}));
     const std::string before = fake_store::Dump();
     ASSERT_EQ(0, Save({Small("b")}, "nowhere"));
@@ -114,7 +114,7 @@ TEST_F(SaveTest, ByAnIdThatNeitherSideHoldsChangesNothingAndCommitsAnEmptyTransa
     EXPECT_EQ("CommitTransaction", fake_store::CallName(fake_store::Calls()));
 }
 
-TEST_F(SaveTest, ByAnIdThatOnlyTheStoreHoldsDeletesItsObjectAlone) {
+TEST_F(SaveTest, ByAnIdInTheStoreOnlyDeletesItsObject) {
     ASSERT_EQ(0, Save({Small("a"), Small("b")}));
     ASSERT_EQ(0, Save({Small("c")}, "a"));
     const std::string dump = fake_store::Dump();
@@ -123,17 +123,17 @@ TEST_F(SaveTest, ByAnIdThatOnlyTheStoreHoldsDeletesItsObjectAlone) {
     EXPECT_EQ(std::string::npos, dump.find("#c"));
 }
 
-TEST_F(SaveTest, DeletesWhatItsUuidNamesNotWhereItStands) {
+TEST_F(SaveTest, DeletesByUuidNotByInstanceId) {
     ASSERT_EQ(0, Save({Small("a")}));
     {
         const Edit edit("other", true);
         ASSERT_EQ(0, configstore::SetValueStr(*edit, "uuid", "a"));
     }
-    ASSERT_EQ(0, Save({Small("a")})) << "the table has the switch that the object says it is";
+    ASSERT_EQ(0, Save({Small("a")})) << "the table has the switch with the object's uuid";
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#other"));
 }
 
-TEST_F(SaveTest, EmptiesAnExistingObjectOfEverythingItWrites) {
+TEST_F(SaveTest, ClearsAllMembersItWritesInAnExistingObject) {
     Switch sw = Small("a");
     sw.global.push_back({"com.orbeno.common.opaqueDvs", Text("true")});
     sw.global.push_back({"com.orbeno.common.portset.ovl", Text("true")});
@@ -177,7 +177,7 @@ TEST_F(SaveTest, RemovesTunnelEndPortsAndTheOtherObsoleteLists) {
         EXPECT_EQ(std::string::npos, fake_store::Dump().find(name)) << name;
 }
 
-TEST_F(SaveTest, KeepsWhatItDoesNotKnow) {
+TEST_F(SaveTest, KeepsUnknownMembers) {
     ASSERT_EQ(0, Save({Small("a")}));
     {
         const Edit edit("a");
@@ -187,7 +187,7 @@ TEST_F(SaveTest, KeepsWhatItDoesNotKnow) {
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#a/of_a_newer_writer = \"kept\"\n"));
 }
 
-TEST_F(SaveTest, ClassNamesOtherThanTheTwoExactOnesAreCodeZero) {
+TEST_F(SaveTest, ClassNamesOtherThanTheTwoKnownAreCodeZero) {
     const std::pair<const char *, uint32_t> cases[] = {{"vswitch", 1},     {"cswitch", 2}, {"vswitchX", 0},
                                                        {"etherswitch", 0}, {"VSWITCH", 0}, {"", 0}};
     for (const auto &[className, code] : cases) {
@@ -207,7 +207,7 @@ TEST_F(SaveTest, VersionsAbove99HaveWidePortRecords) {
     }
 }
 
-TEST_F(SaveTest, PortsOfEveryKindAreSavedAndNamesakesShareAnInstance) {
+TEST_F(SaveTest, PortsOfEveryKindAreSavedAndDuplicatesShareAnInstance) {
     Switch sw = Small("a");
     sw.ports = {{"p1", {{"com.orbeno.common.port.alias", Text("active")}}},
                 {"p1",
@@ -219,7 +219,7 @@ TEST_F(SaveTest, PortsOfEveryKindAreSavedAndNamesakesShareAnInstance) {
     EXPECT_EQ(std::string::npos, fake_store::Dump().find("volatile.type"));
 }
 
-TEST_F(SaveTest, OfABufferThatDoesNotLoadEmptiesTheStore) {
+TEST_F(SaveTest, OfAnInvalidBufferEmptiesTheStore) {
     ASSERT_EQ(0, Save({Small("a")}));
     Bytes damaged = State({Small("a")});
     damaged[40] ^= 1;
@@ -230,14 +230,14 @@ TEST_F(SaveTest, OfABufferThatDoesNotLoadEmptiesTheStore) {
     EXPECT_EQ("", fake_store::Dump());
 }
 
-TEST_F(SaveTest, ByIdOfABufferThatDoesNotLoadDeletesThatObjectAlone) {
+TEST_F(SaveTest, ByIdOfAnInvalidBufferDeletesThatObjectOnly) {
     ASSERT_EQ(0, Save({Small("a"), Small("b")}));
     ASSERT_EQ(0, SaveBytes(Bytes(7), "a"));
     EXPECT_EQ(std::string::npos, fake_store::Dump().find("#a"));
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#b"));
 }
 
-TEST_F(SaveTest, StopsAtTheFirstSwitchThatFailsAndKeepsTheStoreAsItWas) {
+TEST_F(SaveTest, StopsAtTheFirstFailingSwitchAndKeepsTheStore) {
     ASSERT_EQ(0, Save({Small("a", "old"), Small("z", "old")}));
     const std::string before = fake_store::Dump();
     Switch bad = Small("b");
@@ -245,14 +245,14 @@ TEST_F(SaveTest, StopsAtTheFirstSwitchThatFailsAndKeepsTheStoreAsItWas) {
     EXPECT_EQ(-1, Save({Small("a", "new"), bad, Small("c")}));
     EXPECT_EQ(before, fake_store::Dump());
     EXPECT_TRUE(Said("Failed to save dvs: b to configstore\nFailed to save dvs to configstore\n"));
-    EXPECT_FALSE(Said("SaveDVS: c")) << "the walk has ended";
+    EXPECT_FALSE(Said("SaveDVS: c")) << "the walk must end";
     EXPECT_EQ("CancelTransaction", fake_store::CallName(fake_store::Calls()));
     EXPECT_EQ(0u, system.back().find(
                       "End DVSState_SaveBufToConfigStore_ByInstance with error, configStore time: "));
     EXPECT_EQ(0, SwitchesInTable());
 }
 
-TEST_F(SaveTest, AFailingHostOrPortPropertyFailsTheSwitchToo) {
+TEST_F(SaveTest, FailingHostOrPortPropertyFailsTheSwitchToo) {
     Switch host = Small("a");
     host.host = {{"com.orbeno.common.host.uplinkPorts", Bytes(1)}};
     EXPECT_EQ(-1, Save({host}));
@@ -262,7 +262,7 @@ TEST_F(SaveTest, AFailingHostOrPortPropertyFailsTheSwitchToo) {
     EXPECT_EQ("", fake_store::Dump());
 }
 
-TEST_F(SaveTest, KernelStateThatCannotBeFetchedIsReported) {
+TEST_F(SaveTest, ReportsKernelStateThatCannotBeFetched) {
     EXPECT_EQ(-1, DVSState_SaveToConfigStore());
     EXPECT_EQ(
         0u, messages.rfind("Failed to save DVS config to configstore when get DVS buffrom hyp. Error: ", 0));

@@ -88,7 +88,7 @@ TEST_P(Scalars, TrueTextLoadsWithSixBytesAndFalseWithFive) {
         {"com.orbeno.common.port.block", kPort, Text("no"), "/settings/blocked = false\n", Raw("false")});
 }
 
-TEST_P(Scalars, TrueTextIsExact) {
+TEST_P(Scalars, OnlyTheExactTrueTextIsTrue) {
     for (const auto &value : {Raw("true"), Text("True"), Text("truex"), Raw("tru"), Bytes{}, Text("1")})
         RoundTrip({"com.orbeno.common.opaqueDvs", kGlobal, value, "/is_opaque = false\n", Raw("false")});
     RoundTrip({"com.orbeno.common.opaqueDvs", kGlobal, Text("true") + Raw("x"), "/is_opaque = true\n",
@@ -101,7 +101,7 @@ TEST_P(Scalars, OverlayFlagLoadsWithFiveBytesEitherWay) {
     RoundTrip({"com.orbeno.common.portset.ovl", kGlobal, Text("x"), "/ovl_enabled = false\n", Raw("false")});
 }
 
-TEST_P(Scalars, PassthroughIsAllowedByTwoAlone) {
+TEST_P(Scalars, OnlyTwoAllowsPassthrough) {
     const char *key = "com.orbeno.common.port.ptAllowed";
     RoundTrip({key, kPort, U32(2), "/settings/vm_direct_path_gen2_allowed = true\n", U32(2)});
     RoundTrip({key, kPort, U32(0), "/settings/vm_direct_path_gen2_allowed = false\n", U32(0)});
@@ -119,7 +119,7 @@ TEST_P(Scalars, MtuLoadsUnderTheKeysOfItsClass) {
     ASSERT_EQ(0, Save("com.orbeno.common.portset.mtu", U32(1500)));
     ASSERT_EQ(0, Save("com.orbeno.vswitch.mtu", U32(1600)));
     ASSERT_EQ(0, Save("com.orbeno.etherswitch.mtu", U32(9000)));
-    EXPECT_EQ(" {}\n/settings {}\n/settings/max_mtu = 9000\n", Content()) << "the last one wins";
+    EXPECT_EQ(" {}\n/settings {}\n/settings/max_mtu = 9000\n", Content()) << "the last value wins";
     MakeSwitch();
     const Props props = Load();
     EXPECT_EQ(U32(9000), Find(props, "com.orbeno.common.portset.mtu").value);
@@ -137,7 +137,7 @@ TEST_P(Scalars, MulticastFilterLoadsUnderOneFamilysKey) {
 
 struct ScalarFaults : FrameTest {};
 
-TEST_F(ScalarFaults, RefuseValuesShorterThanTheirField) {
+TEST_F(ScalarFaults, RejectValuesShorterThanTheirField) {
     const std::pair<const char *, uint32_t> keys[] = {{"com.orbeno.common.resv.threshold", kGlobal},
                                                       {"com.orbeno.common.portset.mtu", kGlobal},
                                                       {"com.orbeno.etherswitch.beaconTimeout", kGlobal},
@@ -149,10 +149,10 @@ TEST_F(ScalarFaults, RefuseValuesShorterThanTheirField) {
             EXPECT_EQ(-1, Save(key, Bytes(size, 1), propClass)) << key << " " << size;
     }
     EXPECT_EQ(-1, Save("com.orbeno.common.respools.sched", {}));
-    EXPECT_EQ(std::string::npos, Content().find('=')) << "nothing written: " << Content();
+    EXPECT_EQ(std::string::npos, Content().find('=')) << "nothing may be written: " << Content();
 }
 
-TEST_F(ScalarFaults, AbsentFieldsLoadAsNothing) {
+TEST_F(ScalarFaults, AbsentFieldsLoadNoProperty) {
     EXPECT_EQ(Props{}, Load(kGlobal));
     EXPECT_EQ(Props{}, Load(kHost));
     EXPECT_EQ(Props{}, Load(kPort));

@@ -72,7 +72,7 @@ struct StoreMemory : testing::Test {
     fault::Options options;
 };
 
-TEST_F(StoreMemory, AFailingCheckedSaveChangesNothing) {
+TEST_F(StoreMemory, FailingCheckedSaveChangesNothing) {
     const Bytes state = State({Full("a"), Full("b"), Full("c"), Full("d")});
     const auto save = [&] {
         return DVSState_SaveBufToConfigStoreChecked(state.data(), static_cast<uint32_t>(state.size()),
@@ -90,7 +90,7 @@ TEST_F(StoreMemory, AFailingCheckedSaveChangesNothing) {
     EXPECT_GT(failures, 30);
 }
 
-TEST_F(StoreMemory, AFailingLoadGivesNoBuffer) {
+TEST_F(StoreMemory, FailingLoadReturnsNoBuffer) {
     const auto load = [] {
         void *buf = nullptr;
         uint32_t len = 0;
@@ -112,7 +112,7 @@ TEST_F(StoreMemory, AFailingLoadGivesNoBuffer) {
     }
 }
 
-TEST_F(StoreMemory, AFailingUpgradeChangesNothing) {
+TEST_F(StoreMemory, FailingUpgradeChangesNothing) {
     char directory[] = "/tmp/dvs-memory-XXXXXX";
     ASSERT_NE(nullptr, mkdtemp(directory));
     const std::string path = std::string(directory) + "/state";

@@ -22,7 +22,7 @@ constexpr VersionCase kCases[] = {
     {"7.0.3", 9, 109}, {"8.0.0", 10, 110}, {"8.0.2", 11, 111}, {"8.0.3", 12, 112}, {"OVL 1.0", 100, 100},
 };
 
-TEST_F(SwitchVersion, EveryTextHasItsNumberAndItsOverlayNumber) {
+TEST_F(SwitchVersion, EveryTextHasANumberAndAnOverlayNumber) {
     for (const auto &row : kCases) {
         SCOPED_TRACE(row.text);
         MakeSwitch("etherswitch", row.text);
@@ -37,7 +37,7 @@ TEST_F(SwitchVersion, EveryTextHasItsNumberAndItsOverlayNumber) {
     }
 }
 
-TEST_F(SwitchVersion, EveryNumberOfTheTableSavesItsText) {
+TEST_F(SwitchVersion, EveryNumberInTheTableSavesItsText) {
     for (const auto &row : kCases) {
         for (const uint32_t number : {row.number, row.overlayNumber}) {
             ASSERT_EQ(0, Save(kVersion, U32(number)));
@@ -60,7 +60,7 @@ TEST_F(SwitchVersion, NumbersWithoutATextCannotBeSaved) {
     EXPECT_EQ(std::string::npos, Content().find("version"));
 }
 
-TEST_F(SwitchVersion, AnUnknownTextFailsTheRead) {
+TEST_F(SwitchVersion, UnknownTextFailsTheRead) {
     MakeSwitch("etherswitch", "7.0.1");
     uint32_t version = 77;
     EXPECT_EQ(-1, dvs::convert::ReadSwitchVersion(object, &version));
@@ -74,10 +74,10 @@ TEST_F(SwitchVersion, Version800WithoutOverlayFlagLoadsAs10) {
     MakeSwitch("etherswitch", "8.0.0");
     EXPECT_EQ(U32(10), Find(Load(), kVersion).value);
     EXPECT_NE(std::string::npos, messages.find("Unabled to get ovl_enabled\n"));
-    EXPECT_EQ("", errors) << "a trace, not an error";
+    EXPECT_EQ("", errors) << "the message is a trace, not an error";
 }
 
-TEST_F(SwitchVersion, ReportsWhatIsAbsent) {
+TEST_F(SwitchVersion, ReportsAbsentFields) {
     uint32_t version = 0;
     EXPECT_EQ(6, dvs::convert::ReadSwitchVersion(object, &version));
     Sub(object, "product");
@@ -113,7 +113,7 @@ TEST_P(SwitchSettings, AddressIsDottedText) {
     EXPECT_EQ(Bytes({255, 0, 254, 1}), Find(Load(), key).value);
 }
 
-TEST_P(SwitchSettings, AnAddressThatIsNoneFailsTheLoadWithoutAMessageOfItsOwn) {
+TEST_P(SwitchSettings, InvalidAddressFailsTheLoadWithoutItsOwnMessage) {
     for (const char *text : {"10.0.0.300", "", "fe80::1", "1.2.3", "01.2.3.4.5"}) {
         errors.clear();
         ASSERT_EQ(0, configstore::SetValueStr(object, "switch_address", text));

@@ -100,7 +100,7 @@ TEST_P(Unmapped, PortRulesApplyInTheirOrder) {
                  kPort);
 }
 
-TEST_P(Unmapped, GlobalPropertiesComeBackInTheOrderOfTheLists) {
+TEST_P(Unmapped, GlobalPropertiesLoadInListOrder) {
     const Props saved = {{"other", Bytes{1, 0, 2}, 0x24},
                          {"com.orbeno.extraconfig.e", Text("extra"), 0x10},
                          {"opaque", Bytes{0, 1}, 0x18},
@@ -110,7 +110,7 @@ TEST_P(Unmapped, GlobalPropertiesComeBackInTheOrderOfTheLists) {
     EXPECT_EQ(Props({saved[3], saved[2], saved[1], saved[0]}), Load());
 }
 
-TEST_P(Unmapped, HostPropertiesComeBackInTheOrderOfTheLists) {
+TEST_P(Unmapped, HostPropertiesLoadInListOrder) {
     const Props saved = {
         {"other", Bytes{1, 0, 2}, 0x24}, {"opaque", Bytes{0, 1}, 0x18}, {"vendor", Text("v"), 0x10}};
     for (const auto &prop : saved)
@@ -118,14 +118,14 @@ TEST_P(Unmapped, HostPropertiesComeBackInTheOrderOfTheLists) {
     EXPECT_EQ(Props({saved[2], saved[1], saved[0]}), Load(kHost));
 }
 
-TEST_P(Unmapped, OtherDataComesBackToItsClassOnly) {
+TEST_P(Unmapped, OtherDataLoadsIntoItsClassOnly) {
     ASSERT_EQ(0, Save("g", Bytes{1}, kGlobal, 0x20));
     ASSERT_EQ(0, Save("h", Bytes{2}, kHost, 0x40));
     EXPECT_EQ(Props({{"g", {1}, 0x20}}), Load(kGlobal));
     EXPECT_EQ(Props({{"h", {2}, 0x40}}), Load(kHost));
 }
 
-TEST_P(Unmapped, PortPropertiesComeBackInTheOrderOfTheListsButForOtherData) {
+TEST_P(Unmapped, PortPropertiesLoadInListOrderExceptOtherData) {
     const Props saved = {{"vendor", Text("v"), 0x10},
                          {"com.orbeno.port.extraConfig.e", Text("extra"), 0x08},
                          {"opaque", Bytes{0, 1}, 0x18},
@@ -138,7 +138,7 @@ TEST_P(Unmapped, PortPropertiesComeBackInTheOrderOfTheListsButForOtherData) {
     EXPECT_EQ(expected, Load(kPort));
 }
 
-TEST_P(Unmapped, APortPropertyOfTypeZeroIsSavedUnderOtherDataAndAbsentAfterLoad) {
+TEST_P(Unmapped, PortPropertyOfTypeZeroIsSavedButNotLoaded) {
     ASSERT_EQ(0, Save("plain", Bytes{5}, kPort, 0));
     EXPECT_NE(std::string::npos, Content().find("/data/other_data[plain]/prop_type = 0\n"));
     EXPECT_EQ(Props{}, Load(kPort));
@@ -153,7 +153,7 @@ TEST_P(Unmapped, EmptyValuesAreKept) {
 
 struct UnmappedFaults : FrameTest {};
 
-TEST_F(UnmappedFaults, SwitchLoadTakesWhatCanBeRead) {
+TEST_F(UnmappedFaults, SwitchLoadSkipsUnreadableEntries) {
     configstore::Object *data = Sub(object, "data");
     Sub(data, "vendor_specific_config", "without value");
     ASSERT_EQ(0, Save("vendor", Text("v"), kGlobal, 0x10));
@@ -163,7 +163,7 @@ TEST_F(UnmappedFaults, SwitchLoadTakesWhatCanBeRead) {
     EXPECT_EQ(0, status);
 }
 
-TEST_F(UnmappedFaults, PortLoadFailsAtWhatCannotBeRead) {
+TEST_F(UnmappedFaults, PortLoadFailsAtUnreadableEntries) {
     Sub(Sub(object, "data"), "vendor_specific_data", "without value");
     (void)Load(kPort);
     EXPECT_EQ(6, status);
@@ -177,7 +177,7 @@ TEST_F(UnmappedFaults, PortLoadFailsWithTheListing) {
     fake_store::FailFunction(nullptr);
 }
 
-TEST_F(UnmappedFaults, LoadFailsWhereDataIsNoObject) {
+TEST_F(UnmappedFaults, LoadFailsWhereDataIsNotAnObject) {
     ASSERT_EQ(0, configstore::SetValueInt(object, "data", 1));
     for (const uint32_t propClass : {kGlobal, kHost, kPort}) {
         (void)Load(propClass);
@@ -185,7 +185,7 @@ TEST_F(UnmappedFaults, LoadFailsWhereDataIsNoObject) {
     }
 }
 
-TEST_F(UnmappedFaults, SaveGoesOnWithoutAGeneratedIdForGlobalsAndStopsForHosts) {
+TEST_F(UnmappedFaults, FailedIdGenerationIsIgnoredForGlobalsAndFailsHosts) {
     fake_store::FailFunction("GenerateInstanceId", configstore::IO_ERROR);
     EXPECT_EQ(0, Save("opaque", Bytes{1}, kGlobal, 0x18));
     EXPECT_EQ(" {}\n/data {}\n/data/dvs_opaque_data {}\n/data/dvs_opaque_data/key = \"opaque\"\n"
@@ -195,7 +195,7 @@ TEST_F(UnmappedFaults, SaveGoesOnWithoutAGeneratedIdForGlobalsAndStopsForHosts) 
     fake_store::FailFunction(nullptr);
 }
 
-TEST_F(UnmappedFaults, EveryFailingStoreCallOfASaveIsItsStatus) {
+TEST_F(UnmappedFaults, EveryFailingStoreCallOfASaveIsReturned) {
     const std::tuple<const char *, uint32_t, uint32_t> rows[] = {
         {"k", kGlobal, 0x20}, {"k", kGlobal, 0x10}, {"k", kHost, 0x08}, {"k", kHost, 0x20},
         {"k", kPort, 0x18},   {"k", kPort, 0x10},   {"k", kPort, 0},    {"k.ruleset", kPort, 0}};

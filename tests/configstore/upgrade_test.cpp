@@ -72,7 +72,7 @@ TEST_F(UpgradeTest, WritesTheIdentityOfSwitchesWithAPortset) {
     EXPECT_TRUE(Said("SaveDVS: name of a\n"));
 }
 
-TEST_F(UpgradeTest, LeavesTheObjectOfASwitchWithoutPortsetUnchanged) {
+TEST_F(UpgradeTest, KeepsTheObjectOfASwitchWithoutPortset) {
     ASSERT_EQ(0, Save({Small("a", "old")}));
     const std::string before = fake_store::Dump();
     Write({Small("a", ""), Small("b", "")});
@@ -89,30 +89,30 @@ TEST_F(UpgradeTest, ClearsTheObjectOfASwitchWithAPortset) {
     EXPECT_EQ(std::string::npos, fake_store::Dump().find("ports["));
 }
 
-TEST_F(UpgradeTest, LeavesObjectsOfOtherSwitchesAlone) {
+TEST_F(UpgradeTest, KeepsObjectsOfOtherSwitches) {
     ASSERT_EQ(0, Save({Small("gone", "old")}));
     Write({Small("a", "new")});
     ASSERT_EQ(0, Retrieve());
     EXPECT_NE(std::string::npos, fake_store::Dump().find("#gone/name"));
 }
 
-TEST_F(UpgradeTest, AnEmptyStateFileIsSuccessAndTouchesNoStore) {
+TEST_F(UpgradeTest, EmptyStateFileSucceedsWithoutUsingTheStore) {
     std::fclose(std::fopen(path.c_str(), "w"));
     EXPECT_EQ(0, Retrieve());
     EXPECT_EQ(0, fake_store::Calls());
     EXPECT_EQ(std::vector<std::string>{"File is empty, skip load"}, system);
 }
 
-TEST_F(UpgradeTest, AStateFileThatCannotBeReadIsSuccessAndTouchesNoStore) {
+TEST_F(UpgradeTest, UnreadableStateFileSucceedsWithoutUsingTheStore) {
     ASSERT_EQ(HYP_OK, DVSState_SwitchAdd("mine", "vswitch", 8, 9));
     EXPECT_EQ(0, Retrieve());
     EXPECT_EQ(0, fake_store::Calls());
     ASSERT_EQ(2u, system.size()) << "the file's own line first";
     EXPECT_EQ("Failed to read DVS config from sticky-bit file.", system[1]);
-    EXPECT_EQ(0, SwitchesInTable()) << "the table is reset all the same";
+    EXPECT_EQ(0, SwitchesInTable()) << "the table is reset anyway";
 }
 
-TEST_F(UpgradeTest, AStateFileThatDoesNotLoadCommitsNothing) {
+TEST_F(UpgradeTest, InvalidStateFileCommitsNothing) {
     ASSERT_EQ(0, Save({Small("a", "old")}));
     const std::string before = fake_store::Dump();
     const Bytes noise(512, 0x5a);
@@ -138,7 +138,7 @@ TEST_F(UpgradeTest, WithoutStoreOrTransactionTheLockStaysHeldAndTheTableLoaded) 
     ReleaseKeptLock();
 }
 
-TEST_F(UpgradeTest, IntoAnOpenStoreNothingIsKept) {
+TEST_F(UpgradeTest, UpgradeIntoAnOpenStoreLeavesNothing) {
     Write({Small("a", "ps")});
     configstore::Store *store = nullptr;
     ASSERT_EQ(0, configstore::GetStore(&store));
@@ -156,7 +156,7 @@ TEST_F(UpgradeTest, IntoAnOpenStoreNothingIsKept) {
     configstore::DestroyStore(store);
 }
 
-TEST_F(UpgradeTest, EveryStoreCallInTurnLeavesTheStoreAsItWas) {
+TEST_F(UpgradeTest, EachFailingStoreCallKeepsTheStore) {
     Write({Small("a", "new"), Small("b", "new"), Small("c", "")});
     dvsconfigstore_debug = -1;
     int call = 1;
@@ -201,27 +201,27 @@ TEST_F(UpgradeTest, BasicInfoListsTheSwitchesOfTheFile) {
     EXPECT_STREQ("ps-a", info.entries[0].portsetName);
     EXPECT_STREQ("b", info.entries[1].switchId);
     EXPECT_EQ(nullptr, info.entries[1].portsetName);
-    EXPECT_EQ(2, SwitchesInTable()) << "the table is not reset: the texts are its own";
+    EXPECT_EQ(2, SwitchesInTable()) << "the table is not reset: it owns the returned texts";
     EXPECT_EQ(HYP_OK, DVSState_ConfigReset());
-    EXPECT_EQ(blocks + 1, fault_live_blocks()) << "the file's buffer stays allocated, and nothing else";
+    EXPECT_EQ(blocks + 1, fault_live_blocks()) << "only the file's buffer stays allocated";
 }
 
-TEST_F(UpgradeTest, BasicInfoReplacesWhatTheTableHeld) {
+TEST_F(UpgradeTest, BasicInfoReplacesTheTable) {
     ASSERT_EQ(HYP_OK, DVSState_SwitchAdd("mine", "vswitch", 8, 9));
     Write({});
     EXPECT_EQ(0, BasicInfoLeaving(path).count);
     EXPECT_EQ(0, SwitchesInTable());
 }
 
-TEST_F(UpgradeTest, BasicInfoOfAFileThatCannotBeReadIsEmptyAndTouchesNothing) {
+TEST_F(UpgradeTest, BasicInfoOfAnUnreadableFileIsEmptyAndKeepsTheTable) {
     ASSERT_EQ(HYP_OK, DVSState_SwitchAdd("mine", "vswitch", 8, 9));
     EXPECT_EQ(0, BasicInfoFrom((path.string() + ".absent").c_str()).count);
     EXPECT_EQ(1, SwitchesInTable());
     EXPECT_EQ(HYP_OK, DVSState_ConfigReset());
 }
 
-TEST_F(UpgradeTest, TheExportedFunctionsReadTheHostsOwnFile) {
-    if (access("/etc/orbeno/dvsdata.db", F_OK) == 0) GTEST_SKIP() << "this host has a state file of its own";
+TEST_F(UpgradeTest, ExportedFunctionsReadTheHostsFile) {
+    if (access("/etc/orbeno/dvsdata.db", F_OK) == 0) GTEST_SKIP() << "this host has a real state file";
     EXPECT_EQ(0, DVSState_RetrieveDVSUpgradeInfo());
     ASSERT_EQ(2u, system.size()) << "the file's own line first";
     EXPECT_EQ("Failed to read DVS config from sticky-bit file.", system[1]);

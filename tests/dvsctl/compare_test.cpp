@@ -68,7 +68,7 @@ TEST(Compare, ShowsLongValuesWhereTheyDiffer) {
     EXPECT_NE(text.find(y), std::string::npos) << text;
 }
 
-TEST(Compare, ReportsSwitchesAsAWhole) {
+TEST(Compare, ReportsMissingSwitchesAsAWhole) {
     const Buffer a = StateOf({MakeSwitch("s", {kP}, {}, {MakeList("1", kNone)})}),
                  b = StateOf({MakeSwitch("t", {}, {}, {})});
     EXPECT_EQ(Listing(a, b), "- switch s: etherswitch, 1 port, 1 property\n"
@@ -84,7 +84,7 @@ TEST(Compare, ReportsFieldsAndMissingLists) {
                                                 {"className", 0x10, Text("etherswitch")},
                                                 {"maxPorts", 0x10, Number(512)}})});
     EXPECT_EQ(Listing(a, bare), "switch s\n  - list global: 0 properties\n  - list host: 0 properties\n")
-        << "a class name that lacks its padding is the same class";
+        << "padding of a class name is not a difference";
 }
 
 TEST(Compare, MatchesPortsByIdAndKind) {
@@ -98,14 +98,14 @@ TEST(Compare, MatchesPortsByIdAndKind) {
               "switch s\n  port 1 (active)\n    - p: 1\n    + q: \"text\"\n");
 }
 
-TEST(Compare, MatchesNamesakesInTheirOrder) {
+TEST(Compare, MatchesDuplicatesInOrder) {
     const NewEntry p2 = MakeProperty("p", Number(2));
     EXPECT_EQ(Listing(WithGlobal({kP, p2}), WithGlobal({kP, kQ, p2})),
               "switch s\n  global\n    + q: \"text\"\n");
     EXPECT_EQ(Listing(WithGlobal({kP, p2}), WithGlobal({kP})), "switch s\n  global\n    - p: 2\n");
 }
 
-TEST(Compare, IgnoresOrderUnlessAsked) {
+TEST(Compare, IgnoresOrderByDefault) {
     const Buffer a = WithGlobal({kP, kQ}), b = WithGlobal({kQ, kP});
     EXPECT_EQ(Listing(a, b), "");
     EXPECT_EQ(Listing(a, b, {.order = true}), "switch s\n  global\n    % the order differs\n");
@@ -118,7 +118,7 @@ TEST(Compare, IgnoresOrderUnlessAsked) {
     EXPECT_NE(Listing(WithPorts({one, two}), WithPorts({two, one}), {.order = true}), "");
 }
 
-TEST(Compare, KeepsHeadingsOncePerPlace) {
+TEST(Compare, PrintsEachHeadingOnce) {
     const Buffer a = StateOf({MakeSwitch("s", {kP}, {kP}, {MakeList("1", {kP}), MakeList("2", {kP})})});
     const Buffer b = StateOf(
         {MakeSwitch("s", {kQ}, {kQ}, {MakeList("1", {kQ}), MakeList("2", {kQ}), MakeList("3", kNone)})});
@@ -130,13 +130,13 @@ TEST(Compare, KeepsHeadingsOncePerPlace) {
                              "  + port 3: active, 0 properties\n");
 }
 
-TEST(Compare, EscapesWhatItPrints) {
+TEST(Compare, EscapesItsOutput) {
     const std::string text =
         Listing(WithGlobal({}), WithGlobal({MakeProperty("\x1b[2J", Text("a\x1b[2Jb"))}));
     EXPECT_EQ(text.find('\x1b'), std::string::npos) << text;
 }
 
-TEST(Compare, CountsInOneLine) {
+TEST(Compare, SummarizesInOneLine) {
     const Buffer a = WithGlobal({kP, kQ}), b = WithGlobal({MakeProperty("p", Number(2))});
     const State before = ParseState(a), after = ParseState(b);
     EXPECT_EQ(ShowChangeCount(Compare(before, after, {})), "1 removed, 1 changed");

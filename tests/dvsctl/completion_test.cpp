@@ -76,7 +76,7 @@ TEST_F(Completion, OffersEveryVerbAndEveryOptionOfIt) {
     }
 }
 
-TEST_F(Completion, OffersSourcesAndPathsAlsoBehindAColon) {
+TEST_F(Completion, OffersSourcesAndPathsAfterAColonToo) {
     for (const dvs::ctl::Scheme &scheme : dvs::ctl::Schemes())
         ExpectOffered({"copy", "state.db", std::string(scheme.name).substr(0, 3)},
                       std::string(scheme.name) + ":");

@@ -28,7 +28,7 @@ protected:
     [[nodiscard]] std::string JsonAt(std::string_view name) const { return "json:" + At(name); }
 };
 
-TEST_F(Copy, GivesTheSameBytesBackThroughJson) {
+TEST_F(Copy, RoundTripsThroughJson) {
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), JsonAt("a.json")}).status, 0);
     EXPECT_EQ(Dvsctl({"copy", JsonAt("a.json"), At("b.db")}).status, 0);
     EXPECT_EQ(Get("b.db"), Get("a.db"));
@@ -36,7 +36,7 @@ TEST_F(Copy, GivesTheSameBytesBackThroughJson) {
     EXPECT_EQ(Get("b.json"), Get("a.json"));
 }
 
-TEST_F(Copy, TakesTheExampleToAStateFileAndBack) {
+TEST_F(Copy, RoundTripsTheExampleThroughAStateFile) {
     const std::string example = std::string("json:") + DVS_SOURCE_DIR + "/examples/site-basic.json";
     EXPECT_EQ(Dvsctl({"copy", example, At("site.db")}).status, 0);
     EXPECT_EQ(Dvsctl({"verify", At("site.db")}).status, 0);
@@ -63,7 +63,7 @@ TEST_F(Copy, KeepsUnspecifiedBytesBetweenFiles) {
     EXPECT_EQ(Get("b.db"), Get("odd.db"));
 }
 
-TEST_F(Copy, ReportsWhatItDid) {
+TEST_F(Copy, ReportsItsResult) {
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("b.db")}).out,
               "copied 2 switches, 4 ports, 8 properties from file:" + At("a.db") + " to file:" + At("b.db") +
                   "\n");
@@ -72,7 +72,7 @@ TEST_F(Copy, ReportsWhatItDid) {
     EXPECT_EQ(json.at("summary").at("ports"), 4);
 }
 
-TEST_F(Copy, MakesFilesForTheirOwnerOnly) {
+TEST_F(Copy, CreatesFilesForTheOwnerOnly) {
     for (const std::string &target : {At("b.db"), JsonAt("b.json")}) {
         ASSERT_EQ(Dvsctl({"copy", At("a.db"), target}).status, 0);
         struct stat info {};
@@ -82,7 +82,7 @@ TEST_F(Copy, MakesFilesForTheirOwnerOnly) {
     EXPECT_EQ(Files(), (std::vector<std::string>{"a.db", "b.db", "b.json"})) << "no temporary file is left";
 }
 
-TEST_F(Copy, ADryRunChangesNothing) {
+TEST_F(Copy, DryRunChangesNothing) {
     const Result create = Dvsctl({"copy", At("a.db"), At("b.db"), "--dry-run"});
     EXPECT_EQ(create.status, 0);
     EXPECT_EQ(create.out.find("would create file:" + At("b.db") + "\n+ switch alpha: "), 0u) << create.out;
@@ -108,13 +108,13 @@ TEST_F(Copy, ADryRunChangesNothing) {
     EXPECT_EQ(json.at("changes").as_array().size(), 4u);
 }
 
-TEST_F(Copy, ADryRunRefusesWhatTheCopyWouldRefuse) {
+TEST_F(Copy, DryRunRejectsWhatTheCopyRejects) {
     Put("bad.json", "{");
     EXPECT_EQ(Dvsctl({"copy", JsonAt("bad.json"), At("b.db"), "--dry-run"}).status, 6);
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("a.db"), "--dry-run", "--no-replace"}).status, 1);
 }
 
-TEST_F(Copy, ADryRunRefusesPlacesThatCannotBeWritten) {
+TEST_F(Copy, DryRunRejectsUnwritableTargets) {
     ASSERT_EQ(mkdir(At("directory").c_str(), 0700), 0);
     for (const std::string &target :
          {At("none/b.db"), JsonAt("none/b.json"), At("a.db/below"), At("directory"), JsonAt("directory")}) {
@@ -132,7 +132,7 @@ TEST_F(Copy, ADryRunRefusesPlacesThatCannotBeWritten) {
     EXPECT_EQ(Files(), (std::vector<std::string>{"a.db", "directory", "link.db"}));
 }
 
-TEST_F(Copy, SaysWhatStandsWhereTheFileShouldGo) {
+TEST_F(Copy, ReportsAnObstacleAtTheTarget) {
     ASSERT_EQ(mkdir(At("directory").c_str(), 0700), 0);
     ASSERT_EQ(mkfifo(At("fifo").c_str(), 0600), 0);
     const std::pair<std::string, std::string> places[] = {{At("directory"), "it is a directory"},
@@ -146,7 +146,7 @@ TEST_F(Copy, SaysWhatStandsWhereTheFileShouldGo) {
     }
 }
 
-TEST_F(Copy, CanRefuseToReplace) {
+TEST_F(Copy, NoReplaceKeepsAnExistingTarget) {
     Put("b.db", "precious");
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("b.db"), "--no-replace"}).status, 1);
     EXPECT_EQ(Get("b.db"), "precious");
@@ -155,7 +155,7 @@ TEST_F(Copy, CanRefuseToReplace) {
     EXPECT_EQ(Get("b.db"), Get("a.db"));
 }
 
-TEST_F(Copy, AnAbsentSourceNeverEmptiesTheTarget) {
+TEST_F(Copy, AbsentSourceKeepsTheTarget) {
     const std::string before = Get("a.db");
     EXPECT_EQ(Dvsctl({"copy", At("none.db"), At("a.db")}).status, 1);
     EXPECT_EQ(Dvsctl({"copy", At("none.db"), At("a.db"), "--if-exists"}).status, 0);
@@ -164,7 +164,7 @@ TEST_F(Copy, AnAbsentSourceNeverEmptiesTheTarget) {
     EXPECT_EQ(Get("a.db"), before);
 }
 
-TEST_F(Copy, ADamagedSourceLeavesTheTargetAlone) {
+TEST_F(Copy, DamagedSourceKeepsTheTarget) {
     std::string damaged = Get("a.db");
     damaged[300] = static_cast<char>(damaged[300] + 1);
     Put("bad.db", damaged);
@@ -177,7 +177,7 @@ TEST_F(Copy, ADamagedSourceLeavesTheTargetAlone) {
     EXPECT_EQ(Files(), (std::vector<std::string>{"a.db", "bad.db"}));
 }
 
-TEST_F(Copy, AFailedWriteLeavesTheTargetAlone) {
+TEST_F(Copy, FailedWriteKeepsTheTarget) {
     ASSERT_EQ(mkdir(At("directory").c_str(), 0700), 0);
     for (const std::string &target :
          {At("directory"), JsonAt("directory"), At("a.db/below"), JsonAt("none/b.json"),
@@ -199,13 +199,13 @@ TEST_F(Copy, WritesThroughALinkAndKeepsIt) {
     EXPECT_EQ(Get("real.db"), Get("a.db"));
 }
 
-TEST_F(Copy, AnotherWriterMakesItBusy) {
+TEST_F(Copy, FailsAsBusyWhileAnotherWriterHoldsTheLock) {
     const int directory = open(At("").c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
     ASSERT_EQ(flock(directory, LOCK_EX), 0);
     for (const std::string &target : {At("b.db"), JsonAt("b.json")}) {
         const Result result = Dvsctl({"copy", At("a.db"), target, "--timeout", "0.2"});
         EXPECT_EQ(result.status, 8) << result.err;
-        EXPECT_NE(result.err.find("--timeout"), std::string::npos) << "says what to do";
+        EXPECT_NE(result.err.find("--timeout"), std::string::npos) << "the error suggests a fix";
     }
     close(directory);
     EXPECT_EQ(Files(), std::vector<std::string>{"a.db"});

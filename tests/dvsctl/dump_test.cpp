@@ -30,7 +30,7 @@ testing::AssertionResult Covers(const Collector &collector, const Buffer &state)
         if (range.offset != at)
             return testing::AssertionFailure() << range.what << " at " << range.offset << ", not " << at;
         if (range.bytes.data() != state.data() + at)
-            return testing::AssertionFailure() << "other bytes at " << at;
+            return testing::AssertionFailure() << "wrong bytes at " << at;
         at += range.bytes.size();
     }
     if (at != state.size()) return testing::AssertionFailure() << "ends at " << at << " of " << state.size();
@@ -43,7 +43,7 @@ Collector Dump(const Buffer &state, const DumpFilter &filter = {}) {
     return collector;
 }
 
-TEST(Dump, GivesEveryByteOnce) {
+TEST(Dump, PrintsEveryByteOnce) {
     Buffer state = SmallState();
     EXPECT_TRUE(Covers(Dump(state), state));
     EXPECT_TRUE(Dump(state).faults.empty());
@@ -52,7 +52,7 @@ TEST(Dump, GivesEveryByteOnce) {
     EXPECT_EQ(Dump(state).ranges.back().what, "behind the state: padding of the file");
 }
 
-TEST(Dump, GivesEveryByteOfAStateCutAnywhere) {
+TEST(Dump, PrintsEveryByteOfATruncatedState) {
     const Buffer state = SmallState();
     for (std::size_t size = 0; size < state.size(); ++size) {
         const Buffer cut(state.begin(), state.begin() + static_cast<std::ptrdiff_t>(size));
@@ -62,7 +62,7 @@ TEST(Dump, GivesEveryByteOfAStateCutAnywhere) {
     }
 }
 
-TEST(Dump, GivesEveryByteOfAStateChangedAnywhere) {
+TEST(Dump, PrintsEveryByteOfAChangedState) {
     const Buffer state = SmallState();
     for (std::size_t at = 0; at < state.size(); ++at) {
         Buffer changed = state;
@@ -70,7 +70,7 @@ TEST(Dump, GivesEveryByteOfAStateChangedAnywhere) {
         ASSERT_TRUE(Covers(Dump(changed), changed)) << at;
         if (at % 4 != 0) continue;
         Mend(changed);
-        ASSERT_TRUE(Covers(Dump(changed), changed)) << at << ", mended";
+        ASSERT_TRUE(Covers(Dump(changed), changed)) << at << ", with recomputed checksums";
     }
 }
 
@@ -84,7 +84,7 @@ TEST(Dump, MarksAWrongChecksum) {
     EXPECT_FALSE(collector.faults.empty());
 }
 
-TEST(Dump, GivesOneSwitchOrPort) {
+TEST(Dump, PrintsOneSwitchOrPort) {
     const Buffer state = SmallState();
     const auto whole = Dump(state, {"beta", {}}), port = Dump(state, {{}, "9"}),
                both = Dump(state, {"alpha", "2"});

@@ -61,7 +61,7 @@ void ExpectAll(const std::set<std::string> &found, const std::set<std::string> &
         EXPECT_TRUE(found.contains(key)) << key << " is missing in a switch of class " << of;
 }
 
-TEST_F(Generate, TheSameSeedGivesTheSameBytes) {
+TEST_F(Generate, SameSeedGivesTheSameBytes) {
     for (const char *name : {"a.db", "b.db"})
         ASSERT_EQ(Dvsctl({"generate", "--ports", "3", "--seed", "7", At(name)}).status, 0);
     ASSERT_EQ(Dvsctl({"generate", "--ports", "3", "--seed", "8", At("c.db")}).status, 0);
@@ -71,7 +71,7 @@ TEST_F(Generate, TheSameSeedGivesTheSameBytes) {
 }
 
 // The bytes from one compiler; the others must agree. Update it when the generator draws different values.
-TEST_F(Generate, TheBytesAreTheSameWithEveryCompiler) {
+TEST_F(Generate, BytesAreTheSameWithEveryCompiler) {
     ASSERT_EQ(Dvsctl({"generate", "--switches", "15", "--ports", "24", "--seed", "7", At("a.db")}).status, 0);
     std::uint64_t hash = 0xcbf29ce484222325;
     for (const char c : Get("a.db"))
@@ -93,7 +93,7 @@ TEST_F(Generate, EverySwitchHasEveryMappedKeyOfItsClass) {
     }
 }
 
-TEST_F(Generate, TwoSwitchesOfTwoPortsHaveEveryMappedKeyBetweenThem) {
+TEST_F(Generate, TwoSwitchesOfTwoPortsCoverEveryMappedKey) {
     std::set<std::string> found;
     for (const json::value &sw : Switches({"--switches", "2", "--ports", "2"})) {
         found.merge(Names(sw.at("global")));
@@ -125,7 +125,7 @@ TEST_F(Generate, ClassesVersionsAndKindsVary) {
     EXPECT_GT(unnamed, 0U);
 }
 
-TEST_F(Generate, TakesOneClassAndVersionForAll) {
+TEST_F(Generate, AcceptsOneClassAndVersionForAll) {
     for (const json::value &sw : Switches({"--class", "vswitch", "--switch-version", "8"})) {
         EXPECT_EQ(sw.at("class"), "vswitch");
         EXPECT_EQ(sw.at("version"), 8);
@@ -134,7 +134,7 @@ TEST_F(Generate, TakesOneClassAndVersionForAll) {
     EXPECT_EQ(Dvsctl({"generate", "--switch-version", "13", At("b.db")}).status, 2);
 }
 
-TEST_F(Generate, AStoreTakesWhateverIsGenerated) {
+TEST_F(Generate, StoreAcceptsEveryGeneratedState) {
     for (int seed = 0; seed < 5; ++seed)
         ASSERT_EQ(Dvsctl({"generate", "--switches", "32", "--ports", "9", "--seed", std::to_string(seed),
                           "store:" + At("store.db")})
@@ -143,18 +143,18 @@ TEST_F(Generate, AStoreTakesWhateverIsGenerated) {
             << seed;
 }
 
-TEST_F(Generate, TakesAnyNumberOfSeeds) {
+TEST_F(Generate, AcceptsAnySeed) {
     for (int seed = 0; seed < 40; ++seed)
         ASSERT_EQ(Dvsctl({"generate", "--ports", "5", "--seed", std::to_string(seed), At("a.db")}).status, 0)
             << seed;
 }
 
-TEST_F(Generate, TakesNoPortsAndNoSwitches) {
+TEST_F(Generate, AcceptsZeroPortsAndZeroSwitches) {
     EXPECT_EQ(Switches({"--ports", "0"}).size(), 3U);
     EXPECT_TRUE(Switches({"--switches", "0"}).empty());
 }
 
-TEST_F(Generate, ADryRunShowsWhatWouldBeWritten) {
+TEST_F(Generate, DryRunShowsWhatWouldBeWritten) {
     const Result fresh = Dvsctl({"generate", "--dry-run", At("a.db")});
     EXPECT_EQ(fresh.status, 0);
     EXPECT_NE(fresh.out.find("would create"), std::string::npos) << fresh.out;
@@ -172,14 +172,14 @@ TEST_F(Generate, ADryRunShowsWhatWouldBeWritten) {
     EXPECT_EQ(Get("a.db"), before);
 }
 
-TEST_F(Generate, ReplacesOnlyWhereItMay) {
+TEST_F(Generate, ReplacesOnlyWithPermission) {
     ASSERT_EQ(Dvsctl({"generate", "--no-replace", At("a.db")}).status, 0);
     const std::string before = Get("a.db");
     EXPECT_EQ(Dvsctl({"generate", "--no-replace", "--seed", "2", At("a.db")}).status, 1);
     EXPECT_EQ(Get("a.db"), before);
 }
 
-TEST_F(Generate, RefusesWhatIsNoNumber) {
+TEST_F(Generate, RejectsInvalidNumbers) {
     EXPECT_EQ(Dvsctl({"generate", "--ports", "x", At("a.db")}).status, 2);
     EXPECT_EQ(Dvsctl({"generate", "--switches", "-1", At("a.db")}).status, 2);
     EXPECT_EQ(Dvsctl({"generate", "--switches", "33", At("a.db")}).status, 2);

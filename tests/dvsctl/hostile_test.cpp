@@ -17,7 +17,7 @@ using namespace dvs::ctl::test;
 
 class Hostile : public ProgramTest {};
 
-TEST_F(Hostile, DocumentsAreRefusedWithTheirPlace) {
+TEST_F(Hostile, DocumentsAreRejectedWithTheirPlace) {
     const std::pair<std::string, std::string> documents[] = {
         {"", "it is empty"},
         {"{", "line 1, column 2"},
@@ -63,7 +63,7 @@ TEST_F(Hostile, RandomDocumentsNeverCrash) {
     }
 }
 
-TEST_F(Hostile, StateFilesCutOrChangedNeverCrash) {
+TEST_F(Hostile, TruncatedOrChangedStateFilesNeverCrash) {
     Buffer state = SmallState();
     std::mt19937 random(8);
     for (int round = 0; round < 60; ++round) {
@@ -79,7 +79,7 @@ TEST_F(Hostile, StateFilesCutOrChangedNeverCrash) {
     }
 }
 
-TEST_F(Hostile, NamesAndValuesNeverReachTheTerminalRaw) {
+TEST_F(Hostile, NamesAndValuesAreEscapedForTheTerminal) {
     const std::string evil = "\x1b]0;owned\x07\xc2\x9b"
                              "2J\xe2\x80\xae\x7f\r";
     PutState("evil.db",
@@ -110,7 +110,7 @@ TEST_F(Hostile, NamesAndValuesNeverReachTheTerminalRaw) {
     }
 }
 
-TEST_F(Hostile, PathsThatAreNoFilesDoNotHang) {
+TEST_F(Hostile, PathsThatAreNotFilesDoNotHang) {
     ASSERT_EQ(mkfifo(At("fifo").c_str(), 0600), 0);
     ASSERT_EQ(mkdir(At("directory").c_str(), 0700), 0);
     for (const char *verb : {"show", "verify", "hexdump"}) {
@@ -124,7 +124,7 @@ TEST_F(Hostile, PathsThatAreNoFilesDoNotHang) {
     }
 }
 
-TEST_F(Hostile, AJsonDocumentNamedAsAStateFileIsRecognised) {
+TEST_F(Hostile, JsonDocumentNamedAsAStateFileIsRecognised) {
     Put("site.json", "{\"switches\": []}");
     for (const char *verb : {"show", "verify"}) {
         const Result result = Dvsctl({verb, At("site.json")});

@@ -228,11 +228,11 @@ private:
     }
 };
 
-TEST_F(LyingModule, ReadersGiveAnErrorForEveryKindOfLie) {
+TEST_F(LyingModule, ReadersFailForEveryKindOfLie) {
     TellAll(kReaders, 5);
 }
 
-TEST_F(LyingModule, ChangesGiveAnErrorOrBelieveIt) {
+TEST_F(LyingModule, ChangesFailOrTrustTheReply) {
     TellAll(kChanges, 7);
 }
 

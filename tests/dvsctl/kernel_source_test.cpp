@@ -28,13 +28,13 @@ TEST_F(KernelSource, ShowsAndVerifiesTheLiveState) {
     EXPECT_EQ(Kernel({"show", "kernel:1"}).status, 2);
 }
 
-TEST_F(KernelSource, PersistentLeavesOutWhatIsNotWorthKeeping) {
+TEST_F(KernelSource, PersistentOmitsVolatileState) {
     EXPECT_NE(Kernel({"show", "kernel:"}).out.find("shadow of 1"), std::string::npos);
     EXPECT_EQ(Kernel({"show", "kernel:", "--persistent"}).out.find("shadow of 1"), std::string::npos);
     EXPECT_EQ(Kernel({"diff", "kernel:", "kernel:", "--persistent"}).status, 0);
 }
 
-TEST_F(KernelSource, CopiesGoIntoFilesAndBack) {
+TEST_F(KernelSource, CopiesRoundTripThroughFiles) {
     ASSERT_EQ(Kernel({"copy", "kernel:", At("live.db")}).status, 0);
     ASSERT_EQ(Verb({"prop", "set", "alpha", "x.mtu", "1", "--as", "number"}).status, 0);
     EXPECT_EQ(Kernel({"diff", "kernel:", At("live.db")}).status, 1);
@@ -49,7 +49,7 @@ TEST_F(KernelSource, CopiesGoIntoFilesAndBack) {
     EXPECT_EQ(Kernel({"diff", "kernel:", At("live.db")}).status, 0);
 }
 
-TEST_F(KernelSource, ACopyIntoTheStoreTakesThePersistentState) {
+TEST_F(KernelSource, CopyIntoTheStoreUsesThePersistentState) {
     ASSERT_EQ(Kernel({"copy", "json:" DVS_SOURCE_DIR "/examples/site-basic.json", "kernel:"}).status, 0);
     EXPECT_NE(Verb({"ports", "production"}).out.find("shadow"), std::string::npos);
     ASSERT_EQ(Kernel({"copy", "kernel:", "store:"}).status, 0);
@@ -60,7 +60,7 @@ TEST_F(KernelSource, ACopyIntoTheStoreTakesThePersistentState) {
     EXPECT_EQ(Verb({"ports", "production"}).out.find("shadow"), std::string::npos);
 }
 
-TEST_F(KernelSource, AMissingDeviceSaysHowToGetOne) {
+TEST_F(KernelSource, MissingDeviceErrorSuggestsAFix) {
     for (const std::vector<std::string> &args : {std::vector<std::string>{"show", "kernel:"},
                                                  {"copy", At("start.db"), "kernel:"},
                                                  {"kernel", "switch", "remove", "alpha"},
@@ -77,7 +77,7 @@ TEST_F(KernelSource, AMissingDeviceSaysHowToGetOne) {
     EXPECT_NE(gone.err.find("cause:  failed to open dvsdev device"), std::string::npos) << gone.err;
 }
 
-TEST_F(KernelSource, FaultsOfTheModuleBecomeClearErrors) {
+TEST_F(KernelSource, ModuleFaultsGiveClearErrors) {
     const struct {
         const char *fault;
         int status;
@@ -104,7 +104,7 @@ TEST_F(KernelSource, FaultsOfTheModuleBecomeClearErrors) {
     EXPECT_EQ(Kernel({"show", "kernel:"}).status, 1);
 }
 
-TEST_F(KernelSource, AModuleThatHangsIsATimeout) {
+TEST_F(KernelSource, HangingModuleTimesOut) {
     Fault("command=3,nth=1,delay=30s");
     const Result late = Kernel({"show", "kernel:", "--timeout", "0.2", "--json"});
     EXPECT_EQ(late.status, 3);

@@ -61,7 +61,7 @@ TEST_F(KernelVerbs, EveryChangeIsMadeAndReported) {
     }
 }
 
-TEST_F(KernelVerbs, ADryRunShowsTheChangeAndMakesNone) {
+TEST_F(KernelVerbs, DryRunShowsTheChangeAndMakesNone) {
     const std::string before = Everything();
     for (const ChangeRow &row : kChanges) {
         const Result result = Verb(Plus(row.good, {"--json", "--dry-run"}));
@@ -72,7 +72,7 @@ TEST_F(KernelVerbs, ADryRunShowsTheChangeAndMakesNone) {
     }
 }
 
-TEST_F(KernelVerbs, RefusalsHaveTheirStatusAndChangeNothing) {
+TEST_F(KernelVerbs, FailuresReturnTheirStatusAndChangeNothing) {
     const std::string before = Everything();
     for (const ChangeRow &row : kChanges) {
         for (const Words &extra : {Words{}, Words{"--dry-run"}}) {
@@ -84,7 +84,7 @@ TEST_F(KernelVerbs, RefusalsHaveTheirStatusAndChangeNothing) {
     }
 }
 
-TEST_F(KernelVerbs, TheProgramsVersionIsNotTakenForTheSwitchs) {
+TEST_F(KernelVerbs, ProgramsVersionOptionIsNotTheSwitchsVersion) {
     const std::string before = Everything();
     for (const Words &words : {Words{"--version", "9"}, Words{"9", "--version"}, Words{"--version"}}) {
         const Result result =
@@ -95,7 +95,7 @@ TEST_F(KernelVerbs, TheProgramsVersionIsNotTakenForTheSwitchs) {
     EXPECT_EQ(Everything(), before);
 }
 
-TEST_F(KernelVerbs, WhatIsThereAlreadyOrNotThereIsAllowedWhenAskedFor) {
+TEST_F(KernelVerbs, MayExistAndIfExistsTolerateExistingAndMissing) {
     const Words add = {"switch", "add", "alpha", "--class", "x", "--max-ports", "5", "--switch-version", "8"};
     EXPECT_EQ(Json(Verb(Plus(add, {"--may-exist", "--json"}))).at("was_there"), true);
     EXPECT_EQ(Verb({"port", "add", "alpha", "2", "--may-exist"}).status, 0);
@@ -107,7 +107,7 @@ TEST_F(KernelVerbs, WhatIsThereAlreadyOrNotThereIsAllowedWhenAskedFor) {
     EXPECT_FALSE(Json(absent).as_object().contains("value"));
 }
 
-TEST_F(KernelVerbs, ASwitchLeftWithoutItsVersionPropertyIsWarnedAboutWithTheCommandThatMendsIt) {
+TEST_F(KernelVerbs, WarnsOfAMissingVersionPropertyWithTheFixingCommand) {
     Words add = {"switch", "add", "it's", "--class", "portset", "--max-ports", "5", "--switch-version", "8"};
     const Result added = Verb(add);
     EXPECT_EQ(added.status, 0);
@@ -133,7 +133,7 @@ TEST_F(KernelVerbs, ASwitchLeftWithoutItsVersionPropertyIsWarnedAboutWithTheComm
     EXPECT_FALSE(Json(Verb(add)).as_object().contains("warnings"));
 }
 
-TEST_F(KernelVerbs, AssociationsAreMadeAndTakenBack) {
+TEST_F(KernelVerbs, AssociationsAreMadeAndRemoved) {
     const std::string before = Everything();
     EXPECT_EQ(Verb({"switch", "associate", "alpha", "--dry-run"}).status, 0);
     EXPECT_EQ(Verb({"exec", "", "stats"}).out.find(" associated"), std::string::npos);
@@ -146,7 +146,7 @@ TEST_F(KernelVerbs, AssociationsAreMadeAndTakenBack) {
     EXPECT_EQ(Everything(), before);
 }
 
-TEST_F(KernelVerbs, SanitizingRemovesWhatIsLeftOver) {
+TEST_F(KernelVerbs, SanitizeRemovesLeftoverPorts) {
     ASSERT_EQ(Verb({"port", "add", "alpha", "8", "--kind", "zombie"}).status, 0);
     const Result plan = Verb({"state", "sanitize", "--dry-run", "--json"});
     EXPECT_EQ(Json(plan).at("changes").at(0).at("port"), "8");
@@ -154,7 +154,7 @@ TEST_F(KernelVerbs, SanitizingRemovesWhatIsLeftOver) {
     EXPECT_EQ(Verb({"ports", "alpha", "--kind", "zombie"}).out, "");
 }
 
-TEST_F(KernelVerbs, AliasesStandForIds) {
+TEST_F(KernelVerbs, AcceptsAliasesAsIds) {
     EXPECT_EQ(Verb({"prop", "get", "production", "x.mtu"}).out, "9000\n");
     EXPECT_EQ(Json(Verb({"prop", "set", "production", "x.n", "t", "--port", "web-1", "--json"})).at("port"),
               "1");
@@ -163,7 +163,7 @@ TEST_F(KernelVerbs, AliasesStandForIds) {
     EXPECT_EQ(Verb({"exec", "production", "ports"}).status, 0);
 }
 
-TEST_F(KernelVerbs, NamesThatWouldBeCutAreRefused) {
+TEST_F(KernelVerbs, RejectsNamesThatWouldBeTruncated) {
     const std::string before = Everything();
     EXPECT_EQ(Verb({"switch", "remove", std::string(64, 's')}).status, 2);
     EXPECT_EQ(Verb({"port", "remove", "alpha", std::string(48, 'p')}).status, 2);
@@ -173,7 +173,7 @@ TEST_F(KernelVerbs, NamesThatWouldBeCutAreRefused) {
     EXPECT_EQ(Everything(), before);
 }
 
-TEST_F(KernelVerbs, ValuesComeInEveryForm) {
+TEST_F(KernelVerbs, AcceptsValuesInEveryForm) {
     const struct {
         Words words;
         const char *hex;
@@ -199,7 +199,7 @@ TEST_F(KernelVerbs, ValuesComeInEveryForm) {
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.value", "--raw"}).out, "\x07");
 }
 
-TEST_F(KernelVerbs, KnownPropertiesTakeWhatTheStoreTakes) {
+TEST_F(KernelVerbs, KnownPropertiesAcceptTheStoresValues) {
     EXPECT_EQ(Verb({"prop", "set", "alpha", kMtu, "1500"}).status, 0);
     EXPECT_EQ(Json(Verb({"prop", "get", "alpha", kMtu, "--json"})).at("value"), 1500);
     EXPECT_EQ(Verb({"prop", "set", "alpha", kVlan, R"({"vlan_id": 100})", "--port", "1"}).status, 0);
@@ -210,7 +210,7 @@ TEST_F(KernelVerbs, KnownPropertiesTakeWhatTheStoreTakes) {
     EXPECT_EQ(Verb({"prop", "set", "alpha", kMtu, "large"}).status, 6);
 }
 
-TEST_F(KernelVerbs, ValuesThatDoNotSayWhatTheyAreAreRefused) {
+TEST_F(KernelVerbs, RejectsValuesOfAmbiguousForm) {
     const std::string before = Everything();
     for (const Words &words :
          {Words{"1500"}, Words{""}, Words{}, Words{"a", "--file", "b"}, Words{"a", "--as", "number"},
@@ -222,13 +222,13 @@ TEST_F(KernelVerbs, ValuesThatDoNotSayWhatTheyAreAreRefused) {
     EXPECT_EQ(Everything(), before);
 }
 
-TEST_F(KernelVerbs, TypesAreSetAsAskedFor) {
+TEST_F(KernelVerbs, SetsTheRequestedType) {
     ASSERT_EQ(Verb({"prop", "set", "alpha", "x.typed", "t", "--type", "0x18"}).status, 0);
     const Result listed = Verb({"vendor-props", "alpha", "--type", "0x18", "--json"});
     EXPECT_EQ(Json(listed).at("properties").at(0).at("name"), "x.typed");
 }
 
-TEST_F(KernelVerbs, TheSmartNicIsAskedForEveryList) {
+TEST_F(KernelVerbs, SmartNicOptionAppliesToEveryList) {
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.mtu", "--smartnic"}).out, "9000\n");
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.host", "--host", "--smartnic"}).out, "\"h\"\n");
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.blob", "--port", "1", "--smartnic", "--raw"}).out,
@@ -239,7 +239,7 @@ TEST_F(KernelVerbs, TheSmartNicIsAskedForEveryList) {
     EXPECT_EQ(Verb({"prop", "get", "alpha", "x.none", "--smartnic"}).status, 4);
 }
 
-TEST_F(KernelVerbs, PortsComeFromJsonOrSerializedData) {
+TEST_F(KernelVerbs, AcceptsPortsAsJsonOrSerializedData) {
     const std::string json = R"({"kind": "shadow", "properties": [{"name": "x.a", "value": "b"}]})";
     ASSERT_EQ(Verb({"port", "add", "alpha", "70", "--file", "-"}, json).status, 0);
     EXPECT_NE(Verb({"ports", "alpha", "--kind", "shadow"}).out.find("70"), std::string::npos);
@@ -252,7 +252,7 @@ TEST_F(KernelVerbs, PortsComeFromJsonOrSerializedData) {
     EXPECT_EQ(Verb({"port", "find", "alpha", "72"}).status, 4);
 }
 
-TEST_F(KernelVerbs, PropertiesOfTheModuleAreSaidInWordsToo) {
+TEST_F(KernelVerbs, ShowsModulePropertiesInTypedFormToo) {
     const std::string vlan = "com.orbeno.etherswitch.port.vlan",
                       security = "com.orbeno.etherswitch.port.security";
     ASSERT_EQ(Verb({"prop", "set", "alpha", vlan, R"({"vlan_id": 100})", "--port", "1"}).status, 0);
@@ -278,7 +278,7 @@ TEST_F(KernelVerbs, PropertiesOfTheModuleAreSaidInWordsToo) {
     EXPECT_TRUE(found);
 }
 
-TEST_F(KernelVerbs, PortStateListsPropertiesWithOrWithoutTheVolatile) {
+TEST_F(KernelVerbs, PortStateListsPropertiesWithOrWithoutVolatileOnes) {
     ASSERT_EQ(Verb({"prop", "set", "alpha", "x.volatile.y", "z", "--port", "1"}).status, 0);
     EXPECT_NE(Verb({"port", "state", "alpha", "1"}).out.find("x.volatile.y"), std::string::npos);
     const Result kept = Verb({"port", "state", "alpha", "1", "--persistent"});
@@ -311,7 +311,7 @@ TEST_F(KernelVerbs, PortsAreListedByKind) {
     EXPECT_EQ(Verb({"ports", "alpha", "--kind", "odd"}).status, 2);
 }
 
-TEST_F(KernelVerbs, ExternalIdsLeadToPorts) {
+TEST_F(KernelVerbs, FindsPortsByExternalId) {
     const char *key = "com.orbeno.port.extraConfig.vnic.external.id";
     ASSERT_EQ(Verb({"prop", "set", "alpha", key, "vm-7", "--as", "text", "--port", "2"}).status, 0);
     EXPECT_EQ(Verb({"find-external-id", "alpha", "vm-7"}).out, "2\n");
@@ -321,7 +321,7 @@ TEST_F(KernelVerbs, ExternalIdsLeadToPorts) {
     EXPECT_EQ(Json(Verb({"find-external-id", "alpha", "x", "--if-exists", "--json"})).at("is_there"), false);
 }
 
-TEST_F(KernelVerbs, QueriesNarrowTheLists) {
+TEST_F(KernelVerbs, QueriesFilterTheLists) {
     const auto names = [&](Words words) {
         return Verb(Plus(std::move(words), {"--columns", "name", "--no-headings"})).out;
     };

@@ -111,7 +111,7 @@ Result RunInTerminal(const std::vector<std::string> &args, const std::vector<std
     if (child == 0) Become(args, environment);
     Result result;
     if (child == -1) {
-        ADD_FAILURE() << "no pseudo-terminal to be had here: " << std::strerror(errno);
+        ADD_FAILURE() << "no pseudo-terminal available: " << std::strerror(errno);
         return result;
     }
     result.out = ReadToEnd(terminal);

@@ -32,7 +32,7 @@ TEST_F(Program, PrintsItsVersion) {
     EXPECT_EQ(Json(Dvsctl({"--version", "--json"})).at("version"), "1.0.0");
 }
 
-TEST_F(Program, HelpsWithEveryVerb) {
+TEST_F(Program, PrintsHelpForEveryVerb) {
     const Result overview = Dvsctl({"--help"});
     EXPECT_EQ(overview.status, 0);
     EXPECT_EQ(Dvsctl({"-h"}).out, overview.out);
@@ -56,7 +56,7 @@ TEST_F(Program, HelpsWithEveryVerb) {
     EXPECT_EQ(Json(Dvsctl({"show", "--help", "--json"})).at("schema_version"), 1);
 }
 
-TEST_F(Program, RefusesWrongUsage) {
+TEST_F(Program, RejectsWrongUsage) {
     const std::vector<std::vector<std::string>> wrong = {
         {},
         {"shwo"},
@@ -92,20 +92,20 @@ TEST_F(Program, RefusesWrongUsage) {
     }
 }
 
-TEST_F(Program, GuessesWhatWasMeant) {
+TEST_F(Program, SuggestsSimilarNames) {
     EXPECT_NE(Dvsctl({"shwo", "x"}).err.find("\"show\" was meant"), std::string::npos);
     EXPECT_NE(Dvsctl({"show", "stor:x"}).err.find("file:stor:x"), std::string::npos);
     EXPECT_EQ(Dvsctl({"show", "xyzzy:x"}).err.find("json:-\n"), std::string::npos);
 }
 
-TEST_F(Program, TakesOptionsAnywhere) {
+TEST_F(Program, AcceptsOptionsAnywhere) {
     const std::string expected = Dvsctl({"show", At("a.db"), "--json"}).out;
     EXPECT_EQ(Dvsctl({"--json", "show", At("a.db")}).out, expected);
     EXPECT_EQ(Dvsctl({"show", "--json", At("a.db")}).out, expected);
     EXPECT_EQ(Dvsctl({"show", "--timeout=5", "--json", "file:" + At("a.db")}).out, expected);
 }
 
-TEST_F(Program, StatusesSayWhatHappened) {
+TEST_F(Program, ExitStatusesDistinguishErrors) {
     EXPECT_EQ(Dvsctl({"show", At("a.db")}).status, 0);
     EXPECT_EQ(Dvsctl({"show", At("absent.db")}).status, 1);
     EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", "gamma"}).status, 4);
@@ -119,7 +119,7 @@ TEST_F(Program, StatusesSayWhatHappened) {
     EXPECT_EQ(RunProgram({.args = {"show", "json:-", "--timeout", "0.1"}, .openInput = true}).status, 3);
 }
 
-TEST_F(Program, ErrorsSayWhatWhereWhyAndWhatNext) {
+TEST_F(Program, ErrorsStateWhatWhereWhyAndTheFix) {
     const Result result = Dvsctl({"show", At("absent.db")});
     EXPECT_EQ(result.out, "");
     EXPECT_EQ(result.err, "dvsctl: cannot read the state\n"
@@ -130,7 +130,7 @@ TEST_F(Program, ErrorsSayWhatWhereWhyAndWhatNext) {
                               "  next:   check the name; with --if-exists an absent source is no error\n");
 }
 
-TEST_F(Program, ErrorsAreJsonToo) {
+TEST_F(Program, PrintsErrorsAsJsonToo) {
     const std::vector<std::pair<std::vector<std::string>, int>> cases = {
         {{"show", At("absent.db")}, 1},
         {{"show"}, 2},
@@ -154,7 +154,7 @@ TEST_F(Program, ErrorsAreJsonToo) {
     }
 }
 
-TEST_F(Program, QuietLeavesOnlyResultsAndErrors) {
+TEST_F(Program, QuietPrintsOnlyResultsAndErrors) {
     EXPECT_EQ(Dvsctl({"verify", At("a.db"), "-q"}).out, "");
     EXPECT_EQ(Dvsctl({"copy", At("a.db"), At("b.db"), "-q"}).out, "");
     EXPECT_EQ(Dvsctl({"diff", At("a.db"), At("b.db"), "-q"}).out, "");
@@ -168,7 +168,7 @@ TEST_F(Program, VerboseShowsTheLibrarysMessages) {
     EXPECT_NE(result.err.find("libdvs: failed to open dvsfile"), std::string::npos) << result.err;
 }
 
-TEST_F(Program, LibraryMessagesBecomeTheCause) {
+TEST_F(Program, ErrorsQuoteLibraryMessagesAsTheCause) {
     const Result result = Dvsctl({"copy", At("a.db"), At("no/such/directory.db")});
     EXPECT_EQ(result.status, 1);
     EXPECT_NE(result.err.find("  cause:  failed to open dvsfile " + At("no/such/directory.db")),
@@ -177,7 +177,7 @@ TEST_F(Program, LibraryMessagesBecomeTheCause) {
     EXPECT_EQ(result.err.find("libdvs:"), std::string::npos);
 }
 
-TEST_F(Program, FailingOutputIsAFailure) {
+TEST_F(Program, FailsWhenItsOutputFails) {
     for (const char *verb : {"show", "verify", "hexdump"}) {
         const Result full = RunProgram({.args = {verb, At("a.db")}, .outPath = "/dev/full"});
         EXPECT_EQ(full.status, 1) << verb;
@@ -192,19 +192,19 @@ TEST_F(Program, FailingOutputIsAFailure) {
     EXPECT_EQ(RunProgram({.args = {"copy", At("a.db"), "json:-"}, .outPath = "/dev/full"}).status, 1);
 }
 
-TEST_F(Program, FailingOutputOfAnErrorKeepsItsStatus) {
+TEST_F(Program, FailedOutputOfAnErrorKeepsTheStatus) {
     const Result result = RunProgram({.args = {"show", At("absent.db"), "--json"}, .outPath = "/dev/full"});
     EXPECT_EQ(result.status, 1);
     EXPECT_NE(result.err.find("does not exist"), std::string::npos)
-        << "people are told when programs cannot be";
+        << "the message still goes to standard error";
 }
 
-TEST_F(Program, ClosedOutputIsNeverTheFileOpenedNext) {
+TEST_F(Program, ClosedOutputIsNeverReusedForAFile) {
     // With descriptor 1 free, the next open would get it, and results would be written into the state.
     const std::string before = Get("a.db");
     EXPECT_EQ(RunProgram({.args = {"copy", At("a.db"), At("b.db")}, .outPath = "-"}).status, 1);
     EXPECT_EQ(Get("a.db"), before);
-    EXPECT_EQ(Get("b.db"), before) << "the copy itself was made";
+    EXPECT_EQ(Get("b.db"), before) << "the copy itself succeeds";
 }
 
 TEST_F(Program, EscapesArgumentsInErrors) {

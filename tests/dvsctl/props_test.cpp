@@ -39,14 +39,14 @@ TEST_F(Props, ExplainsAProperty) {
     EXPECT_TRUE(Has(out, "trunk_vlan_ids[].start")) << out;
 }
 
-TEST_F(Props, NamesTypedFieldsAsTheyAreWritten) {
+TEST_F(Props, NamesTypedFieldsAsInDocuments) {
     const std::string out = Dvsctl({"props", "com.orbeno.etherswitch.port.vlan"}).out;
     EXPECT_TRUE(Has(out, "\nvlan_id                 uint16, 0 to 4095 ")) << out;
     EXPECT_TRUE(Has(out, "\ntrunk_vlan_ids[].end    uint16, 0 to 4095, never left out ")) << out;
     EXPECT_TRUE(Has(Dvsctl({"props", "com.orbeno.etherswitch.cdp"}).out, "protocol spoken: CDP, LLDP"));
 }
 
-TEST_F(Props, EveryExampleIsAValueOfItsProperty) {
+TEST_F(Props, EveryExampleIsAValidValue) {
     const auto document = Json(Dvsctl({"props", "*", "--json"}));
     for (const auto &property : document.at("properties").as_array()) {
         const std::string name(property.at("name").as_string());
@@ -63,7 +63,7 @@ TEST_F(Props, EveryExampleIsAValueOfItsProperty) {
     }
 }
 
-TEST_F(Props, TakesPatterns) {
+TEST_F(Props, AcceptsPatterns) {
     const std::string out = Dvsctl({"props", "*.port.vlan"}).out;
     EXPECT_TRUE(Has(out, "com.orbeno.etherswitch.port.vlan"));
     EXPECT_TRUE(Has(out, "com.orbeno.vswitch.port.vlan"));
@@ -82,7 +82,7 @@ TEST_F(Props, JsonHasLayoutAndTypedForm) {
     EXPECT_EQ(property.at("typed").at("members").at(1).at("unit"), "bit/s");
 }
 
-TEST_F(Props, AnUnknownNameIsNotThere) {
+TEST_F(Props, ReturnsNotFoundForAnUnknownName) {
     EXPECT_EQ(Dvsctl({"props", "com.example.unknown"}).status, 4);
     EXPECT_EQ(Dvsctl({"props", "DEFAULT"}).status, 4);
     const Result lenient = Dvsctl({"props", "com.example.unknown", "--if-exists", "--json"});

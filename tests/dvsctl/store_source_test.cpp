@@ -18,7 +18,7 @@ constexpr bool kMemoryCounts = false; // a sanitizer's own bookkeeping dominates
 constexpr bool kMemoryCounts = true;
 #endif
 
-TEST_F(StoreSource, ReadOfAStoreThatIsNotThereIsAnErrorAndMakesNone) {
+TEST_F(StoreSource, ReadOfAMissingStoreFailsAndCreatesNone) {
     for (const char *verb : {"show", "verify"}) {
         const Result result = Ctl({verb, "store:"});
         EXPECT_EQ(result.status, 7);
@@ -49,7 +49,7 @@ TEST_F(StoreSource, PathNamesAnotherStore) {
     EXPECT_EQ(Ctl({"show", "store::memory:"}).status, 2);
 }
 
-TEST_F(StoreSource, ShowPrintsTypedFieldsAndBytesWhenAsked) {
+TEST_F(StoreSource, ShowPrintsTypedFieldsAndBytesOnRequest) {
     Save();
     const Result typed = Ctl({"show", "store:", "--switch", "alpha"});
     EXPECT_EQ(typed.status, 0);
@@ -66,14 +66,14 @@ TEST_F(StoreSource, ShowPrintsTypedFieldsAndBytesWhenAsked) {
     EXPECT_TRUE(found);
 }
 
-TEST_F(StoreSource, DryRunMakesNoStore) {
+TEST_F(StoreSource, DryRunCreatesNoStore) {
     const Result planned = Ctl({"copy", At("site.db"), "store:", "--dry-run"});
     EXPECT_EQ(planned.status, 0);
     EXPECT_NE(planned.out.find("+ switch alpha"), std::string::npos) << planned.out;
     EXPECT_EQ(Files(), std::vector<std::string>{"site.db"});
 }
 
-TEST_F(StoreSource, DryRunShowsWhatTheSaveWouldChangeAndLeavesTheFileAlone) {
+TEST_F(StoreSource, DryRunShowsTheChangesAndKeepsTheFile) {
     Save();
     PutState("changed.db", Site("db"));
     const std::string before = Get("store.db");
@@ -86,7 +86,7 @@ TEST_F(StoreSource, DryRunShowsWhatTheSaveWouldChangeAndLeavesTheFileAlone) {
     EXPECT_EQ(Get("store.db"), before);
 }
 
-TEST_F(StoreSource, SwitchSavesOneAndTouchesNoOther) {
+TEST_F(StoreSource, SwitchOptionSavesOneSwitchOnly) {
     Save();
     ASSERT_EQ(Ctl({"store", "delete", "beta"}).status, 0);
     PutState("changed.db", Site("db"));
@@ -95,7 +95,7 @@ TEST_F(StoreSource, SwitchSavesOneAndTouchesNoOther) {
     EXPECT_NE(Document("alpha").find("\"web\""), std::string::npos);
 }
 
-TEST_F(StoreSource, SwitchThatTheSourceLacksIsNotThereAndDeletesNothing) {
+TEST_F(StoreSource, SwitchMissingInTheSourceFailsAndDeletesNothing) {
     Save();
     const std::string before = Get("store.db");
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store:", "--switch", "gamma"}).status, 4);
@@ -103,14 +103,14 @@ TEST_F(StoreSource, SwitchThatTheSourceLacksIsNotThereAndDeletesNothing) {
     EXPECT_EQ(Get("store.db"), before);
 }
 
-TEST_F(StoreSource, NoReplaceLooksAtTheSwitchesThatTheStoreHolds) {
+TEST_F(StoreSource, NoReplaceChecksTheStoresSwitches) {
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store:", "--switch", "alpha", "--no-replace"}).status, 0);
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store:", "--switch", "beta", "--no-replace"}).status, 0);
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store:", "--switch", "beta", "--no-replace"}).status, 1);
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store:", "--no-replace"}).status, 1);
 }
 
-TEST_F(StoreSource, DamagedStateIsRefusedAndTheStoreUntouched) {
+TEST_F(StoreSource, RejectsADamagedStateAndKeepsTheStore) {
     Save();
     const std::string before = Get("store.db");
     std::string damaged = Get("site.db");
@@ -122,7 +122,7 @@ TEST_F(StoreSource, DamagedStateIsRefusedAndTheStoreUntouched) {
     EXPECT_EQ(Get("store.db"), before);
 }
 
-TEST_F(StoreSource, ValueThatTheStoreCannotExpressIsRefusedWithItsCause) {
+TEST_F(StoreSource, RejectsAValueThatTheStoreCannotExpress) {
     Save();
     const std::string before = Document();
     // A version is a number of four bytes.
@@ -138,7 +138,7 @@ TEST_F(StoreSource, ValueThatTheStoreCannotExpressIsRefusedWithItsCause) {
     EXPECT_EQ(Document(), before);
 }
 
-TEST_F(StoreSource, DesiredIsReadBesideTheCurrentAndNotWritten) {
+TEST_F(StoreSource, DesiredIsReadSeparatelyAndNotWritten) {
     Save();
     const Result uneven = Ctl({"show", "store-desired:"});
     EXPECT_EQ(uneven.status, 7);
@@ -152,7 +152,7 @@ TEST_F(StoreSource, DesiredIsReadBesideTheCurrentAndNotWritten) {
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store-desired:", "--dry-run"}).status, 2);
 }
 
-TEST_F(StoreSource, SaveThatMakesTheStoreUnloadableSaysSoAndHowToMendIt) {
+TEST_F(StoreSource, SaveThatMakesTheStoreUnloadableSuggestsAFix) {
     PutState("bare.db", EncodeList(std::vector<NewEntry>{MakeSwitch("bare one", {}, {}, {})}));
     for (const char *mode : {"--dry-run", "--may-exist"}) {
         const Result saved = Ctl({"copy", At("bare.db"), "store:", mode, "--quiet"});
@@ -175,7 +175,7 @@ TEST_F(StoreSource, SaveThatMakesTheStoreUnloadableSaysSoAndHowToMendIt) {
     EXPECT_FALSE(Json(Ctl({"copy", At("site.db"), "store:", "--json"})).as_object().contains("warnings"));
 }
 
-TEST_F(StoreSource, LoadThatGivesNothingIsAFailure) {
+TEST_F(StoreSource, LoadWithoutABufferIsAFailure) {
     Save();
     std::string document = Document();
     const std::size_t at = document.find("\"forwarding_class\"");
@@ -191,7 +191,7 @@ TEST_F(StoreSource, LoadThatGivesNothingIsAFailure) {
 }
 
 // This bounds the memory of a save with a host's maximum number of ports.
-TEST_F(StoreSource, CopyTakesFewTimesTheStatesSize) {
+TEST_F(StoreSource, CopyMemoryIsAFewTimesTheStatesSize) {
     const long idle = Ctl({"--version"}).peakKilobytes;
     const char *const ports = kMemoryCounts ? "2048" : "64";
     ASSERT_EQ(Ctl({"generate", At("large.db"), "--switches", "1", "--ports", ports}).status, 0);
@@ -206,7 +206,7 @@ TEST_F(StoreSource, CopyTakesFewTimesTheStatesSize) {
 }
 
 // Traces are for --verbose: a load that is followed builds every list apart.
-TEST_F(StoreSource, TheLibraryTracesOnlyWhenAsked) {
+TEST_F(StoreSource, LibraryTracesOnlyOnRequest) {
     const Result quiet = Ctl({"copy", At("site.db"), "store:"});
     EXPECT_EQ(quiet.err.find("SaveDVS"), std::string::npos) << quiet.err;
     const Result verbose = Ctl({"copy", At("site.db"), "store:", "--verbose"});

@@ -47,7 +47,7 @@ protected:
     }
 };
 
-TEST_F(StoreTrouble, AnotherWriterIsBusyOnceTheTimeIsOver) {
+TEST_F(StoreTrouble, FailsAsBusyAfterTheTimeout) {
     Save();
     const std::string document = Document();
     const Database other = OpenDatabase(store_);
@@ -77,12 +77,12 @@ TEST_F(StoreTrouble, WaitingIsShownOnATerminalOnly) {
     EXPECT_EQ(shown.status, 8);
     EXPECT_NE(shown.out.find("\rwaiting for other writers of " + store_ + ": "), std::string::npos)
         << shown.out;
-    EXPECT_NE(shown.out.find("\r\x1b[K"), std::string::npos) << "and taken away again: " << shown.out;
+    EXPECT_NE(shown.out.find("\r\x1b[K"), std::string::npos) << "the line must be erased: " << shown.out;
     EXPECT_EQ(Ctl(verb).err.find("waiting"), std::string::npos);
     Sql(other, "ROLLBACK");
 }
 
-TEST_F(StoreTrouble, ForeignDatabaseIsRefusedAndLeftAlone) {
+TEST_F(StoreTrouble, RejectsAForeignDatabaseUnchanged) {
     {
         const Database foreign = OpenDatabase(store_);
         Sql(foreign, "CREATE TABLE mail (text TEXT)");
@@ -92,7 +92,7 @@ TEST_F(StoreTrouble, ForeignDatabaseIsRefusedAndLeftAlone) {
     EXPECT_EQ(Get("store.db"), before);
 }
 
-TEST_F(StoreTrouble, NewerDatabaseIsRefusedAndLeftAlone) {
+TEST_F(StoreTrouble, RejectsANewerDatabaseUnchanged) {
     Save();
     {
         const Database db = OpenDatabase(store_);
@@ -103,19 +103,19 @@ TEST_F(StoreTrouble, NewerDatabaseIsRefusedAndLeftAlone) {
     EXPECT_EQ(Get("store.db"), before);
 }
 
-TEST_F(StoreTrouble, FileThatIsNoDatabaseIsRefused) {
+TEST_F(StoreTrouble, RejectsAFileThatIsNotADatabase) {
     Put("store.db", std::string(4096, 'x'));
     ExpectStoreError("store.db");
     EXPECT_EQ(Get("store.db"), std::string(4096, 'x'));
 }
 
-TEST_F(StoreTrouble, LinkIsRefused) {
+TEST_F(StoreTrouble, RejectsALink) {
     Save();
     ASSERT_EQ(symlink(store_.c_str(), At("link.db").c_str()), 0);
     EXPECT_EQ(Ctl({"show", "store:" + At("link.db")}).status, 7);
 }
 
-TEST_F(StoreTrouble, CheckAndVerifyNameADocumentThatBreaksTheSchema) {
+TEST_F(StoreTrouble, CheckAndVerifyNameADocumentThatViolatesTheSchema) {
     Save();
     {
         const Database db = OpenDatabase(store_);
@@ -158,7 +158,7 @@ const UnsoundRow kUnsound[] = {
      [](const std::string &) { return StateOf(33); }},
 };
 
-TEST_F(StoreTrouble, WhatAPlainSaveOfAnUnsoundBufferLostComesBackAndACheckedOneLosesNothing) {
+TEST_F(StoreTrouble, RestoreUndoesAPlainSaveOfAnInvalidBuffer) {
     Save();
     const std::string alpha = Document("alpha"), beta = Document("beta");
     ASSERT_EQ(setenv("DVS_CONFIGSTORE", store_.c_str(), 1), 0);
@@ -184,7 +184,7 @@ TEST_F(StoreTrouble, WhatAPlainSaveOfAnUnsoundBufferLostComesBackAndACheckedOneL
     }
 }
 
-TEST_F(StoreTrouble, FullDiskLeavesTheOldContent) {
+TEST_F(StoreTrouble, FullDiskKeepsTheOldContent) {
     Save();
     const std::string document = Document();
     PutState("changed.db", Site("db"));
@@ -203,7 +203,7 @@ TEST_F(StoreTrouble, FullDiskLeavesTheOldContent) {
     EXPECT_GT(refused, 0);
 }
 
-TEST_F(StoreTrouble, NewStoreOnAFullDiskIsAnErrorAndHarmless) {
+TEST_F(StoreTrouble, NewStoreOnAFullDiskFailsCleanly) {
     const Result result = Ctl({"copy", At("site.db"), "store:"},
                               {"LD_PRELOAD=" DVS_FAULT_LIBRARY, "ASAN_OPTIONS=verify_asan_link_order=0",
                                "DVS_FAULT=write:1+:ENOSPC:path=" + Directory()});
@@ -211,7 +211,7 @@ TEST_F(StoreTrouble, NewStoreOnAFullDiskIsAnErrorAndHarmless) {
     EXPECT_EQ(Ctl({"copy", At("site.db"), "store:"}).status, 0); // once there is room
 }
 
-TEST_F(StoreTrouble, SmallSaveShowsNoProgressAndNoneGoesToAFile) {
+TEST_F(StoreTrouble, ShowsNoProgressForSmallSavesOrIntoFiles) {
     const Result result = Ctl({"copy", At("site.db"), "store:"});
     EXPECT_EQ(result.err, "");
     EXPECT_EQ(result.out.find('\r'), std::string::npos);

@@ -11,7 +11,7 @@ using namespace dvs::ctl::test;
 
 using StoreVerbs = StoreProgram;
 
-TEST_F(StoreVerbs, WithoutAStoreTheySaySoAndMakeNone) {
+TEST_F(StoreVerbs, FailWithoutAStoreAndCreateNone) {
     const std::vector<std::vector<std::string>> verbs = {
         {"store", "list"},          {"store", "export", "alpha"},
         {"store", "history"},       {"store", "delete", "alpha"},
@@ -26,7 +26,7 @@ TEST_F(StoreVerbs, WithoutAStoreTheySaySoAndMakeNone) {
     EXPECT_EQ(Files(), std::vector<std::string>{"site.db"});
 }
 
-TEST_F(StoreVerbs, ListIsATableAndADocument) {
+TEST_F(StoreVerbs, ListPrintsATableOrADocument) {
     Save();
     const auto document = Json(Ctl({"store", "list", "--json"}));
     ASSERT_EQ(document.at("objects").as_array().size(), 2u);
@@ -57,7 +57,7 @@ struct BadDocument {
     const char *what, *text, *named;
 };
 
-TEST_F(StoreVerbs, ImportRefusesWithTheFieldAndStoresNothing) {
+TEST_F(StoreVerbs, ImportRejectsWithTheFieldAndStoresNothing) {
     Save();
     const std::string before = Get("store.db");
     const BadDocument cases[] = {
@@ -96,7 +96,7 @@ constexpr bool kMemoryCounts = true;
 #endif
 
 // Applies even to documents with very little text per value.
-TEST_F(StoreVerbs, ImportRefusesWithinTenTimesTheDocumentsSize) {
+TEST_F(StoreVerbs, ImportRejectsWithinTenTimesTheDocumentsSize) {
     constexpr std::size_t size = kMemoryCounts ? 2'000'000 : 100'000;
     const long idle = Dvsctl({"store", "import", At("none.json")}).peakKilobytes;
     std::string ids = R"({"uuid": "alpha", "ports": {"p": {})";
@@ -117,7 +117,7 @@ TEST_F(StoreVerbs, ImportRefusesWithinTenTimesTheDocumentsSize) {
     }
 }
 
-TEST_F(StoreVerbs, ImportAfterWhichTheStoreDoesNotLoadSaysSo) {
+TEST_F(StoreVerbs, ImportWarnsIfTheStoreNoLongerLoads) {
     Save();
     const BadDocument cases[] = {
         {"no id", R"({"name": "a"})", "Failed to get uuid"},
@@ -150,7 +150,7 @@ TEST_F(StoreVerbs, ImportAfterWhichTheStoreDoesNotLoadSaysSo) {
         << other.err;
 }
 
-TEST_F(StoreVerbs, DeleteGoesIntoHistoryAndComesBack) {
+TEST_F(StoreVerbs, DeletedSwitchIsInHistoryAndCanBeRestored) {
     Save();
     const std::string before = Get("store.db"), document = Document();
     EXPECT_NE(Ctl({"store", "delete", "production", "--dry-run"}).out.find("- switch alpha"),
@@ -167,7 +167,7 @@ TEST_F(StoreVerbs, DeleteGoesIntoHistoryAndComesBack) {
     EXPECT_EQ(Document(), document);
 }
 
-TEST_F(StoreVerbs, RestoreBringsBackOneSwitchOrAllInOneRevision) {
+TEST_F(StoreVerbs, RestoresOneSwitchOrAllInOneRevision) {
     Save();
     SaveChange("db");                                      // 2
     ASSERT_EQ(Ctl({"store", "delete", "beta"}).status, 0); // 3
@@ -188,7 +188,7 @@ TEST_F(StoreVerbs, RestoreBringsBackOneSwitchOrAllInOneRevision) {
     EXPECT_EQ(Ctl({"store", "restore", "--revision", "x"}).status, 2);
 }
 
-TEST_F(StoreVerbs, TheSwitchIsAnOperandOrAnOption) {
+TEST_F(StoreVerbs, SwitchIsAnOperandOrAnOption) {
     Save();
     SaveChange("db");
     for (const char *verb : {"history", "restore"}) {
@@ -209,7 +209,7 @@ TEST_F(StoreVerbs, TheSwitchIsAnOperandOrAnOption) {
     }
 }
 
-TEST_F(StoreVerbs, BackupIsAWholeStoreOfItsOwnAndReplacesNothingUnasked) {
+TEST_F(StoreVerbs, BackupIsACompleteStoreAndReplacesNothingByDefault) {
     Save();
     ASSERT_EQ(Ctl({"store", "backup", At("copy.db"), "--dry-run"}).status, 0);
     EXPECT_EQ(Files(), (std::vector<std::string>{"site.db", "store.db"}));
@@ -227,7 +227,7 @@ TEST_F(StoreVerbs, BackupIsAWholeStoreOfItsOwnAndReplacesNothingUnasked) {
     EXPECT_EQ(Ctl({"store", "backup", At("no/such/dir.db")}).status, 7);
 }
 
-TEST_F(StoreVerbs, UpgradeCarriesOverSwitchesWithAPortSetOnly) {
+TEST_F(StoreVerbs, UpgradeKeepsOnlySwitchesWithAPortSet) {
     ASSERT_EQ(Ctl({"store", "upgrade", At("site.db"), "--dry-run"}).status, 0);
     EXPECT_EQ(Files(), std::vector<std::string>{"site.db"});
     ASSERT_EQ(Ctl({"store", "upgrade", At("site.db")}).status, 0);
@@ -238,7 +238,7 @@ TEST_F(StoreVerbs, UpgradeCarriesOverSwitchesWithAPortSetOnly) {
     EXPECT_EQ(Ctl({"store", "upgrade", At("none.db")}).status, 1);
 }
 
-TEST_F(StoreVerbs, SchemaIsWholeOrExplainsAField) {
+TEST_F(StoreVerbs, SchemaPrintsAllOrExplainsAField) {
     EXPECT_NO_THROW((void)Json({0, Dvsctl({"schema"}).out, ""}).at("properties"));
     const std::string vlan = Dvsctl({"schema", "ports.settings.vlan"}).out;
     EXPECT_NE(vlan.find("vlan_id"), std::string::npos);

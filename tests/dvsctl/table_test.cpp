@@ -25,13 +25,13 @@ std::string Render(const Options &options) {
     return testing::internal::GetCapturedStdout();
 }
 
-TEST(Table, AlignsByWhatIsSeen) {
+TEST(Table, AlignsByVisibleWidth) {
     EXPECT_EQ(Render({}), "NAME    SIZE\n"
                           "a          1\n"
                           "Zürich  1000\n");
 }
 
-TEST(Table, ShowsTheColumnsAskedForInTheirOrder) {
+TEST(Table, PrintsTheRequestedColumnsInOrder) {
     Options options;
     options.columns = "extra,name";
     EXPECT_EQ(Render(options), "EXTRA  NAME\n"
@@ -39,14 +39,14 @@ TEST(Table, ShowsTheColumnsAskedForInTheirOrder) {
                                "       Zürich\n");
 }
 
-TEST(Table, LeavesHeadingsOut) {
+TEST(Table, CanOmitHeadings) {
     Options options;
     options.noHeadings = true;
     options.columns = "size";
     EXPECT_EQ(Render(options), "   1\n1000\n");
 }
 
-TEST(Table, RefusesAnUnknownColumn) {
+TEST(Table, RejectsAnUnknownColumn) {
     for (const char *columns : {"nmae", "", "name,", ",name", "name,,size"}) {
         Options options;
         options.columns = columns;

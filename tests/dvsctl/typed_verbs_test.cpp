@@ -43,7 +43,7 @@ protected:
     }
 };
 
-TEST_F(Typed, ShowSaysWhatPropertiesMean) {
+TEST_F(Typed, ShowPrintsMeanings) {
     const std::string out = Dvsctl({"show", At("site.db")}).out;
     EXPECT_TRUE(Has(out, "trunk 1-10,20-30")) << out;
     EXPECT_TRUE(Has(out, "average 1 Mbit/s, peak 2 Mbit/s")) << out;
@@ -51,13 +51,13 @@ TEST_F(Typed, ShowSaysWhatPropertiesMean) {
     EXPECT_TRUE(Has(out, "notify_switches")) << out;
 }
 
-TEST_F(Typed, ShowGivesBytesOnDemand) {
+TEST_F(Typed, ShowPrintsBytesOnRequest) {
     const std::string out = Dvsctl({"show", At("site.db"), "--raw"}).out;
     EXPECT_FALSE(Has(out, "trunk"));
     EXPECT_TRUE(Has(out, "01 00 00 00 00 00 02 00 01 00 0a 00 14 00 1e 00")) << out;
 }
 
-TEST_F(Typed, ShowGivesTheReasonBesideDamagedBytes) {
+TEST_F(Typed, ShowPrintsTheReasonWithDamagedBytes) {
     PutState(
         "broken.db",
         EncodeList(std::vector<dvs::form::NewEntry>{MakeSwitch(
@@ -69,7 +69,7 @@ TEST_F(Typed, ShowGivesTheReasonBesideDamagedBytes) {
     EXPECT_TRUE(Has(text.out, "does not fit: at byte 3")) << text.out;
 }
 
-TEST_F(Typed, ShowInJsonIsASourceToo) {
+TEST_F(Typed, ShowInJsonIsAValidSource) {
     const Result shown = Dvsctl({"show", At("site.db"), "--json"});
     const auto document = Json(shown);
     const auto &property = document.at("switches").at(0).at("ports").at(0).at("properties").at(0);
@@ -80,7 +80,7 @@ TEST_F(Typed, ShowInJsonIsASourceToo) {
     EXPECT_EQ(Dvsctl({"diff", At("site.db"), "json:" + At("shown.json")}).status, 0);
 }
 
-TEST_F(Typed, CopiesComeBackByteForByte) {
+TEST_F(Typed, CopiesRoundTripByteForByte) {
     for (const bool raw : {false, true}) {
         std::vector<std::string> args = {"copy", At("site.db"), "json:" + At("back.json")};
         if (raw) args.emplace_back("--raw");
@@ -91,7 +91,7 @@ TEST_F(Typed, CopiesComeBackByteForByte) {
     }
 }
 
-TEST_F(Typed, TheExampleSiteIsTypedAndComesBack) {
+TEST_F(Typed, ExampleSiteIsTypedAndRoundTrips) {
     const std::string example = "json:" DVS_SOURCE_DIR "/examples/site.json";
     ASSERT_EQ(Dvsctl({"copy", example, At("example.db")}).status, 0);
     ASSERT_EQ(Dvsctl({"copy", At("example.db"), "json:" + At("typed.json")}).status, 0);
@@ -114,7 +114,7 @@ TEST_F(Typed, DiffComparesFieldByField) {
     EXPECT_FALSE(Has(diff.out, "reverse_policy")) << diff.out;
 }
 
-TEST_F(Typed, DiffNamesTheRecordsFieldWhereTheMeaningIsTheSame) {
+TEST_F(Typed, DiffNamesTheRecordsFieldIfMeaningsAreEqual) {
     for (const auto &[name, reserved] : {std::pair("a.db", "\0\0"s), std::pair("b.db", "\1\0"s)})
         PutState(name, EncodeList(std::vector<dvs::form::NewEntry>{MakeSwitch(
                            "s", {}, {},
@@ -126,7 +126,7 @@ TEST_F(Typed, DiffNamesTheRecordsFieldWhereTheMeaningIsTheSame) {
     EXPECT_TRUE(Has(diff.out, "~ reserved of the record: ")) << diff.out;
 }
 
-TEST_F(Typed, DiffNamesTheSizeWhereNothingElseDiffers) {
+TEST_F(Typed, DiffNamesTheSizeIfNothingElseDiffers) {
     for (const auto &[name, value] : {std::pair("a.db", "true\0"s), std::pair("b.db", "true\0f"s)})
         PutState(name,
                  EncodeList(std::vector<dvs::form::NewEntry>{MakeSwitch(
@@ -138,7 +138,7 @@ TEST_F(Typed, DiffNamesTheSizeWhereNothingElseDiffers) {
     EXPECT_TRUE(Has(diff.out, "~ size of the record: 5 -> 6 bytes")) << diff.out;
 }
 
-TEST_F(Typed, DiffSaysBothMeanings) {
+TEST_F(Typed, DiffPrintsBothMeanings) {
     Edited("{\"start\": 20, \"end\": 30}", "{\"start\": 40, \"end\": 40}");
     const std::string out = Dvsctl({"diff", At("site.db"), At("edited.db")}).out;
     EXPECT_TRUE(Has(out, "trunk 1-10,20-30 -> trunk 1-10,40")) << out;
@@ -153,7 +153,7 @@ TEST_F(Typed, DiffSaysBothMeanings) {
     EXPECT_TRUE(change.at("before").is_object());
 }
 
-TEST_F(Typed, ARefusedFieldIsNamedAndNothingIsWritten) {
+TEST_F(Typed, RejectedFieldIsNamedAndNothingIsWritten) {
     std::string text = kSite;
     text.replace(text.find("1000000"), 7, "\"1M\"");
     Put("wrong.json", text);

@@ -63,12 +63,12 @@ TEST_F(Verbs, ShowFindsSwitchesAndPortsByIdAndAlias) {
     EXPECT_EQ(byAlias.out.find("shadow of 1"), std::string::npos);
     EXPECT_NE(byAlias.out.find("switch alpha"), std::string::npos);
     EXPECT_NE(byAlias.out.find("\"production\""), std::string::npos)
-        << "the alias is shown, whatever else is not";
+        << "the alias is always shown";
     EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", "beta", "--port", "1"}).status, 4);
-    EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", ""}).status, 4) << "no alias is no empty alias";
+    EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", ""}).status, 4) << "no alias is not an empty alias";
 }
 
-TEST_F(Verbs, ShowKeepsMatchingProperties) {
+TEST_F(Verbs, ShowFiltersPropertiesByPattern) {
     EXPECT_EQ(
         Dvsctl({"show", At("a.db"), "--props", "*.mtu", "--columns", "switch,port,list,name,value"}).out,
         "SWITCH  PORT  LIST    NAME   VALUE\n"
@@ -76,7 +76,7 @@ TEST_F(Verbs, ShowKeepsMatchingProperties) {
         "beta    9     port    x.mtu  1500\n");
 }
 
-TEST_F(Verbs, ShowOfNothingIsNoErrorWhenAllowed) {
+TEST_F(Verbs, ShowOfNothingSucceedsWhenAllowed) {
     EXPECT_EQ(Dvsctl({"show", At("a.db"), "--switch", "x", "--if-exists", "-q"}).out, "");
     const auto filtered = Json(Dvsctl({"show", At("a.db"), "--switch", "x", "--if-exists", "--json"}));
     EXPECT_EQ(filtered.at("switches"), boost::json::array());
@@ -85,7 +85,7 @@ TEST_F(Verbs, ShowOfNothingIsNoErrorWhenAllowed) {
     EXPECT_EQ(Json(absent).at("switches"), boost::json::array());
 }
 
-TEST_F(Verbs, ShowAsJsonIsAnInputAgain) {
+TEST_F(Verbs, ShowAsJsonIsValidInput) {
     const Result shown = Dvsctl({"show", At("a.db"), "--json"});
     EXPECT_EQ(Json(shown).at("switches").at(0).at("ports").at(2).at("kind"), "shadow");
     Put("shown.json", shown.out);
@@ -99,7 +99,7 @@ TEST_F(Verbs, ShowWorksOnAnEmptyState) {
     EXPECT_EQ(Json(Dvsctl({"show", At("empty.db"), "--json"})).at("switches"), boost::json::array());
 }
 
-TEST_F(Verbs, VerifyCountsWhatIsSound) {
+TEST_F(Verbs, VerifyCountsValidEntries) {
     const Result result = Dvsctl({"verify", At("a.db")});
     EXPECT_EQ(result.status, 0);
     const auto size = std::to_string(Get("a.db").size());
@@ -111,7 +111,7 @@ TEST_F(Verbs, VerifyCountsWhatIsSound) {
     EXPECT_FALSE(json.as_object().contains("error"));
 }
 
-TEST_F(Verbs, VerifyWarnsOfMoreSwitchesThanAnyTableHolds) {
+TEST_F(Verbs, VerifyWarnsOfTooManySwitches) {
     std::vector<dvs::form::NewEntry> switches;
     for (int i = 0; i < 32; ++i)
         switches.push_back(MakeSwitch("s" + std::to_string(i), {}, {}, {}));
@@ -121,7 +121,7 @@ TEST_F(Verbs, VerifyWarnsOfMoreSwitchesThanAnyTableHolds) {
     switches.push_back(MakeSwitch("one too many", {}, {}, {}));
     PutState("over.db", dvs::form::EncodeList(switches));
     const Result result = Dvsctl({"verify", At("over.db")});
-    EXPECT_EQ(result.status, 0) << "its bytes are sound";
+    EXPECT_EQ(result.status, 0) << "its bytes are valid";
     EXPECT_NE(result.err.find("warning: no host loads this state"), std::string::npos) << result.err;
     EXPECT_EQ(Json(Dvsctl({"verify", At("over.db"), "--json"})).at("warnings").as_array().size(), 1u);
 }
@@ -147,7 +147,7 @@ TEST_F(Verbs, VerifyNamesTheInnermostFault) {
     EXPECT_GT(json.at("error").at("offset").as_int64(), 0);
 }
 
-TEST_F(Verbs, VerifyJudgesTheFileToo) {
+TEST_F(Verbs, VerifyChecksTheFileToo) {
     const Buffer state = SmallState();
     Put("raw.db", {reinterpret_cast<const char *>(state.data()), state.size()});
     const Result result = Dvsctl({"verify", At("raw.db")});
@@ -158,7 +158,7 @@ TEST_F(Verbs, VerifyJudgesTheFileToo) {
     EXPECT_NE(Dvsctl({"verify", At("empty.db")}).out.find("the file is empty"), std::string::npos);
 }
 
-TEST_F(Verbs, DiffPrintsWhatDiffers) {
+TEST_F(Verbs, DiffPrintsDifferences) {
     Put("b.json",
         R"({"switches": [{"id": "beta", "version": 10, "class": "vswitch", "max_ports": 512, "global": [],
         "host": [], "ports": [{"id": "9", "properties": [{"name": "x.mtu", "value": 9000}]}]}]})");
@@ -190,12 +190,13 @@ TEST_F(Verbs, DiffOfEqualStatesIsEmpty) {
     EXPECT_EQ(Json(result).at("changes"), boost::json::array());
 }
 
-TEST_F(Verbs, DiffNarrowsDown) {
+TEST_F(Verbs, DiffFilters) {
     Put("b.json", R"({"switches": []})");
     const std::string b = "json:" + At("b.json");
     EXPECT_EQ(Dvsctl({"diff", At("a.db"), b, "--switch", "beta"}).status, 1)
-        << "on one side only: a difference";
-    EXPECT_EQ(Dvsctl({"diff", At("a.db"), b, "--switch", "gamma"}).status, 4) << "on neither side";
+        << "a switch on one side only is a difference";
+    EXPECT_EQ(Dvsctl({"diff", At("a.db"), b, "--switch", "gamma"}).status, 4)
+        << "a switch on neither side is an error";
     EXPECT_EQ(Dvsctl({"diff", b, At("a.db"), "--switch", "beta"}).status, 1);
     EXPECT_EQ(Dvsctl({"diff", b, b, "--switch", "gamma", "--if-exists"}).status, 0);
 }
@@ -228,7 +229,7 @@ TEST_F(Verbs, HexdumpFindsSwitchesAndPortsByIdAndAlias) {
     EXPECT_EQ(Dvsctl({"hexdump", At("a.db"), "--switch", "gamma", "--if-exists"}).out, "");
 }
 
-TEST_F(Verbs, HexdumpGoesUpToAFaultAndBehindIt) {
+TEST_F(Verbs, HexdumpContinuesAfterAFault) {
     Put("cut.db", Get("a.db").substr(0, 700));
     const Result result = Dvsctl({"hexdump", At("cut.db")});
     EXPECT_EQ(result.status, 6);

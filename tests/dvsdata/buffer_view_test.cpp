@@ -31,7 +31,7 @@ void ExpectFault(const Buffer &buffer, FaultKind kind, std::size_t offset, std::
     EXPECT_EQ(fault.expected, expected);
 }
 
-TEST(BufferView, GivesHeaderAndEntriesOfEveryType) {
+TEST(BufferView, ReturnsHeaderAndEntriesOfEveryType) {
     const ExactBlock block(Two());
     BufferView view(block.bytes());
     EXPECT_EQ(view.Header().totalLength, 312u);
@@ -72,7 +72,7 @@ TEST(BufferView, RewindsToTheFirstEntry) {
     EXPECT_FALSE(view.AtEnd());
 }
 
-TEST(BufferView, CountsNestedOffsetsFromTheOutermostBytes) {
+TEST(BufferView, NestedOffsetsCountFromTheOutermostBuffer) {
     const Buffer inner = SerializedOf({{"inner", "1"}});
     const Buffer outer = SerializedOf({{"x", ""}, {"outer", std::string(inner.begin(), inner.end())}});
     const ExactBlock block(outer);
@@ -88,7 +88,7 @@ TEST(BufferView, CountsNestedOffsetsFromTheOutermostBytes) {
     EXPECT_EQ(outer[entry.ValueOffset()], '1');
 }
 
-TEST(BufferView, FindsEachFaultAtItsByte) {
+TEST(BufferView, ReportsEachFaultAtItsByte) {
     ExpectFault(Two(), FaultKind::None, static_cast<std::size_t>(-1000), 0, 0);
     ExpectFault(Buffer(15), FaultKind::TooShort, 15, 15, 16);
     ExpectFault({}, FaultKind::TooShort, 0, 0, 16);
@@ -116,7 +116,7 @@ TEST(BufferView, FindsEachFaultAtItsByte) {
     ExpectFault(buffer, FaultKind::NoMarker, 310, 2, 4);
 }
 
-TEST(BufferView, DescribesFaultsInWordsAndNumbers) {
+TEST(BufferView, DescribesFaultsInText) {
     char text[128];
     const Fault fault{FaultKind::Checksum, 4, 0xab, 0xcd};
     EXPECT_TRUE(fault.Describe(text));
@@ -130,7 +130,7 @@ TEST(BufferView, DescribesFaultsInWordsAndNumbers) {
     EXPECT_FALSE(fault.Describe({}));
 }
 
-TEST(BufferView, WalksAnywayBehindAWrongVersionOrChecksum) {
+TEST(BufferView, CanWalkPastAWrongVersionOrChecksum) {
     Buffer buffer = Two();
     buffer[8] = 3;
     buffer[100] ^= 1;
@@ -148,7 +148,7 @@ TEST(BufferView, WalksAnywayBehindAWrongVersionOrChecksum) {
     EXPECT_FALSE(view.Next(&entry)); // The fault is reported again.
 }
 
-TEST(BufferView, DoesNotWalkBehindAWrongLength) {
+TEST(BufferView, DoesNotWalkPastAWrongLength) {
     Buffer buffer = Two();
     SetU32(&buffer, 0, 5000);
     const ExactBlock block(buffer);
@@ -159,7 +159,7 @@ TEST(BufferView, DoesNotWalkBehindAWrongLength) {
     EXPECT_EQ(BufferView().Header().totalLength, 0u);
 }
 
-TEST(BufferView, CutsNamesLikeAList) {
+TEST(BufferView, TruncatesNamesLikeAList) {
     Buffer buffer = SerializedOf({{std::string(127, 'n'), "1"}});
     buffer[16 + 127] = 'n';
     Mend(&buffer);

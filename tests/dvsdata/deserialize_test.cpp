@@ -119,7 +119,7 @@ protected:
 INSTANTIATE_TEST_SUITE_P(Damage, BadBuffers, testing::ValuesIn(kBad),
                          [](const auto &each) { return std::string(each.param.name); });
 
-TEST_P(BadBuffers, AreRefusedWithoutALeftover) {
+TEST_P(BadBuffers, AreRejectedWithoutALeak) {
     const Buffer buffer = Damaged();
     ResetHeap();
     const Messages messages(0);
@@ -130,7 +130,7 @@ TEST_P(BadBuffers, AreRefusedWithoutALeftover) {
     EXPECT_EQ(Heap().Live(), 0u);
 }
 
-TEST_P(BadBuffers, AreRefusedAlikeByListsInOneBlock) {
+TEST_P(BadBuffers, AreRejectedAlikeByListsInOneBlock) {
     const Buffer buffer = Damaged();
     ResetHeap();
     const Messages messages(0);
@@ -141,7 +141,7 @@ TEST_P(BadBuffers, AreRefusedAlikeByListsInOneBlock) {
     EXPECT_EQ(Heap().Live(), 0u);
 }
 
-TEST_P(BadBuffers, GiveSingleValuesAsFarAsTheyCan) {
+TEST_P(BadBuffers, ReturnSingleValuesThatAreStillReadable) {
     const ExactBlock block(Damaged());
     const Messages messages(0);
     char value[4096];
@@ -153,7 +153,7 @@ TEST_P(BadBuffers, GiveSingleValuesAsFarAsTheyCan) {
         EXPECT_EQ(messages.All().size(), 1u);
 }
 
-TEST(DataDeserialize, NamesBothChecksums) {
+TEST(DataDeserialize, MessageNamesBothChecksums) {
     Buffer buffer = SerializedOf({{"a", "1234"}});
     const std::uint32_t right = U32At(buffer, 4);
     SetU32(&buffer, 4, 0xabcd);
@@ -164,7 +164,7 @@ TEST(DataDeserialize, NamesBothChecksums) {
     EXPECT_EQ(messages.All(), Texts{expected});
 }
 
-TEST(DataDeserialize, AnyChangedByteFromOffset32OnIsABadChecksum) {
+TEST(DataDeserialize, RejectsAnyChangedByteFromOffset32) {
     const Buffer written = SerializedOf(kTwo);
     for (std::size_t i = 32; i < written.size(); ++i) {
         Buffer buffer = written;
@@ -173,7 +173,7 @@ TEST(DataDeserialize, AnyChangedByteFromOffset32OnIsABadChecksum) {
     }
 }
 
-TEST(DataDeserialize, ReservedBytesAndTheFirstNamesBeginningAreNotSummed) {
+TEST(DataDeserialize, ChecksumExcludesReservedBytesAndStartOfFirstName) {
     const Buffer written = SerializedOf(kTwo);
     for (const std::size_t i : {10u, 11u, 16u, 17u, 20u, 31u}) {
         Buffer buffer = written;
@@ -182,7 +182,7 @@ TEST(DataDeserialize, ReservedBytesAndTheFirstNamesBeginningAreNotSummed) {
     }
 }
 
-TEST(DataDeserialize, LengthsAreJudgedBeforeTheChecksum) {
+TEST(DataDeserialize, ChecksLengthsBeforeTheChecksum) {
     for (const std::uint32_t length : {0u, 8u, 15u, 313u, 0xffffffffu}) {
         Buffer buffer = SerializedOf(kTwo);
         SetU32(&buffer, 0, length);
@@ -212,7 +212,7 @@ TEST(DataDeserialize, WithPropTypeKeepsTypesThatShareABit) {
     EXPECT_TRUE(ContentOf(Read(buffer, 0).second).empty());
 }
 
-TEST(DataDeserialize, IgnoresWhatLiesBehindLengthAndMarker) {
+TEST(DataDeserialize, IgnoresBytesAfterLengthAndMarker) {
     Buffer buffer = SerializedOf(kTwo);
     buffer.insert(buffer.end(), 40, 0xcc);
     EXPECT_EQ(ContentOf(Read(buffer).second), kTwo); // after the header's length
@@ -221,7 +221,7 @@ TEST(DataDeserialize, IgnoresWhatLiesBehindLengthAndMarker) {
     EXPECT_EQ(ContentOf(Read(buffer).second), kTwo); // after the marker
 }
 
-TEST(DataDeserialize, TakesOddLengthsAndSizes) {
+TEST(DataDeserialize, AcceptsOddLengthsAndSizes) {
     Buffer buffer = SerializedOf({{"a", "1234"}});
     buffer.insert(buffer.begin() + 160, 1, 0x77); // One extra byte of padding: entry size 149.
     SetU32(&buffer, 0, 165);
@@ -233,7 +233,7 @@ TEST(DataDeserialize, TakesOddLengthsAndSizes) {
     EXPECT_EQ(list->serialSize, 164u);
 }
 
-TEST(DataDeserialize, CutsANameWithoutAnEnd) {
+TEST(DataDeserialize, TruncatesAnUnterminatedName) {
     Buffer buffer = SerializedOf({{std::string(127, 'n'), "1234"}});
     buffer[16 + 127] = 'n';
     Mend(&buffer);
@@ -242,7 +242,7 @@ TEST(DataDeserialize, CutsANameWithoutAnEnd) {
     EXPECT_EQ(ContentOf(list), (Props{{std::string(127, 'n'), "1234"}}));
 }
 
-TEST(DataDeserialize, WritesZerosForWhatAForeignBufferLeftOpen) {
+TEST(DataDeserialize, ZeroesUnusedBytesOfAForeignBuffer) {
     const Props props{{"ab", "12345"}};
     Buffer buffer = SerializedOf(props);
     for (std::size_t i = 16 + 3; i < 16 + 128; ++i)
@@ -255,7 +255,7 @@ TEST(DataDeserialize, WritesZerosForWhatAForeignBufferLeftOpen) {
     EXPECT_EQ(Serialized(list.get()), SerializedOf(props));
 }
 
-TEST(DataDeserialize, ClearsEachByteBehindANameOfEachLength) {
+TEST(DataDeserialize, ZeroesTheTailOfNamesOfEveryLength) {
     for (std::size_t length = 0; length < 128; ++length) {
         const Props props{{std::string(length, 'n'), "1234"}};
         const Buffer written = SerializedOf(props);
@@ -272,7 +272,7 @@ TEST(DataDeserialize, ClearsEachByteBehindANameOfEachLength) {
     }
 }
 
-TEST(DataDeserialize, MissingMemoryIsNoMemoryWithoutALeftover) {
+TEST(DataDeserialize, ReturnsNoMemoryWithoutALeak) {
     Props props;
     for (int i = 0; i < 40; ++i)
         props.push_back({"name" + std::to_string(i), "v"});
@@ -296,7 +296,7 @@ TEST(DataDeserialize, MissingMemoryIsNoMemoryWithoutALeftover) {
 
 // ---- Lists in one block ----
 
-TEST(ListInOneBlock, HoldsTheSameInOneAllocation) {
+TEST(ListInOneBlock, HoldsTheSameContentInOneAllocation) {
     const Props props{{"a", "", 0x10}, {"dropped", "1", 1}, {"b", "12345"}, {"c", std::string(300, 'v')}};
     const Buffer buffer = SerializedOf(props);
     ResetHeap();
@@ -308,7 +308,7 @@ TEST(ListInOneBlock, HoldsTheSameInOneAllocation) {
     EXPECT_EQ(Serialized(list.get()), Serialized(Read(buffer).second.get()));
 }
 
-TEST(ListInOneBlock, GivesBlocksToWhatIsAddedAndTakesThemBack) {
+TEST(ListInOneBlock, AllocatesAddedEntriesSeparatelyAndFreesThem) {
     const Props props{{"a", "1"}, {"b", "2"}, {"c", "3"}};
     const Buffer buffer = SerializedOf(props);
     ResetHeap();
@@ -326,7 +326,7 @@ TEST(ListInOneBlock, GivesBlocksToWhatIsAddedAndTakesThemBack) {
     EXPECT_EQ(Heap().Live(), 0u);
 }
 
-TEST(ListInOneBlock, SaysWhatOtherListsSay) {
+TEST(ListInOneBlock, PrintsTheSameMessagesAsOtherLists) {
     const Buffer buffer = SerializedOf(kTwo);
     for (const int level : {1, 2, 3}) {
         Messages messages(level);
@@ -337,7 +337,7 @@ TEST(ListInOneBlock, SaysWhatOtherListsSay) {
     }
 }
 
-TEST(ListInOneBlock, WithoutMemoryIsNoMemory) {
+TEST(ListInOneBlock, ReturnsNoMemory) {
     const Buffer buffer = SerializedOf(kTwo);
     const FailingHeap failing(1);
     const auto [status, list] = ReadShared(buffer);
@@ -345,7 +345,7 @@ TEST(ListInOneBlock, WithoutMemoryIsNoMemory) {
     EXPECT_EQ(list, nullptr);
 }
 
-TEST(ListInOneBlock, AnUpdateMayTakeItsValueFromTheEntryItReplaces) {
+TEST(ListInOneBlock, UpdateAcceptsTheValueOfTheEntryItReplaces) {
     const auto [status, list] = ReadShared(SerializedOf({{"a", "0123456789"}}));
     ASSERT_EQ(status, HYP_OK);
     DVSDataEntry *entry = nullptr;
@@ -365,7 +365,7 @@ HYP_ReturnStatus GetValue(const Buffer &buffer, const char *name, std::string *v
     return status;
 }
 
-TEST(DataGetPropVal, CopiesTheFirstMatchAndNoMore) {
+TEST(DataGetPropVal, CopiesTheFirstMatchOnly) {
     const Buffer buffer = SerializedOf({{"a", "1234", 0}, {"twin", "first", 1}, {"twin", "second", 0x20}});
     std::string value = "........";
     EXPECT_EQ(GetValue(buffer, "twin", &value), HYP_OK);
@@ -375,7 +375,7 @@ TEST(DataGetPropVal, CopiesTheFirstMatchAndNoMore) {
     EXPECT_EQ(value, "1234");
 }
 
-TEST(DataGetPropVal, MissingArgumentsAreABadParameterWithoutAMessage) {
+TEST(DataGetPropVal, RejectsNullArgumentsWithoutAMessage) {
     const Buffer buffer = SerializedOf(kTwo);
     const auto size = static_cast<std::uint32_t>(buffer.size());
     char value[8];
@@ -386,7 +386,7 @@ TEST(DataGetPropVal, MissingArgumentsAreABadParameterWithoutAMessage) {
     EXPECT_TRUE(messages.All().empty());
 }
 
-TEST(DataGetPropVal, OfAnEmptyBufferOrAnotherNameIsNotFound) {
+TEST(DataGetPropVal, ReturnsNotFoundForAnEmptyBufferOrUnknownName) {
     std::string value(8, '.');
     EXPECT_EQ(GetValue(SerializedOf({}), "a", &value), HYP_NOT_FOUND);
     EXPECT_EQ(GetValue(SerializedOf(kTwo), "third", &value), HYP_NOT_FOUND);
@@ -395,7 +395,7 @@ TEST(DataGetPropVal, OfAnEmptyBufferOrAnotherNameIsNotFound) {
     EXPECT_EQ(value, "........");
 }
 
-TEST(DataGetPropVal, TooLittleRoomSaysSo) {
+TEST(DataGetPropVal, RejectsTooLittleRoomWithAMessage) {
     const Messages messages(0);
     std::string value(3, '.');
     EXPECT_EQ(GetValue(SerializedOf(kTwo), "second", &value), HYP_LIMIT_EXCEEDED);
@@ -405,7 +405,7 @@ TEST(DataGetPropVal, TooLittleRoomSaysSo) {
     EXPECT_EQ(value, "...");
 }
 
-TEST(DataGetPropVal, JudgesTheChecksumBeforeTheVersion) {
+TEST(DataGetPropVal, ChecksTheChecksumBeforeTheVersion) {
     Buffer buffer = SerializedOf(kTwo);
     buffer[8] = 7;
     std::string value(8, '.');
@@ -427,7 +427,7 @@ TEST(DataGetPropVal, ComparesAtMost128Characters) {
     EXPECT_EQ(GetValue(buffer, std::string(127, 'n').c_str(), &value), HYP_NOT_FOUND);
 }
 
-TEST(DataGetPropVal, AValueThatLeavesTheBufferIsABadParameter) {
+TEST(DataGetPropVal, RejectsAValueThatLeavesTheBuffer) {
     Buffer buffer = SerializedOf({{"a", "1234"}});
     std::string value(100, '.');
     for (const std::uint32_t len : {13u, 100u, 0xfffffff0u, 0xffffffffu}) {
@@ -440,7 +440,7 @@ TEST(DataGetPropVal, AValueThatLeavesTheBufferIsABadParameter) {
     EXPECT_EQ(GetValue(buffer, "a", &value), HYP_OK);
 }
 
-TEST(DataGetPropVal, AnEntryWithoutItsFixedPartIsABadParameter) {
+TEST(DataGetPropVal, RejectsAnEntryShorterThanItsFixedPart) {
     Buffer buffer = SerializedOf({});
     buffer.resize(12 + 139, 0);
     SetU32(&buffer, 0, 12 + 139);

@@ -69,7 +69,7 @@ Buffer Written() {
         {{"first", "12345", 0x10}, {"second", std::string(200, 's'), 0x20}, {"third", "", 0x80000008}});
 }
 
-TEST(DamagedBuffer, TruncatedAtEveryLengthIsRefused) {
+TEST(DamagedBuffer, IsRejectedWhenTruncatedAtAnyLength) {
     const Buffer written = Written();
     for (std::size_t size = 0; size < written.size(); ++size) {
         Buffer buffer(written.begin(), written.begin() + static_cast<std::ptrdiff_t>(size));
@@ -82,7 +82,7 @@ TEST(DamagedBuffer, TruncatedAtEveryLengthIsRefused) {
     }
 }
 
-TEST(DamagedBuffer, EveryByteChangedIsReadTheSameByAll) {
+TEST(DamagedBuffer, AllReadersAgreeOnEveryChangedByte) {
     const Buffer written = Written();
     for (std::size_t i = 0; i < written.size(); ++i)
         for (const unsigned change : {0x01u, 0x80u, 0xffu}) {
@@ -95,7 +95,7 @@ TEST(DamagedBuffer, EveryByteChangedIsReadTheSameByAll) {
         }
 }
 
-TEST(DamagedBuffer, SizesAndLengthsThatLieAreReadTheSameByAll) {
+TEST(DamagedBuffer, AllReadersAgreeOnWrongSizesAndLengths) {
     const Buffer written = Written();
     std::vector<std::uint32_t> lies{0x7fffffff, 0x80000000, 0xfffffff0, 0xffffffff};
     for (std::uint32_t lie = 0; lie < written.size() + 20; ++lie)
@@ -110,7 +110,7 @@ TEST(DamagedBuffer, SizesAndLengthsThatLieAreReadTheSameByAll) {
             }
 }
 
-TEST(DamagedBuffer, HeaderLengthsThatLieAreReadTheSameByAll) {
+TEST(DamagedBuffer, AllReadersAgreeOnWrongHeaderLengths) {
     const Buffer written = Written();
     for (std::uint32_t length = 0; length <= written.size() + 1; ++length) {
         Buffer buffer = written;
@@ -121,7 +121,7 @@ TEST(DamagedBuffer, HeaderLengthsThatLieAreReadTheSameByAll) {
     }
 }
 
-TEST(DamagedBuffer, NoiseNeverPassesUnnoticed) {
+TEST(DamagedBuffer, RandomBytesAreRejected) {
     std::uint64_t state = 1;
     for (int round = 0; round < 2000; ++round) {
         Buffer buffer(static_cast<std::size_t>(round) % 400);

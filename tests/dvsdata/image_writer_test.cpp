@@ -60,7 +60,7 @@ HYP_ReturnStatus WriteNested(DVSData *inner, const Filter &filter, std::span<std
     return status;
 }
 
-TEST(ImageWriter, NestedLevelsAreThoseOfListsInLists) {
+TEST(ImageWriter, NestedLevelsEqualListsInLists) {
     const Buffer expected = LevelByLevel(kInner);
     Buffer block(expected.size(), 0xee);
     bool complete = false;
@@ -78,7 +78,7 @@ TEST(ImageWriter, AppliesFilters) {
     EXPECT_EQ(block, expected);
 }
 
-TEST(ImageWriter, NeverWritesBehindItsBlock) {
+TEST(ImageWriter, NeverWritesPastItsBlock) {
     const ListPtr inner = ListOf(kInner);
     const std::size_t size = LevelByLevel(kInner).size();
     for (std::size_t less = 1; less <= size; ++less) {
@@ -99,7 +99,7 @@ TEST(ImageWriter, IsNotCompleteWithRoomLeftOrALevelOpen) {
     EXPECT_FALSE(writer.Complete());
 }
 
-TEST(ImageWriter, RefusesAnInconsistentList) {
+TEST(ImageWriter, RejectsAnInconsistentList) {
     const ListPtr inner = ListOf(kInner);
     inner->serialSize += 4;
     Buffer block(4096);
@@ -109,7 +109,7 @@ TEST(ImageWriter, RefusesAnInconsistentList) {
 
 // ---- Reading in place ----
 
-TEST(InPlaceList, GivesWhatTheListWouldHold) {
+TEST(InPlaceList, ReturnsWhatTheListWouldHold) {
     const ExactBlock block(SerializedOf({{"a", "1", 0x10}, {"dropped", "2", 1}, {"b", "3", 0x20}}));
     data::InPlaceList list;
     ASSERT_EQ(list.Open(block.bytes()), HYP_OK);
@@ -126,7 +126,7 @@ TEST(InPlaceList, GivesWhatTheListWouldHold) {
     }
 }
 
-TEST(InPlaceList, SaysWhatTheDeserializerSays) {
+TEST(InPlaceList, PrintsTheSameMessagesAsTheDeserializer) {
     Buffer good = SerializedOf({{"a", "1", 0x10}, {"dropped", "2", 1}, {"b", "3", 0x20}});
     Buffer late = good; // A fault after valid entries.
     SetU32(&late, 12 + 144 + 144, 100000);
@@ -154,7 +154,7 @@ TEST(InPlaceList, SaysWhatTheDeserializerSays) {
     }
 }
 
-TEST(InPlaceList, KnownSumsAreTheValuesSums) {
+TEST(InPlaceList, KnownSumsEqualTheValuesSums) {
     Props props;
     for (int i = 0; i < 40; ++i) {
         const Buffer inner =
@@ -183,7 +183,7 @@ TEST(InPlaceList, KnownSumsAreTheValuesSums) {
     EXPECT_EQ(known, 32);
 }
 
-TEST(InPlaceList, AKnownSumDoesNotHideANestedFault) {
+TEST(InPlaceList, KnownSumDoesNotHideANestedFault) {
     Buffer inner = SerializedOf({{"n", "1234"}});
     inner[150] ^= 1;
     const ExactBlock block(SerializedOf({{"outer", Text(inner), 0x10}}));
@@ -195,7 +195,7 @@ TEST(InPlaceList, AKnownSumDoesNotHideANestedFault) {
     EXPECT_EQ(nested.Open(entry.value, data::kDeserializeTypeMask, entry.sum), HYP_BAD_CHECKSUM);
 }
 
-TEST(InPlaceList, BytesBehindANestedBufferAreNotPartOfItsSum) {
+TEST(InPlaceList, SumExcludesBytesAfterANestedBuffer) {
     Buffer inner = SerializedOf({{"n", "1234"}});
     inner.insert(inner.end(), 8, 0x11);
     const ExactBlock block(SerializedOf({{"outer", Text(inner), 0x10}}));
@@ -206,7 +206,7 @@ TEST(InPlaceList, BytesBehindANestedBufferAreNotPartOfItsSum) {
     EXPECT_EQ(nested.Open(entry.value, data::kDeserializeTypeMask, entry.sum), HYP_OK);
 }
 
-TEST(RemoveAfter, TakesTheVeryEntryAlsoAmongNamesakes) {
+TEST(RemoveAfter, RemovesExactlyTheGivenEntryAmongDuplicates) {
     const ListPtr list = ListOf({{"twin", "1"}, {"twin", "2"}, {"twin", "3"}});
     data::RemoveAfter(list.get(), list->head);
     EXPECT_EQ(ContentOf(list), (Props{{"twin", "1"}, {"twin", "3"}}));

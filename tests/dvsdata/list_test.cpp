@@ -35,18 +35,18 @@ TEST(DataAlloc, NewListIsEmptyOfSize16) {
     EXPECT_EQ(list->freeFn, &CountingFree);
 }
 
-TEST(DataAlloc, FailsWithNoMemoryAndLeavesTheOutput) {
+TEST(DataAlloc, ReturnsNoMemoryAndKeepsTheOutput) {
     const FailingHeap failing(1);
     DVSData *list = reinterpret_cast<DVSData *>(8);
     EXPECT_EQ(DVSData_Alloc(&list, CountingAlloc, CountingFree), HYP_NO_MEMORY);
     EXPECT_EQ(list, reinterpret_cast<DVSData *>(8));
 }
 
-TEST(DataFree, TakesNull) {
+TEST(DataFree, AcceptsNull) {
     DVSData_Free(nullptr);
 }
 
-TEST(DataFree, GivesEveryBlockBackToTheListsFree) {
+TEST(DataFree, ReturnsEveryBlockToTheListsFree) {
     ResetHeap();
     ListOf({{"a", "1"}, {"b", "22"}, {"c", ""}}).reset();
     EXPECT_EQ(Heap().allocs, 4u);
@@ -62,7 +62,7 @@ TEST(DataAppend, AddsTheStatedSizes) {
     EXPECT_EQ(SizeAddedBy(6), 152u);
 }
 
-TEST(DataAppend, TakesOneBlockOfImageAndLink) {
+TEST(DataAppend, AllocatesOneBlockForImageAndLink) {
     const ListPtr list = NewList();
     ResetHeap();
     Append(list.get(), {"name", "four"});
@@ -70,7 +70,7 @@ TEST(DataAppend, TakesOneBlockOfImageAndLink) {
     EXPECT_EQ(Heap().sizes[0], 156u);
 }
 
-TEST(DataAppend, RefusesLengthsWhoseSumWraps) {
+TEST(DataAppend, RejectsLengthsWhoseSumWraps) {
     const ListPtr list = ListOf({{"a", "1"}});
     const std::uint32_t before = list->serialSize;
     ResetHeap();
@@ -81,7 +81,7 @@ TEST(DataAppend, RefusesLengthsWhoseSumWraps) {
     EXPECT_EQ(ContentOf(list).size(), 1u);
 }
 
-TEST(DataAppend, RefusesEntrySizesFromFffffff8On) {
+TEST(DataAppend, RejectsEntrySizesFromFffffff8) {
     const ListPtr list = NewList();
     const FailingHeap failing(1); // An accepted length fails in the allocator.
     for (std::uint32_t len = 0xffffff66; len <= 0xffffff6d; ++len)
@@ -90,7 +90,7 @@ TEST(DataAppend, RefusesEntrySizesFromFffffff8On) {
     EXPECT_EQ(list->serialSize, 16u);
 }
 
-TEST(DataAppend, KeepsBothOfTwoNamesakesAndActsOnTheFirst) {
+TEST(DataAppend, KeepsDuplicateNamesAndActsOnTheFirst) {
     const ListPtr list = ListOf({{"twin", "first", 0x20}, {"twin", "second", 0x40}});
     DVSDataEntry *entry = nullptr;
     ASSERT_EQ(DVSData_Lookup(list.get(), "twin", &entry), HYP_OK);
@@ -106,7 +106,7 @@ TEST(DataAppend, KeepsTypeZero) {
     EXPECT_EQ(ContentOf(ListOf({{"n", "v", 0}}))[0].type, 0u);
 }
 
-TEST(DataAppend, TakesNoValueAtAll) {
+TEST(DataAppend, AcceptsAnEmptyValue) {
     const ListPtr list = NewList();
     EXPECT_EQ(DVSData_Append(list.get(), "n", nullptr, 0, 0x20), HYP_OK);
     EXPECT_EQ(DVSData_Update(list.get(), "n", nullptr, 0, 0x20), HYP_OK);
@@ -122,7 +122,7 @@ TEST(DataAppend, CopiesTheValue) {
     EXPECT_EQ(ContentOf(list)[0].value, "before");
 }
 
-TEST(DataAppend, CutsLongNamesAfter127Characters) {
+TEST(DataAppend, TruncatesLongNamesAfter127Characters) {
     const ListPtr list = NewList();
     const std::string name(200, 'x');
     Append(list.get(), {name, "v"});
@@ -151,7 +151,7 @@ TEST(DataAppend, ZeroesTheNamesTailAndThePadding) {
     }
 }
 
-TEST(DataUpdate, OfTheSameLengthKeepsThePlace) {
+TEST(DataUpdate, KeepsThePositionAtTheSameLength) {
     const ListPtr list = ListOf({{"a", "1"}, {"b", "2"}, {"c", "3"}});
     DVSDataEntry *const entry = list->head->next;
     EXPECT_EQ(DVSData_Update(list.get(), "b", "9", 1, 0x10), HYP_OK);
@@ -160,7 +160,7 @@ TEST(DataUpdate, OfTheSameLengthKeepsThePlace) {
     ExpectSound(list.get());
 }
 
-TEST(DataUpdate, OfAnotherLengthMovesToTheTail) {
+TEST(DataUpdate, MovesToTheTailAtAnotherLength) {
     const ListPtr list = ListOf({{"a", "1"}, {"b", "2"}, {"c", "3"}});
     EXPECT_EQ(DVSData_Update(list.get(), "b", "longer", 6, 0x10), HYP_OK);
     EXPECT_EQ(ContentOf(list), (Props{{"a", "1"}, {"c", "3"}, {"b", "longer", 0x10}}));
@@ -170,19 +170,19 @@ TEST(DataUpdate, OfAnotherLengthMovesToTheTail) {
     ExpectSound(list.get());
 }
 
-TEST(DataUpdate, OfTypeZeroAndAnotherLengthKeepsTheOldType) {
+TEST(DataUpdate, TypeZeroKeepsTheOldTypeAtAnotherLength) {
     const ListPtr list = ListOf({{"a", "1", 0x48}});
     EXPECT_EQ(DVSData_Update(list.get(), "a", "12", 2, 0), HYP_OK);
     EXPECT_EQ(ContentOf(list), (Props{{"a", "12", 0x48}}));
 }
 
-TEST(DataUpdate, OfTypeZeroAndTheSameLengthSetsTheDefaultType) {
+TEST(DataUpdate, TypeZeroSetsTheDefaultTypeAtTheSameLength) {
     const ListPtr list = ListOf({{"a", "1", 0x48}});
     EXPECT_EQ(DVSData_Update(list.get(), "a", "2", 1, 0), HYP_OK);
     EXPECT_EQ(ContentOf(list), (Props{{"a", "2", 0x20}}));
 }
 
-TEST(DataUpdate, AddsWhatIsNotThere) {
+TEST(DataUpdate, AddsAMissingName) {
     const ListPtr list = NewList();
     EXPECT_EQ(DVSData_Update(list.get(), "a", "1", 1, 0), HYP_OK);
     EXPECT_EQ(DVSData_Update(list.get(), "b", "2", 1, 0x10), HYP_OK);
@@ -190,7 +190,7 @@ TEST(DataUpdate, AddsWhatIsNotThere) {
     EXPECT_EQ(ContentOf(list), (Props{{"a", "1", 0x20}, {"b", "2", 0x10}, {"c", "3", 0x20}}));
 }
 
-TEST(DataUpdate, PropIsAnUpdateOfTypeZero) {
+TEST(DataUpdate, UpdatePropUsesTypeZero) {
     const ListPtr list = ListOf({{"a", "1", 0x48}, {"b", "1", 0x48}});
     EXPECT_EQ(DVSData_UpdateProp(list.get(), "a", "2", 1), HYP_OK);
     EXPECT_EQ(DVSData_UpdateProp(list.get(), "b", "22", 2), HYP_OK);
@@ -214,26 +214,26 @@ TEST(DataUpdate, LosesTheOldValueWhenMemoryRunsOut) {
 }
 
 // Callers shorten or retype a property by passing a value or name that lies in the list itself.
-TEST(DataUpdate, TakesAShorterPartOfTheOldValue) {
+TEST(DataUpdate, AcceptsAPartOfTheOldValue) {
     const ListPtr list = ListOf({{"a", "0123456789"}, {"b", "2"}});
     EXPECT_EQ(DVSData_Update(list.get(), "a", list->head->data + 3, 4, 0), HYP_OK);
     EXPECT_EQ(ContentOf(list), (Props{{"b", "2"}, {"a", "3456"}}));
 }
 
-TEST(DataUpdate, TakesTheOldEntrysOwnName) {
+TEST(DataUpdate, AcceptsTheOldEntrysOwnName) {
     const ListPtr list = ListOf({{"a", "0123456789"}, {"b", "2"}});
     EXPECT_EQ(DVSData_Update(list.get(), DVSData_Name(list->head), "new", 3, 0), HYP_OK);
     EXPECT_EQ(ContentOf(list), (Props{{"b", "2"}, {"a", "new"}}));
 }
 
-TEST(DataUpdate, TakesTheOldValueItselfAndAnotherEntrysValue) {
+TEST(DataUpdate, AcceptsTheOldValueAndAnotherEntrysValue) {
     const ListPtr list = ListOf({{"a", "01234"}, {"b", "56789"}});
     EXPECT_EQ(DVSData_Update(list.get(), "a", list->head->data, 5, 0x10), HYP_OK);
     EXPECT_EQ(DVSData_Update(list.get(), "b", list->head->data, 4, 0x10), HYP_OK);
     EXPECT_EQ(ContentOf(list), (Props{{"a", "01234", 0x10}, {"b", "0123", 0x10}}));
 }
 
-TEST(DataUpdate, OwnValueIsFreedOnceAlsoWhenMemoryRunsOut) {
+TEST(DataUpdate, FreesItsOwnValueOnceWhenMemoryRunsOut) {
     const ListPtr list = ListOf({{"a", "0123456789"}});
     const FailingHeap failing(1);
     EXPECT_EQ(DVSData_Update(list.get(), "a", list->head->data, 4, 0), HYP_NO_MEMORY);
@@ -241,7 +241,7 @@ TEST(DataUpdate, OwnValueIsFreedOnceAlsoWhenMemoryRunsOut) {
     EXPECT_EQ(list->serialSize, 16u);
 }
 
-TEST(DataRemove, OfAMissingNameGivesTheDefaultType) {
+TEST(DataRemove, ReturnsTheDefaultTypeForAMissingName) {
     const ListPtr list = ListOf({{"a", "1", 0x48}});
     std::uint32_t type = 0;
     EXPECT_EQ(DVSDataRemove(list.get(), "b", &type), HYP_NOT_FOUND);
@@ -250,7 +250,7 @@ TEST(DataRemove, OfAMissingNameGivesTheDefaultType) {
     EXPECT_EQ(DVSData_Remove(list.get(), "b"), HYP_NOT_FOUND);
 }
 
-TEST(DataRemove, GivesTheRemovedType) {
+TEST(DataRemove, ReturnsTheRemovedType) {
     const ListPtr list = ListOf({{"a", "1", 0x48}});
     std::uint32_t type = 0;
     EXPECT_EQ(DVSDataRemove(list.get(), "a", &type), HYP_OK);
@@ -260,7 +260,7 @@ TEST(DataRemove, GivesTheRemovedType) {
     EXPECT_EQ(list->tail, nullptr);
 }
 
-TEST(DataRemove, OfTheTailLetsALaterAppendLinkBehindTheNewTail) {
+TEST(DataRemove, OfTheTailMakesALaterAppendLinkToTheNewTail) {
     const ListPtr list = ListOf({{"a", "1"}, {"b", "2"}});
     EXPECT_EQ(DVSData_Remove(list.get(), "b"), HYP_OK);
     Append(list.get(), {"c", "3"});
@@ -268,7 +268,7 @@ TEST(DataRemove, OfTheTailLetsALaterAppendLinkBehindTheNewTail) {
     ExpectSound(list.get());
 }
 
-TEST(DataRemove, TakesHeadAndMiddle) {
+TEST(DataRemove, RemovesHeadAndMiddle) {
     const ListPtr list = ListOf({{"a", "1"}, {"b", "2"}, {"c", "3"}, {"d", "4"}});
     EXPECT_EQ(DVSData_Remove(list.get(), "a"), HYP_OK);
     EXPECT_EQ(DVSData_Remove(list.get(), "c"), HYP_OK);
@@ -276,14 +276,14 @@ TEST(DataRemove, TakesHeadAndMiddle) {
     ExpectSound(list.get());
 }
 
-TEST(DataRemove, TakesTheEntrysOwnName) {
+TEST(DataRemove, AcceptsTheEntrysOwnName) {
     const ListPtr list = ListOf({{"a", "1"}});
     const Messages messages(2);
     EXPECT_EQ(DVSData_Remove(list.get(), DVSData_Name(list->head)), HYP_OK);
     EXPECT_TRUE(ContentOf(list).empty());
 }
 
-TEST(DataLookup, ComparesCasesAndWholeNames) {
+TEST(DataLookup, ComparesWholeNamesCaseSensitively) {
     const ListPtr list = ListOf({{"com.orbeno.common.alias", "1"}, {"", "2"}, {"com.orbeno.common", "3"}});
     DVSDataEntry *entry = nullptr;
     for (const char *missing :
@@ -295,14 +295,14 @@ TEST(DataLookup, ComparesCasesAndWholeNames) {
     EXPECT_EQ(entry, list->head->next);
 }
 
-TEST(DataLookup, OfNothingIsNotFoundAndLeavesTheOutput) {
+TEST(DataLookup, ReturnsNotFoundAndKeepsTheOutput) {
     const ListPtr list = NewList();
     DVSDataEntry *entry = reinterpret_cast<DVSDataEntry *>(8);
     EXPECT_EQ(DVSData_Lookup(list.get(), "a", &entry), HYP_NOT_FOUND);
     EXPECT_EQ(entry, reinterpret_cast<DVSDataEntry *>(8));
 }
 
-TEST(DataNext, OnAnEmptyListIsNotFoundAtOnce) {
+TEST(DataNext, ReturnsNotFoundOnAnEmptyList) {
     const ListPtr list = NewList();
     DVSDataEntry *entry = nullptr;
     EXPECT_EQ(DVSData_Next(list.get(), nullptr, &entry), HYP_NOT_FOUND);
@@ -334,7 +334,7 @@ bool OnEntry(const char *name, const void *data, std::uint32_t dataLen, std::uin
     return walk->seen.back().name == walk->stopAt;
 }
 
-TEST(DataForEach, GivesEveryEntryInOrder) {
+TEST(DataForEach, VisitsEveryEntryInOrder) {
     const Props props{{"a", "1", 0x10}, {"b", "", 0}, {"c", "333", 0x80000020}};
     const ListPtr list = ListOf(props);
     Walk walk{list.get(), {}, "none", "none"};
@@ -342,14 +342,14 @@ TEST(DataForEach, GivesEveryEntryInOrder) {
     EXPECT_EQ(walk.seen, props);
 }
 
-TEST(DataForEach, StopsWhenToldTo) {
+TEST(DataForEach, StopsWhenTheCallbackSaysSo) {
     const ListPtr list = ListOf({{"a", "1"}, {"b", "2"}, {"c", "3"}});
     Walk walk{list.get(), {}, "b", "none"};
     DVSData_ForEach(list.get(), OnEntry, &walk);
     EXPECT_EQ(walk.seen.size(), 2u);
 }
 
-TEST(DataForEach, LetsTheCallbackRemoveItsEntry) {
+TEST(DataForEach, AllowsTheCallbackToRemoveItsEntry) {
     for (const char *name : {"a", "b", "c"}) {
         const ListPtr list = ListOf({{"a", "1"}, {"b", "2"}, {"c", "3"}});
         Walk walk{list.get(), {}, "none", name};
@@ -360,7 +360,7 @@ TEST(DataForEach, LetsTheCallbackRemoveItsEntry) {
     }
 }
 
-TEST(DataAccessors, GiveTheEntrysFields) {
+TEST(DataAccessors, ReturnTheEntrysFields) {
     const ListPtr list = ListOf({{"a", "123", 0x80000013}});
     void *data = nullptr;
     EXPECT_STREQ(DVSData_Name(list->head), "a");

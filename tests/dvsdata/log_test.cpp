@@ -30,7 +30,7 @@ protected:
     Messages messages_;
 };
 
-TEST_F(LogSink, GetsTextAndLevel) {
+TEST_F(LogSink, ReceivesTextAndLevel) {
     DVSLog_SetSink(Collect, &messages_);
     Emit(2, "port %s: %d\n", "p1", 7);
     ASSERT_EQ(messages_.size(), 1u);
@@ -38,7 +38,7 @@ TEST_F(LogSink, GetsTextAndLevel) {
     EXPECT_EQ(messages_[0].second, "port p1: 7\n");
 }
 
-TEST_F(LogSink, GetsLongMessagesWhole) {
+TEST_F(LogSink, ReceivesLongMessagesWhole) {
     DVSLog_SetSink(Collect, &messages_);
     // Covers every length around the size of the stack buffer.
     for (std::size_t size = 0; size < 5000; size += size < 1030 ? 1 : 993) {

@@ -57,7 +57,7 @@ TEST(DataMessages, OfAppend) {
                                       "added data name, serialSize = 164\n"}));
 }
 
-TEST(DataMessages, OfOverflowingAppendsPrintAboveOneOnly) {
+TEST(DataMessages, OfOverflowingAppendsPrintFromLevelTwo) {
     const ListPtr list = NewList();
     const auto texts = AtEveryLevel([&](Messages *) {
         EXPECT_EQ(DVSData_Append(list.get(), "n", "", 0xfffffff0, 0), HYP_BAD_PARAM);
@@ -112,7 +112,7 @@ TEST(DataMessages, OfSerialize) {
               (Texts{"allocating buffer size 164\n", "serializing a: 2/148 data/serial bytes\n"}));
 }
 
-TEST(DataMessages, OfTheNamedFilterComeInBothPasses) {
+TEST(DataMessages, OfTheNameFilterPrintInBothPasses) {
     const ListPtr list = ListOf({{"a", "12"}, {"xb", ""}});
     const auto texts = AtEveryLevel([&](Messages *) { SerializeAndFree(list.get(), "x", 0, 0); });
     const Texts filter{"Entry a, length 2 exName x\n", "Entry xb, length 0 exName x\n"};
@@ -122,7 +122,7 @@ TEST(DataMessages, OfTheNamedFilterComeInBothPasses) {
                                       "serializing a: 2/148 data/serial bytes\n", filter[1]}));
 }
 
-TEST(DataMessages, OfTheTypeFilterComeAlsoForMaskZero) {
+TEST(DataMessages, OfTheTypeFilterPrintForMaskZeroToo) {
     const ListPtr list = ListOf({{"a", "12", 0x28}});
     const auto texts = AtEveryLevel([&](Messages *) { SerializeAndFree(list.get(), nullptr, 0, 1); });
     EXPECT_EQ(texts[kErrors], Texts{});

@@ -50,7 +50,7 @@ TEST_P(IndexedList, FindsEveryEntry) {
     ExpectFindsFirstMatches(ListOfSize(GetParam()).get());
 }
 
-TEST_P(IndexedList, FindsTheFirstNamesake) {
+TEST_P(IndexedList, FindsTheFirstOfDuplicateNames) {
     const ListPtr list = ListOfSize(GetParam());
     for (std::uint32_t i = 0; i < GetParam(); ++i)
         Append(list.get(), {NameAt(i), "twin"});
@@ -60,7 +60,7 @@ TEST_P(IndexedList, FindsTheFirstNamesake) {
     ExpectFindsFirstMatches(list.get());
 }
 
-TEST_P(IndexedList, FollowsRemovalsFromTheFront) {
+TEST_P(IndexedList, StaysCorrectAfterRemovalsFromTheFront) {
     const ListPtr list = ListOfSize(GetParam());
     for (std::uint32_t i = 0; i < GetParam(); ++i) {
         ASSERT_EQ(DVSData_Remove(list.get(), NameAt(i).c_str()), HYP_OK);
@@ -71,7 +71,7 @@ TEST_P(IndexedList, FollowsRemovalsFromTheFront) {
     ExpectFindsFirstMatches(list.get());
 }
 
-TEST_P(IndexedList, FollowsRemovalsFromTheBackAndTheMiddle) {
+TEST_P(IndexedList, StaysCorrectAfterRemovalsFromBackAndMiddle) {
     for (const std::uint32_t step : {2u, 3u, 5u}) {
         const ListPtr list = ListOfSize(GetParam());
         for (std::uint32_t i = GetParam(); i-- > 0;)
@@ -85,7 +85,7 @@ TEST_P(IndexedList, FollowsRemovalsFromTheBackAndTheMiddle) {
     }
 }
 
-TEST_P(IndexedList, GrowsInListOrderBehindRemovals) {
+TEST_P(IndexedList, GrowsInListOrderAfterRemovals) {
     const ListPtr list = ListOfSize(GetParam());
     for (std::uint32_t i = 0; i < GetParam(); i += 4)
         ASSERT_EQ(DVSData_Remove(list.get(), NameAt(i).c_str()), HYP_OK);
@@ -94,14 +94,14 @@ TEST_P(IndexedList, GrowsInListOrderBehindRemovals) {
     ExpectFindsFirstMatches(list.get());
 }
 
-TEST_P(IndexedList, FollowsUpdatesToTheTail) {
+TEST_P(IndexedList, StaysCorrectAfterUpdatesMoveToTheTail) {
     const ListPtr list = ListOfSize(GetParam());
     for (std::uint32_t i = 0; i < GetParam(); i += 2)
         ASSERT_EQ(DVSData_Update(list.get(), NameAt(i).c_str(), "another", 7, 0), HYP_OK);
     ExpectFindsFirstMatches(list.get());
 }
 
-TEST_P(IndexedList, GivesEveryBlockBack) {
+TEST_P(IndexedList, FreesEveryBlock) {
     ResetHeap();
     ListPtr list = ListOfSize(GetParam());
     for (std::uint32_t i = 0; i < GetParam(); i += 2)
@@ -110,7 +110,7 @@ TEST_P(IndexedList, GivesEveryBlockBack) {
     EXPECT_EQ(Heap().Live(), 0u);
 }
 
-TEST(NameIndex, ShortListsAllocateNothingForIt) {
+TEST(NameIndex, ShortListsAllocateNoIndex) {
     ResetHeap();
     const ListPtr list = ListOfSize(kShortMax);
     EXPECT_EQ(Heap().allocs, kShortMax + 1u);
@@ -123,14 +123,14 @@ TEST(NameIndex, LookupsAllocateNothing) {
     EXPECT_EQ(Heap().allocs, 0u);
 }
 
-TEST(NameIndex, LongListsTakeAFewBlocksMoreThanEntries) {
+TEST(NameIndex, LongListsAllocateFewBlocksForTheIndex) {
     ResetHeap();
     const ListPtr list = ListOfSize(1000);
     EXPECT_GT(Heap().allocs, 1001u);
     EXPECT_LE(Heap().allocs, 1001u + 8u);
 }
 
-TEST(NameIndex, WithoutMemoryForItTheListIsWalked) {
+TEST(NameIndex, FailedAllocationFallsBackToAWalk) {
     const ListPtr list = ListOfSize(kShortMax);
     {
         const FailingHeap failing(2, FailingHeap::Only); // The 33rd entry, then the table.
@@ -147,7 +147,7 @@ TEST(NameIndex, WithoutMemoryForItTheListIsWalked) {
     ExpectFindsFirstMatches(list.get());
 }
 
-TEST(NameIndex, ListThatShrankWithoutATableIsShortAgain) {
+TEST(NameIndex, ListThatShrinksWithoutATableCountsAsShort) {
     const ListPtr list = ListOfSize(kShortMax);
     {
         const FailingHeap failing(2, FailingHeap::Only);
@@ -162,7 +162,7 @@ TEST(NameIndex, ListThatShrankWithoutATableIsShortAgain) {
     ExpectFindsFirstMatches(list.get());
 }
 
-TEST(NameIndex, ThousandsOfNamesakesStayQuickToAppend) {
+TEST(NameIndex, AppendsThousandsOfDuplicatesQuickly) {
     const ListPtr list = NewList();
     for (std::uint32_t i = 0; i < 50000; ++i)
         Append(list.get(), {"twin", U32Value(i)});

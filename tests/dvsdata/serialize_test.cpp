@@ -81,7 +81,7 @@ TEST(DataSerialize, WritesEveryField) {
     EXPECT_EQ(buffer, expected);
 }
 
-TEST(DataSerialize, ChecksumIsThatOfThePlainDefinition) {
+TEST(DataSerialize, ChecksumMatchesItsDefinition) {
     for (std::uint32_t size = 0; size < 700; ++size) {
         Buffer bytes(size);
         for (std::uint32_t i = 0; i < size; ++i)
@@ -90,7 +90,7 @@ TEST(DataSerialize, ChecksumIsThatOfThePlainDefinition) {
     }
 }
 
-TEST(DataSerialize, SumsAreTheSameOnEveryProcessor) {
+TEST(DataSerialize, EveryProcessorVariantGivesTheSameSum) {
     for (std::size_t size = 0; size < 700; ++size) {
         Buffer bytes(size);
         for (std::size_t i = 0; i < size; ++i)
@@ -115,7 +115,7 @@ TEST(DataSerialize, SizeIsTheRunningTotal) {
     EXPECT_EQ(Serialized(list.get()).size(), list->serialSize);
 }
 
-TEST(DataSerialize, ComesBackUnchanged) {
+TEST(DataSerialize, RoundTrips) {
     const auto [status, list] = Read(SerializedOf(kSome), 0xffffffff);
     ASSERT_EQ(status, HYP_OK);
     EXPECT_EQ(ContentOf(list), Props(kSome.begin(), kSome.end() - 1)); // Type 0 shares no bit with any mask.
@@ -126,7 +126,7 @@ TEST(DataSerialize, BuffersAreReproducible) {
     EXPECT_EQ(SerializedOf(kSome), SerializedOf(kSome));
 }
 
-TEST(DataSerialize, TakesACallersBufferOfTheRightSizeOrMore) {
+TEST(DataSerialize, AcceptsACallersBufferOfAtLeastTheSize) {
     const ListPtr list = ListOf(kSome);
     const Buffer expected = Serialized(list.get());
     for (const std::uint32_t more : {0u, 1u, 100u}) {
@@ -144,7 +144,7 @@ TEST(DataSerialize, TakesACallersBufferOfTheRightSizeOrMore) {
     }
 }
 
-TEST(DataSerialize, RefusesACallersBufferOneByteTooSmall) {
+TEST(DataSerialize, RejectsACallersBufferOneByteTooSmall) {
     const ListPtr list = ListOf(kSome);
     Buffer own(list->serialSize - 1, 0xee);
     const Buffer untouched = own;
@@ -167,7 +167,7 @@ TEST(DataSerialize, AllocatesOneBlockOfTheSizeFromTheList) {
     EXPECT_EQ(Heap().frees, 1u);
 }
 
-TEST(DataSerialize, WithoutMemoryLeavesNoBuffer) {
+TEST(DataSerialize, ReturnsNoBufferWhenMemoryRunsOut) {
     const ListPtr list = ListOf(kSome);
     const FailingHeap failing(1);
     Output output;
@@ -178,7 +178,7 @@ TEST(DataSerialize, WithoutMemoryLeavesNoBuffer) {
     EXPECT_EQ(output.buf, nullptr);
 }
 
-TEST(DataSerialize, OfAVersionBelowFourWritesAllTheSame) {
+TEST(DataSerialize, WritesVersionsBelowFourWithAMessage) {
     const ListPtr list = ListOf(kSome);
     const Messages messages(0);
     Output output;
@@ -192,31 +192,31 @@ TEST(DataSerialize, OfAVersionBelowFourWritesAllTheSame) {
     EXPECT_EQ(messages.All().size(), 1u); // version 4 causes no message
 }
 
-TEST(DataSerializeExNamedProp, VolatileLeavesOutTheTypeButKeepsThePersistFlag) {
+TEST(DataSerializeExNamedProp, VolatileOmitsTheTypeButKeepsThePersistFlag) {
     const Props kept{kSome[0], kSome[2], kSome[3], kSome[4]};
     EXPECT_EQ(WithoutName(kSome, "volatile"), SerializedOf(kept));
 }
 
-TEST(DataSerializeExNamedProp, WithoutANameLeavesOutNothing) {
+TEST(DataSerializeExNamedProp, WithoutANameOmitsNothing) {
     EXPECT_EQ(WithoutName(kSome, nullptr), SerializedOf(kSome));
 }
 
-TEST(DataSerializeExNamedProp, TheEmptyNameIsInEveryName) {
+TEST(DataSerializeExNamedProp, EmptyNameMatchesEveryName) {
     EXPECT_EQ(WithoutName(kSome, ""), SerializedOf({kSome[2]}));
 }
 
-TEST(DataSerializeExNamedProp, AnyNameHoldingTheKeptKeyStays) {
+TEST(DataSerializeExNamedProp, KeepsAnyNameThatContainsTheKeptKey) {
     const Props props{{"x.com.orbeno.common.port.volatile.persist.y", "1"}, {"volatile", "2"}};
     EXPECT_EQ(WithoutName(props, "volatile"), SerializedOf({props[0]}));
 }
 
-TEST(DataSerializeExTypeProp, LeavesOutTypesWithAnyBitOfTheMask) {
+TEST(DataSerializeExTypeProp, OmitsTypesWithAnyBitOfTheMask) {
     EXPECT_EQ(WithoutTypes(kSome, 0x80000064), SerializedOf({kSome[1], kSome[4]}));
     EXPECT_EQ(WithoutTypes(kSome, 0x10), SerializedOf({kSome[0], kSome[2], kSome[3], kSome[4]}));
     EXPECT_EQ(WithoutTypes(kSome, 0xffffffff), SerializedOf({kSome[4]}));
 }
 
-TEST(DataSerializeExTypeProp, MaskZeroLeavesOutNothing) {
+TEST(DataSerializeExTypeProp, MaskZeroOmitsNothing) {
     EXPECT_EQ(WithoutTypes(kSome, 0), SerializedOf(kSome));
 }
 
@@ -227,7 +227,7 @@ TEST(DataSerializeEntry, MakesABufferOfOneEntry) {
     EXPECT_EQ(TakeBytes(list.get(), output), SerializedOf({kSome[3]}));
 }
 
-TEST(DataSerializeEntry, RefusesAnyCallersBuffer) {
+TEST(DataSerializeEntry, RejectsAnyCallersBuffer) {
     const ListPtr list = ListOf(kSome);
     Buffer own(4096);
     void *buf = own.data();
@@ -274,25 +274,25 @@ protected:
     ListPtr list_ = ListOf({{"a", "1234"}, {"b", "5678"}});
 };
 
-TEST_F(InconsistentList, OfASizeThatIsTooSmallFailsAtTheEntry) {
+TEST_F(InconsistentList, TooSmallASizeFailsAtTheEntry) {
     list_->serialSize -= 4;
     Expect(
         "DVSData length changed during serialization, buflen = 308, lenRemaining = 148, name b, size 148\n");
 }
 
-TEST_F(InconsistentList, OfASizeThatIsTooLargeFailsAtTheEnd) {
+TEST_F(InconsistentList, TooLargeASizeFailsAtTheEnd) {
     list_->serialSize += 8;
     Expect(
         "DVSData length changed during serialization, buflen = 320, lenRemaining = 12, name NULL, size 0\n");
 }
 
-TEST_F(InconsistentList, OfAnEntryThatIsTooLargeFailsAtIt) {
+TEST_F(InconsistentList, TooLargeAnEntryFailsAtTheEntry) {
     list_->head->serialSize = 5000;
     Expect(
         "DVSData length changed during serialization, buflen = 312, lenRemaining = 300, name a, size 5000\n");
 }
 
-TEST_F(InconsistentList, OfAnEntryThatIsTooSmallFailsAtTheEnd) {
+TEST_F(InconsistentList, TooSmallAnEntryFailsAtTheEnd) {
     list_->head->serialSize = 144;
     Expect(
         "DVSData length changed during serialization, buflen = 312, lenRemaining = 8, name NULL, size 0\n");

@@ -73,7 +73,7 @@ const WriteRow kWriteRows[] = {
     {"close:1", HYP_OK, "", ""}, // a failed close is ignored
 };
 
-TEST_F(FileFaults, FailedWriteThroughATemporaryFileNeverTouchesTheOldOne) {
+TEST_F(FileFaults, FailedWriteViaTemporaryFileKeepsTheOldFile) {
     for (const WriteRow &row : kWriteRows) {
         for (const int error : kErrors) {
             SCOPED_TRACE(std::string(row.call) + " " + std::strerror(error));
@@ -88,7 +88,7 @@ TEST_F(FileFaults, FailedWriteThroughATemporaryFileNeverTouchesTheOldOne) {
     }
 }
 
-TEST_F(FileFaults, FailedWriteInPlaceTellsItsStatus) {
+TEST_F(FileFaults, FailedWriteInPlaceReturnsItsStatus) {
     for (const WriteRow &row : kWriteRows) {
         if (std::strncmp(row.call, "rename", 6) == 0) continue;
         for (const int error : kErrors) {
@@ -120,12 +120,12 @@ TEST_F(FileFaults, ShortWriteIsAWriteError) {
     }
 }
 
-TEST_F(FileFaults, FailedRenameLeavesTheNewContentsUnderTheTemporaryName) {
+TEST_F(FileFaults, FailedRenameKeepsTheTemporaryFile) {
     EXPECT_EQ(Write("rename:1:EACCES", true).status, HYP_WRITE_ERROR);
     EXPECT_EQ(Contents(path_ + ".tmp"), Padded(kNew));
 }
 
-TEST_F(FileFaults, WriteWithoutMemoryAtAnyAllocationIsNoMemory) {
+TEST_F(FileFaults, WriteReturnsNoMemoryWhenAnyAllocationFails) {
     for (const bool viaTemp : {false, true}) {
         for (int k = 1; k <= (viaTemp ? 2 : 1); k++) {
             const fault::Report report = Write("alloc:" + std::to_string(k), viaTemp);
@@ -136,17 +136,17 @@ TEST_F(FileFaults, WriteWithoutMemoryAtAnyAllocationIsNoMemory) {
             }
         }
         const fault::Report report = Write(viaTemp ? "alloc:3" : "alloc:2", viaTemp);
-        EXPECT_EQ(report.hits, 0) << "an allocation that this test does not know";
+        EXPECT_EQ(report.hits, 0) << "an allocation that this test does not expect";
         EXPECT_EQ(report.status, HYP_OK);
     }
 }
 
-TEST_F(FileFaults, FailedReadTellsItsStatus) {
+TEST_F(FileFaults, FailedReadReturnsItsStatus) {
     Put(path_, Padded(kOld));
     for (const int error : kErrors) {
         SCOPED_TRACE(std::strerror(error));
         const std::string tail = ":" + std::to_string(error);
-        EXPECT_EQ(Read("open:1" + tail).status, HYP_OK) << "the plain open takes over";
+        EXPECT_EQ(Read("open:1" + tail).status, HYP_OK) << "falls back to the plain open";
         const fault::Report report = Read("open:1+" + tail);
         EXPECT_EQ(report.status, HYP_NOT_FOUND);
         EXPECT_EQ(report.notes,
@@ -164,7 +164,7 @@ TEST_F(FileFaults, FailedReadTellsItsStatus) {
     }
 }
 
-TEST_F(FileFaults, ReadWithoutMemoryIsNoMemory) {
+TEST_F(FileFaults, ReadReturnsNoMemory) {
     Put(path_, Padded(kOld));
     const fault::Report report = Read("alloc:1");
     EXPECT_EQ(report.hits, 1);

@@ -17,7 +17,7 @@ namespace {
 using FileWrite = StateDir;
 using FileRead = StateDir;
 
-TEST_F(FileWrite, Of164BytesGivesOneBlock) {
+TEST_F(FileWrite, Pads164BytesToOneBlock) {
     const std::string bytes(164, 'b');
     ASSERT_EQ(DVSFile_Write(path_.c_str(), bytes.data(), 164), HYP_OK);
     EXPECT_EQ(Contents(path_), Padded(bytes));
@@ -31,20 +31,20 @@ TEST_F(FileWrite, Of164BytesGivesOneBlock) {
     EXPECT_TRUE(messages_.empty());
 }
 
-TEST_F(FileWrite, Of513BytesGivesTwoBlocks) {
+TEST_F(FileWrite, Pads513BytesToTwoBlocks) {
     const std::string bytes(513, 'c');
     ASSERT_EQ(DVSFile_Write(path_.c_str(), bytes.data(), 513), HYP_OK);
     EXPECT_EQ(Contents(path_), Padded(bytes));
     EXPECT_EQ(Contents(path_).size(), 1024u);
 }
 
-TEST_F(FileWrite, OfAWholeBlockIsNotPadded) {
+TEST_F(FileWrite, DoesNotPadAWholeBlock) {
     const std::string bytes(512, 'd');
     ASSERT_EQ(DVSFile_WriteClassical(path_.c_str(), bytes.data(), 512, false), HYP_OK);
     EXPECT_EQ(Contents(path_), bytes);
 }
 
-TEST_F(FileWrite, OfNothingLeavesOneByteThatNoReadAccepts) {
+TEST_F(FileWrite, OfNoBytesLeavesOneByteThatReadsReject) {
     for (const bool viaTemp : {false, true}) {
         ASSERT_EQ(DVSFile_WriteClassical(path_.c_str(), nullptr, 0, viaTemp), HYP_OK);
         EXPECT_EQ(Contents(path_).size(), 1u);
@@ -52,7 +52,7 @@ TEST_F(FileWrite, OfNothingLeavesOneByteThatNoReadAccepts) {
     }
 }
 
-TEST_F(FileWrite, ShortensALongerFile) {
+TEST_F(FileWrite, TruncatesALongerFile) {
     Put(path_, std::string(5000, 'o'));
     Put(path_ + ".tmp", std::string(5000, 'o'));
     for (const bool viaTemp : {false, true}) {
@@ -62,19 +62,19 @@ TEST_F(FileWrite, ShortensALongerFile) {
     EXPECT_EQ(Names(dir_), std::set<std::string>{"state"});
 }
 
-TEST_F(FileWrite, CreatesForTheOwnerOnly) {
+TEST_F(FileWrite, CreatesFilesForTheOwnerOnly) {
     ASSERT_EQ(DVSFile_Write(path_.c_str(), "x", 1), HYP_OK);
     EXPECT_EQ(Mode(path_) & 07777, 0600u);
 }
 
-TEST_F(FileWrite, FailingRenameLeavesTheTemporaryFileBehind) {
+TEST_F(FileWrite, FailingRenameLeavesTheTemporaryFile) {
     std::filesystem::create_directory(path_);
     EXPECT_EQ(DVSFile_Write(path_.c_str(), "new", 3), HYP_WRITE_ERROR);
     EXPECT_EQ(Contents(path_ + ".tmp"), Padded("new"));
     EXPECT_EQ(Messages(), "failed to rename dvsfile " + path_ + ".tmp, error: Is a directory\n");
 }
 
-TEST_F(FileWrite, WithoutAFolderIsAnIoError) {
+TEST_F(FileWrite, ReturnsIoErrorWithoutADirectory) {
     const std::string path = dir_ + "/none/state";
     EXPECT_EQ(DVSFile_Write(path.c_str(), "x", 1), HYP_IO_ERROR);
     EXPECT_EQ(Messages(),
@@ -85,7 +85,7 @@ TEST_F(FileWrite, WithoutAFolderIsAnIoError) {
               "failed to open dvsfile " + path + " for write, error: No such file or directory\n");
 }
 
-TEST_F(FileWrite, OntoADirectoryIsAnIoError) {
+TEST_F(FileWrite, ReturnsIoErrorForADirectory) {
     EXPECT_EQ(DVSFile_WriteClassical(dir_.c_str(), "x", 1, false), HYP_IO_ERROR);
     EXPECT_EQ(Messages(), "failed to open dvsfile " + dir_ + " for write, error: Is a directory\n");
 }
@@ -93,20 +93,20 @@ TEST_F(FileWrite, OntoADirectoryIsAnIoError) {
 TEST_F(FileWrite, OntoAFifoDoesNotHang) {
     alarm(30);
     ASSERT_EQ(mkfifo(path_.c_str(), 0600), 0);
-    EXPECT_EQ(DVSFile_WriteClassical(path_.c_str(), "x", 1, false), HYP_IO_ERROR) << "nobody reads it";
+    EXPECT_EQ(DVSFile_WriteClassical(path_.c_str(), "x", 1, false), HYP_IO_ERROR) << "the FIFO has no reader";
     messages_.clear();
     const int reader = open(path_.c_str(), O_RDONLY | O_NONBLOCK);
-    EXPECT_EQ(DVSFile_WriteClassical(path_.c_str(), "x", 1, false), HYP_IO_ERROR) << "it cannot be truncated";
+    EXPECT_EQ(DVSFile_WriteClassical(path_.c_str(), "x", 1, false), HYP_IO_ERROR) << "no truncate on a FIFO";
     EXPECT_EQ(Messages(), "failed to truncate dvsfile " + path_ + ", error: Invalid argument\n");
     close(reader);
 }
 
-TEST_F(FileWrite, WithoutAPathIsNoMemory) {
+TEST_F(FileWrite, ReturnsNoMemoryForANullPath) {
     EXPECT_EQ(DVSFile_WriteClassical(nullptr, "x", 1, false), HYP_NO_MEMORY);
     EXPECT_EQ(DVSFile_WriteClassical(nullptr, "x", 1, true), HYP_NO_MEMORY);
 }
 
-TEST_F(FileWrite, RefusesAMissingBufferAndFourGigabytes) {
+TEST_F(FileWrite, RejectsANullBufferAndFourGigabytes) {
     Put(path_, "old");
     for (const bool viaTemp : {false, true}) {
         EXPECT_EQ(DVSFile_WriteClassical(path_.c_str(), nullptr, 1, viaTemp), HYP_BAD_PARAM);
@@ -117,19 +117,19 @@ TEST_F(FileWrite, RefusesAMissingBufferAndFourGigabytes) {
     EXPECT_EQ(Names(dir_), std::set<std::string>{"state"});
 }
 
-TEST_F(FileRead, OfAMissingFileIsNotFound) {
+TEST_F(FileRead, ReturnsNotFoundForAMissingFile) {
     EXPECT_EQ(ReadBack(path_).status, HYP_NOT_FOUND);
     EXPECT_EQ(Messages(),
               "failed to open dvsfile " + path_ + " for read, error: No such file or directory\n");
 }
 
-TEST_F(FileRead, OfAnEmptyFileIsFileEmpty) {
+TEST_F(FileRead, ReturnsFileEmptyForAnEmptyFile) {
     Put(path_, "");
     EXPECT_EQ(ReadBack(path_).status, HYP_FILE_EMPTY);
     EXPECT_TRUE(messages_.empty());
 }
 
-TEST_F(FileRead, Of1000BytesIsAnIoError) {
+TEST_F(FileRead, ReturnsIoErrorFor1000Bytes) {
     Put(path_, std::string(1000, 'x'));
     EXPECT_EQ(ReadBack(path_).status, HYP_IO_ERROR);
     EXPECT_EQ(Messages(), "failed to verify dvsfile " + path_ + " with length 1000\n");
@@ -145,7 +145,7 @@ TEST_F(FileRead, OfADirectoryFails) {
     EXPECT_NE(ReadBack(dir_).status, HYP_OK);
 }
 
-TEST_F(FileRead, OfFourGigabytesIsRefusedBeforeAnythingIsAllocated) {
+TEST_F(FileRead, RejectsFourGigabytesBeforeAllocating) {
     for (const off_t size : {off_t{1} << 32, (off_t{1} << 32) + 1, off_t{1} << 40}) {
         Put(path_, "");
         ASSERT_EQ(truncate(path_.c_str(), size), 0);
@@ -159,7 +159,7 @@ TEST_F(FileRead, OfFourGigabytesIsRefusedBeforeAnythingIsAllocated) {
     EXPECT_TRUE(messages_.empty());
 }
 
-TEST_F(FileRead, LeavesItsOutputsAloneOnFailure) {
+TEST_F(FileRead, KeepsItsOutputsOnFailure) {
     Put(path_, std::string(1000, 'x'));
     void *buf = this;
     uint32_t len = 1, alignOffset = 2;
@@ -171,7 +171,7 @@ TEST_F(FileRead, LeavesItsOutputsAloneOnFailure) {
     }
 }
 
-TEST_F(FileRead, RefusesMissingArguments) {
+TEST_F(FileRead, RejectsNullArguments) {
     void *buf = nullptr;
     uint32_t len = 0, alignOffset = 0;
     EXPECT_EQ(DVSFile_Read(nullptr, &buf, &len, &alignOffset), HYP_NOT_FOUND);
@@ -194,20 +194,20 @@ protected:
     }
 };
 
-TEST_F(FileDirect, IsWhatEveryOpenTriesFirst) {
+TEST_F(FileDirect, IsTriedFirstByEveryOpen) {
     ASSERT_EQ(fault_arm("open:1+:EINVAL:direct"), 0);
     WriteAndRead(path_);
     EXPECT_EQ(fault_hits(), 4) << "two writes and two reads";
 }
 
-TEST_F(FileDirect, RefusedByAMemoryFileSystemOrNotTheFileIsWritten) {
+TEST_F(FileDirect, WriteSucceedsOnAMemoryFileSystem) {
     char name[] = "/dev/shm/dvs-file-XXXXXX";
     if (!mkdtemp(name)) GTEST_SKIP() << "no /dev/shm on this machine";
     WriteAndRead(std::string(name) + "/state");
     std::filesystem::remove_all(name);
 }
 
-TEST(FileLog, GoesToTheHostsLogWithoutASink) {
+TEST(FileLog, GoesToTheSystemLogWithoutASink) {
     testing::internal::CaptureStderr();
     void *buf = nullptr;
     uint32_t len = 0, alignOffset = 0;

@@ -84,7 +84,7 @@ const Row kRows[] = {
     {"flock:2", HYP_OK, "", "", true}, // the unlock
 };
 
-TEST_F(DurableFaults, EachCallFailedInTurnLeavesOldOrNewWhole) {
+TEST_F(DurableFaults, EachFailedCallLeavesTheOldOrTheNewFile) {
     for (const Row &row : kRows) {
         for (const int error : kErrors) {
             SCOPED_TRACE(std::string(row.call) + " " + std::strerror(error));
@@ -98,7 +98,7 @@ TEST_F(DurableFaults, EachCallFailedInTurnLeavesOldOrNewWhole) {
     }
 }
 
-TEST_F(DurableFaults, FailedWriteIsAWriteErrorAndASignalIsNone) {
+TEST_F(DurableFaults, FailedWriteReturnsWriteErrorAndEintrIsRetried) {
     for (const char *call : {"write:1", "write:2"}) {
         for (const int error : kErrors) {
             SCOPED_TRACE(std::string(call) + " " + std::strerror(error));
@@ -123,14 +123,14 @@ TEST_F(DurableFaults, ShortWritesAreContinued) {
     }
 }
 
-TEST_F(DurableFaults, AWriteThatMakesNoProgressIsNoHang) {
+TEST_F(DurableFaults, WriteWithoutProgressDoesNotHang) {
     const fault::Report report = Write("write:1+:short=0");
     EXPECT_EQ(report.status, HYP_WRITE_ERROR);
     EXPECT_EQ(report.notes, "failed to write dvsfile " + path_ + ", error: No space left on device\n");
     EXPECT_EQ(Contents(path_), Padded(kOld));
 }
 
-TEST_F(DurableFaults, LockIsTriedAgainUnlessItCannotBeHad) {
+TEST_F(DurableFaults, LockIsRetriedUnlessItIsUnsupported) {
     EXPECT_EQ(Write("flock:1:EINTR").status, HYP_OK);
     EXPECT_EQ(Write("flock:1:EWOULDBLOCK").status, HYP_OK);
     EXPECT_EQ(Write("flock:1:ENOLCK").status, HYP_IO_ERROR);
@@ -139,13 +139,13 @@ TEST_F(DurableFaults, LockIsTriedAgainUnlessItCannotBeHad) {
     EXPECT_EQ(Contents(path_), Padded(kOld));
 }
 
-TEST_F(DurableFaults, NamesAreTriedAgainUnlessTheyAllExist) {
+TEST_F(DurableFaults, TemporaryNamesAreRetriedUnlessAllExist) {
     EXPECT_EQ(Write("open:3:EEXIST").status, HYP_OK);
     EXPECT_EQ(Write("open:1+:EEXIST:writers").status, HYP_IO_ERROR);
     EXPECT_EQ(Contents(path_), Padded(kOld));
 }
 
-TEST_F(DurableFaults, WithoutRandomBytesThereIsNoTemporaryFile) {
+TEST_F(DurableFaults, FailsWithoutRandomBytes) {
     EXPECT_EQ(Write("random:1:EINTR").status, HYP_OK);
     EXPECT_EQ(Write("random:1:EIO").status, HYP_IO_ERROR);
     EXPECT_EQ(Write("random:1:short=8").status, HYP_IO_ERROR);
@@ -155,11 +155,11 @@ TEST_F(DurableFaults, WithoutRandomBytesThereIsNoTemporaryFile) {
 TEST_F(DurableFaults, NeedsNoMemory) {
     const fault::Report report = Write("alloc:%");
     EXPECT_EQ(report.status, HYP_OK);
-    EXPECT_EQ(Write("alloc:1+").status, HYP_OK) << "the stale name may stay, the save must not fail";
+    EXPECT_EQ(Write("alloc:1+").status, HYP_OK) << "the stale file may stay, the save must not fail";
     EXPECT_EQ(Contents(path_), Padded(kNew));
 }
 
-TEST_F(DurableFaults, AKilledWriterLeavesOldOrNewAndIsCleanedUpAfter) {
+TEST_F(DurableFaults, KilledWriterLeavesAWholeFileAndIsCleanedUp) {
     for (const char *call : {"open:1", "flock:1", "open:2", "open:3", "chmod:1", "write:1", "write:2",
                              "fsync:1", "rename:1", "fsync:2", "close:2"}) {
         SCOPED_TRACE(call);

@@ -43,7 +43,7 @@ pid_t StartWriter(const std::string &path, uint32_t first, uint32_t num) {
     _exit(0);
 }
 
-TEST_F(DurableRace, EveryReadBesideTwoWritersIsOneWholeVersion) {
+TEST_F(DurableRace, ReadsDuringTwoWritersSeeWholeVersions) {
     const uint32_t saves = SavesPerWriter();
     const std::string first = Version(0);
     ASSERT_EQ(DVSFile_WriteDurable(path_.c_str(), first.data(), static_cast<uint32_t>(first.size())), HYP_OK);
@@ -60,7 +60,7 @@ TEST_F(DurableRace, EveryReadBesideTwoWritersIsOneWholeVersion) {
         for (pid_t &pid : writers) {
             int how = 0;
             if (pid <= 0 || waitpid(pid, &how, WNOHANG) != pid) continue;
-            EXPECT_TRUE(WIFEXITED(how) && WEXITSTATUS(how) == 0) << "a save failed";
+            EXPECT_TRUE(WIFEXITED(how) && WEXITSTATUS(how) == 0) << "a writer's save failed";
             pid = 0;
             running--;
         }
@@ -69,7 +69,7 @@ TEST_F(DurableRace, EveryReadBesideTwoWritersIsOneWholeVersion) {
     EXPECT_EQ(Names(dir_), std::set<std::string>{"state"});
 }
 
-TEST_F(DurableRace, AWriterWaitsForTheLocksHolder) {
+TEST_F(DurableRace, WriterWaitsForTheLock) {
     const int fd = open(dir_.c_str(), O_RDONLY | O_DIRECTORY);
     ASSERT_EQ(flock(fd, LOCK_EX), 0);
     std::thread holder([fd] {
@@ -83,7 +83,7 @@ TEST_F(DurableRace, AWriterWaitsForTheLocksHolder) {
 }
 
 // The only test that waits in real time: the limit of 10 s is documented.
-TEST_F(DurableRace, AWriterGivesUpAfterTenSeconds) {
+TEST_F(DurableRace, WriterTimesOutAfterTenSeconds) {
     const int fd = open(dir_.c_str(), O_RDONLY | O_DIRECTORY);
     ASSERT_EQ(flock(fd, LOCK_EX), 0);
     const auto start = std::chrono::steady_clock::now();

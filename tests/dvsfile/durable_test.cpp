@@ -26,7 +26,7 @@ protected:
     std::string StaleName(char tail) const { return dir_ + "/.state.dvs-" + std::string(31, '0') + tail; }
 };
 
-TEST_F(DurableWrite, PadsAsThePlainWriteDoes) {
+TEST_F(DurableWrite, PadsLikeThePlainWrite) {
     for (const std::size_t size : {1u, 164u, 511u, 512u, 513u, 70000u}) {
         const std::string bytes(size, 'b');
         ASSERT_EQ(Write(path_, bytes), HYP_OK);
@@ -47,7 +47,7 @@ TEST_F(DurableWrite, LeavesOtherFilesUnpadded) {
     EXPECT_EQ(Mode(path_) & 07777, 0600u);
 }
 
-TEST_F(DurableWrite, RefusesNothingWithNothingTouched) {
+TEST_F(DurableWrite, RejectsNoBytesAndTouchesNothing) {
     Put(path_, "old");
     Put(StaleName('1'), "stale");
     EXPECT_EQ(DVSFile_WriteDurable(path_.c_str(), "x", 0), HYP_BAD_PARAM);
@@ -59,7 +59,7 @@ TEST_F(DurableWrite, RefusesNothingWithNothingTouched) {
     EXPECT_TRUE(messages_.empty());
 }
 
-TEST_F(DurableWrite, LeavesMode0600UnderAnyUmask) {
+TEST_F(DurableWrite, SetsMode0600UnderAnyUmask) {
     for (const mode_t mask : {0u, 022u, 077u, 0177u, 0277u, 0777u}) {
         const mode_t before = umask(mask);
         const HYP_ReturnStatus fresh = Write(path_, "new");
@@ -85,13 +85,13 @@ TEST_F(DurableWrite, WorksOnANameInTheWorkingDirectory) {
     EXPECT_EQ(Contents(path_), Padded("new"));
 }
 
-TEST_F(DurableWrite, TakesTheLongestName) {
+TEST_F(DurableWrite, AcceptsTheLongestName) {
     const std::string path = dir_ + "/" + std::string(NAME_MAX, 'n');
     EXPECT_EQ(Write(path, "new"), HYP_OK);
     EXPECT_EQ(Contents(path), Padded("new"));
 }
 
-TEST_F(DurableWrite, LeavesTheOtherNamesOfTheOldFileAlone) {
+TEST_F(DurableWrite, KeepsOtherHardLinksOfTheOldFile) {
     Put(path_, "old");
     fs::create_hard_link(path_, dir_ + "/other");
     EXPECT_EQ(Write(path_, "new"), HYP_OK);
@@ -124,7 +124,7 @@ TEST_F(DurableWrite, CreatesTheTargetOfADanglingLink) {
     EXPECT_EQ(Mode(dir_ + "/real/absent") & 07777, 0600u);
 }
 
-TEST_F(DurableWrite, GivesUpOnALoopOfLinks) {
+TEST_F(DurableWrite, RejectsALoopOfLinks) {
     fs::create_symlink("second", path_);
     fs::create_symlink("state", dir_ + "/second");
     EXPECT_EQ(Write(path_, "new"), HYP_IO_ERROR);
@@ -132,17 +132,17 @@ TEST_F(DurableWrite, GivesUpOnALoopOfLinks) {
               "failed to open dvsfile " + path_ + " for write, error: Too many levels of symbolic links\n");
 }
 
-TEST_F(DurableWrite, GivesUpOnAPathThatIsTooLong) {
+TEST_F(DurableWrite, RejectsAPathThatIsTooLong) {
     EXPECT_EQ(Write(dir_ + "/" + std::string(5000, 'x'), "new"), HYP_IO_ERROR);
     EXPECT_TRUE(Messages().ends_with("error: File name too long\n"));
     fs::create_symlink(std::string(4000, 'x'), path_);
     EXPECT_EQ(Write(dir_ + std::string(200, '/') + "state", "new"), HYP_IO_ERROR)
-        << "a link that makes it so";
+        << "a link target that is too long";
 }
 
 // ---- obstacles at the path ----
 
-TEST_F(DurableWrite, WithoutAFolderIsAnIoError) {
+TEST_F(DurableWrite, ReturnsIoErrorWithoutADirectory) {
     EXPECT_EQ(Write(dir_ + "/none/state", "new"), HYP_IO_ERROR);
     EXPECT_EQ(Messages(),
               "failed to open dvsfile " + dir_ + "/none/state for write, error: No such file or directory\n");
@@ -150,7 +150,7 @@ TEST_F(DurableWrite, WithoutAFolderIsAnIoError) {
     EXPECT_EQ(Write(dir_ + "/", "new"), HYP_IO_ERROR);
 }
 
-TEST_F(DurableWrite, OntoADirectoryIsAWriteError) {
+TEST_F(DurableWrite, ReturnsWriteErrorForADirectory) {
     fs::create_directory(path_);
     EXPECT_EQ(Write(path_, "new"), HYP_WRITE_ERROR);
     EXPECT_EQ(Messages(), "failed to rename dvsfile " + path_ + ", error: Is a directory\n");
@@ -183,7 +183,7 @@ TEST_F(DurableWrite, RemovesItsOwnStaleFiles) {
     EXPECT_EQ(Contents(dir_ + "/precious"), "precious");
 }
 
-TEST_F(DurableWrite, LeavesForeignNamesAlone) {
+TEST_F(DurableWrite, KeepsFilesOfOtherNames) {
     Put(dir_ + "/precious", "precious");
     fs::create_symlink("precious", StaleName('1'));
     fs::create_directory(StaleName('2'));
@@ -199,7 +199,7 @@ TEST_F(DurableWrite, LeavesForeignNamesAlone) {
     EXPECT_EQ(Contents(dir_ + "/precious"), "precious");
 }
 
-TEST_F(DurableWrite, IsNotInTheWayOfThePlainWritesTemporaryName) {
+TEST_F(DurableWrite, KeepsThePlainWritesTemporaryFile) {
     for (const char *kind : {"directory", "fifo", "link"}) {
         const std::string temp = path_ + ".tmp";
         if (kind[0] == 'd') fs::create_directory(temp);
@@ -215,7 +215,7 @@ TEST_F(DurableWrite, IsNotInTheWayOfThePlainWritesTemporaryName) {
 
 // ---- the lock ----
 
-TEST_F(DurableWrite, GivesUpWhenTheDirectoryStaysLocked) {
+TEST_F(DurableWrite, TimesOutWhenTheDirectoryStaysLocked) {
     Put(path_, "old");
     Put(StaleName('1'), "may be in use by the lock's holder");
     const int fd = open(dir_.c_str(), O_RDONLY | O_DIRECTORY);
@@ -229,7 +229,7 @@ TEST_F(DurableWrite, GivesUpWhenTheDirectoryStaysLocked) {
     EXPECT_EQ(Write(path_, "new"), HYP_OK) << "the lock is free again";
 }
 
-TEST_F(DurableWrite, GivesTheLockUp) {
+TEST_F(DurableWrite, ReleasesTheLock) {
     EXPECT_EQ(Write(path_, "new"), HYP_OK);
     fs::create_directory(dir_ + "/d");
     EXPECT_EQ(Write(dir_ + "/d", "new"), HYP_WRITE_ERROR);

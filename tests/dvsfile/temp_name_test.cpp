@@ -41,7 +41,7 @@ TEST(TempName, IsNewEachTime) {
     EXPECT_EQ(names.size(), 1000u);
 }
 
-TEST(TempName, FitsForTheLongestFileName) {
+TEST(TempName, FitsTheLongestFileName) {
     const std::string base(NAME_MAX, 'b');
     EXPECT_LE(Make(base).size(), static_cast<std::size_t>(NAME_MAX));
     EXPECT_TRUE(IsTempName(base, Make(base)));

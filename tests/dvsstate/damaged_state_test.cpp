@@ -92,13 +92,13 @@ void MendState(Buffer *state) {
     MendAll(state, 0, state->size(), 3);
 }
 
-TEST_F(DamagedState, IsRefusedAtEveryLength) {
+TEST_F(DamagedState, IsRejectedWhenTruncatedAtAnyLength) {
     for (std::size_t size = 0; size < state_.size(); size++)
         EXPECT_NE(JudgedAlike(std::span(state_).first(size)), HYP_OK) << size;
     EXPECT_EQ(JudgedAlike(state_), HYP_OK);
 }
 
-TEST_F(DamagedState, IsJudgedAlikeWithEachByteChanged) {
+TEST_F(DamagedState, AllReadersAgreeOnEachChangedByte) {
     for (std::size_t at = 0; at < state_.size(); at++) {
         Buffer damaged = state_;
         damaged[at] ^= 0x41;
@@ -108,7 +108,7 @@ TEST_F(DamagedState, IsJudgedAlikeWithEachByteChanged) {
     }
 }
 
-TEST_F(DamagedState, IsJudgedAlikeWithEachByteChangedAndChecksumsMended) {
+TEST_F(DamagedState, AllReadersAgreeOnEachChangedByteWithValidChecksums) {
     for (std::size_t at = 0; at < state_.size(); at++) {
         for (const int change : {0x01, 0x80}) {
             Buffer damaged = state_;
@@ -140,7 +140,7 @@ constexpr std::uint32_t kLies[] = {0,   1,   3,          4,          12,        
                                    17,  139, 140,        143,        144,        145,        147,
                                    148, 256, 0x7fffffff, 0x80000000, 0xfffffff0, 0xfffffffd, 0xffffffff};
 
-TEST_F(DamagedState, IsJudgedAlikeWhateverSizesSay) {
+TEST_F(DamagedState, AllReadersAgreeOnWrongSizes) {
     const Places places = PlacesOf(state_);
     for (const std::size_t buffer : places.buffers) {
         for (const std::uint32_t lie : kLies) {
@@ -166,7 +166,7 @@ TEST_F(DamagedState, IsJudgedAlikeWhateverSizesSay) {
     }
 }
 
-TEST_F(DamagedState, IsJudgedAlikeUnderRandomChanges) {
+TEST_F(DamagedState, AllReadersAgreeOnRandomChanges) {
     const char *count = std::getenv("DVS_TEST_MUTATIONS");
     std::mt19937 random(20261121);
     const Places places = PlacesOf(state_);

@@ -42,7 +42,7 @@ HYP_ReturnStatus LoadPort(DVSwitch *sw, const std::string &id, const Props &prop
     return DVSState_PortAddDeserialize(sw, id.c_str(), block.data(), block.size());
 }
 
-TEST_F(StateDeserialize, BringsAShadowPortBackWithoutItsKindProperty) {
+TEST_F(StateDeserialize, RestoresAShadowPortWithoutItsKindProperty) {
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "p");
     AddPort(sw, "p", DVS_PORT_SHADOW, {{"a", "1"}});
@@ -53,7 +53,7 @@ TEST_F(StateDeserialize, BringsAShadowPortBackWithoutItsKindProperty) {
     EXPECT_EQ(ContentOf(DVSState_PortFindShadow("dvs", "p")->portData), (Props{{"a", "1"}}));
 }
 
-TEST_F(StateDeserialize, NamesWithoutAnEndAreCutAndRefusedAsIds) {
+TEST_F(StateDeserialize, TruncatesUnterminatedNamesAndRejectsThemAsIds) {
     const std::string name(127, 'n');
     const auto without = [&](Buffer buffer) {
         const auto field = std::search(buffer.begin(), buffer.end(), name.begin(), name.end());
@@ -70,7 +70,7 @@ TEST_F(StateDeserialize, NamesWithoutAnEndAreCutAndRefusedAsIds) {
     EXPECT_TRUE(std::ranges::count(messages.Take(), "DVSState_SwitchAdd " + name + ", id length too long\n"));
 }
 
-TEST_F(StateDeserialize, TakesPortsOfAnyKindAndTellsEach) {
+TEST_F(StateDeserialize, AcceptsPortsOfAnyKindAndPrintsEach) {
     DVSwitch *sw = AddSwitch("dvs");
     StateMessages messages(0);
     EXPECT_EQ(LoadPort(sw, "a", {}), HYP_OK);
@@ -87,13 +87,13 @@ TEST_F(StateDeserialize, TakesPortsOfAnyKindAndTellsEach) {
     EXPECT_EQ(PortsOf(sw), (Lines{"a/1", "z/3", "z/3", "odd/77"}));
 }
 
-TEST_F(StateDeserialize, RefusesAPortKindOfLessThanFourBytes) {
+TEST_F(StateDeserialize, RejectsAPortKindOfLessThanFourBytes) {
     DVSwitch *sw = AddSwitch("dvs");
     EXPECT_EQ(LoadPort(sw, "p", {{kKind, "\1\0\0"}}), HYP_BAD_PARAM);
     EXPECT_TRUE(PortsOf(sw).empty());
 }
 
-TEST_F(StateDeserialize, PortNeedsSwitchAndSoundData) {
+TEST_F(StateDeserialize, PortNeedsSwitchAndValidData) {
     const Buffer bytes = SerializedOf({});
     EXPECT_EQ(DVSState_PortDeserialize("absent", "p", bytes.data(), 16), HYP_NOT_FOUND);
     AddSwitch("dvs");
@@ -122,7 +122,7 @@ TEST_F(StateDeserialize, CreatesASwitchFromItsFields) {
     EXPECT_EQ(ContentOf(sw->hostPropList), (Props{{"h", "1"}}));
 }
 
-TEST_F(StateDeserialize, RefusesASwitchWithoutAField) {
+TEST_F(StateDeserialize, RejectsASwitchWithoutAField) {
     StateMessages messages(0);
     EXPECT_EQ(LoadSwitch("dvs", Without("switchVersion")), HYP_NOT_FOUND);
     EXPECT_EQ(messages.Take(), Lines{"Failed to find switchVersion, status:195887107\n\n"});
@@ -132,7 +132,7 @@ TEST_F(StateDeserialize, RefusesASwitchWithoutAField) {
     EXPECT_TRUE(SwitchIds().empty());
 }
 
-TEST_F(StateDeserialize, RefusesFieldsThatAreTooShort) {
+TEST_F(StateDeserialize, RejectsFieldsThatAreTooShort) {
     for (const std::size_t field : {0u, 2u}) {
         Props props = SwitchProps();
         props[field].value.resize(3);
@@ -168,7 +168,7 @@ TEST_F(StateDeserialize, ExistingSwitchKeepsVersionAndClassAndGetsNewLists) {
     EXPECT_EQ(PortsOf(sw), (Lines{"a/1", "b/1"}));
 }
 
-TEST_F(StateDeserialize, PortFailureTakesACreatedSwitchAwayAndLeavesAnExistingOne) {
+TEST_F(StateDeserialize, PortFailureRemovesOnlyASwitchThatItCreated) {
     const Props props = With(SwitchProps(), {Nested("p", {}), Nested("p", {})});
     StateMessages messages(0);
     EXPECT_EQ(LoadSwitch("dvs", props), HYP_EXISTS);
@@ -179,7 +179,7 @@ TEST_F(StateDeserialize, PortFailureTakesACreatedSwitchAwayAndLeavesAnExistingOn
     EXPECT_EQ(PortsOf(sw), Lines{"p/1"});
 }
 
-TEST_F(StateDeserialize, AFailingSwitchEmptiesTheWholeTable) {
+TEST_F(StateDeserialize, FailingSwitchEmptiesTheWholeTable) {
     AddSwitch("before");
     const Buffer state =
         SerializedOf({Nested("good", SwitchProps()),
@@ -190,7 +190,7 @@ TEST_F(StateDeserialize, AFailingSwitchEmptiesTheWholeTable) {
     EXPECT_TRUE(SwitchIds().empty());
 }
 
-TEST_F(StateDeserialize, ABufferThatIsNoStateLeavesTheTableAlone) {
+TEST_F(StateDeserialize, InvalidBufferKeepsTheTable) {
     AddSwitch("before");
     Buffer state = SerializedOf({Nested("good", SwitchProps())});
     state[200] ^= 1;
@@ -209,7 +209,7 @@ TEST_F(StateDeserialize, StateAddsToTheTable) {
     EXPECT_EQ(SwitchIds(), (Lines{"before", "more"}));
 }
 
-TEST_F(StateDeserialize, SwitchIdOf64CharactersReachesTheAddUncut) {
+TEST_F(StateDeserialize, SwitchIdOf64CharactersIsNotTruncated) {
     const std::string id(64, 'i');
     StateMessages messages(0);
     EXPECT_EQ(LoadState(SerializedOf({Nested(id, SwitchProps())})), HYP_BAD_PARAM);
@@ -239,7 +239,7 @@ TEST_F(StateDeserialize, EntriesOfUnknownTypesAreDropped) {
     EXPECT_EQ(LoadSwitch("other", props), HYP_NOT_FOUND); // its version entry is dropped
 }
 
-TEST_F(StateDeserialize, HostListIsJudgedBeforeTheGlobalOne) {
+TEST_F(StateDeserialize, ChecksTheHostListBeforeTheGlobalOne) {
     Props props =
         With(SwitchProps(), {{"globalPropList", "short", 0x10}, Nested("hostPropList", {{"a", "1"}})});
     props[4].value[60] ^= 1;
@@ -248,7 +248,7 @@ TEST_F(StateDeserialize, HostListIsJudgedBeforeTheGlobalOne) {
     EXPECT_EQ(LoadSwitch("dvs", props), HYP_BAD_PARAM);
 }
 
-TEST_F(StateDeserialize, TheBufferMayLieInAListThatItReplaces) {
+TEST_F(StateDeserialize, BufferMayLieInAListThatItReplaces) {
     DVSwitch *sw = AddSwitch("dvs");
     const Buffer buffer =
         SerializedOf(With(SwitchProps(), {Nested("globalPropList", {{"new", "2"}}), Nested("p", {})}));

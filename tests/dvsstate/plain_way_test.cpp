@@ -101,7 +101,7 @@ TEST_F(PlainWay, WritesDetachedListsAndHiddenPortsAlike) {
     ExpectWrittenAlike();
 }
 
-TEST_F(PlainWay, RefusesListsWhoseBooksAreWrongAlike) {
+TEST_F(PlainWay, RejectsInconsistentListsAlike) {
     BuildExample();
     DVSwitch *sw = DVSState_SwitchFind("second");
     for (DVSData *list : {sw->globalPropList, sw->hostPropList, DVSState_PortFind("second", "2")->portData}) {

@@ -44,7 +44,7 @@ TEST_F(PortFind, KeepsKindsApart) {
     EXPECT_EQ(DVSState_PortFindShadowByAlias("sw", "al"), shadow);
 }
 
-TEST_F(PortFind, LooksForASwitchWhoseIdIsTheUuidsText) {
+TEST_F(PortFind, FindsASwitchWhoseIdIsTheUuidsText) {
     DVSwitch *sw = AddSwitch(kUuidId);
     EXPECT_EQ(DVSState_PortFindByUUID(kUuid, "p"), nullptr);
     DVSPort *cached = AddPort(sw, "p", DVS_PORT_LOCAL_CACHE);
@@ -56,7 +56,7 @@ TEST_F(PortFind, LooksForASwitchWhoseIdIsTheUuidsText) {
     EXPECT_EQ(DVSState_PortFindShadowByUUID(kUuid, "p"), shadow);
 }
 
-TEST_F(PortFind, GivesNoneWithoutASwitch) {
+TEST_F(PortFind, ReturnsNullWithoutASwitch) {
     EXPECT_EQ(DVSState_PortFind("absent", "p"), nullptr);
     EXPECT_EQ(DVSState_PortFindShadow("absent", "p"), nullptr);
     EXPECT_EQ(DVSState_PortFindByUUID(kUuid, "p"), nullptr);
@@ -65,7 +65,7 @@ TEST_F(PortFind, GivesNoneWithoutASwitch) {
     DVSState_PortForEach(nullptr, nullptr, nullptr);
 }
 
-TEST_F(PortFind, TakesTheFirstAliasInSlotOrderAsText) {
+TEST_F(PortFind, FindsTheFirstAliasInSlotOrderAsText) {
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "other", DVS_PORT_ACTIVE, Alias("al2"));
     DVSPort *first = AddPort(sw, "b", DVS_PORT_ACTIVE, Alias(std::string("al\0x", 4)));
@@ -81,7 +81,7 @@ TEST_F(PortFind, NamesAPortByItsAliasOrUnknown) {
 }
 
 // Callers can change slots. A set bit without a port ends every walk, with and without an index.
-TEST_F(PortFind, APortWhoseSlotACallerEmptiedIsNotFound) {
+TEST_F(PortFind, PortWhoseSlotACallerEmptiedIsNotFound) {
     for (const int ports : {4, 200}) {
         const std::string id = "dvs" + std::to_string(ports);
         DVSwitch *sw = AddSwitch(id);

@@ -16,7 +16,7 @@ class PortTable : public StateTest {};
 
 using Lines = std::vector<std::string>;
 
-TEST_F(PortTable, HoldsIdsToTheLengthOfTheSwitchVersion) {
+TEST_F(PortTable, LimitsIdLengthByTheSwitchVersion) {
     DVSwitch *old = AddSwitch("old", 6);
     EXPECT_EQ(TryAddPort(old, std::string(16, 'p')), HYP_BAD_PARAM);
     EXPECT_EQ(TryAddPort(old, std::string(15, 'p')), HYP_OK);
@@ -28,7 +28,7 @@ TEST_F(PortTable, HoldsIdsToTheLengthOfTheSwitchVersion) {
     EXPECT_EQ(PortsOf(recent), Lines{std::string(47, 'p') + "/1"});
 }
 
-TEST_F(PortTable, HoldsOneIdOncePerKindAndHandsOutTheFirst) {
+TEST_F(PortTable, AllowsAnIdOncePerKindAndReturnsTheFirst) {
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "other");
     DVSPort *first = AddPort(sw, "p");
@@ -44,7 +44,7 @@ TEST_F(PortTable, HoldsOneIdOncePerKindAndHandsOutTheFirst) {
     EXPECT_EQ(TryAddPort(sw, "other", DVS_PORT_ACTIVE), HYP_EXISTS);
 }
 
-TEST_F(PortTable, TellsSlotAndKindInEachOthersPlace) {
+TEST_F(PortTable, MessageSwapsSlotAndKind) {
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "p", DVS_PORT_LOCAL_CACHE);
     StateMessages messages(0);
@@ -52,7 +52,7 @@ TEST_F(PortTable, TellsSlotAndKindInEachOthersPlace) {
     EXPECT_EQ(messages.Take(), Lines{"DVSStatePortAdd port p type 0[4] exists.\n"});
 }
 
-TEST_F(PortTable, LetsZombiesRepeatAnId) {
+TEST_F(PortTable, AllowsZombiesToRepeatAnId) {
     DVSwitch *sw = AddSwitch("dvs");
     DVSPort *first = AddPort(sw, "z", DVS_PORT_ZOMBIE);
     DVSPort *second = AddPort(sw, "z", DVS_PORT_ZOMBIE);
@@ -61,7 +61,7 @@ TEST_F(PortTable, LetsZombiesRepeatAnId) {
     EXPECT_EQ(DVSState_PortFindZombie("dvs", "z"), second);
 }
 
-TEST_F(PortTable, HoldsASwitchToItsOwnLimit) {
+TEST_F(PortTable, EnforcesTheSwitchsLimit) {
     DVSwitch *sw = AddLimitedSwitch("dvs", 2);
     AddPort(sw, "a");
     AddPort(sw, "a", DVS_PORT_SHADOW);
@@ -70,7 +70,7 @@ TEST_F(PortTable, HoldsASwitchToItsOwnLimit) {
     EXPECT_EQ(messages.Take(), Lines{"DVSStatePortAdd dvs, switch has already used up max num ports (2)\n"});
 }
 
-TEST_F(PortTable, HoldsEverySwitchToTheHostsLimit) {
+TEST_F(PortTable, EnforcesTheHostsLimitForEverySwitch) {
     SetHostPorts(3);
     DVSwitch *first = AddSwitch("first");
     DVSwitch *second = AddLimitedSwitch("second", 2);
@@ -85,7 +85,7 @@ TEST_F(PortTable, HoldsEverySwitchToTheHostsLimit) {
                      "DVSStatePortAdd second, host has already used up max num ports (3)\n"}));
 }
 
-TEST_F(PortTable, RefusesPortsOnALimitBelowOne) {
+TEST_F(PortTable, RejectsPortsOnALimitBelowOne) {
     DVSwitch *sw = AddSwitch("dvs");
     StateMessages messages(0);
     for (const std::uint32_t limit : {0u, 0x80000000u}) {
@@ -95,7 +95,7 @@ TEST_F(PortTable, RefusesPortsOnALimitBelowOne) {
     }
 }
 
-TEST_F(PortTable, ScansNoFurtherThanTheLimitAndNeverLeavesTheRecord) {
+TEST_F(PortTable, ScansUpToTheLimitWithinTheRecord) {
     SetHostPorts(4);
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "a");
@@ -112,7 +112,7 @@ TEST_F(PortTable, ScansNoFurtherThanTheLimitAndNeverLeavesTheRecord) {
     uwMaxNumActivePortsSystemWide = 4;
 }
 
-TEST_F(PortTable, RefusesMissingSwitchAndMissingData) {
+TEST_F(PortTable, RejectsMissingSwitchAndMissingData) {
     StateMessages messages(0);
     EXPECT_EQ(DVSState_PortAdd("absent", "p", nullptr), HYP_NOT_FOUND);
     EXPECT_EQ(DVSState_PortRemove("absent", "p"), HYP_NOT_FOUND);
@@ -133,7 +133,7 @@ TEST_F(PortTable, KeepsPortsOfOtherKindsWhenRemoving) {
     EXPECT_TRUE(PortsOf(sw).empty());
 }
 
-TEST_F(PortTable, FillsTheFirstFreeSlotAndTracesBothWays) {
+TEST_F(PortTable, FillsTheFirstFreeSlotAndTracesAddAndRemove) {
     DVSwitch *sw = AddSwitch("dvs");
     for (const char *id : {"a", "b", "c"})
         AddPort(sw, id);
@@ -164,7 +164,7 @@ TEST_F(PortTable, AddsShadowPortsFromSerializedData) {
     EXPECT_EQ(PortsOf(sw), Lines{"p/2"});
 }
 
-TEST_F(PortTable, EndsAWalkAtASetBitWithoutAPort) {
+TEST_F(PortTable, WalkEndsAtASetBitWithoutAPort) {
     DVSwitch *sw = AddSwitch("dvs");
     for (const char *id : {"a", "b", "c"})
         AddPort(sw, id);
@@ -177,7 +177,7 @@ TEST_F(PortTable, EndsAWalkAtASetBitWithoutAPort) {
 }
 
 // From 64 used slots, lookups use an index. Results must not change.
-TEST_F(PortTable, AnswersAlikeWithAnIndex) {
+TEST_F(PortTable, GivesTheSameResultsWithAnIndex) {
     SetHostPorts(300);
     DVSwitch *sw = AddSwitch("dvs");
     for (int i = 0; i < 299; i++)

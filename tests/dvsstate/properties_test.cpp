@@ -38,7 +38,7 @@ protected:
 INSTANTIATE_TEST_SUITE_P(Families, SwitchProperties, testing::ValuesIn(kFamilies),
                          [](const auto &family) { return family.param.name; });
 
-TEST_P(SwitchProperties, RefuseMissingValuesBeforeAnythingElse) {
+TEST_P(SwitchProperties, RejectMissingValuesBeforeAnyOtherCheck) {
     StateMessages messages(9);
     EXPECT_EQ(on_.set("absent", "a", "x", 0, 0), HYP_FAILURE);
     EXPECT_EQ(on_.set("dvs", "a", "x", 0, 0), HYP_FAILURE);
@@ -72,14 +72,14 @@ TEST_P(SwitchProperties, AreSetReadAndCleared) {
     EXPECT_EQ(on_.read(sw_, "a", &data, &len), HYP_NOT_FOUND);
 }
 
-TEST_P(SwitchProperties, ReadWithoutALengthGivesTheAddress) {
+TEST_P(SwitchProperties, ReadWithoutALengthReturnsTheAddress) {
     EXPECT_EQ(on_.set("dvs", "a", "value", 5, 0), HYP_OK);
     void *data = nullptr;
     EXPECT_EQ(on_.read(sw_, "a", &data, nullptr), HYP_OK);
     EXPECT_EQ(data, List()->head->data);
 }
 
-TEST_P(SwitchProperties, KeepTheirPlaceAtTheSameLengthAndMoveToTheEndAtAnother) {
+TEST_P(SwitchProperties, KeepTheirPlaceOnlyAtTheSameLength) {
     EXPECT_EQ(on_.set("dvs", "a", "1234", 4, 0x18), HYP_OK);
     EXPECT_EQ(on_.set("dvs", "b", "1234", 4, 0x18), HYP_OK);
     EXPECT_EQ(on_.set("dvs", "a", "5678", 4, 0), HYP_OK);
@@ -88,7 +88,7 @@ TEST_P(SwitchProperties, KeepTheirPlaceAtTheSameLengthAndMoveToTheEndAtAnother) 
     EXPECT_EQ(ContentOf(List()), (Props{{"b", "1234", 0x18}, {"a", "56789", 0x18}}));
 }
 
-TEST_P(SwitchProperties, WalkToTheEndIsNotFoundAndAStoppedOneIsTrue) {
+TEST_P(SwitchProperties, CompleteWalkReturnsNotFoundAndAStoppedOneTrue) {
     for (const char *name : {"a", "b", "c"})
         EXPECT_EQ(on_.set("dvs", name, "x", 1, 0), HYP_OK);
     int calls = 0;
@@ -99,7 +99,7 @@ TEST_P(SwitchProperties, WalkToTheEndIsNotFoundAndAStoppedOneIsTrue) {
     EXPECT_EQ(calls, 5);
 }
 
-TEST_P(SwitchProperties, OfASwitchWithoutTheListAreNotThereUntilOneIsSet) {
+TEST_P(SwitchProperties, AreAbsentWithoutAListUntilOneIsSet) {
     DVSData_Free(List());
     sw_->*on_.list = nullptr;
     DVSDataEntry *entry = nullptr;

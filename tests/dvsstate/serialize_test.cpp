@@ -35,7 +35,7 @@ Lines NamesOf(const Props &props) {
     return names;
 }
 
-TEST_F(StateSerialize, EmptyTableIs16BytesAndLoadsAsNothing) {
+TEST_F(StateSerialize, EmptyTableIs16BytesAndLoadsAsEmpty) {
     const Buffer bytes = StateBytes();
     EXPECT_EQ(bytes, (Buffer{16, 0, 0, 0, 0, 0, 0, 0, 1, 0, 0, 0, 0, 0, 0, 0}));
     EXPECT_EQ(LoadState(bytes), HYP_OK);
@@ -63,7 +63,7 @@ TEST_F(StateSerialize, SwitchHoldsFiveFixedEntriesAndItsPorts) {
               (Props{{"com.orbeno.common.port.volatile.type", U32Value(2), 0x10}}));
 }
 
-TEST_F(StateSerialize, StateNamesSwitchesBySlotOrder) {
+TEST_F(StateSerialize, StateListsSwitchesInSlotOrder) {
     for (const char *id : {"b", "a"})
         AddSwitch(id);
     const Props entries = EntriesOf(StateBytes());
@@ -85,7 +85,7 @@ TEST_F(StateSerialize, AddsTheKindToTheOutputOnly) {
     EXPECT_EQ(EntriesOf(PortBytes(port)), ContentOf(port->portData));
 }
 
-TEST_F(StateSerialize, LeavesOutPortsOfKind0AndAbsentLists) {
+TEST_F(StateSerialize, OmitsPortsOfKind0AndAbsentLists) {
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "a")->portType = 0;
     AddPort(sw, "b");
@@ -94,7 +94,7 @@ TEST_F(StateSerialize, LeavesOutPortsOfKind0AndAbsentLists) {
     EXPECT_EQ(NamesOf(EntriesOf(SwitchBytes(sw))), (Lines{"switchVersion", "className", "maxPorts", "b"}));
 }
 
-TEST_F(StateSerialize, EndsThePortsAtASetBitWithoutAPort) {
+TEST_F(StateSerialize, PortsEndAtASetBitWithoutAPort) {
     DVSwitch *sw = AddSwitch("dvs");
     for (const char *id : {"a", "b", "c"})
         AddPort(sw, id);
@@ -103,7 +103,7 @@ TEST_F(StateSerialize, EndsThePortsAtASetBitWithoutAPort) {
     sw->ports[1] = hidden;
 }
 
-TEST_F(StateSerialize, Version99LeavesOutFilteredTypesOfItsOwnLists) {
+TEST_F(StateSerialize, Version99OmitsFilteredTypesOfTheSwitchsLists) {
     DVSwitch *sw = AddSwitch("dvs", 99);
     const Props all = {{"default", "1", 0x20},    {"24", "1", 0x24}, {"40", "1", 0x40},
                        {"10", "1", 0x10},         {"18", "1", 0x18}, {"04", "1", 0x04},
@@ -118,14 +118,14 @@ TEST_F(StateSerialize, Version99LeavesOutFilteredTypesOfItsOwnLists) {
     EXPECT_EQ(EntriesOf(entries[5].value), all); // port data is never filtered
 }
 
-TEST_F(StateSerialize, WritesNothingBehindAClassNamesEnd) {
+TEST_F(StateSerialize, ZeroesBytesAfterTheClassName) {
     DVSwitch *sw = AddSwitch("dvs");
     std::memset(sw->className, 'x', sizeof sw->className);
     std::strcpy(sw->className, "mine");
     EXPECT_EQ(EntriesOf(SwitchBytes(sw))[1].value, std::string("mine") + std::string(124, '\0'));
 }
 
-TEST_F(StateSerialize, TellsWhatItDoes) {
+TEST_F(StateSerialize, PrintsItsMessages) {
     AddPort(AddSwitch("dvs"), "p");
     StateMessages messages(2);
     (void)StateBytes();
@@ -135,7 +135,7 @@ TEST_F(StateSerialize, TellsWhatItDoes) {
                      "DVSState_SwitchDeserialize dvs dvs return Success\n"}));
 }
 
-TEST_F(StateSerialize, FailsWithExistsWhateverASwitchFailsWith) {
+TEST_F(StateSerialize, FailsWithExistsForAnySwitchFailure) {
     DVSwitch *sw = AddSwitch("dvs");
     sw->hostPropList->serialSize += 4;
     StateMessages messages(1);
@@ -174,7 +174,7 @@ TEST_F(StateSerialize, WritesIntoTheCallersBufferWhenItIsLargeEnough) {
     EXPECT_EQ(len, given.size() - 1);
 }
 
-TEST_F(StateSerialize, RefusesASizeThatNoBufferCanHave) {
+TEST_F(StateSerialize, RejectsASizeThatNoBufferCanHave) {
     DVSwitch *sw = AddSwitch("dvs");
     AddPort(sw, "a")->portData->serialSize = 0xffffff00;
     void *buf = nullptr;

@@ -34,7 +34,7 @@ std::vector<std::string> Walk(const Buffer &bytes) {
     return lines;
 }
 
-TEST_F(StateViewTest, GivesEveryEntryWithItsPath) {
+TEST_F(StateViewTest, ReturnsEveryEntryWithItsPath) {
     DVSwitch *sw = AddSwitch("dvs");
     Append(sw->globalPropList, {"mtu", U32Value(1500)});
     AddPort(sw, "p1", DVS_PORT_ACTIVE, {{"a", "1"}, {"b", "2"}});
@@ -63,7 +63,7 @@ TEST_F(StateViewTest, GivesEveryEntryWithItsPath) {
     EXPECT_EQ(Walk(StateBytes()), expected);
 }
 
-TEST_F(StateViewTest, SaysSoundOfAWrittenState) {
+TEST_F(StateViewTest, AcceptsAWrittenState) {
     BuildExample();
     const StateVerdict verdict = VerifyState(StateBytes());
     EXPECT_FALSE(verdict.first) << verdict.first.Text();
@@ -99,7 +99,7 @@ std::size_t ValueOffset(const Buffer &bytes, std::initializer_list<std::string_v
     return 0;
 }
 
-TEST_F(StateViewTest, FindsTheSmallestBufferAroundAWrongByte) {
+TEST_F(StateViewTest, ReportsTheSmallestBufferAroundAWrongByte) {
     BuildExample();
     Buffer bytes = StateBytes();
     bytes[ValueOffset(bytes, {"second", "2"}) + 40] ^= 1;
@@ -130,7 +130,7 @@ std::string FirstOf(const Props &state, std::optional<std::uint32_t> host = std:
     return Described(VerifyState(SerializedOf(state), host).first);
 }
 
-TEST_F(StateViewTest, SaysWhatALoadWouldRefuseAndWhere) {
+TEST_F(StateViewTest, ReportsWhatALoadWouldRejectAndWhere) {
     const std::string kind = "com.orbeno.common.port.volatile.type";
     EXPECT_EQ(FirstOf({Nested("s", {})}), "s @12: switch has no switchVersion");
     EXPECT_EQ(FirstOf({Nested("s", {{"switchVersion", "123", 0x10}})}),
@@ -151,7 +151,7 @@ TEST_F(StateViewTest, SaysWhatALoadWouldRefuseAndWhere) {
         "s/p @1620: port of this id and kind is there already");
 }
 
-TEST_F(StateViewTest, FindsTheOneRepeatedPortAmongMany) {
+TEST_F(StateViewTest, ReportsTheOneRepeatedPortAmongMany) {
     const std::string kind = "com.orbeno.common.port.volatile.type";
     Props ports;
     for (int i = 0; i < 3000; i++)
@@ -169,7 +169,7 @@ TEST_F(StateViewTest, FindsTheOneRepeatedPortAmongMany) {
     EXPECT_EQ(verdict.sound.ports, 3001u);
 }
 
-TEST_F(StateViewTest, KeepsToTheHostsLimitsOnlyWhenAsked) {
+TEST_F(StateViewTest, ChecksTheHostsLimitsOnlyOnRequest) {
     const Props full = {Nested("s", SwitchWith({Nested("p", {}), Nested("q", {})}))};
     EXPECT_EQ(FirstOf(full, 1), "s/q @892: more ports than the switch or the host may have");
     EXPECT_EQ(FirstOf(full, 2), " @0: no fault");
@@ -187,7 +187,7 @@ TEST_F(StateViewTest, KeepsToTheHostsLimitsOnlyWhenAsked) {
     EXPECT_EQ(VerifyState(state).first.Status(), HYP_OK);
 }
 
-TEST_F(StateViewTest, GivesFieldsKindsAndDroppedEntries) {
+TEST_F(StateViewTest, ReturnsFieldsKindsAndDroppedEntries) {
     Props props =
         SwitchWith({Nested("p", {{"com.orbeno.common.port.volatile.type", U32Value(3)}}), Nested("q", {})});
     props.back().type = 1;
@@ -212,7 +212,7 @@ TEST_F(StateViewTest, GivesFieldsKindsAndDroppedEntries) {
     EXPECT_EQ(others, 1);
 }
 
-TEST_F(StateViewTest, SkipsWhatAnItemHolds) {
+TEST_F(StateViewTest, SkipsTheContentsOfAnItem) {
     BuildExample();
     const Buffer bytes = StateBytes();
     StateView view(bytes);
@@ -222,7 +222,7 @@ TEST_F(StateViewTest, SkipsWhatAnItemHolds) {
     EXPECT_EQ(items, 6); // the state, two switches, and the end of each
 }
 
-TEST_F(StateViewTest, CutsTextsToTheRoomThereIs) {
+TEST_F(StateViewTest, TruncatesTextsToTheAvailableRoom) {
     StatePath path;
     path.names = {"switch", "port"};
     path.depth = 2;

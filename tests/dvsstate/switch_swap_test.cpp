@@ -65,7 +65,7 @@ TEST_F(SwitchSwap, StripWithParkingEmptiesTheTable) {
     DVSState_FreeDVSArray(parked_);
 }
 
-TEST_F(SwitchSwap, AFlagThatIsEmptyOrZeroIsNotSet) {
+TEST_F(SwitchSwap, EmptyOrZeroFlagIsNotSet) {
     for (const char *id : {"a", "b", "c"})
         AddSwitch(id);
     MarkNotPersisted("a", "");
@@ -75,7 +75,7 @@ TEST_F(SwitchSwap, AFlagThatIsEmptyOrZeroIsNotSet) {
     EXPECT_EQ(SwitchIds(), (Lines{"a", "b", "c"}));
 }
 
-TEST_F(SwitchSwap, StoredCopiesTakeThePlacesOfRemovedSwitches) {
+TEST_F(SwitchSwap, StoredCopiesReplaceRemovedSwitches) {
     for (const char *id : {"a", "b", "c"})
         AddSwitch(id);
     MarkNotPersisted("a");
@@ -93,7 +93,7 @@ TEST_F(SwitchSwap, StoredCopiesTakeThePlacesOfRemovedSwitches) {
     EXPECT_TRUE(SwitchIds().empty());
 }
 
-TEST_F(SwitchSwap, ASwitchStaysWhereItIsWhenNoSlotRemains) {
+TEST_F(SwitchSwap, SwitchStaysInPlaceWhenNoSlotRemains) {
     for (int i = 0; i < 32; i++)
         AddSwitch("p" + std::to_string(i));
     MarkNotPersisted("p3");
@@ -107,7 +107,7 @@ TEST_F(SwitchSwap, ASwitchStaysWhereItIsWhenNoSlotRemains) {
     DVSState_FreeDVSArray(parked_);
 }
 
-TEST_F(SwitchSwap, RowsWithoutATerminatorAreReadToTheirEnd) {
+TEST_F(SwitchSwap, UnterminatedRowsAreReadToTheirEnd) {
     AddSwitch(std::string(63, 'a'));
     std::memset(ids_[0], 'a', sizeof ids_[0]);
     Update();

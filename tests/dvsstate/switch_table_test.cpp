@@ -17,7 +17,7 @@ class SwitchTable : public StateTest {};
 
 using Lines = std::vector<std::string>;
 
-TEST_F(SwitchTable, AcceptsAnIdOf63CharactersAndRefuses64) {
+TEST_F(SwitchTable, AcceptsAnIdOf63CharactersAndRejects64) {
     StateMessages messages(0);
     EXPECT_EQ(DVSState_SwitchAdd(std::string(63, 'a').c_str(), "vswitch", 1, 9), HYP_OK);
     EXPECT_TRUE(messages.All().empty());
@@ -26,7 +26,7 @@ TEST_F(SwitchTable, AcceptsAnIdOf63CharactersAndRefuses64) {
     EXPECT_EQ(messages.Take(), Lines{"DVSState_SwitchAdd " + tooLong + ", id length too long\n"});
 }
 
-TEST_F(SwitchTable, RefusesThe33rdSwitchAndTheSameIdTwice) {
+TEST_F(SwitchTable, RejectsThe33rdSwitchAndADuplicateId) {
     for (int i = 0; i < 32; i++)
         AddSwitch("dvs" + std::to_string(i));
     StateMessages messages(0);
@@ -44,7 +44,7 @@ TEST_F(SwitchTable, FillsTheFirstFreeSlot) {
     EXPECT_EQ(SwitchIds(), (Lines{"a", "d", "c"}));
 }
 
-TEST_F(SwitchTable, GivesTheFiveClassesTheHostsLimitAndTheirFlags) {
+TEST_F(SwitchTable, SetsTheHostsLimitAndFlagsOfTheFiveClasses) {
     SetHostPorts(100);
     const struct {
         const char *name;
@@ -62,7 +62,7 @@ TEST_F(SwitchTable, GivesTheFiveClassesTheHostsLimitAndTheirFlags) {
     }
 }
 
-TEST_F(SwitchTable, RefusesALimitBeyondTheHostsFreePorts) {
+TEST_F(SwitchTable, RejectsALimitAboveTheHostsFreePorts) {
     SetHostPorts(10);
     AddPort(AddSwitch("first"), "p");
     StateMessages messages(0);
@@ -90,7 +90,7 @@ TEST_F(SwitchTable, StartsASwitchEmpty) {
     }
 }
 
-TEST_F(SwitchTable, TakesThePendingLimitWhenTold) {
+TEST_F(SwitchTable, AppliesThePendingLimitOnRequest) {
     DVSwitch *sw = AddLimitedSwitch("dvs", 4);
     sw->newMaxPorts = 7;
     EXPECT_EQ(DVS_GetMaxPorts(sw), 4u);
@@ -99,7 +99,7 @@ TEST_F(SwitchTable, TakesThePendingLimitWhenTold) {
     EXPECT_EQ(DVS_GetMaxPorts(sw), 7u);
 }
 
-TEST_F(SwitchTable, CutsAClassNameAndClearsWhatWasBehindIt) {
+TEST_F(SwitchTable, TruncatesAClassNameAndClearsTheRest) {
     DVSwitch *sw = AddSwitch("dvs");
     DVS_SetClassName(sw, std::string(300, 'x').c_str());
     EXPECT_EQ(DVS_ClassName(sw), std::string(127, 'x'));
@@ -119,7 +119,7 @@ TEST_F(SwitchTable, AcceptsSupportedVersionsOnly) {
     EXPECT_EQ(DVSState_SwitchSetVersion("absent", 9), HYP_NOT_FOUND);
 }
 
-TEST_F(SwitchTable, SaysWhichVersionItSets) {
+TEST_F(SwitchTable, PrintsTheVersionItSets) {
     AddSwitch("dvs", 9);
     StateMessages messages(0);
     (void)DVSState_SwitchSetVersion("dvs", 12);
@@ -207,7 +207,7 @@ TEST_F(SwitchTable, ReadsTheHostsLimitOnceAtTheFirstAdd) {
     EXPECT_EQ(AddSwitch("second")->maxPorts, 12u);
 }
 
-TEST_F(SwitchTable, FailsWithTheHostWhenItCannotTellItsLimit) {
+TEST_F(SwitchTable, FailsWhenTheHostsLimitIsUnreadable) {
     setenv("DVS_MAX_PORTS", "many", 1);
     StateMessages messages(0);
     EXPECT_EQ(DVSState_SwitchAdd("dvs", "vswitch", 1, 9), HYP_BAD_PARAM);
@@ -217,7 +217,7 @@ TEST_F(SwitchTable, FailsWithTheHostWhenItCannotTellItsLimit) {
     EXPECT_EQ(DVSState_SwitchAdd("dvs", "vswitch", 1, 9), HYP_OK);
 }
 
-TEST_F(SwitchTable, LockIsRecursiveAndReleasingNoneIsFine) {
+TEST_F(SwitchTable, LockIsRecursiveAndReleasingANullLockIsANoOp) {
     MXUserRecLock *outer = DVSwitchHandleLock();
     MXUserRecLock *inner = DVSwitchHandleLock();
     EXPECT_NE(outer, nullptr);
@@ -227,7 +227,7 @@ TEST_F(SwitchTable, LockIsRecursiveAndReleasingNoneIsFine) {
     DVSwitchHandleUnlock(nullptr);
 }
 
-TEST_F(SwitchTable, IsSearchedAndChangedFromSeveralThreads) {
+TEST_F(SwitchTable, SupportsLookupsAndChangesFromSeveralThreads) {
     AddSwitch("stays");
     std::vector<std::thread> threads;
     for (int worker = 0; worker < 4; worker++) {

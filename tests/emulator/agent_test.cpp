@@ -38,7 +38,7 @@ TEST_F(Agent, SetsUpListsAndSaves) {
     EXPECT_EQ(saved.status, 0) << saved.out << saved.err;
 }
 
-TEST_F(Agent, WithoutAnEmulatorFailsAndSaysSo) {
+TEST_F(Agent, FailsWithAMessageWithoutAnEmulator) {
     emulator_.Process().Stop(SIGTERM);
     const Finished saved = RunProgram({kAgent, "save"});
     EXPECT_EQ(saved.status, 1);

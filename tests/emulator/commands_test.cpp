@@ -32,7 +32,7 @@ TEST_F(EmulatorCommands, StartsWithoutSwitches) {
     EXPECT_EQ(state.text.size(), 16U);
 }
 
-TEST_F(EmulatorCommands, SaysWhereItListensInOneLine) {
+TEST_F(EmulatorCommands, PrintsItsSocketInOneLine) {
     EXPECT_EQ(emulator_.Process().ReadyLine(), "dvs-emulator ready on " + emulator_.Socket());
 }
 
@@ -43,7 +43,7 @@ TEST_F(EmulatorCommands, StateInitReplacesTheWholeState) {
     EXPECT_EQ(Fetch(DVSHYP_StateGet).text, before.text);
 }
 
-TEST_F(EmulatorCommands, StateInitRefusesDamageAndKeepsTheState) {
+TEST_F(EmulatorCommands, StateInitRejectsDamageAndKeepsTheState) {
     const Bytes before = Fetch(DVSHYP_StateGet);
     std::string damaged = before.text;
     damaged.back() = 1;
@@ -69,7 +69,7 @@ TEST_F(EmulatorCommands, StateSanitizeRemovesZombiesAndCachedPorts) {
     EXPECT_EQ(listing.find("local-cache"), std::string::npos) << listing;
 }
 
-TEST_F(EmulatorCommands, SwitchAddAndRemoveRefuseAsTheTableDoes) {
+TEST_F(EmulatorCommands, SwitchAddAndRemoveFailLikeTheTable) {
     EXPECT_EQ(DVSHYP_SwitchAdd("s1", "vswitch", 0, 110), HYP_EXISTS);
     EXPECT_EQ(DVSHYP_SwitchAdd("big", "custom", 70000, 110), HYP_LIMIT_EXCEEDED);
     EXPECT_EQ(DVSHYP_SwitchRemove("s2"), HYP_NOT_FOUND);
@@ -87,7 +87,7 @@ TEST_F(EmulatorCommands, AssociationShowsInStats) {
     EXPECT_NE(Exec("stats").text.find("ports 1 dissociated\n"), std::string::npos);
 }
 
-TEST_F(EmulatorCommands, GlobalAndHostPropertiesAreApart) {
+TEST_F(EmulatorCommands, GlobalAndHostPropertiesAreSeparate) {
     EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", "global", 6, 16), HYP_OK);
     EXPECT_EQ(DVSHYP_HostPropSet("s1", "n", "host", 4, 16), HYP_OK);
     EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "n").text, "global");
@@ -101,7 +101,7 @@ TEST_F(EmulatorCommands, GlobalAndHostPropertiesAreApart) {
     EXPECT_EQ(Fetch(DVSHYP_HostPropGet, "s1", "n").status, HYP_NOT_FOUND);
 }
 
-TEST_F(EmulatorCommands, PropertyCommandsRefuseUnknownSwitchesAndEmptyValues) {
+TEST_F(EmulatorCommands, PropertyCommandsRejectUnknownSwitchesAndEmptyValues) {
     EXPECT_EQ(DVSHYP_GlobalPropSet("none", "n", "v", 1, 16), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYP_HostPropSet("none", "n", "v", 1, 16), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYP_HostPropClear("none", "n"), HYP_NOT_FOUND);
@@ -121,7 +121,7 @@ TEST_F(EmulatorCommands, TheVersionReadsAsAGlobalProperty) {
     EXPECT_EQ(FetchWord(DVSHYP_GlobalPropGet, "s1", "com.orbeno.common.version"), 112U);
 }
 
-TEST_F(EmulatorCommands, AVersionThatIsSetLeavesItsPropertysType) {
+TEST_F(EmulatorCommands, SettingTheVersionKeepsItsPropertysType) {
     const uint32_t version = 106;
     ASSERT_EQ(DVSHYP_GlobalPropSet("s1", "com.orbeno.common.version", &version, sizeof version, 16), HYP_OK);
     ASSERT_EQ(DVSHYP_SwitchSetVersion("s1", 112), HYP_OK);
@@ -138,7 +138,7 @@ TEST_F(EmulatorCommands, UnsupportedVersionsAreRefused) {
     EXPECT_EQ(DVSHYP_SwitchSetVersion("none", 12), HYP_NOT_FOUND);
 }
 
-TEST_F(EmulatorCommands, MaxPortsAreSetAndHeldTo) {
+TEST_F(EmulatorCommands, MaxPortsAreSetAndEnforced) {
     ASSERT_EQ(DVSHYP_SwitchAdd("c1", "custom", 2, 110), HYP_OK);
     ASSERT_EQ(AddPort("c1", "a"), HYP_OK);
     ASSERT_EQ(AddPort("c1", "b"), HYP_OK);
@@ -152,7 +152,7 @@ TEST_F(EmulatorCommands, MaxPortsAreSetAndHeldTo) {
     EXPECT_NE(Exec("stats").text.find("max-ports 20 "), std::string::npos);
 }
 
-TEST_F(EmulatorCommands, ALimitBelowASlotInUseIsRefusedHoweverFewPortsThereAre) {
+TEST_F(EmulatorCommands, RejectsALimitBelowAUsedSlot) {
     ASSERT_EQ(DVSHYP_SwitchAdd("c1", "custom", 3, 110), HYP_OK);
     for (const char *port : {"a", "b", "c"})
         ASSERT_EQ(AddPort("c1", port), HYP_OK);
@@ -161,7 +161,7 @@ TEST_F(EmulatorCommands, ALimitBelowASlotInUseIsRefusedHoweverFewPortsThereAre) 
     EXPECT_EQ(DVSHYP_PortFind("c1", "c"), HYP_OK);
 }
 
-TEST_F(EmulatorCommands, PortsComeAndGo) {
+TEST_F(EmulatorCommands, PortsAreAddedAndRemoved) {
     EXPECT_EQ(DVSHYP_PortFind("s1", "p1"), HYP_OK);
     EXPECT_EQ(DVSHYP_PortFind("s1", "p2"), HYP_NOT_FOUND);
     EXPECT_EQ(AddPort("s1", "p1"), HYP_EXISTS);
@@ -208,7 +208,7 @@ TEST_F(EmulatorCommands, UplinkDataIsKeptPerPortAndUplink) {
     EXPECT_EQ(FetchUplink("s1", "p1", 0).status, HYP_NOT_FOUND);
 }
 
-TEST_F(EmulatorCommands, WhatIsKeptBesideTheStateGoesWithItsSwitch) {
+TEST_F(EmulatorCommands, RemovingASwitchRemovesItsDataOutsideTheState) {
     const Bytes state = Fetch(DVSHYP_StateGet);
     const auto init = [&] { ASSERT_EQ(DVSHYP_StateInit(state.text.data(), state.Size()), HYP_OK); };
     const std::function<void()> renewals[] = {
@@ -234,7 +234,7 @@ TEST_F(EmulatorCommands, WhatIsKeptBesideTheStateGoesWithItsSwitch) {
     }
 }
 
-TEST_F(EmulatorCommands, ARefusedFetchIsNoMemoryOfTheStateItWasAskedFor) {
+TEST_F(EmulatorCommands, FailedFetchDoesNotReturnAStaleState) {
     // A state that did not fit is cached for the retry with a larger buffer, until it changes.
     const auto change = [](const char *name) { return DVSHYP_HostPropSet("s1", name, "v", 1, 16); };
     const auto refuse = [] {
@@ -259,7 +259,7 @@ TEST_F(EmulatorCommands, ARefusedFetchIsNoMemoryOfTheStateItWasAskedFor) {
     testing::internal::GetCapturedStderr();
 }
 
-TEST_F(EmulatorCommands, LargeValuesTravelWhole) {
+TEST_F(EmulatorCommands, LargeValuesArriveWhole) {
     std::string value(1 << 20, 'v');
     value[12345] = '\0';
     ASSERT_EQ(DVSHYP_GlobalPropSet("s1", "large", value.data(), static_cast<uint32_t>(value.size()), 16),
@@ -267,14 +267,14 @@ TEST_F(EmulatorCommands, LargeValuesTravelWhole) {
     EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "large").text, value);
 }
 
-TEST_F(EmulatorCommands, ValuesOfSixteenMebibytesAreTheLargest) {
+TEST_F(EmulatorCommands, LargestValueIsSixteenMebibytes) {
     const std::string value((16 << 20) + 1, 'v');
     EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", value.data(), 16 << 20, 16), HYP_OK);
     EXPECT_EQ(DVSHYP_GlobalPropSet("s1", "n", value.data(), (16 << 20) + 1, 16), HYP_LIMIT_EXCEEDED);
     EXPECT_EQ(Fetch(DVSHYP_GlobalPropGet, "s1", "n").text.size(), 16U << 20);
 }
 
-TEST_F(EmulatorCommands, UplinkDataCountsForTheBoundOfTheState) {
+TEST_F(EmulatorCommands, UplinkDataCountsTowardsTheStatesLimit) {
     const std::string value(16 << 20, 'v');
     ASSERT_EQ(DVSHYP_UplinkDataSet("s1", "p1", 1, value.data(), 16 << 20, 16), HYP_OK);
     HYP_ReturnStatus status = HYP_OK;
@@ -285,7 +285,7 @@ TEST_F(EmulatorCommands, UplinkDataCountsForTheBoundOfTheState) {
     EXPECT_EQ(set, 15); // one less than without uplink data
 }
 
-TEST_F(EmulatorCommands, APortWithTheLargestValuesIsFetchedAndAddedAgain) {
+TEST_F(EmulatorCommands, PortWithTheLargestValuesRoundTrips) {
     const std::string value(16 << 20, 'v');
     const std::string data = PortData({{"a", value}, {"b", value}});
     ASSERT_EQ(DVSHYP_PortAdd("s1", "large", data.data(), static_cast<uint32_t>(data.size())), HYP_OK);
@@ -295,7 +295,7 @@ TEST_F(EmulatorCommands, APortWithTheLargestValuesIsFetchedAndAddedAgain) {
     EXPECT_EQ(Fetch(DVSHYP_PortDataGet, "s1", "again", "b").text.size(), value.size());
 }
 
-TEST_F(EmulatorCommands, TheWholeStateIsBounded) {
+TEST_F(EmulatorCommands, StateSizeIsLimited) {
     const std::string value(16 << 20, 'v');
     HYP_ReturnStatus status = HYP_OK;
     int set = 0;

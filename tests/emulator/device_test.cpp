@@ -35,7 +35,7 @@ uint64_t CallsOf(int command) {
     return at == std::string::npos ? 0 : std::strtoull(stats.c_str() + at + line.size(), nullptr, 10);
 }
 
-TEST(EmbeddedDeviceAlone, WithoutAnEmulatorIsAMissingFile) {
+TEST(EmbeddedDeviceAlone, FailsLikeAMissingFileWithoutAnEmulator) {
     for (const char *value : {static_cast<const char *>(nullptr), "", "/no/such/socket", "/etc/passwd"}) {
         if (value)
             setenv("DVS_EMULATOR", value, 1);
@@ -51,7 +51,7 @@ TEST(EmbeddedDeviceAlone, WithoutAnEmulatorIsAMissingFile) {
               std::string("failed to open dvsdev device ") + kPath + "\n");
 }
 
-TEST(EmbeddedDeviceAlone, AFileThatIsThereIsTheDevice) {
+TEST(EmbeddedDeviceAlone, OpensAnExistingFileAsTheDevice) {
     TempDir directory;
     const std::string path = directory / "device";
     std::ofstream(path) << "x";
@@ -65,20 +65,20 @@ TEST(EmbeddedDeviceAlone, AFileThatIsThereIsTheDevice) {
     EXPECT_EQ(HostDevice_Close(fd), -1);
 }
 
-TEST(EmbeddedDeviceAlone, AnEmulatorThatAppearsIsUsedByTheNextCall) {
+TEST(EmbeddedDeviceAlone, NextCallUsesAnEmulatorThatAppears) {
     unsetenv("DVS_EMULATOR");
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_FAILURE);
     LiveEmulator emulator;
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
 }
 
-TEST_F(EmbeddedDevice, TheLimitsAreAskedWithoutADevice) {
+TEST_F(EmbeddedDevice, LimitsAreReadWithoutADevice) {
     ASSERT_EQ(DVSState_SwitchAdd("own", "vswitch", 0, 110), HYP_OK);
     EXPECT_EQ(uwMaxNumActivePortsSystemWide, 65536U);
     EXPECT_EQ(DVSState_ConfigReset(), HYP_OK);
 }
 
-TEST_F(EmbeddedDevice, ALengthWithoutABufferIsEfault) {
+TEST_F(EmbeddedDevice, NullBufferWithALengthIsEfault) {
     ASSERT_EQ(DVSHYP_SwitchAdd("s", "vswitch", 0, 110), HYP_OK);
     const int fd = HostDevice_Open(kPath);
     for (const device::CommandRow &row : device::kCommands) {
@@ -94,7 +94,7 @@ TEST_F(EmbeddedDevice, ALengthWithoutABufferIsEfault) {
     HostDevice_Close(fd);
 }
 
-TEST_F(EmbeddedDevice, ASizeMayBeAskedForWithoutABuffer) {
+TEST_F(EmbeddedDevice, NullBufferQueriesTheSize) {
     const int fd = HostDevice_Open(kPath);
     DVSHYPRequest request{};
     EXPECT_EQ(HostDevice_Ioctl(fd, NumberOf(Command::StateGet), &request), -1);
@@ -104,7 +104,7 @@ TEST_F(EmbeddedDevice, ASizeMayBeAskedForWithoutABuffer) {
     HostDevice_Close(fd);
 }
 
-TEST_F(EmbeddedDevice, StatesOfMoreThan256MebibytesAreRefusedUnsent) {
+TEST_F(EmbeddedDevice, RejectsStatesAbove256MebibytesWithoutSending) {
     const int fd = HostDevice_Open(kPath);
     DVSHYPRequest request{};
     request.data = 4096; // never read
@@ -115,7 +115,7 @@ TEST_F(EmbeddedDevice, StatesOfMoreThan256MebibytesAreRefusedUnsent) {
     HostDevice_Close(fd);
 }
 
-TEST_F(EmbeddedDevice, TheCachedDescriptorSurvivesARestartUnderItsNumber) {
+TEST_F(EmbeddedDevice, CachedDescriptorKeepsItsNumberAcrossARestart) {
     ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     const int descriptors = OpenDescriptors();
     for (int round = 0; round < 5; round++) {
@@ -125,7 +125,7 @@ TEST_F(EmbeddedDevice, TheCachedDescriptorSurvivesARestartUnderItsNumber) {
     }
 }
 
-TEST_F(EmbeddedDevice, WhileTheEmulatorIsAwayCallsFailAndThenGoOn) {
+TEST_F(EmbeddedDevice, CallsFailWhileTheEmulatorIsDownAndRecover) {
     ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     emulator_.Process().Stop(SIGTERM);
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_FAILURE);
@@ -134,7 +134,7 @@ TEST_F(EmbeddedDevice, WhileTheEmulatorIsAwayCallsFailAndThenGoOn) {
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
 }
 
-TEST_F(EmbeddedDevice, AnAnswerThatIsLostIsEioAndNeverAskedForAgain) {
+TEST_F(EmbeddedDevice, LostReplyIsEioAndIsNotRetried) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,drop=after")).status, HYP_OK);
     const int fd = HostDevice_Open(kPath);
     DVSHYPRequest request{};
@@ -150,7 +150,7 @@ TEST_F(EmbeddedDevice, AnAnswerThatIsLostIsEioAndNeverAskedForAgain) {
     HostDevice_Close(fd);
 }
 
-TEST_F(EmbeddedDevice, AChildGetsAConnectionOfItsOwn) {
+TEST_F(EmbeddedDevice, ForkedChildGetsItsOwnConnection) {
     ASSERT_EQ(DVSHYP_SwitchAdd("s", "vswitch", 0, 110), HYP_OK);
     std::vector<pid_t> children;
     for (int i = 0; i < 4; i++) {
@@ -175,7 +175,7 @@ TEST_F(EmbeddedDevice, AChildGetsAConnectionOfItsOwn) {
     }
 }
 
-TEST_F(EmbeddedDevice, AChildOfABusyThreadIsNotHeldUp) {
+TEST_F(EmbeddedDevice, ForkDuringACallDoesNotBlockTheChild) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "nth=1,delay=400")).status, HYP_OK);
     ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     std::thread busy([] { EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND); });
@@ -191,7 +191,7 @@ TEST_F(EmbeddedDevice, AChildOfABusyThreadIsNotHeldUp) {
     busy.join();
 }
 
-TEST_F(EmbeddedDevice, ADescriptorThatTheProgramReusedIsLeftAlone) {
+TEST_F(EmbeddedDevice, DoesNotTouchADescriptorThatTheProgramReused) {
     const int fd = HostDevice_Open(kPath);
     TempDir directory;
     const int other = open((directory / "file").c_str(), O_RDWR | O_CREAT, 0600);
@@ -204,7 +204,7 @@ TEST_F(EmbeddedDevice, ADescriptorThatTheProgramReusedIsLeftAlone) {
     HostDevice_Close(fd);
 }
 
-TEST_F(EmbeddedDevice, DescriptorsAreClosedOnExecAndComeBack) {
+TEST_F(EmbeddedDevice, DescriptorsAreCloseOnExecAndReopen) {
     const int before = OpenDescriptors();
     for (int i = 0; i < 100; i++) {
         const int fd = HostDevice_Open(kPath);
@@ -242,7 +242,7 @@ TEST_F(EmbeddedDevice, OneProcessCannotTakeAllConnections) {
         HostDevice_Close(fd);
 }
 
-TEST_F(EmbeddedDevice, ClientsKilledInMidRequestHarmNobody) {
+TEST_F(EmbeddedDevice, ClientsKilledInMidRequestDoNoHarm) {
     const unsigned rounds = CountFromEnvironment("DVS_TEST_KILLED_CLIENTS", 30);
     ASSERT_EQ(DVSHYP_SwitchAdd("s", "vswitch", 0, 110), HYP_OK);
     const int before = OpenDescriptors();
@@ -266,7 +266,7 @@ TEST_F(EmbeddedDevice, ClientsKilledInMidRequestHarmNobody) {
 }
 
 /// Adds ports one after another while the emulator is killed and restarted from its saved state.
-TEST(EmulatorRestarts, NoAddHappensTwiceAndNoLostAnswerIsASuccess) {
+TEST(EmulatorRestarts, NoAddRunsTwiceAndLostRepliesFail) {
     TempDir directory;
     const std::string state = directory / "state";
     LiveEmulator emulator({"--state", state, "--sync"});
@@ -304,7 +304,7 @@ TEST(EmulatorRestarts, NoAddHappensTwiceAndNoLostAnswerIsASuccess) {
     std::printf("%u ports added for certain, %u unknown, over %u restarts\n", added, unknown, restarts);
 }
 
-TEST_F(EmbeddedDevice, TerminationFinishesTheRequestsInHand) {
+TEST_F(EmbeddedDevice, TerminationFinishesInFlightRequests) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,delay=60s")).status, HYP_OK);
     ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     HYP_ReturnStatus status = HYP_FAILURE;

@@ -99,7 +99,7 @@ protected:
     LiveEmulator emulator_;
 };
 
-TEST_F(HostileClients, RandomAndMutatedRequestsHarmNobody) {
+TEST_F(HostileClients, RandomAndMutatedRequestsDoNoHarm) {
     const unsigned count = CountFromEnvironment("DVS_TEST_HOSTILE_REQUESTS", 2000);
     std::mt19937 random(20240501);
     const auto below = [&](uint32_t limit) { return static_cast<uint32_t>(random() % limit); };
@@ -150,7 +150,7 @@ TEST_F(HostileClients, FieldsWithoutNulAreBadParameters) {
     }
 }
 
-TEST_F(HostileClients, WhatIsNoRequestEndsTheConnection) {
+TEST_F(HostileClients, InvalidRequestClosesTheConnection) {
     Parts wrong[4] = {ValidRequest(Command::PortFind), ValidRequest(Command::PortFind),
                       ValidRequest(Command::PortFind), ValidRequest(Command::StateInit)};
     wrong[0].header.magic++;
@@ -166,7 +166,7 @@ TEST_F(HostileClients, WhatIsNoRequestEndsTheConnection) {
     }
 }
 
-TEST_F(HostileClients, AnnouncedSizesCostNothingUntilTheyArrive) {
+TEST_F(HostileClients, MemoryGrowsWithReceivedBytesNotAnnouncedSize) {
     Parts parts = ValidRequest(Command::StateInit);
     parts.header.dataSize = parts.record.dataLen = 256U << 20;
     std::vector<std::unique_ptr<RawClient>> clients;
@@ -186,7 +186,7 @@ uint64_t TouchedPages(pid_t pid) {
     return std::stoull(word);
 }
 
-TEST_F(HostileClients, ALargeRequestIsNotCopiedWithEachPieceOfIt) {
+TEST_F(HostileClients, LargeRequestIsNotCopiedWithEachPiece) {
     // A buffer that grows with each receive is copied each time; a state of this size then takes minutes.
     const std::string value(32 << 20, 'v');
     const uint64_t pages = value.size() / 4096;
@@ -196,7 +196,7 @@ TEST_F(HostileClients, ALargeRequestIsNotCopiedWithEachPieceOfIt) {
     EXPECT_LT(TouchedPages(emulator_.Process().Pid()) - before, 8 * pages);
 }
 
-TEST_F(HostileClients, ARequestCutOffIsNotCarriedOut) {
+TEST_F(HostileClients, TruncatedRequestIsNotExecuted) {
     const std::string whole = ValidRequest(Command::SwitchRemove).Bytes();
     for (const std::size_t size : {std::size_t{1}, std::size_t{24}, whole.size() - 1}) {
         RawClient client(emulator_.Socket());
@@ -209,7 +209,7 @@ TEST_F(HostileClients, ARequestCutOffIsNotCarriedOut) {
     EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
 }
 
-TEST_F(HostileClients, ByteByByteIsStillARequest) {
+TEST_F(HostileClients, RequestMayArriveByteByByte) {
     RawClient client(emulator_.Socket());
     for (const char byte : ValidRequest(Command::SwitchRemove).Bytes())
         client.Send(std::string(1, byte));
@@ -228,7 +228,7 @@ TEST_F(HostileClients, RequestsSentAheadAreAnsweredInOrder) {
     EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
 }
 
-TEST_F(HostileClients, AClientThatTakesNoAnswersHoldsUpNobody) {
+TEST_F(HostileClients, ClientThatReadsNoRepliesBlocksNoOther) {
     const std::string value(8 << 20, 'v');
     ASSERT_EQ(DVSHYP_GlobalPropSet("s", "name", value.data(), static_cast<uint32_t>(value.size()), 16),
               HYP_OK);
@@ -243,10 +243,10 @@ TEST_F(HostileClients, AClientThatTakesNoAnswersHoldsUpNobody) {
     // Pending replies hold copies: changing the value does not change them.
     EXPECT_EQ(DVSHYP_GlobalPropClear("s", "name"), HYP_OK);
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
-    EXPECT_TRUE(clients.front()->Received(value)) << "as it was when it was asked for";
+    EXPECT_TRUE(clients.front()->Received(value)) << "the value at the time of the request";
 }
 
-TEST(ClientsTogether, WaitForNoMoreThanTheirBudget) {
+TEST(ClientsTogether, ReceiveAtMostTheirMemoryBudget) {
     int ends[2];
     ASSERT_EQ(socketpair(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0, ends), 0);
     constexpr uint64_t kBudget = 1 << 20;
@@ -262,11 +262,11 @@ TEST(ClientsTogether, WaitForNoMoreThanTheirBudget) {
             bytes.assign(32 << 10, 'v');
             if (!connection.Receive()) break;
         }
-        EXPECT_GT(sent, kBudget / 4) << "what fits is taken in";
-        EXPECT_LT(sent, kBudget) << "and no more";
+        EXPECT_GT(sent, kBudget / 4) << "receives up to the budget";
+        EXPECT_LT(sent, kBudget) << "receives no more than the budget";
         EXPECT_FALSE(budget.Take(kBudget));
     }
-    EXPECT_TRUE(budget.Take(kBudget)) << "given back with the connection";
+    EXPECT_TRUE(budget.Take(kBudget)) << "closing the connection returns the budget";
     close(ends[1]);
 }
 

@@ -171,7 +171,7 @@ TEST_F(HostileEmulator, ClaimsMorePayloadThanTheBufferHolds) {
     AllFail([](auto &, auto &) { return Reply(0, 0, 0xFFFFFFFF, "x", 0xFFFFFFFF); });
 }
 
-TEST_F(HostileEmulator, NamesAnotherLengthThanItSends) {
+TEST_F(HostileEmulator, AnnouncesADifferentLengthThanItSends) {
     AllFail([](auto &, auto &) { return Reply(0, 0, 10, "abc", 3); }, true);
     AllFail([](auto &, auto &) { return Reply(0, 0, 0xFFFFFFFF, "abc", 3); }, true);
     AllFail([](auto &, auto &) { return Reply(0, 0, 10, {}, 0); }, true);
@@ -181,11 +181,11 @@ TEST_F(HostileEmulator, SendsMoreThanItAnnounced) {
     AllFail([](auto &, auto &) { return Reply(0, 0, 3, "abcdef", 3); }, true);
 }
 
-TEST_F(HostileEmulator, SendsAPayloadWithARefusal) {
+TEST_F(HostileEmulator, SendsAPayloadWithAnError) {
     AllFail([](auto &, auto &) { return Reply(HYP_NOT_FOUND, ENOENT, 3, "abc", 3); });
 }
 
-TEST_F(HostileEmulator, RefusesEveryBufferWithoutAskingForMore) {
+TEST_F(HostileEmulator, RejectsEveryBufferWithoutALargerSize) {
     AllFail([](auto &, const DVSHYPRequest &record) {
         return Reply(HYP_LIMIT_EXCEEDED, ENOSPC, record.dataLen ? record.dataLen : record.cmdOutLen, {}, 0);
     });
@@ -201,7 +201,7 @@ TEST_F(HostileEmulator, AsksForOneByteMoreEachTime) {
     EXPECT_EQ(peer.Requests(), 130U);
 }
 
-TEST_F(HostileEmulator, AsksForMoreThanAStateMayHave) {
+TEST_F(HostileEmulator, AsksForMoreThanTheStateLimit) {
     HostilePeer peer(
         [](auto &, auto &) { return Reply(HYP_LIMIT_EXCEEDED, ENOSPC, (256U << 20) + 1, {}, 0); });
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_FAILURE);
@@ -215,12 +215,12 @@ TEST_F(HostileEmulator, RefusalsOfPlainCallsAreNotCounted) {
         ASSERT_EQ(DVSHYP_PortAdd("s", "p", "data", 4), HYP_LIMIT_EXCEEDED) << i;
 }
 
-TEST_F(HostileEmulator, NamesAnErrorThatIsNone) {
+TEST_F(HostileEmulator, SendsAnInvalidErrno) {
     AllFail([](auto &, auto &) { return Reply(HYP_NOT_FOUND, -5, 0, {}, 0); });
     AllFail([](auto &, auto &) { return Reply(HYP_NOT_FOUND, 0x7FFFFFFF, 0, {}, 0); });
 }
 
-TEST_F(HostileEmulator, RefusesWithTheStatusOfSuccess) {
+TEST_F(HostileEmulator, FailsWithTheStatusOfSuccess) {
     AllFail([](auto &, auto &) { return Reply(HYP_OK, EIO, 10, {}, 0); }, true);
 }
 
@@ -232,7 +232,7 @@ TEST_F(HostileEmulator, HangsUpInTheMiddleOfAnAnswer) {
         EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_FAILURE);
 }
 
-TEST_F(HostileEmulator, LiesAboutTheLimit) {
+TEST_F(HostileEmulator, ReportsAnInvalidLimit) {
     for (const std::string &reply :
          {std::string(), Reply(0, 0, 0, {}, 0), Reply(0, 0, 0, std::string(4, '\0'), 4),
           Reply(0, EIO, 0, {}, 0), Reply(0, 0, 0, std::string(8, '\1'), 8)}) {

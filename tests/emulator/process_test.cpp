@@ -39,7 +39,7 @@ std::string ReadWhole(const std::string &path) {
     return {std::istreambuf_iterator<char>(file), {}};
 }
 
-TEST(EmulatorOptions, WrongCommandLinesAreStatusTwo) {
+TEST(EmulatorOptions, WrongCommandLinesExitWithStatusTwo) {
     unsetenv("DVS_EMULATOR");
     const Words wrong[] = {{},
                            {"--socket"},
@@ -74,7 +74,7 @@ protected:
     std::string socket_ = directory_ / "socket";
 };
 
-TEST_F(EmulatorSocket, IsForItsOwnerOnlyWhateverTheMask) {
+TEST_F(EmulatorSocket, IsForItsOwnerOnlyUnderAnyUmask) {
     const mode_t mask = umask(0);
     EmulatorProcess process;
     ASSERT_TRUE(process.Start(socket_));
@@ -85,14 +85,14 @@ TEST_F(EmulatorSocket, IsForItsOwnerOnlyWhateverTheMask) {
     EXPECT_TRUE(S_ISSOCK(status.st_mode));
 }
 
-TEST_F(EmulatorSocket, GoesWithTheEmulator) {
+TEST_F(EmulatorSocket, IsRemovedWithTheEmulator) {
     EmulatorProcess process;
     ASSERT_TRUE(process.Start(socket_));
     EXPECT_EQ(process.Stop(SIGTERM), 0);
     EXPECT_FALSE(std::filesystem::exists(socket_));
 }
 
-TEST_F(EmulatorSocket, OfADeadEmulatorIsReplacedOfALivingOneNot) {
+TEST_F(EmulatorSocket, IsReplacedOnlyWhenItsEmulatorIsDead) {
     EmulatorProcess first;
     ASSERT_TRUE(first.Start(socket_));
     const Finished second = Emulator({"--socket", socket_});
@@ -111,7 +111,7 @@ void LeaveStaleSocket(const std::string &path) {
     close(fd);
 }
 
-TEST_F(EmulatorSocket, OfADeadEmulatorIsTakenByOneOfManyAtTheSameInstant) {
+TEST_F(EmulatorSocket, StaleSocketIsReplacedByOneOfManyThreads) {
     constexpr std::size_t kStarters = 8;
     for (unsigned round = CountFromEnvironment("DVS_START_ROUNDS", 100); round > 0; --round) {
         LeaveStaleSocket(socket_);
@@ -136,7 +136,7 @@ TEST_F(EmulatorSocket, OfADeadEmulatorIsTakenByOneOfManyAtTheSameInstant) {
     }
 }
 
-TEST_F(EmulatorSocket, OfADeadEmulatorGoesToOneOfManyThatStartAtOnce) {
+TEST_F(EmulatorSocket, StaleSocketIsReplacedByOneOfManyEmulators) {
     constexpr int kStarters = 8;
     for (unsigned round = CountFromEnvironment("DVS_START_ROUNDS", 5); round > 0; --round) {
         {
@@ -162,7 +162,7 @@ TEST_F(EmulatorSocket, OfADeadEmulatorGoesToOneOfManyThatStartAtOnce) {
     }
 }
 
-TEST_F(EmulatorSocket, InADirectoryThatIsNotThereIsStatusOne) {
+TEST_F(EmulatorSocket, ExitsWithStatusOneInAMissingDirectory) {
     const std::string absent = directory_ / "absent/";
     const Finished finished = Emulator({"--socket", absent + "socket"});
     EXPECT_EQ(finished.status, 1);
@@ -177,8 +177,8 @@ TEST_F(EmulatorSocket, NeverReplacesAnotherFile) {
     EXPECT_EQ(Emulator({"--socket", directory_ / "no/such/directory"}).status, 1);
 }
 
-TEST_F(EmulatorSocket, OtherUsersAreTurnedAway) {
-    if (geteuid() != 0) GTEST_SKIP() << "another user can be had by root only";
+TEST_F(EmulatorSocket, OtherUsersAreRejected) {
+    if (geteuid() != 0) GTEST_SKIP() << "only root can switch to another user";
     EmulatorProcess process;
     ASSERT_TRUE(process.Start(socket_));
     // Opens the modes to everyone, so that only the check of the peer's user can fail.
@@ -207,7 +207,7 @@ protected:
     EmulatorProcess process_;
 };
 
-TEST_F(EmulatorState, IsSavedAtTheEndAndLoadedAtTheStart) {
+TEST_F(EmulatorState, IsSavedOnExitAndLoadedOnStart) {
     ASSERT_TRUE(process_.Start(socket_, {"--state", state_}));
     Change();
     const std::string live = Fetch(DVSHYP_StateGet).text;
@@ -228,7 +228,7 @@ TEST_F(EmulatorState, SyncSavesEveryChange) {
     EXPECT_EQ(ReadWhole(state_).substr(0, live.size()), live);
 }
 
-TEST_F(EmulatorState, TheSaveCommandSavesAtOnce) {
+TEST_F(EmulatorState, SaveCommandSavesAtOnce) {
     ASSERT_TRUE(process_.Start(socket_, {"--state", state_}));
     Change();
     EXPECT_FALSE(std::filesystem::exists(state_));
@@ -237,12 +237,12 @@ TEST_F(EmulatorState, TheSaveCommandSavesAtOnce) {
     EXPECT_EQ(ReadWhole(state_).substr(0, live.size()), live);
 }
 
-TEST_F(EmulatorState, WithoutAFileNothingCanBeSaved) {
+TEST_F(EmulatorState, SaveFailsWithoutAFile) {
     ASSERT_TRUE(process_.Start(socket_));
     EXPECT_EQ(Exec("save").status, HYP_BAD_PARAM);
 }
 
-TEST_F(EmulatorState, ADamagedFileIsRefusedWithStatusSixAndLeftAlone) {
+TEST_F(EmulatorState, RejectsADamagedFileWithStatusSixAndKeepsIt) {
     ASSERT_TRUE(process_.Start(socket_, {"--state", state_}));
     Change();
     ASSERT_EQ(process_.Stop(SIGTERM), 0);
@@ -259,13 +259,13 @@ TEST_F(EmulatorState, ADamagedFileIsRefusedWithStatusSixAndLeftAlone) {
     }
 }
 
-TEST_F(EmulatorState, AFileThatCannotBeReadIsNotTakenForANewOne) {
+TEST_F(EmulatorState, UnreadableFileIsNotTreatedAsNew) {
     std::filesystem::create_directory(state_);
     EXPECT_NE(Emulator({"--socket", socket_, "--state", state_}).status, 0);
     EXPECT_TRUE(std::filesystem::is_directory(state_));
 }
 
-TEST_F(EmulatorState, AFileThatCannotBeLookedAtIsNotTakenForANewOne) {
+TEST_F(EmulatorState, FileThatFailsStatIsNotTreatedAsNew) {
     const std::string below = state_ + "/below";
     std::ofstream(state_) << "a file, no directory";
     const Finished finished = Emulator({"--socket", socket_, "--state", below});
@@ -273,7 +273,7 @@ TEST_F(EmulatorState, AFileThatCannotBeLookedAtIsNotTakenForANewOne) {
     EXPECT_NE(finished.err.find(below + ": Not a directory"), std::string::npos) << finished.err;
 }
 
-TEST_F(EmulatorState, AFileThatCannotBeSavedIsStatusOne) {
+TEST_F(EmulatorState, ExitsWithStatusOneWhenTheSaveFails) {
     ASSERT_TRUE(process_.Start(socket_, {"--state", directory_ / "absent/state"}));
     EXPECT_EQ(Exec("save").status, HYP_IO_ERROR);
     EXPECT_EQ(process_.Stop(SIGTERM), 1);
@@ -281,7 +281,7 @@ TEST_F(EmulatorState, AFileThatCannotBeSavedIsStatusOne) {
     EXPECT_EQ(DVSHYP_SwitchAdd("s1", "vswitch", 0, 110), HYP_IO_ERROR);
 }
 
-TEST_F(EmulatorState, MaxPortsHoldsForTheHostAndForTheLibrarysLimit) {
+TEST_F(EmulatorState, MaxPortsSetsTheHostsAndTheLibrarysLimit) {
     ASSERT_TRUE(process_.Start(socket_, {"--max-ports", "2"}));
     ASSERT_EQ(DVSHYP_SwitchAdd("s1", "vswitch", 0, 110), HYP_OK);
     EXPECT_EQ(AddPort("s1", "a"), HYP_OK);
@@ -294,7 +294,7 @@ TEST_F(EmulatorState, MaxPortsHoldsForTheHostAndForTheLibrarysLimit) {
     EXPECT_EQ(DVSState_ConfigReset(), HYP_OK);
 }
 
-TEST_F(EmulatorState, TheEnvironmentsLimitHoldsWithoutTheOption) {
+TEST_F(EmulatorState, EnvironmentSetsTheLimitWithoutTheOption) {
     setenv("DVS_MAX_PORTS", "3", 1);
     ASSERT_TRUE(process_.Start(socket_));
     EXPECT_NE(Exec("stats").text.find("port-limit 3\n"), std::string::npos);
@@ -302,7 +302,7 @@ TEST_F(EmulatorState, TheEnvironmentsLimitHoldsWithoutTheOption) {
     EXPECT_EQ(Emulator({"--socket", directory_ / "other"}).status, 2);
 }
 
-TEST_F(EmulatorState, SignalsEndItOrderly) {
+TEST_F(EmulatorState, SignalsShutItDownCleanly) {
     for (const int signal : {SIGTERM, SIGINT, SIGHUP}) {
         ASSERT_TRUE(process_.Start(socket_, {"--state", state_}));
         ASSERT_EQ(DVSHYP_StateCleanup(), HYP_OK);
@@ -352,7 +352,7 @@ protected:
     pid_t pid_ = -1;
 };
 
-TEST_F(EmulatorSurroundings, NobodyHasToHearThatItIsReady) {
+TEST_F(EmulatorSurroundings, StartsWithoutAReaderOfTheReadyLine) {
     ASSERT_TRUE(StartAfter([] {
         int pipe[2];
         if (pipe2(pipe, O_CLOEXEC) != 0) _exit(126);
@@ -363,7 +363,7 @@ TEST_F(EmulatorSurroundings, NobodyHasToHearThatItIsReady) {
     EXPECT_FALSE(std::filesystem::exists(socket_));
 }
 
-TEST_F(EmulatorSurroundings, MissingStandardStreamsAreNobodyElses) {
+TEST_F(EmulatorSurroundings, OpensDevNullForMissingStandardStreams) {
     ASSERT_TRUE(StartAfter([] {
         for (int fd = 0; fd <= STDERR_FILENO; fd++)
             close(fd);
@@ -374,7 +374,7 @@ TEST_F(EmulatorSurroundings, MissingStandardStreamsAreNobodyElses) {
     EXPECT_EQ(End(), 0);
 }
 
-TEST_F(EmulatorSurroundings, UnderNohupItOutlivesTheTerminal) {
+TEST_F(EmulatorSurroundings, IgnoresSighupUnderNohup) {
     ASSERT_TRUE(StartAfter([] { std::signal(SIGHUP, SIG_IGN); }));
     kill(pid_, SIGHUP);
     usleep(50 * 1000); // time to exit, if it handled the signal
@@ -394,7 +394,7 @@ protected:
     }
 };
 
-TEST_F(EmulatorRun, GivesTheCommandAnEmulatorAndAStoreOfItsOwn) {
+TEST_F(EmulatorRun, GivesTheCommandItsOwnEmulatorAndStore) {
     const Finished finished =
         Run({}, "test -S \"$DVS_EMULATOR\" && dirname \"$DVS_EMULATOR\" \"$DVS_CONFIGSTORE\"");
     EXPECT_EQ(finished.status, 0) << finished.err;
@@ -403,14 +403,14 @@ TEST_F(EmulatorRun, GivesTheCommandAnEmulatorAndAStoreOfItsOwn) {
     EXPECT_FALSE(std::filesystem::exists(directory));
 }
 
-TEST_F(EmulatorRun, PassesTheCommandsStatusOn) {
+TEST_F(EmulatorRun, ReturnsTheCommandsStatus) {
     EXPECT_EQ(Run({}, "exit 42").status, 42);
     EXPECT_EQ(Run({}, "kill -9 $$").status, 137);
     EXPECT_EQ(Emulator({"run", "--", "/no/such/program"}).status, 127);
     EXPECT_EQ(Emulator({"run", "--", "/etc/passwd"}).status, 126);
 }
 
-TEST_F(EmulatorRun, AnEmulatorThatDoesNotStartIsItsOwnStatus) {
+TEST_F(EmulatorRun, ReturnsADistinctStatusWhenTheEmulatorFails) {
     TempDir directory;
     std::ofstream(directory / "state") << "damaged";
     const Finished finished = Run({"--state", directory / "state"}, "echo started");
@@ -418,14 +418,14 @@ TEST_F(EmulatorRun, AnEmulatorThatDoesNotStartIsItsOwnStatus) {
     EXPECT_EQ(finished.out, "");
 }
 
-TEST_F(EmulatorRun, PassesSignalsOnToTheCommand) {
+TEST_F(EmulatorRun, ForwardsSignalsToTheCommand) {
     const Finished finished = Run(
         {},
         "trap 'exit 7' TERM; kill -TERM $PPID; i=0; while [ $i -lt 500 ]; do sleep 0.01; i=$((i+1)); done");
     EXPECT_EQ(finished.status, 7) << finished.err;
 }
 
-TEST_F(EmulatorRun, WithoutAPlaceForItsFilesStartsNothing) {
+TEST_F(EmulatorRun, StartsNothingWithoutATemporaryDirectory) {
     TempDir directory;
     setenv("TMPDIR", (directory / "absent").c_str(), 1);
     const Finished finished = Run({}, "echo started");

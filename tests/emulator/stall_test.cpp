@@ -51,7 +51,7 @@ protected:
     int fd_;
 };
 
-TEST_F(IdlePeer, WithoutRoomForAnotherClientIsAMissingDevice) {
+TEST_F(IdlePeer, FailsLikeAMissingDeviceWhenTheBacklogIsFull) {
     const int first = HostDevice_Open("/nonexistent/device");
     ASSERT_NE(first, -1);
     EXPECT_EQ(HostDevice_Open("/nonexistent/device"), -1);
@@ -63,12 +63,12 @@ TEST_F(IdlePeer, WithoutRoomForAnotherClientIsAMissingDevice) {
     HostDevice_Close(first);
 }
 
-TEST_F(IdlePeer, ThatTakesNoMoreOfARequestIsAnError) {
+TEST_F(IdlePeer, FailsWhenThePeerStopsReading) {
     const std::string value(32 << 20, 'v');
     EXPECT_EQ(DVSHYP_StateInit(value.data(), static_cast<uint32_t>(value.size())), HYP_FAILURE);
 }
 
-TEST_F(IdlePeer, ThatDoesNotSayItsLimitIsAFailure) {
+TEST_F(IdlePeer, FailsWhenThePeerSendsNoLimit) {
     uint32_t limit = 0;
     EXPECT_EQ(KIT_Get(KIT_NODE_net_maxPortsSystemWide, nullptr, &limit, sizeof limit), HYP_FAILURE);
 }

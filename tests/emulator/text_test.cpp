@@ -43,18 +43,18 @@ protected:
     LiveEmulator emulator_;
 };
 
-TEST_F(TextCommands, HelpListsThemAll) {
+TEST_F(TextCommands, HelpListsAllCommands) {
     const std::string help = Exec("help").text;
     for (const char *name : {"help ", "stats ", "ports ", "event ", "save ", "fault "})
         EXPECT_TRUE(help.find(name) == 0 || help.find(std::string("\n") + name) != std::string::npos) << name;
 }
 
-TEST_F(TextCommands, UnknownOnesAreNotSupported) {
+TEST_F(TextCommands, UnknownCommandsReturnNotSupported) {
     for (const char *text : {"", "   ", "helpme", "HELP"})
         EXPECT_EQ(Exec(text).status, HYP_NOT_SUPPORTED) << text;
 }
 
-TEST_F(TextCommands, StatsCountWhatWasAsked) {
+TEST_F(TextCommands, StatsCountRequests) {
     (void)Fetch(DVSHYP_GlobalPropGet, kSwitch, "none");
     const std::string stats = Exec("stats").text;
     const std::string fixed[] = {"switches 1\n", "ports 0\n", "port-limit 65536\n", "refused 1\n"};
@@ -77,7 +77,7 @@ TEST_F(TextCommands, PortsAreListedByArgumentOrByTheRecordsSwitch) {
     EXPECT_EQ(Exec("ports").status, HYP_NOT_FOUND);
 }
 
-TEST_F(TextCommands, ALinkThatComesUpGetsAConnectionIdOfItsOwn) {
+TEST_F(TextCommands, LinkUpAssignsAUniqueConnectionId) {
     ASSERT_EQ(AddPort(kSwitch, "p1"), HYP_OK);
     ASSERT_EQ(AddPort(kSwitch, "p2"), HYP_OK);
     EXPECT_EQ(ConnectionId("p1"), 0U);
@@ -91,7 +91,7 @@ TEST_F(TextCommands, ALinkThatComesUpGetsAConnectionIdOfItsOwn) {
     EXPECT_EQ(ConnectionId("p1"), 0U);
 }
 
-TEST_F(TextCommands, AConnectionIdOfTheAgentsIsKept) {
+TEST_F(TextCommands, KeepsAConnectionIdSetByTheAgent) {
     ASSERT_EQ(AddPort(kSwitch, "p1"), HYP_OK);
     const uint32_t own = 4711;
     ASSERT_EQ(DVSHYP_PortDataSet(kSwitch, "p1", "com.orbeno.common.port.connectid", &own, sizeof own, 16),
@@ -102,7 +102,7 @@ TEST_F(TextCommands, AConnectionIdOfTheAgentsIsKept) {
     EXPECT_EQ(ConnectionId("p1"), 4711U);
 }
 
-TEST_F(TextCommands, AConnectionIdThatAPortHasIsGivenToNoOther) {
+TEST_F(TextCommands, DoesNotReuseAConnectionIdOfAPort) {
     // A restored state contains the ids of a module that also counted from 1.
     uint32_t own = 1;
     for (const char *port : {"p1", "p2"}) {
@@ -116,14 +116,14 @@ TEST_F(TextCommands, AConnectionIdThatAPortHasIsGivenToNoOther) {
     EXPECT_EQ(ConnectionId("p3"), 3U);
 }
 
-TEST_F(TextCommands, EventsAreRefusedWhereTheyMeanNothing) {
+TEST_F(TextCommands, RejectsEventsThatDoNotApply) {
     EXPECT_EQ(Exec("event p1 up", kSwitch).status, HYP_NOT_FOUND);
     EXPECT_EQ(Exec("event p1 sideways", kSwitch).status, HYP_BAD_PARAM);
     EXPECT_EQ(Exec("event up", kSwitch).status, HYP_BAD_PARAM);
     EXPECT_EQ(Exec("event", kSwitch).status, HYP_BAD_PARAM);
 }
 
-TEST_F(TextCommands, ALongReplyGrowsTheBuffer) {
+TEST_F(TextCommands, LongReplyGrowsTheBuffer) {
     for (int i = 0; i < 1000; i++)
         ASSERT_EQ(AddPort(kSwitch, "port-" + std::to_string(i)), HYP_OK);
     const std::string ports = Exec("ports", kSwitch).text;
@@ -147,7 +147,7 @@ TEST_F(InjectedFaults, HitTheNthMatchingCommandOnce) {
     EXPECT_EQ(Exec("fault list").text, "");
 }
 
-TEST_F(InjectedFaults, WithoutANumberHitUntilTheyAreCleared) {
+TEST_F(InjectedFaults, WithoutANumberHitUntilCleared) {
     ASSERT_EQ(Exec("fault status=2").status, HYP_OK);
     EXPECT_EQ(Find(), 2U);
     EXPECT_EQ(Find(), 2U);
@@ -156,7 +156,7 @@ TEST_F(InjectedFaults, WithoutANumberHitUntilTheyAreCleared) {
     EXPECT_EQ(Find(), HYP_NOT_FOUND);
 }
 
-TEST_F(InjectedFaults, SetTheErrnoAlone) {
+TEST_F(InjectedFaults, SetOnlyTheErrno) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "errno=EBUSY")).status, HYP_OK);
     const int fd = HostDevice_Open("/pelo/devices/char/hypdriver/dvsdev");
     DVSHYPRequest request{};
@@ -167,7 +167,7 @@ TEST_F(InjectedFaults, SetTheErrnoAlone) {
     HostDevice_Close(fd);
 }
 
-TEST_F(InjectedFaults, DelayOneClientAndNoOther) {
+TEST_F(InjectedFaults, DelayOneClientOnly) {
     using namespace std::chrono;
     ASSERT_EQ(Exec("fault " + FaultOf(Command::PortFind, "nth=1,delay=300")).status, HYP_OK);
     ASSERT_EQ(DVSHYP_StateSanitize(), HYP_OK); // opens the connection of the plain calls
@@ -183,28 +183,28 @@ TEST_F(InjectedFaults, DelayOneClientAndNoOther) {
     EXPECT_EQ(status, 0);
 }
 
-TEST_F(InjectedFaults, DroppedRequestsAreNotCarriedOut) {
+TEST_F(InjectedFaults, DroppedRequestsAreNotExecuted) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,drop")).status, HYP_OK);
     EXPECT_EQ(DVSHYP_SwitchAdd("new", "vswitch", 0, 110), HYP_FAILURE);
     EXPECT_EQ(DVSHYP_SwitchAssociate("new"), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYP_SwitchAdd("new", "vswitch", 0, 110), HYP_OK);
 }
 
-TEST_F(InjectedFaults, DroppedAnswersAreNoSuccessAndNotSentAgain) {
+TEST_F(InjectedFaults, DroppedRepliesFailAndAreNotResent) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::SwitchAdd, "nth=1,drop=after")).status, HYP_OK);
     EXPECT_EQ(DVSHYP_SwitchAdd("new", "vswitch", 0, 110), HYP_FAILURE);
     EXPECT_EQ(DVSHYP_SwitchAssociate("new"), HYP_OK);
     EXPECT_NE(Exec("stats").text.find(CountOf(Command::SwitchAdd, 2)), std::string::npos);
 }
 
-TEST_F(InjectedFaults, HitTheExecutionOfTextCommandsButTheirOwn) {
+TEST_F(InjectedFaults, HitTextCommandsExceptTheirOwn) {
     ASSERT_EQ(Exec("fault " + FaultOf(Command::CmdExec, "errno=EIO,status=0x0bad0001")).status, HYP_OK);
     EXPECT_EQ(Exec("help").status, HYP_FAILURE);
     EXPECT_EQ(Exec("fault clear").status, HYP_OK);
     EXPECT_EQ(Exec("help").status, HYP_OK);
 }
 
-TEST_F(InjectedFaults, AreGivenAtTheStartToo) {
+TEST_F(InjectedFaults, CanBeSetAtStartup) {
     EmulatorProcess process;
     const std::string socket = emulator_.Directory() / "second";
     ASSERT_TRUE(
@@ -215,7 +215,7 @@ TEST_F(InjectedFaults, AreGivenAtTheStartToo) {
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_FAILURE);
 }
 
-TEST(FaultSpecifications, GoodOnesAreTaken) {
+TEST(FaultSpecifications, AcceptsGoodSpecifications) {
     for (const char *text :
          {"status=1", "errno=5", "errno=ENOSPC", "delay=10", "delay=10ms", "delay=2s", "drop", "drop=after",
           "command=0,nth=1,status=0x0bad0014", "nth=4294967295,drop,delay=1", "status=4294967295"}) {
@@ -225,7 +225,7 @@ TEST(FaultSpecifications, GoodOnesAreTaken) {
     }
 }
 
-TEST(FaultSpecifications, BadOnesAreRefusedWithTheReason) {
+TEST(FaultSpecifications, RejectsBadSpecificationsWithTheReason) {
     for (const char *text :
          {"", "command=19", "nth=3", "status=", "status=x", "status=0", "status=4294967296", "errno=0",
           "errno=9999", "errno=EWHAT", "delay=-1", "delay=1h", "delay=99999999999", "drop=maybe",

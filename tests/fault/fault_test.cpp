@@ -155,7 +155,7 @@ TEST_F(Fault, OnlyTheNthCallFails) {
     EXPECT_EQ(fault_hits(), 1);
 }
 
-TEST_F(Fault, PlusMeansAndAllLaterOnes) {
+TEST_F(Fault, PlusFailsAllLaterCalls) {
     ASSERT_EQ(fault_arm("fsync:2+"), 0);
     EXPECT_EQ(fsync(fd_), 0);
     EXPECT_EQ(fsync(fd_), -1);
@@ -163,7 +163,7 @@ TEST_F(Fault, PlusMeansAndAllLaterOnes) {
     EXPECT_EQ(errno, EIO);
 }
 
-TEST_F(Fault, ShortCountsTransferThatMuch) {
+TEST_F(Fault, ShortCountsTransferThatManyBytes) {
     ASSERT_EQ(fault_arm("write:1:short=2;read:1:short=3"), 0);
     EXPECT_EQ(pwrite(fd_, "abcdef", 6, 0), 2);
     char got[8] = {};
@@ -171,7 +171,7 @@ TEST_F(Fault, ShortCountsTransferThatMuch) {
     EXPECT_STREQ(got, "ab2");
 }
 
-TEST_F(Fault, ShortCountsCutVectors) {
+TEST_F(Fault, ShortCountsTruncateVectors) {
     ASSERT_EQ(fault_arm("write:1:short=3"), 0);
     char first[] = "ab", second[] = "cd";
     const iovec vector[] = {{first, 2}, {second, 2}};
@@ -205,7 +205,7 @@ TEST_F(Fault, DirectLimitsAPlanToOpensForDirectInput) {
     close(fd);
 }
 
-TEST_F(Fault, FailedCloseHasClosed) {
+TEST_F(Fault, FailedCloseClosesTheDescriptor) {
     const int fd = dup(fd_);
     ASSERT_EQ(fault_arm("close:1:EIO"), 0);
     EXPECT_EQ(close(fd), -1);
@@ -213,7 +213,7 @@ TEST_F(Fault, FailedCloseHasClosed) {
     EXPECT_EQ(fcntl(fd, F_GETFD), -1);
 }
 
-TEST_F(Fault, RandomPlansRepeatForTheirSeed) {
+TEST_F(Fault, RandomPlansAreReproducibleBySeed) {
     const auto run = [this](const char *plan) {
         EXPECT_EQ(fault_arm(plan), 0);
         std::string pattern;
@@ -253,7 +253,7 @@ TEST_F(Fault, SuspendedCallsNeitherCountNorFail) {
     EXPECT_EQ(pwrite(fd_, "x", 1, 0), -1);
 }
 
-TEST_F(Fault, MalformedPlansAreRefused) {
+TEST_F(Fault, RejectsMalformedPlans) {
     for (const char *plan :
          {"writ:1", "write", "write:", "write:0", "write:x", "write:1:EWHAT", "write:~1001",
           "write:1:short=", "write:1:seed=x", "write:1;bad", "write:1:5000"})
@@ -327,7 +327,7 @@ uint32_t ThreeBlocks(bool leak) {
     return status;
 }
 
-TEST(FaultSweep, RunsUntilNoFaultIsMet) {
+TEST(FaultSweep, RunsUntilNoFaultOccurs) {
     std::vector<uint32_t> statuses;
     const uint64_t rounds = fault::Sweep(
         "alloc:%", [](fault::Child &) { return ThreeBlocks(false); },
@@ -340,7 +340,7 @@ TEST(FaultSweep, RunsUntilNoFaultIsMet) {
     EXPECT_EQ(statuses, (std::vector<uint32_t>{1, 1, 1, 0}));
 }
 
-TEST(FaultSweep, SeesLeakedBlocksAndDescriptors) {
+TEST(FaultSweep, DetectsLeakedBlocksAndDescriptors) {
     fault::Sweep(
         "alloc:2", [](fault::Child &) { return (void)!dup(0), ThreeBlocks(true); },
         [](uint64_t, const fault::Report &report) {
@@ -359,7 +359,7 @@ TEST(FaultSweep, CollectsNotes) {
         [](uint64_t, const fault::Report &report) { EXPECT_EQ(report.notes, "a note"); });
 }
 
-TEST(FaultSweep, SeesAHeldLock) {
+TEST(FaultSweep, DetectsAHeldLock) {
     static pthread_mutex_t mutex = PTHREAD_MUTEX_INITIALIZER;
     const auto run = [](bool hold) {
         bool held = false;

@@ -324,7 +324,7 @@ protected:
 
 class OutOfMemory : public StateFileDir, public testing::WithParamInterface<std::size_t> {};
 
-TEST_P(OutOfMemory, LeavesNothingBehind) {
+TEST_P(OutOfMemory, FailsCleanly) {
     const Row &row = kRows[GetParam()];
     fault::Options options;
     options.prepare = Prepare;
@@ -349,9 +349,9 @@ TEST_P(OutOfMemory, LeavesNothingBehind) {
         },
         options);
     if (row.onFault.empty()) {
-        EXPECT_EQ(rounds, 1u) << "an allocation where none is needed";
+        EXPECT_EQ(rounds, 1u) << "an unexpected allocation";
     } else {
-        EXPECT_GT(rounds, 1u) << "the row says that it allocates";
+        EXPECT_GT(rounds, 1u) << "the row expects an allocation";
     }
 }
 
@@ -396,7 +396,7 @@ TEST_F(OutOfMemoryMessages, NameTheSwitchThatCouldNotBeAdded) {
 TEST(OutOfMemoryTable, HasEveryExportedOperationOfTheseFamilies) {
     std::set<std::string> rows;
     for (const Row &row : kRows)
-        EXPECT_TRUE(rows.insert(row.name).second) << row.name << " stands there twice";
+        EXPECT_TRUE(rows.insert(row.name).second) << row.name << " has two rows";
     std::ifstream symbols(DVS_SOURCE_DIR "/dvs.symbols");
     std::size_t found = 0;
     for (std::string name; std::getline(symbols, name);) {

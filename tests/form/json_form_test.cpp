@@ -25,7 +25,7 @@ std::string ToJson(const Buffer &state) {
 }
 
 void ExpectSurvives(const Buffer &state) {
-    ASSERT_FALSE(dvs::state::VerifyState(state).first) << "the test's state must be sound";
+    ASSERT_FALSE(dvs::state::VerifyState(state).first) << "the test's state must be valid";
     const std::string text = ToJson(state);
     EXPECT_EQ(StateFromJsonText(text), state) << text;
 }
@@ -58,7 +58,7 @@ TEST(JsonForm, KeepsASmallState) {
     ExpectSurvives(SmallState());
 }
 
-TEST(JsonForm, ReadsNaturallyWhereItCan) {
+TEST(JsonForm, IsReadableWherePossible) {
     const std::string text = ToJson(SmallState());
     for (const char *part : {
              R"("class": "etherswitch")",
@@ -69,7 +69,7 @@ TEST(JsonForm, ReadsNaturallyWhereItCan) {
              R"({"name": "x.blob", "type": 32, "value": {"hex": "010200"}})",
          })
         EXPECT_NE(text.find(part), std::string::npos) << part << "\n" << text;
-    EXPECT_EQ(text.find("volatile.type"), std::string::npos) << "the kind says it";
+    EXPECT_EQ(text.find("volatile.type"), std::string::npos) << "the kind replaces it";
 }
 
 TEST(JsonForm, KeepsEveryValue) {
@@ -179,13 +179,13 @@ TEST(JsonForm, KeepsDuplicates) {
     ExpectSurvives(OneSwitch(FieldsAnd({MakeList("maxPorts", {p}), MakeList("className", {})})));
 }
 
-TEST(JsonForm, KeepsEntriesThatALoadPassesOver) {
+TEST(JsonForm, KeepsEntriesThatALoadIgnores) {
     ExpectSurvives(StateOf({MakeProperty("not a switch", Text("at all"), 1), MakeSwitch("s", {}, {}, {})}));
     ExpectSurvives(OneSwitch(
         FieldsAnd({MakeProperty("globalPropList", Raw("\1\2"), 2), MakeList("globalPropList", {})})));
 }
 
-TEST(JsonForm, KeepsPortKindsHoweverTheyAreWritten) {
+TEST(JsonForm, KeepsPortKindsInEveryNotation) {
     const std::string name = "com.orbeno.common.port.volatile.type";
     const NewEntry p = MakeProperty("p", Number(1));
     const auto kind = [&](Buffer value, std::uint32_t type = 0x10) {
@@ -257,7 +257,7 @@ TEST(JsonForm, DropsOnlyBytesWithoutMeaning) {
     EXPECT_EQ(StateFromJsonText(ToJson(state)), clean);
 }
 
-TEST(JsonForm, GivesTheLibrarysOwnBytesBack) {
+TEST(JsonForm, RestoresTheLibrarysOwnBytes) {
     ASSERT_EQ(
         DVSState_ConfigDeserialize(SmallState().data(), static_cast<std::uint32_t>(SmallState().size())),
         HYP_OK);
@@ -271,7 +271,7 @@ TEST(JsonForm, GivesTheLibrarysOwnBytesBack) {
     ExpectSurvives(written);
 }
 
-TEST(JsonForm, TheExampleIsASoundState) {
+TEST(JsonForm, ExampleIsAValidState) {
     std::ifstream file(std::string(DVS_SOURCE_DIR) + "/examples/site-basic.json");
     std::stringstream text;
     text << file.rdbuf();
@@ -300,7 +300,7 @@ Buffer ValueFrom(const std::string &value) {
     return {bytes.begin(), bytes.end()};
 }
 
-TEST(JsonForm, TakesValuesInEveryNotation) {
+TEST(JsonForm, AcceptsValuesInEveryNotation) {
     EXPECT_EQ(ValueFrom("\"text\""), Text("text"));
     EXPECT_EQ(ValueFrom("\"\""), Raw("\0"s));
     EXPECT_EQ(ValueFrom("\"a\\u0000b\""), Raw("a\0b\0"s));
@@ -314,7 +314,7 @@ TEST(JsonForm, TakesValuesInEveryNotation) {
     EXPECT_EQ(ValueFrom("{\"names\": [\"a\", \"b\"], \"slot\": 3}"), Raw("\2\0\0\0a\0\0b\0\0"s));
 }
 
-TEST(JsonForm, FillsInWhatIsUsual) {
+TEST(JsonForm, FillsInDefaults) {
     const Buffer state =
         StateFromJsonText(Document(R"({"id": "s", "version": 8, "class": "vswitch", "max_ports": 1,
         "global": [{"name": "n", "value": 1}], "ports": [{"id": "1"}, {"id": "2", "kind": "zombie"}, {"id": "3", "kind": "active"}]})"));
@@ -332,7 +332,7 @@ struct BadCase {
     std::string document, path, why;
 };
 
-TEST(JsonForm, SaysWhatIsWrongAndWhere) {
+TEST(JsonForm, ReportsErrorsWithTheirPlace) {
     const std::string port = R"({"id": "s", "ports": [{"id": "1", )";
     const BadCase cases[] = {
         {"[]", "$", "it is an array, an object is expected"},

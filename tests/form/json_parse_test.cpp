@@ -25,7 +25,7 @@ struct BadCase {
     std::string text, path, why;
 };
 
-TEST(JsonParse, SaysWhereAndWhy) {
+TEST(JsonParse, ReportsPlaceAndReason) {
     const BadCase cases[] = {
         {"", "$, line 1, column 1", "it is empty"},
         {" \n ", "$, line 2, column 2", "it is empty"},
@@ -59,13 +59,13 @@ TEST(JsonParse, SaysWhereAndWhy) {
     }
 }
 
-TEST(JsonParse, TellsAnObjectFromOtherValues) {
+TEST(JsonParse, DistinguishesObjectsFromOtherValues) {
     EXPECT_TRUE(IsJsonObject(R"({"a": [{"a": "b"}, {"a": null}]})"));
     for (const char *other : {"[{}]", "null", "\"{}\"", "1"})
         EXPECT_FALSE(IsJsonObject(other)) << other;
 }
 
-TEST(JsonParse, RefusesAbsurdDepth) {
+TEST(JsonParse, RejectsExcessiveDepth) {
     for (const char *open : {"[", "{\"a\":"}) {
         std::string text;
         for (int i = 0; i < 1'000'000; ++i)
@@ -79,7 +79,7 @@ TEST(JsonParse, RefusesAbsurdDepth) {
     }
 }
 
-TEST(JsonParse, FindsDuplicatesAmongManyKeys) {
+TEST(JsonParse, DetectsDuplicatesAmongManyKeys) {
     std::string text = "{";
     for (int i = 0; i < 50'000; ++i)
         text += "\"key" + std::to_string(i) + "\": 0, ";

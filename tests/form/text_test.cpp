@@ -16,7 +16,7 @@ struct EscapeCase {
     std::string given, shown;
 };
 
-TEST(Escape, ReplacesWhatATerminalActsOn) {
+TEST(Escape, ReplacesTerminalControls) {
     const EscapeCase cases[] = {
         {"plain text", "plain text"},
         {"Zürich 東京", "Zürich 東京"},
@@ -58,7 +58,7 @@ TEST(Quote, EscapesItsOwnQuotes) {
     EXPECT_EQ(Quote("say \"hi\""), "\"say \\\"hi\\\"\"");
 }
 
-TEST(ShowName, QuotesOnlyWhatHasNoVisibleBounds) {
+TEST(ShowName, QuotesOnlyWhenNeeded) {
     EXPECT_EQ(ShowName("web-1"), "web-1");
     EXPECT_EQ(ShowName("50 2e 1a"), "50 2e 1a");
     EXPECT_EQ(ShowName(""), "\"\"");
@@ -76,7 +76,7 @@ TEST(Width, CountsColumnsNotBytes) {
     EXPECT_EQ(Width("e\xcc\x81"), 1u);
 }
 
-TEST(Hex, CutsWithAnEllipsis) {
+TEST(Hex, TruncatesWithAnEllipsis) {
     const std::uint8_t bytes[] = {0, 0xab, 0xff};
     EXPECT_EQ(Hex(bytes), "00 ab ff");
     EXPECT_EQ(Hex(bytes, 2), "00 ab …");
@@ -114,7 +114,7 @@ TEST(Glob, MatchesWholeNames) {
         EXPECT_EQ(GlobMatch(c.pattern, c.text), c.matches) << c.pattern << " on " << c.text;
 }
 
-TEST(Glob, ManyStarsTakeNoTime) {
+TEST(Glob, ManyStarsAreFast) {
     // An exponential matcher, which tries every split for every star, would not finish.
     std::string pattern;
     for (int i = 0; i < 60; ++i)

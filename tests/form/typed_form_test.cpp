@@ -65,19 +65,19 @@ Error Refusal(const std::string &property) {
     return {ErrorKind::Warning, ""};
 }
 
-TEST(TypedForm, StandsForExactlyTheBytes) {
+TEST(TypedForm, RepresentsExactlyTheBytes) {
     const json::object property = Written(PortState(kVlan, AccessVlan(100)));
     EXPECT_FALSE(property.contains("value"));
     EXPECT_EQ(property.at("typed").at("vlan_id"), 100);
 }
 
-TEST(TypedForm, LeavesValuesThatReadWellAsTheyAre) {
+TEST(TypedForm, KeepsReadableValuesUnchanged) {
     const json::object property = Written(PortState("com.orbeno.common.port.alias", Text("web")));
     EXPECT_EQ(property.at("value"), "web");
     EXPECT_FALSE(property.contains("typed"));
 }
 
-TEST(TypedForm, KeepsBytesThatItWouldNotGiveBack) {
+TEST(TypedForm, KeepsBytesThatWouldNotRoundTrip) {
     // The typed form has no member for the record's reserved field.
     const Buffer value = Raw("\0\0\x64\0\x01\0\0\0"s);
     const json::object property = Written(PortState(kVlan, value));
@@ -93,20 +93,20 @@ TEST(TypedForm, KeepsDamagedAndUnknownValues) {
     }
 }
 
-TEST(TypedForm, IsShownBesideTheBytes) {
+TEST(TypedForm, IsShownWithTheBytes) {
     const json::object property = Written(PortState(kVlan, AccessVlan(100)), TypedForm::Beside);
     EXPECT_EQ(property.at("value").at("hex"), "0000640000000000");
     EXPECT_EQ(property.at("typed").at("vlan_id"), 100);
     EXPECT_EQ(property.at("summary"), "VLAN 100");
 }
 
-TEST(TypedForm, DamageIsShownBesideTheBytes) {
+TEST(TypedForm, DamageIsShownWithTheBytes) {
     const json::object property = Written(PortState(kVlan, Raw("\x01\0\x02"s)), TypedForm::Beside);
     EXPECT_EQ(property.at("value").at("hex"), "010002");
     EXPECT_NE(std::string(property.at("damage").as_string()).find("at byte 3"), std::string::npos);
 }
 
-TEST(TypedForm, CanBeLeftOut) {
+TEST(TypedForm, CanBeOmitted) {
     EXPECT_FALSE(Written(PortState(kVlan, AccessVlan(100)), TypedForm::None).contains("typed"));
 }
 
@@ -115,7 +115,7 @@ TEST(TypedForm, IsReadInsteadOfBytes) {
               PortState(kVlan, AccessVlan(100)));
 }
 
-TEST(TypedForm, FollowsTheSwitchesVersion) {
+TEST(TypedForm, DependsOnTheSwitchsVersion) {
     // Overlay switches use the same version texts as others, with different numbers.
     for (const std::uint32_t version : {8u, 108u}) {
         const std::string text =
@@ -150,7 +150,7 @@ TEST(TypedForm, NamesPathAndField) {
     EXPECT_FALSE(error.why.empty());
 }
 
-TEST(TypedForm, RefusesWhatHasNoSuchForm) {
+TEST(TypedForm, RejectsPropertiesWithoutATypedForm) {
     EXPECT_NE(Refusal(Named(kVlan, R"("typed": {"vlan": 100})")).path.find(".typed.vlan"), std::string::npos);
     EXPECT_NE(Refusal(Named(kVlan, R"("typed": {"vlan_id": 70000})")).path.find(".typed.vlan_id"),
               std::string::npos);
@@ -162,7 +162,7 @@ TEST(TypedForm, RefusesWhatHasNoSuchForm) {
     EXPECT_NE(Refusal(Named(kVlan, R"("type": 16)")).why.find("\"value\" or \"typed\""), std::string::npos);
 }
 
-TEST(TypedForm, SaysWhereFieldsBelong) {
+TEST(TypedForm, SuggestsWhereFieldsBelong) {
     for (const char *fields : {R"({"vlan_id": 100})", "[1]", "true", "{}"}) {
         const Error error = Refusal(Named(kVlan, R"("value": )" + std::string(fields)));
         EXPECT_EQ(error.path, "$.switches[0].ports[0].properties[0].value");
@@ -172,14 +172,14 @@ TEST(TypedForm, SaysWhereFieldsBelong) {
               std::string::npos);
 }
 
-TEST(TypedForm, RefusesWhatWouldReadBackOtherwise) {
+TEST(TypedForm, RejectsValuesThatWouldNotRoundTrip) {
     // The record counts bytes; three bits are not a whole byte.
     const Error error = Refusal(Named(
         kShaper, R"("typed": {"average_bandwidth": 8003, "peak_bandwidth": 8000, "burst_size": 8000})"));
     EXPECT_NE(error.path.find("average_bandwidth"), std::string::npos) << error.path;
 }
 
-TEST(TypedForm, MustAgreeWithTheBytesBesideIt) {
+TEST(TypedForm, MustAgreeWithTheBytes) {
     const Buffer state = StateFromJsonText(Document(
         Named(kVlan, R"("type": 16, "value": {"hex": "0000640000000000"}, "typed": {"vlan_id": 100})")));
     EXPECT_EQ(state, PortState(kVlan, AccessVlan(100)));

@@ -33,7 +33,7 @@ constexpr const char *kVlan = "etherswitch.port.vlan";
 constexpr const char *kTeaming = "etherswitch.port.teaming";
 constexpr const char *kSessions = "etherswitch.port.mirrorSessions";
 
-TEST(TypedMistakes, AnotherType) {
+TEST(TypedMistakes, WrongType) {
     ExpectRefusal(kVlan, R"({"vlan_id": "100"})", ".vlan_id", "is a text, expected a number");
     ExpectRefusal(kVlan, R"({"trunk_vlan_ids": [5]})", ".trunk_vlan_ids[0]",
                   "is a number, expected an object");
@@ -43,7 +43,7 @@ TEST(TypedMistakes, AnotherType) {
                   ".network_filters[0].slot_number", "is a number, expected a text");
 }
 
-TEST(TypedMistakes, AMemberThatThereIsNot) {
+TEST(TypedMistakes, UnknownMember) {
     ExpectRefusal(kVlan, R"({"vlanid": 100})", ".vlanid",
                   "is no field of this value; there are vlan_id, pvlan_id, trunk_vlan_ids");
     ExpectRefusal(
@@ -51,19 +51,19 @@ TEST(TypedMistakes, AMemberThatThereIsNot) {
         "is no field of this value; there are check_beacon, lc_link_state, full_duplex, percentage, speed");
 }
 
-TEST(TypedMistakes, AVlanOutOfRange) {
+TEST(TypedMistakes, VlanOutOfRange) {
     ExpectRefusal(kVlan, R"({"vlan_id": 5000})", ".vlan_id", "5000 is no VLAN id, expected 0 to 4095");
     ExpectRefusal(kVlan, R"({"trunk_vlan_ids": [{"start": 1, "end": 2}, {"start": 9, "end": 4096}]})",
                   ".trunk_vlan_ids[1].end", "4096 is no VLAN id, expected 0 to 4095");
 }
 
-TEST(TypedMistakes, AWordThatThereIsNot) {
+TEST(TypedMistakes, UnknownWord) {
     ExpectRefusal(kTeaming, R"({"policy": "ROUNDROBIN"})", ".policy",
                   "\"ROUNDROBIN\" is not known; expected one of LOADBALANCE_IP, LOADBALANCE_SRCMAC, "
                   "LOADBALANCE_SRCID, FAILOVER_EXPLICIT, LOADBALANCE_LOADBASED");
 }
 
-TEST(TypedMistakes, NoAddress) {
+TEST(TypedMistakes, InvalidAddress) {
     ExpectRefusal(kSessions,
                   R"([{"key": "a", "session_type": "ENCAPSULATED_REMOTE_MIRROR_SOURCE",
                       "destination_port": {"addresses": ["2001:db8:::1"]}}])",
@@ -71,7 +71,7 @@ TEST(TypedMistakes, NoAddress) {
                   "\"2001:db8:::1\" is no IP address, expected one as 192.0.2.1 or 2001:db8::1");
 }
 
-TEST(TypedMistakes, AMemberLeftOut) {
+TEST(TypedMistakes, MissingMember) {
     ExpectRefusal("etherswitch.port.lacp", R"({"enabled": true})", ".mode", "is missing; the value needs it");
     ExpectRefusal(kVlan, R"({"trunk_vlan_ids": [{"start": 1}]})", ".trunk_vlan_ids[0].end",
                   "is missing; the value needs it");
@@ -88,29 +88,29 @@ TEST(TypedMistakes, TooManyElements) {
                   ".uplink_port_order", "names 33 uplinks, at most 32 fit");
 }
 
-TEST(TypedMistakes, ATextThatIsTooLong) {
+TEST(TypedMistakes, TextThatIsTooLong) {
     ExpectRefusal(kTeaming,
                   R"({"uplink_port_order": {"standby_uplink_ports": [")" + std::string(81, 'x') + "\"]}}",
                   ".uplink_port_order.standby_uplink_ports[0]", "is 81 bytes long, at most 80 fit");
 }
 
-TEST(TypedMistakes, AMemberThatStandsTwice) {
+TEST(TypedMistakes, DuplicateMember) {
     ExpectRefusal(kVlan, R"({"vlan_id": 1, "vlan_id": 2})", ".vlan_id, line 2, column 90",
                   "the key stands there twice");
     ExpectRefusal(kSessions, R"([{"key": "a"}, {"key": "a"}])", "[1].key", "\"a\" is there twice");
 }
 
-TEST(TypedMistakes, BytesThatSaySomethingElse) {
+TEST(TypedMistakes, ContradictingBytes) {
     ExpectRefusal(kVlan, R"({"vlan_id": 1}, "value": {"hex": "0000020000000000"})", "",
                   "\"value\" says something else; leave out the one that is not meant");
 }
 
-TEST(TypedMistakes, TwoThingsOfWhichAPortHasOne) {
+TEST(TypedMistakes, ConflictingMembers) {
     ExpectRefusal(kVlan, R"({"vlan_id": 1, "pvlan_id": 2})", ".pvlan_id",
                   "excludes vlan_id: a port has one of vlan_id, pvlan_id and trunk_vlan_ids");
 }
 
-TEST(TypedMistakes, ANumberThatIsNotKeptWhole) {
+TEST(TypedMistakes, NumberThatIsNotKeptWhole) {
     ExpectRefusal("common.port.shaper.input", R"({"average_bandwidth": 100})", ".average_bandwidth",
                   "100 is no multiple of 8, and only whole bytes are kept");
     ExpectRefusal("common.port.shaper.input", R"({"burst_size": -8})", ".burst_size", "-8 is negative");
@@ -119,7 +119,7 @@ TEST(TypedMistakes, ANumberThatIsNotKeptWhole) {
                   "the property cannot hold it as it is given: 01 reads back as 1");
 }
 
-TEST(TypedMistakes, AValueThatIsNone) {
+TEST(TypedMistakes, NullValue) {
     ExpectRefusal("etherswitch.port.ipfix", "false", "",
                   "is what there is without the property; leave the property out");
     ExpectRefusal("site.colour", "5", "", "the property has no typed form: its meaning is not known");

@@ -49,7 +49,7 @@ void ExpectWhole(const char *key, const char *text, std::uint32_t version = 8) {
     EXPECT_TRUE(view.exact) << text << (view.differences.empty() ? "" : view.differences[0]);
 }
 
-TEST(TypedSessions, DestinationsAndBothKindsOfSourcesStandApart) {
+TEST(TypedSessions, DestinationsAndBothKindsOfSourcesAreSeparate) {
     const char *text = R"([
         {"key": "a", "session_type": "MIXED_DEST_MIRROR",
          "destination_port": {"port_keys": ["d1"], "uplink_port_names": ["uplink1"]},
@@ -103,7 +103,7 @@ TEST(TypedSessions, AddressesOfAnEncapsulatedSourceAreAddresses) {
     EXPECT_EQ(addresses->items[0].text, "192.0.2.9");
 }
 
-TEST(TypedSessions, FlagsLengthsAndKindsAreWrittenAsTheyAreGiven) {
+TEST(TypedSessions, FlagsLengthsAndKindsAreWrittenUnchanged) {
     const char *text = R"([
         {"key": "a", "name": "one", "session_type": "DVPORT_MIRROR", "enabled": false, "strip_original_vlan": true,
          "normal_traffic_allowed": false, "legacy_mode": false, "mirrored_packet_length": 128,
@@ -123,7 +123,7 @@ TEST(TypedSessions, FlagsLengthsAndKindsAreWrittenAsTheyAreGiven) {
     EXPECT_EQ(fields["sessions[1].transmit_connectee_types"], "0x6 PNIC from_store");
 }
 
-TEST(TypedSessions, WhatIsLeftOutIsNotSet) {
+TEST(TypedSessions, OmittedMembersAreNotSet) {
     ExpectWhole(kSessions, R"([{"key": "a"}])");
     auto fields = Fields(kSessions, Build(kSessions, R"([{"key": "a"}])"));
     EXPECT_EQ(fields["sessions[0].flags"], "0x0");
@@ -131,7 +131,7 @@ TEST(TypedSessions, WhatIsLeftOutIsNotSet) {
     EXPECT_EQ(Build(kSessions, "[]").bytes.size(), 20U);
 }
 
-TEST(TypedSessions, NamesWhatHasNoPlaceInASession) {
+TEST(TypedSessions, NamesMembersThatDoNotBelongInASession) {
     const struct {
         const char *text, *field, *reason;
     } rows[] = {

@@ -21,7 +21,7 @@ struct LookCase {
     std::string shown;
 };
 
-TEST(Value, LooksLikeWhatItIs) {
+TEST(Value, IsShownByItsKind) {
     const LookCase cases[] = {
         {"production\0"s, ValueForm::Text, "\"production\""},
         {"Zürich\0"s, ValueForm::Text, "\"Zürich\""},
@@ -67,7 +67,7 @@ TEST(Value, ShowsListsOfNames) {
     EXPECT_EQ(LookAt(AsBytes(Slots(1, {""}, 48))).form, ValueForm::Raw);
 }
 
-TEST(Value, CutsLongOnesUnlessAskedForAll) {
+TEST(Value, TruncatesLongValuesByDefault) {
     const std::string bytes(100, '\x80');
     EXPECT_LT(ShowValue(AsBytes(bytes), false).size(), 100u);
     EXPECT_NE(ShowValue(AsBytes(bytes), false).find("(100 bytes)"), std::string::npos);
@@ -78,7 +78,7 @@ TEST(Value, CutsLongOnesUnlessAskedForAll) {
     EXPECT_NE(cut.find("(622 bytes)"), std::string::npos);
 }
 
-TEST(Digits, HexReadsBackWhatItWrites) {
+TEST(Digits, HexRoundTrips) {
     std::string all;
     for (int i = 0; i < 256; ++i)
         all += static_cast<char>(i);
@@ -91,7 +91,7 @@ TEST(Digits, HexReadsBackWhatItWrites) {
         EXPECT_FALSE(FromHexDigits(bad)) << bad;
 }
 
-TEST(Digits, Base64ReadsBackWhatItWrites) {
+TEST(Digits, Base64RoundTrips) {
     std::string bytes;
     for (int i = 0; i < 300; ++i) {
         const auto back = FromBase64(ToBase64(AsBytes(bytes)));

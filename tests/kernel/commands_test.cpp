@@ -124,7 +124,7 @@ TEST_F(Commands, EachReturnsTheModulesStatus) {
     }
 }
 
-TEST_F(Commands, SwitchAddSendsTheFirst127CharactersOfALongClassName) {
+TEST_F(Commands, SwitchAddTruncatesClassNamesTo127Characters) {
     EXPECT_EQ(DVSHYP_SwitchAdd("s", std::string(200, 'c').c_str(), 0, 0), HYP_OK);
     EXPECT_EQ(device.calls.at(0).record, Names("s", "", std::string(127, 'c').c_str()));
 }
@@ -171,7 +171,7 @@ TEST_F(ExternalId, IdsOf128CharactersDoNotTouchTheDevice) {
     EXPECT_EQ(Find(std::string(127, 'i')), "");
 }
 
-TEST_F(ExternalId, AStoredPrefixThatComesFirstWins) {
+TEST_F(ExternalId, FirstStoredPrefixWins) {
     Serve({{"p1", {{kVnic, "abc"}}}, {"p2", {{kVnic, "abcd"}}}});
     EXPECT_EQ(Find("abcd"), "p1");
     Serve({{"p1", {{kVnic, "abcd"}}}, {"p2", {{kVnic, "abc"}}}});
@@ -180,36 +180,36 @@ TEST_F(ExternalId, AStoredPrefixThatComesFirstWins) {
     EXPECT_EQ(Find("ab"), "");
 }
 
-TEST_F(ExternalId, NoPortWithEitherKeyIsAnEmptyResult) {
+TEST_F(ExternalId, ReturnsAnEmptyResultWithoutEitherKey) {
     Serve({{"p1", {{"other", "abc"}}}, {"p2", {}}});
     EXPECT_EQ(Find("abc"), "");
 }
 
-TEST_F(ExternalId, TheVirtualAdaptersKeyComesFirst) {
+TEST_F(ExternalId, VirtualAdaptersKeyTakesPrecedence) {
     Serve({{"p1", {{kHypnic, "abc"}, {kVnic, "xyz"}}}, {"p2", {{kHypnic, "abc"}}}});
     EXPECT_EQ(Find("abc"), "p2");
     EXPECT_EQ(Find("xyz"), "p1");
 }
 
-TEST_F(ExternalId, AnEmptyStoredIdMatchesEverything) {
+TEST_F(ExternalId, EmptyStoredIdMatchesEverything) {
     Serve({{"p1", {{kVnic, std::string("\0abc", 4)}}}, {"p2", {{kVnic, "abc"}}}});
     EXPECT_EQ(Find("abc"), "p1");
     EXPECT_EQ(Find(""), "p1");
 }
 
-TEST_F(ExternalId, AStoredIdWithoutNulEndsWithItsValue) {
+TEST_F(ExternalId, UnterminatedStoredIdEndsWithItsValue) {
     Serve({{"p1", {{kVnic, "abc"}}}});
     EXPECT_EQ(Find("abcdef"), "p1");
     Serve({{"p1", {{kVnic, std::string("ab\0zz", 5)}}}});
     EXPECT_EQ(Find("abc"), "p1");
 }
 
-TEST_F(ExternalId, AnUnknownSwitchIsNotFound) {
+TEST_F(ExternalId, ReturnsNotFoundForAnUnknownSwitch) {
     Serve({});
     EXPECT_EQ(Find("abc", "s2"), "status " + std::to_string(HYP_NOT_FOUND));
 }
 
-TEST_F(ExternalId, FailuresOfFetchAndLoadPassThrough) {
+TEST_F(ExternalId, ReturnsFailuresOfFetchAndLoad) {
     device.always[Command::StateGet] = {EPERM, 0x0bad0042, -1, {}};
     EXPECT_EQ(Find("abc"), "status " + std::to_string(0x0bad0042));
     device.replies[Command::StateGet] = "no state at all, but more than sixteen bytes";

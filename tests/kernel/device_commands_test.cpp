@@ -38,7 +38,7 @@ TEST(DeviceCommands, AreFoundByTheirNumbersOnly) {
     EXPECT_EQ(FindCommand(INT32_MAX), nullptr);
 }
 
-TEST(DeviceCommands, AreTheTableOfTheEmulatorsDocument) {
+TEST(DeviceCommands, MatchTheTableInTheEmulatorsDocument) {
     std::ostringstream document;
     document << std::ifstream(DVS_SOURCE_DIR "/docs/emulator.md").rdbuf();
     std::string table = "| number | command | buffers | changes the state |\n|---|---|---|---|\n";

@@ -25,7 +25,7 @@ uint32_t WordAt(const DeviceCall &call, std::size_t offset) {
     return word;
 }
 
-TEST_F(DeviceChannel, OverlongTextsAreCutToTheirFields) {
+TEST_F(DeviceChannel, TruncatesLongTextsToTheirFields) {
     const std::string text(300, 'x');
     EXPECT_EQ(DVSHYP_PortDataClear(text.c_str(), text.c_str(), text.c_str()), HYP_OK);
     EXPECT_EQ(device.calls.at(0).record, RecordBytes()
@@ -35,7 +35,7 @@ TEST_F(DeviceChannel, OverlongTextsAreCutToTheirFields) {
                                              .Bytes());
 }
 
-TEST_F(DeviceChannel, TextsOfExactlyTheFieldsSizeAreCutByOne) {
+TEST_F(DeviceChannel, TruncatesTextsOfTheFieldsSizeByOne) {
     EXPECT_EQ(DVSHYP_PortRemove(std::string(64, 's').c_str(), std::string(48, 'p').c_str()), HYP_OK);
     EXPECT_EQ(device.calls.at(0).record,
               RecordBytes().Text(0, std::string(63, 's')).Text(64, std::string(47, 'p')).Bytes());
@@ -52,7 +52,7 @@ TEST_F(DeviceChannel, WithoutADeviceEveryCallFailsWithOneMessage) {
     EXPECT_TRUE(device.calls.empty());
 }
 
-TEST_F(DeviceChannel, ADeviceThatAppearsIsUsedByTheNextCall) {
+TEST_F(DeviceChannel, NextCallUsesADeviceThatAppears) {
     device.present = false;
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_FAILURE);
     device.present = true;
@@ -94,21 +94,21 @@ TEST_F(DeviceChannel, FetchesAndExecutionsOpenAndCloseTheirOwn) {
     EXPECT_NE(device.calls[0].fd, device.calls[1].fd);
 }
 
-TEST_F(DeviceChannel, SuccessCountsWhateverStatusTheRecordHolds) {
+TEST_F(DeviceChannel, SuccessfulCallIgnoresTheRecordsStatus) {
     device.script = {{0, HYP_EXISTS, -1, {}}};
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_OK);
     device.script = {{0, HYP_LIMIT_EXCEEDED, 2, "ab"}};
     EXPECT_EQ(Fetch(DVSHYP_StateGet).text, "ab");
 }
 
-TEST_F(DeviceChannel, AFailedCallReturnsThePresetWhereTheModuleWroteNoStatus) {
+TEST_F(DeviceChannel, FailedCallReturnsThePresetStatusByDefault) {
     device.script = {{EIO, -1, -1, {}}};
     DVSHYPRequest request{};
     request.status = HYP_EXISTS;
     EXPECT_EQ(DVSHYP_Ioctl(1, &request), HYP_FAILURE);
 }
 
-TEST_F(DeviceChannel, MissingObjectsAreSilentOtherErrorsPrint) {
+TEST_F(DeviceChannel, PrintsErrorsOtherThanMissingObjects) {
     device.script = {{ENOENT, HYP_NOT_FOUND, -1, {}}, {EEXIST, HYP_EXISTS, -1, {}}};
     EXPECT_EQ(DVSHYP_PortFind("s", "p"), HYP_NOT_FOUND);
     EXPECT_TRUE(log.lines.empty());
@@ -123,7 +123,7 @@ TEST_F(DeviceChannel, ReceivingCallsPrintNothingWhenTheyFail) {
     EXPECT_TRUE(log.lines.empty());
 }
 
-TEST_F(DeviceChannel, AFetchOf100000BytesTakesTwoCalls) {
+TEST_F(DeviceChannel, FetchOf100000BytesTakesTwoCalls) {
     device.replies[Command::StateGet] = std::string(100000, 'v');
     void *out = nullptr;
     uint32_t outLen = 0;
@@ -136,7 +136,7 @@ TEST_F(DeviceChannel, AFetchOf100000BytesTakesTwoCalls) {
     DVSHYP_DataFree(out);
 }
 
-TEST_F(DeviceChannel, AFetchEndsWhenTheModuleNamesNoLargerSize) {
+TEST_F(DeviceChannel, FetchStopsWhenTheModuleReportsNoLargerSize) {
     device.script = {{ENOSPC, HYP_LIMIT_EXCEEDED, 40000, {}}, {ENOSPC, HYP_LIMIT_EXCEEDED, 40000, {}}};
     int marker = 0;
     void *out = &marker;
@@ -147,13 +147,13 @@ TEST_F(DeviceChannel, AFetchEndsWhenTheModuleNamesNoLargerSize) {
     EXPECT_EQ(device.calls.size(), 2U);
 }
 
-TEST_F(DeviceChannel, AFetchEndsWhenTheModuleNamesASmallerSize) {
+TEST_F(DeviceChannel, FetchStopsWhenTheModuleReportsASmallerSize) {
     device.script = {{ENOSPC, HYP_LIMIT_EXCEEDED, 10, {}}};
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_LIMIT_EXCEEDED);
     EXPECT_EQ(device.calls.size(), 1U);
 }
 
-TEST_F(DeviceChannel, AFetchThatFailsToOpenLeavesItsLength) {
+TEST_F(DeviceChannel, FetchThatFailsToOpenKeepsItsLength) {
     device.present = false;
     int marker = 0;
     void *out = &marker;
@@ -163,7 +163,7 @@ TEST_F(DeviceChannel, AFetchThatFailsToOpenLeavesItsLength) {
     EXPECT_EQ(outLen, 77U);
 }
 
-TEST_F(DeviceChannel, AReplyThatClaimsMoreThanTheBufferHoldsIsAFailure) {
+TEST_F(DeviceChannel, RejectsAReplyLongerThanTheBuffer) {
     for (const int64_t claimed : {int64_t{32769}, int64_t{0xFFFFFFFF}}) {
         device.script = {{0, -1, claimed, {}}, {0, -1, claimed, {}}};
         void *out = &device;
@@ -178,7 +178,7 @@ TEST_F(DeviceChannel, AReplyThatClaimsMoreThanTheBufferHoldsIsAFailure) {
     }
 }
 
-TEST_F(DeviceChannel, AFailedReceiveNeverPassesForASuccess) {
+TEST_F(DeviceChannel, FailedReceiveNeverReturnsSuccess) {
     device.script = {{EIO, HYP_OK, -1, {}}, {EIO, HYP_OK, -1, {}}};
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_FAILURE);
     EXPECT_EQ(Exec("x").status, HYP_FAILURE);
@@ -196,7 +196,7 @@ TEST_F(DeviceChannel, CmdExecFillsItsOwnFields) {
     EXPECT_EQ(record, expected.Bytes());
 }
 
-TEST_F(DeviceChannel, CmdExecKeepsAskingAtAnUnchangedSize) {
+TEST_F(DeviceChannel, CmdExecRetriesAtAnUnchangedSize) {
     for (int i = 0; i < 500; i++)
         device.script.push_back({ENOSPC, HYP_LIMIT_EXCEEDED, i < 250 ? -1 : 10, {}});
     device.script.push_back({0, -1, 2, "ok"});
@@ -206,14 +206,14 @@ TEST_F(DeviceChannel, CmdExecKeepsAskingAtAnUnchangedSize) {
     EXPECT_EQ(device.calls.size(), 501U);
 }
 
-TEST_F(DeviceChannel, CmdExecSurvivesASizeOfNothing) {
+TEST_F(DeviceChannel, CmdExecAcceptsASizeOfZero) {
     device.script = {{ENOSPC, HYP_LIMIT_EXCEEDED, 0, {}}, {0, -1, 0, {}}};
     EXPECT_EQ(Exec("x").status, HYP_OK);
     device.script = {{ENOSPC, HYP_LIMIT_EXCEEDED, 0, {}}, {0, -1, 1, {}}};
     EXPECT_EQ(Exec("x").status, HYP_FAILURE);
 }
 
-TEST_F(DeviceChannel, CmdExecLeavesTheLengthTheModuleNamed) {
+TEST_F(DeviceChannel, CmdExecReturnsTheModulesLength) {
     device.script = {{EINVAL, HYP_BAD_PARAM, 123, {}}};
     void *out = &device;
     uint32_t outLen = 0;
@@ -222,11 +222,11 @@ TEST_F(DeviceChannel, CmdExecLeavesTheLengthTheModuleNamed) {
     EXPECT_EQ(outLen, 123U);
 }
 
-TEST_F(DeviceChannel, DataFreeTakesNull) {
+TEST_F(DeviceChannel, DataFreeAcceptsNull) {
     DVSHYP_DataFree(nullptr);
 }
 
-TEST_F(DeviceChannel, TheLockMayBeTakenAgainByItsHolder) {
+TEST_F(DeviceChannel, LockIsRecursive) {
     MXUserRecLock *first = DVSwitchHYPLock();
     MXUserRecLock *second = DVSwitchHYPLock();
     EXPECT_EQ(first, second);
@@ -235,7 +235,7 @@ TEST_F(DeviceChannel, TheLockMayBeTakenAgainByItsHolder) {
     DVSwitchHYPUnlock(nullptr);
 }
 
-TEST_F(DeviceChannel, TheLockKeepsOtherThreadsOut) {
+TEST_F(DeviceChannel, LockExcludesOtherThreads) {
     int shared = 0;
     std::vector<std::thread> threads;
     for (int i = 0; i < 4; i++) {
@@ -253,7 +253,7 @@ TEST_F(DeviceChannel, TheLockKeepsOtherThreadsOut) {
 }
 
 #ifndef NDEBUG
-TEST_F(DeviceChannel, TheLockComesBeforeTheStateLock) {
+TEST_F(DeviceChannel, LockIsTakenBeforeTheStateLock) {
     EXPECT_DEATH(
         {
             MXUserRecLock *state = DVSwitchHandleLock();

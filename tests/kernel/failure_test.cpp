@@ -31,7 +31,7 @@ TEST_F(FailureRecord, IsEmptyBeforeACallAndAfterASuccess) {
     Expect(hyp::Step::None, 0);
 }
 
-TEST_F(FailureRecord, TellsADeviceThatDoesNotOpen) {
+TEST_F(FailureRecord, RecordsAFailedOpen) {
     for (const int error : {ENOENT, EACCES, EBUSY}) {
         device.present = false;
         device.openError = error;
@@ -44,7 +44,7 @@ TEST_F(FailureRecord, TellsADeviceThatDoesNotOpen) {
     }
 }
 
-TEST_F(FailureRecord, TellsTheErrnoOfARefusedRequest) {
+TEST_F(FailureRecord, RecordsTheErrnoOfAFailedRequest) {
     device.script = {{EBUSY, HYP_FAILURE, -1, {}},
                      {EBUSY, HYP_FAILURE, -1, {}},
                      {EIO, HYP_BAD_PARAM, -1, {}},
@@ -59,7 +59,7 @@ TEST_F(FailureRecord, TellsTheErrnoOfARefusedRequest) {
     Expect(hyp::Step::Send, ENOENT);
 }
 
-TEST_F(FailureRecord, TellsAReplyThatClaimsTooMuch) {
+TEST_F(FailureRecord, RecordsAReplyLongerThanTheBuffer) {
     device.script = {{0, -1, 32769, {}}, {0, -1, 32769, {}}};
     EXPECT_EQ(Fetch(DVSHYP_StateGet).status, HYP_FAILURE);
     Expect(hyp::Step::Reply, 0);
@@ -67,7 +67,7 @@ TEST_F(FailureRecord, TellsAReplyThatClaimsTooMuch) {
     Expect(hyp::Step::Reply, 0);
 }
 
-TEST_F(FailureRecord, OfAGrowingFetchIsThatOfItsLastCall) {
+TEST_F(FailureRecord, OfAGrowingFetchComesFromItsLastCall) {
     device.script = {{ENOSPC, HYP_LIMIT_EXCEEDED, 40000, {}}, {0, -1, 2, "ok"}};
     EXPECT_EQ(Fetch(DVSHYP_StateGet).text, "ok");
     Expect(hyp::Step::None, 0);
@@ -85,7 +85,7 @@ TEST_F(FailureRecord, GoesToTheInnermostObserver) {
     Expect(hyp::Step::Send, EIO);
 }
 
-TEST_F(FailureRecord, StaysInItsThread) {
+TEST_F(FailureRecord, IsPerThread) {
     device.script = {{EBUSY, HYP_FAILURE, -1, {}}};
     std::thread([] {
         const FailureObserver other;
@@ -95,7 +95,7 @@ TEST_F(FailureRecord, StaysInItsThread) {
     Expect(hyp::Step::None, 0);
 }
 
-TEST_F(FailureRecord, LeavesTheErrnoToTheMessage) {
+TEST_F(FailureRecord, PreservesErrnoForTheMessage) {
     device.script = {{EBUSY, HYP_FAILURE, -1, {}}};
     EXPECT_EQ(DVSHYP_StateCleanup(), HYP_FAILURE);
     EXPECT_EQ(log.lines, std::vector<std::string>{"-1:ioctl failed: Device or resource busy\n"});

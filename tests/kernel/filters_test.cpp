@@ -25,7 +25,7 @@ protected:
     DVSData *list = nullptr;
 };
 
-TEST_F(Filters, AVolatilePartInTheMiddleCountsOneAtTheEndDoesNot) {
+TEST_F(Filters, VolatileMatchesInTheMiddleButNotAtTheEnd) {
     Add("a.volatile.b");
     Add("a.volatile");
     Add(".volatile.");
@@ -45,7 +45,7 @@ TEST_F(Filters, StripRemovesRunsHeadAndTail) {
     EXPECT_EQ(Names(), Strings{});
 }
 
-TEST_F(Filters, AnEmptyListIsAtItsEndAtOnce) {
+TEST_F(Filters, EmptyListEndsAtOnce) {
     EXPECT_EQ(DVSHYPStripNamedProp(list, "x"), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYPStripNamedPropForType(list, "x", nullptr, 16), HYP_NOT_FOUND);
     EXPECT_EQ(DVSHYPExtractNamedPropForType(list, "x", 16), HYP_NOT_FOUND);
@@ -64,7 +64,7 @@ TEST_F(Filters, StripForTypeRemovesOtherTypesUnlessTheyAreKept) {
     EXPECT_EQ(Names(), Strings{"b"});
 }
 
-TEST_F(Filters, TheTwoLowBitsAreNoPartOfTheType) {
+TEST_F(Filters, IgnoreTheTwoLowBitsOfTheType) {
     Add("a", 17);
     Add("b", 19);
     Add("c", 0x80000010);
@@ -73,7 +73,7 @@ TEST_F(Filters, TheTwoLowBitsAreNoPartOfTheType) {
     EXPECT_EQ(Names(), (Strings{"a", "b", "c"}));
 }
 
-TEST_F(Filters, NamesAreKeptByTheirWholeText) {
+TEST_F(Filters, KeepNamesByTheirWholeText) {
     Add("kept.more", 32);
     Add("kep", 32);
     const char *keep[] = {"kept", nullptr};
@@ -81,7 +81,7 @@ TEST_F(Filters, NamesAreKeptByTheirWholeText) {
     EXPECT_EQ(Names(), Strings{});
 }
 
-TEST_F(Filters, ExtractKeepsWhatIsOfTheTypeAndNamed) {
+TEST_F(Filters, ExtractKeepsNamedEntriesOfTheType) {
     Add("needle.a", 16);
     Add("needle.b", 32);
     Add("c", 16);
@@ -90,7 +90,7 @@ TEST_F(Filters, ExtractKeepsWhatIsOfTheTypeAndNamed) {
     EXPECT_EQ(Names(), (Strings{"needle.a", "x.needle"}));
 }
 
-TEST_F(Filters, NamesakesAreJudgedOneByOne) {
+TEST_F(Filters, DuplicatesAreFilteredOneByOne) {
     Add("n", 16, "1");
     Add("n", 32, "2");
     Add("n", 16, "3");

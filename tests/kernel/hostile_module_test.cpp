@@ -213,7 +213,7 @@ TEST_F(HostileModule, EveryReceiverSurvivesEveryKindOfAnswer) {
     EXPECT_LE(device.open.size(), 1U);
 }
 
-TEST_F(HostileModule, EverySenderSurvivesEveryKindOfAnswerAndGivesItsStatus) {
+TEST_F(HostileModule, EverySenderSurvivesEveryKindOfAnswer) {
     for (const Sender &sender : Senders()) {
         for (const Answer &answer : Answers()) {
             device.Reset();
@@ -223,14 +223,14 @@ TEST_F(HostileModule, EverySenderSurvivesEveryKindOfAnswerAndGivesItsStatus) {
                 first.status == -1 ? uint32_t{HYP_FAILURE} : static_cast<uint32_t>(first.status);
             EXPECT_EQ(sender.call(), first.error == 0 ? uint32_t{HYP_OK} : refusal)
                 << sender.name << ": " << answer.name;
-            EXPECT_EQ(device.calls.size(), 1U) << sender.name << ": a change is never asked for twice";
+            EXPECT_EQ(device.calls.size(), 1U) << sender.name << ": a change must be sent only once";
             EXPECT_TRUE(TableIsEmpty()) << sender.name << ": " << answer.name;
         }
     }
     EXPECT_LE(device.open.size(), 1U);
 }
 
-TEST_F(HostileModule, EveryCommandIsAmongTheReceiversOrTheSenders) {
+TEST_F(HostileModule, EveryCommandIsAReceiverOrASender) {
     std::set<Command> expected, asked;
     for (const device::CommandRow &row : device::kCommands)
         expected.insert(row.command);
@@ -252,14 +252,14 @@ TEST_F(HostileModule, EveryCommandIsAmongTheReceiversOrTheSenders) {
     EXPECT_EQ(asked, expected);
 }
 
-TEST_F(HostileModule, PlainCallsReturnWhateverTheModuleSays) {
+TEST_F(HostileModule, PlainCallsReturnTheModulesStatus) {
     for (const uint32_t status : {0U, 1U, 0x0bad0006U, 0xDEADBEEFU}) {
         device.script = {{EIO, status, 0xFFFFFFFF, {}}};
         EXPECT_EQ(DVSHYP_PortFind("s", "p"), status);
     }
 }
 
-TEST_F(HostileModule, MutatedStatesAndPortsAreTakenOrRefused) {
+TEST_F(HostileModule, MutatedStatesAndPortsAreLoadedOrRejected) {
     const unsigned count = CountFromEnvironment("DVS_TEST_HOSTILE_REPLIES", 3000);
     const std::string sources[] = {GoodState(), PortData({{"com.vendor.a", "v"}, {"b.volatile.c", "v"}})};
     std::mt19937 random(4711);

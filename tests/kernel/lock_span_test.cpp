@@ -126,7 +126,7 @@ protected:
     }
 };
 
-TEST_F(LockSpan, OfEachQueryIsFromLoadingToTheEmptyTable) {
+TEST_F(LockSpan, OfEachQueryLastsFromLoadToEmptyTable) {
     for (const Row &row : Rows()) {
         EXPECT_EQ(EventsOf([&] { return row.call("s"); }, HYP_OK), Span(row.calls)) << row.name;
         EXPECT_EQ(EventsOf([&] { return row.call("unknown"); }, HYP_NOT_FOUND), Span()) << row.name;
@@ -141,7 +141,7 @@ TEST_F(LockSpan, OfARetrievalIsTheSameOnEveryPath) {
     EXPECT_EQ(EventsOf([&] { return Persist(path_.c_str()); }, HYP_OK), Span());
 }
 
-TEST_F(LockSpan, EndsAlsoWhereTheStateDoesNotLoad) {
+TEST_F(LockSpan, EndsWhenTheStateDoesNotLoad) {
     device.replies[Command::StateGet] = std::string(64, '\x7f');
     for (const Row &row : Rows())
         EXPECT_EQ(EventsOf([&] { return row.call("s"); }, HYP_BAD_PARAM), Span()) << row.name;
@@ -157,7 +157,7 @@ TEST_F(LockSpan, DoesNotBeginWithoutAState) {
     EXPECT_EQ(EventsOf([&] { return FindId("s", std::string(128, 'i')); }, HYP_BAD_PARAM), Strings{});
 }
 
-TEST_F(LockSpan, IsNoneForWhatNeedsNoTable) {
+TEST_F(LockSpan, IsEmptyForCallsWithoutATable) {
     const std::function<HYP_ReturnStatus()> calls[] = {
         [&] { return Free(DVSHYP_VendorPortPropList("s", "p", &list_, 16)); },
         [&] { return Free(DVSHYP_ExtraConfigPortPropList("s", "p", &list_, 16)); },

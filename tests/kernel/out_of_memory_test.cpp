@@ -135,7 +135,7 @@ TEST(KernelWithoutMemory, EveryOperationFailsCleanly) {
 }
 
 /// This is the only line that a command prints itself, and the only one without a newline.
-TEST(KernelWithoutMemory, CmdExecSaysThatItsBufferIsMissing) {
+TEST(KernelWithoutMemory, CmdExecReportsAFailedBufferAllocation) {
     Serve();
     g_size = 77;
     fault::Options options;
@@ -163,7 +163,7 @@ TEST(KernelWithoutMemory, CmdExecSaysThatItsBufferIsMissing) {
 }
 
 /// A fetch prints nothing and returns the size that it failed to allocate.
-TEST(KernelWithoutMemory, AFetchTellsTheSizeOfItsMissingBuffer) {
+TEST(KernelWithoutMemory, FetchReturnsTheSizeItFailedToAllocate) {
     Serve();
     fault::Options options;
     options.warmUp = true;
@@ -190,7 +190,7 @@ TEST(KernelWithoutMemory, AFetchTellsTheSizeOfItsMissingBuffer) {
 }
 
 /// Documented behaviour: state file contents that do not load stay allocated.
-TEST(KernelLeaks, TheContentsOfAStateFileThatDoesNotLoadStayAllocated) {
+TEST(KernelLeaks, ContentsOfAnUnloadableStateFileStayAllocated) {
     Serve();
     const TempDir directory;
     const std::string path = directory / "state";

@@ -68,7 +68,7 @@ protected:
     };
 };
 
-TEST_F(Queries, VendorListsOfASwitchKeepWhatIsNotThePlatforms) {
+TEST_F(Queries, VendorListsOfASwitchOmitPlatformEntries) {
     ServeVendorNames();
     device.always[Command::GlobalPropGet] = {ENOENT, HYP_NOT_FOUND, -1, {}};
     EXPECT_EQ(VendorGlobal(), (Strings{"com.orbeno.common", "com.orbeno.vswitch.disabled",
@@ -78,7 +78,7 @@ TEST_F(Queries, VendorListsOfASwitchKeepWhatIsNotThePlatforms) {
                        "com.orbeno.ovl.vdr.dvptracking", "com.vendor.own"}));
 }
 
-TEST_F(Queries, VendorListsAskTheModuleForTheVersion) {
+TEST_F(Queries, VendorListsQueryTheModulesVersion) {
     ServeVendorNames();
     device.replies[Command::GlobalPropGet] = Word(110);
     (void)VendorGlobal();
@@ -88,7 +88,7 @@ TEST_F(Queries, VendorListsAskTheModuleForTheVersion) {
     EXPECT_STREQ(device.calls[1].record.data() + 112, "com.orbeno.common.version");
 }
 
-TEST_F(Queries, NamesThatGoAboveVersion106StayAt106) {
+TEST_F(Queries, NamesOmittedAboveVersion106StayAt106) {
     // Two names are omitted above 106. An earlier filter already removes teaming: of the names below
     // "com.orbeno.vswitch.", it keeps only the exact name of the exception.
     StateBuilder state;
@@ -109,7 +109,7 @@ TEST_F(Queries, NamesThatGoAboveVersion106StayAt106) {
     }
 }
 
-TEST_F(Queries, AVersionReplyShorterThanAWordIsAFailedQuery) {
+TEST_F(Queries, ShortVersionReplyIsAFailedQuery) {
     ServeVendorNames();
     for (const std::string &reply : {std::string("\xff\xff\xff", 3), std::string()}) {
         device.replies[Command::GlobalPropGet] = reply;
@@ -128,7 +128,7 @@ TEST_F(Queries, DisabledSurvivesTheVendorFilterOfItsType) {
     EXPECT_EQ(VendorGlobal(16), Strings{});
 }
 
-TEST_F(Queries, EntriesOfAnotherTypeAreInNoVendorList) {
+TEST_F(Queries, VendorListsOmitEntriesOfOtherTypes) {
     StateBuilder state;
     state.Switch("s").Global("s", "com.vendor.a", "v", 16).Global("s", "com.vendor.b", "v", 32);
     state.Host("s", "com.vendor.a", "v", 16).Host("s", "com.vendor.b", "v", 32);
@@ -154,7 +154,7 @@ TEST_F(Queries, VendorListOfAPort) {
     EXPECT_EQ(device.calls.at(0).request, NumberOf(Command::PortStateGet));
 }
 
-TEST_F(Queries, VendorListOfAPortOfTheDefaultTypeLosesNetToo) {
+TEST_F(Queries, VendorListOfADefaultTypePortOmitsNetToo) {
     DVSData *list = nullptr;
     ASSERT_EQ(DVSData_Alloc(&list, HeapAlloc, std::free), HYP_OK);
     for (const char *name : {"com.orbeno.net.x", "com.vendor.own"})
@@ -168,7 +168,7 @@ TEST_F(Queries, VendorListOfAPortOfTheDefaultTypeLosesNetToo) {
     EXPECT_EQ(VendorPort(32), Strings{"com.vendor.own"});
 }
 
-TEST_F(Queries, ExtraConfigurationOfASwitchIsOfTheGlobalList) {
+TEST_F(Queries, ExtraConfigurationOfASwitchIsFromTheGlobalList) {
     StateBuilder state;
     state.Switch("s")
         .Global("s", "com.orbeno.extraconfig.a", "v", 16)
@@ -215,7 +215,7 @@ TEST_F(Queries, PortsetEntriesOfAnyTypeAreInTheOverlayListOfType16) {
     EXPECT_EQ(Overlay(64, true), Strings{});
 }
 
-TEST_F(Queries, ASwitchWithoutAListGivesAnEmptyOne) {
+TEST_F(Queries, ReturnsAnEmptyListForASwitchWithoutOne) {
     StateBuilder state;
     state.Switch("s");
     DVSwitch *sw = DVSState_SwitchFind("s");
@@ -243,7 +243,7 @@ protected:
     }
 };
 
-TEST_F(PortLists, ASwitchWithoutPortsYieldsCountZero) {
+TEST_F(PortLists, ReturnCountZeroForASwitchWithoutPorts) {
     device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     const PortList list = Ports(1);
     EXPECT_EQ(list->numEntries, 0U);
@@ -271,12 +271,12 @@ TEST_F(PortLists, PortsOfTheTypeInSlotOrderWithTheirConnectionIds) {
     EXPECT_EQ(Ports(77)->portType, 77U);
 }
 
-TEST_F(PortLists, AnUnknownSwitchIsNotFound) {
+TEST_F(PortLists, ReturnNotFoundForAnUnknownSwitch) {
     device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     EXPECT_EQ(Ports(1, "t", HYP_NOT_FOUND), nullptr);
 }
 
-TEST_F(Queries, UnknownSwitchesAndFailuresHandNothingOut) {
+TEST_F(Queries, UnknownSwitchesAndFailuresReturnNoData) {
     const Query queries[] = {
         [](DVSData **out) { return DVSHYP_VendorGlobalPropList("t", out, 16); },
         [](DVSData **out) { return DVSHYP_VendorHostPropList("t", out, 16); },

@@ -71,7 +71,7 @@ TEST_F(Retrieval, OnlyActivePortsArePersistent) {
     EXPECT_EQ(kept.Ports("s"), (Strings{"active", "same"}));
 }
 
-TEST_F(Retrieval, PortsMarkedByThePersistEntryAreLeftOutOthersLoseVolatileEntries) {
+TEST_F(Retrieval, OmitsMarkedPortsAndVolatileEntriesOfOthers) {
     StateBuilder state;
     state.Switch("s").Port("s", "marked", {{kPersist, "x"}});
     state.Port("s", "kept", {{"a", "1"}, {"com.orbeno.port.volatile.b", "2"}, {"c.volatile", "3"}});
@@ -135,7 +135,7 @@ TEST_F(RetrievalWithFile, UnpersistedSwitchesComeFromTheFile) {
               (std::vector<Entry>{{"from", "module", 16}}));
 }
 
-TEST_F(RetrievalWithFile, ASwitchThatTheFileLacksIsAbsent) {
+TEST_F(RetrievalWithFile, SwitchMissingFromTheFileIsAbsent) {
     const std::string path = File(StateBuilder().Switch("other").Serialize());
     ServeUnpersisted();
     const LoadedState kept(Persist(path.c_str()));
@@ -148,13 +148,13 @@ TEST_F(RetrievalWithFile, WithoutUnpersistedSwitchesTheFileIsNotRead) {
     EXPECT_EQ(kept.Switches(), Strings{"s"});
 }
 
-TEST_F(RetrievalWithFile, AFileThatCannotBeReadFailsWithItsStatus) {
+TEST_F(RetrievalWithFile, UnreadableFileFailsWithItsStatus) {
     ServeUnpersisted();
     EXPECT_EQ(Persist((directory_ / "absent").c_str(), HYP_NOT_FOUND), "");
     EXPECT_TRUE(log.lines.empty() || log.lines[0].find("ConfigDeserialize") == std::string::npos);
 }
 
-TEST_F(Retrieval, FailuresOfFetchAndLoadLeaveTheOutputs) {
+TEST_F(Retrieval, FailuresOfFetchAndLoadKeepTheOutputs) {
     for (int round = 0; round < 2; round++) {
         int marker = 0;
         void *out = &marker;
@@ -172,7 +172,7 @@ TEST_F(Retrieval, FailuresOfFetchAndLoadLeaveTheOutputs) {
     }
 }
 
-TEST_F(Retrieval, AGivenBufferIsFilledOrRefused) {
+TEST_F(Retrieval, CallersBufferIsFilledOrRejected) {
     device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     const std::string expected = Persist();
     std::string buffer(expected.size(), 'x');
@@ -187,7 +187,7 @@ TEST_F(Retrieval, AGivenBufferIsFilledOrRefused) {
     EXPECT_EQ(outLen, expected.size() - 1);
 }
 
-TEST_F(Retrieval, ASwitchThatFailsToLoadLeavesTheTableEmpty) {
+TEST_F(Retrieval, SwitchThatFailsToLoadLeavesTheTableEmpty) {
     StateBuilder state;
     state.Switch("s1").Switch("s2").Port("s2", "p");
     std::string serialized = state.Serialize();
@@ -207,7 +207,7 @@ TEST_F(Retrieval, ASwitchThatFailsToLoadLeavesTheTableEmpty) {
     EXPECT_EQ(out, nullptr);
 }
 
-TEST_F(Retrieval, PersistentPortStateLosesVolatileEntriesOnly) {
+TEST_F(Retrieval, PersistentPortStateOmitsVolatileEntriesOnly) {
     device.replies[Command::PortStateGet] = PortData({{"a", "1"}, {"b.volatile.c", "2"}, {kPersist, "3"}});
     EXPECT_EQ(Fetch(DVSHYP_PersistentPortStateGet, "s", "p", uint32_t{9}).text, PortData({{"a", "1"}}));
     EXPECT_EQ(device.calls.at(0).request, NumberOf(Command::PortStateGet));
@@ -215,7 +215,7 @@ TEST_F(Retrieval, PersistentPortStateLosesVolatileEntriesOnly) {
     EXPECT_EQ(Fetch(DVSHYP_PersistentPortStateGet, "s", "p", uint32_t{9}).status, HYP_BAD_PARAM);
 }
 
-TEST_F(Retrieval, TheLockIsFreeAfterwards) {
+TEST_F(Retrieval, ReleasesTheLock) {
     device.replies[Command::StateGet] = StateBuilder().Switch("s").Serialize();
     (void)Persist();
     device.replies[Command::StateGet] = "damaged state of more than sixteen bytes";

@@ -43,13 +43,13 @@ TEST_P(BitVectorSizes, StartsClear) {
     EXPECT_EQ(Next(vector.get(), 0, false), bits == 0 ? std::nullopt : std::optional<uint32_t>(0));
 }
 
-TEST_P(BitVectorSizes, EndsWhereItWasToldTo) {
+TEST_P(BitVectorSizes, EndsAtTheRequestedSize) {
     const uint32_t bits = GetParam();
     const Owner vector = Make(bits);
     for (uint32_t i = 0; i < bits; i++)
         BitVector_SetBit(vector.get(), i);
     EXPECT_EQ(Next(vector.get(), 0, false), std::nullopt)
-        << "the last word's spare bits are no bits of the vector";
+        << "spare bits of the last word are not part of the vector";
     for (const uint32_t beyond : {bits, bits + 1, bits + 63, bits + 64, UINT32_MAX}) {
         BitVector_SetBit(vector.get(), beyond);
         EXPECT_FALSE(BitVector_IsSet(vector.get(), beyond));
@@ -91,14 +91,14 @@ TEST(BitVector, NextBitWalksAllSetBits) {
     EXPECT_EQ(walked, set);
 }
 
-TEST(BitVector, NextBitLeavesThePositionAloneWhenThereIsNone) {
+TEST(BitVector, NextBitKeepsThePositionWhenThereIsNone) {
     const Owner vector = Make(10);
     uint32_t pos = 4711;
     EXPECT_FALSE(BitVector_NextBit(vector.get(), 0, true, &pos));
     EXPECT_EQ(pos, 4711u);
 }
 
-TEST(BitVector, FreeTakesNull) {
+TEST(BitVector, FreeAcceptsNull) {
     BitVector_Free(nullptr);
 }
 

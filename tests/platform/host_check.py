@@ -4,9 +4,9 @@
 
 Usage: host_check.py CMAKE NM SOURCE_DIR LIBRARY_ARCHIVE C_COMPILER CXX_COMPILER [LINK_FLAG...]
 
-Configures it and builds what is its own, the device. The library's objects do not depend on the platform, so those of
-this build stand in for the rest: linked with that device, what stays undefined must be functions of the other contract
-headers, and no more. A library that reached for something of the embedded platform would show here.
+Configures that build and compiles its own part, the device. The library's objects do not depend on the platform, so
+the objects of this build are linked with that device. Only functions of the other contract headers may stay undefined.
+The check fails if the library uses anything of the embedded platform.
 """
 
 import pathlib
@@ -14,7 +14,7 @@ import subprocess
 import sys
 import tempfile
 
-sys.dont_write_bytecode = True  # not into the source tree
+sys.dont_write_bytecode = True  # no cache files in the source tree
 import seam_check  # noqa: E402
 
 DEVICE = "device.h"
@@ -28,13 +28,13 @@ def dynamic_names(nm, library, which):
 
 
 def undefined(nm, library):
-    """What no library that this one is linked with has: a sanitizer's runtime takes over much of the system's."""
+    """Names that no linked library defines. A sanitizer's runtime defines many of the system's names."""
     names = dynamic_names(nm, library, "--undefined-only")
     for line in subprocess.run(["ldd", library], check=True, capture_output=True, text=True).stdout.splitlines():
         path = next((word for word in line.split() if word.startswith("/")), None)
         if path:
             names -= dynamic_names(nm, path, "--defined-only")
-    # The compiler's own.
+    # Names of the compiler itself.
     return {name for name in names if not name.startswith("__")}
 
 

@@ -29,18 +29,18 @@ protected:
     uint32_t ports_ = 4711;
 };
 
-TEST_F(Kit, AnswersTheDefaultWhenNothingIsSet) {
+TEST_F(Kit, ReturnsTheDefaultWhenNothingIsSet) {
     EXPECT_EQ(Get(), HYP_OK);
     EXPECT_EQ(ports_, 65536u);
 }
 
-TEST_F(Kit, EnvironmentBeatsTheDefault) {
+TEST_F(Kit, EnvironmentOverridesTheDefault) {
     setenv(kVariable, "512", 1);
     EXPECT_EQ(Get(), HYP_OK);
     EXPECT_EQ(ports_, 512u);
 }
 
-TEST_F(Kit, ProgramBeatsTheEnvironment) {
+TEST_F(Kit, ProgramOverridesTheEnvironment) {
     setenv(kVariable, "512", 1);
     DVSHost_SetMaxPorts(7);
     EXPECT_EQ(Get(), HYP_OK);
@@ -50,13 +50,13 @@ TEST_F(Kit, ProgramBeatsTheEnvironment) {
     EXPECT_EQ(ports_, 512u);
 }
 
-TEST_F(Kit, ProgramBeatsAMalformedEnvironment) {
+TEST_F(Kit, ProgramOverridesAMalformedEnvironment) {
     setenv(kVariable, "many", 1);
     DVSHost_SetMaxPorts(7);
     EXPECT_EQ(Get(), HYP_OK);
 }
 
-TEST_F(Kit, TakesTheWholeRange) {
+TEST_F(Kit, AcceptsTheWholeRange) {
     setenv(kVariable, "1", 1);
     EXPECT_EQ(Get(), HYP_OK);
     EXPECT_EQ(ports_, 1u);
@@ -65,16 +65,16 @@ TEST_F(Kit, TakesTheWholeRange) {
     EXPECT_EQ(ports_, 4294967295u);
 }
 
-TEST_F(Kit, RefusesMalformedValues) {
+TEST_F(Kit, RejectsMalformedValues) {
     for (const char *text : {"", "0", "abc", "12x", "x12", "-1", "+1", " 12", "12 ", "4294967296", "0x10",
                              "1e3", "99999999999999999999", "12\n"}) {
         setenv(kVariable, text, 1);
         EXPECT_EQ(Get(), HYP_BAD_PARAM) << '"' << text << '"';
-        EXPECT_EQ(ports_, 4711u) << "the value is touched on failure";
+        EXPECT_EQ(ports_, 4711u) << "a failure must not change the value";
     }
 }
 
-TEST_F(Kit, RefusesOtherNodesAndWidths) {
+TEST_F(Kit, RejectsOtherNodesAndWidths) {
     EXPECT_EQ(KIT_Get(2, nullptr, &ports_, sizeof ports_), HYP_NOT_FOUND);
     EXPECT_EQ(KIT_Get(KIT_NODE_net_maxPortsSystemWide, nullptr, &ports_, 8), HYP_BAD_PARAM);
     EXPECT_EQ(KIT_Get(KIT_NODE_net_maxPortsSystemWide, nullptr, nullptr, sizeof ports_), HYP_BAD_PARAM);

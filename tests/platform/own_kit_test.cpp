@@ -53,7 +53,7 @@ protected:
 // The limit is read once per process. ctest runs each test in its own process; for runs of the whole program,
 // the failing reads come first.
 
-TEST_F(OwnKit, AFailedSignatureCheckFailsTheFirstAdd) {
+TEST_F(OwnKit, FailedSignatureCheckFailsTheFirstAdd) {
     g_signatureStatus = HYP_NOT_SUPPORTED;
     EXPECT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_NOT_SUPPORTED);
     EXPECT_EQ(g_version, 21u);
@@ -61,18 +61,18 @@ TEST_F(OwnKit, AFailedSignatureCheckFailsTheFirstAdd) {
     EXPECT_EQ(uwMaxNumActivePortsSystemWide, 0u);
 }
 
-TEST_F(OwnKit, AFailedReadFailsTheFirstAdd) {
+TEST_F(OwnKit, FailedReadFailsTheFirstAdd) {
     g_getStatus = HYP_FAILURE;
     EXPECT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_FAILURE);
     EXPECT_EQ(said_, "DVSState_SwitchAdd s, failed to get max ports systemwide. Error: Failure\n");
 }
 
-TEST_F(OwnKit, IsAskedBeforeTheIdIsLookedAt) {
+TEST_F(OwnKit, IsReadBeforeTheIdIsChecked) {
     g_getStatus = HYP_FAILURE;
     EXPECT_EQ(DVSState_SwitchAdd(std::string(64, 'i').c_str(), "vswitch", 8, 4), HYP_FAILURE);
 }
 
-TEST_F(OwnKit, GivesThePortLimit) {
+TEST_F(OwnKit, ProvidesThePortLimit) {
     ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_OK);
     EXPECT_EQ(uwMaxNumActivePortsSystemWide, 77u);
     EXPECT_EQ(DVS_GetMaxPorts(DVSState_SwitchFind("s")), 77u);

@@ -109,7 +109,7 @@ void LogV(uint32_t level, const char *format, va_list args) {
 
 namespace {
 
-TEST(OwnRuntime, GetsTheLibrarysLogAndGivesItsErrorTexts) {
+TEST(OwnRuntime, ReceivesTheLogAndProvidesErrorTexts) {
     void *buf = nullptr;
     uint32_t len = 0, alignOffset = 0;
     EXPECT_EQ(DVSFile_Read("/nowhere/state", &buf, &len, &alignOffset), HYP_NOT_FOUND);
@@ -117,7 +117,7 @@ TEST(OwnRuntime, GetsTheLibrarysLogAndGivesItsErrorTexts) {
     EXPECT_EQ(g_logLevel, 2u);
 }
 
-TEST(OwnRuntime, GivesTheLocks) {
+TEST(OwnRuntime, ProvidesTheLocks) {
     MXUserRecLock *lock = DVSwitchHandleLock();
     ASSERT_NE(lock, nullptr);
     EXPECT_EQ(lock->name, "dvsstate");
@@ -127,7 +127,7 @@ TEST(OwnRuntime, GivesTheLocks) {
     EXPECT_EQ(g_held, 0);
 }
 
-TEST(OwnRuntime, GivesTheKernelInterfacesLock) {
+TEST(OwnRuntime, ProvidesTheKernelInterfacesLock) {
     MXUserRecLock *lock = DVSwitchHYPLock();
     ASSERT_NE(lock, nullptr);
     EXPECT_EQ(lock->name, "dvshyp");
@@ -138,7 +138,7 @@ TEST(OwnRuntime, GivesTheKernelInterfacesLock) {
     EXPECT_EQ(g_held, 0);
 }
 
-TEST(OwnRuntime, IsAskedForEachLockOnItsFirstUseOnly) {
+TEST(OwnRuntime, CreatesEachLockOnFirstUseOnly) {
     DVSwitchHandleUnlock(DVSwitchHandleLock());
     DVSwitchHYPUnlock(DVSwitchHYPLock());
     g_created = 0;
@@ -150,7 +150,7 @@ TEST(OwnRuntime, IsAskedForEachLockOnItsFirstUseOnly) {
     EXPECT_EQ(g_created, 0);
 }
 
-TEST(OwnRuntime, GivesTheBitVectors) {
+TEST(OwnRuntime, ProvidesTheBitVectors) {
     ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 4), HYP_OK);
     EXPECT_EQ(g_bitsAsked, uwMaxNumActivePortsSystemWide);
     EXPECT_EQ(DVSState_SwitchRemove("s"), HYP_OK);
@@ -165,7 +165,7 @@ DVSData *NewData() {
 
 // A port lookup starts at the first marked slot and ends at a marked slot without a port. If clearing a bit
 // has no effect, only the first port can be removed.
-TEST(OwnRuntime, WhoseBitsStayLeavesASwitchWithThePortsThatCannotGo) {
+TEST(OwnRuntime, StuckBitsKeepASwitchWithItsOtherPorts) {
     ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 9), HYP_OK);
     for (int i = 0; i < 100; i++)
         ASSERT_EQ(DVSState_PortAdd("s", ("p" + std::to_string(i)).c_str(), NewData()), HYP_OK);
@@ -188,7 +188,7 @@ TEST(OwnRuntime, WhoseBitsStayLeavesASwitchWithThePortsThatCannotGo) {
     EXPECT_EQ(DVSState_SwitchFind("s"), nullptr);
 }
 
-TEST(OwnRuntime, WhoseBitsStayStillLosesASwitchOfOnePort) {
+TEST(OwnRuntime, StuckBitsStillRemoveASwitchOfOnePort) {
     ASSERT_EQ(DVSState_SwitchAdd("s", "vswitch", 8, 9), HYP_OK);
     ASSERT_EQ(DVSState_PortAdd("s", "p", NewData()), HYP_OK);
     g_bitsStay = true;

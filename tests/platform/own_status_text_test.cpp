@@ -16,7 +16,7 @@ extern "C" const char *HYP_ReturnStatusToString(HYP_ReturnStatus status) {
 
 namespace {
 
-TEST(OwnStatusText, IsWhatMessagesShow) {
+TEST(OwnStatusText, AppearsInMessages) {
     std::string text;
     DVSLog_SetSink([](int, const char *message, void *arg) { *static_cast<std::string *>(arg) += message; },
                    &text);

@@ -52,7 +52,7 @@ TEST(RecLock, RacingCreatorsGetTheSameLock) {
     EXPECT_EQ(seen[0], g_raced);
 }
 
-TEST(RecLock, MayBeTakenAgainByItsHolder) {
+TEST(RecLock, IsRecursive) {
     MXUser_AcquireRecLock(Inner());
     MXUser_AcquireRecLock(Inner());
     MXUser_AcquireRecLock(Inner());
@@ -66,13 +66,13 @@ TEST(RecLock, MayBeTakenAgainByItsHolder) {
     });
     for (int i = 0; i < 1000; i++)
         std::this_thread::yield();
-    EXPECT_FALSE(taken) << "given up before its last release";
+    EXPECT_FALSE(taken) << "released before its last release call";
     MXUser_ReleaseRecLock(Inner());
     other.join();
     EXPECT_TRUE(taken);
 }
 
-TEST(RecLock, KeepsThreadsApart) {
+TEST(RecLock, ExcludesOtherThreads) {
     int counter = 0;
     std::vector<std::thread> threads;
     for (int t = 0; t < 4; t++) {
@@ -109,7 +109,7 @@ TEST(RecLock, HeldLockMayBeTakenAgainUnderALaterOne) {
     MXUser_ReleaseRecLock(Outer());
 }
 
-TEST(RecLock, MakingOneBeyondThePoolIsFatal) {
+TEST(RecLock, CreatingOneBeyondThePoolIsFatal) {
     GTEST_FLAG_SET(death_test_style, "threadsafe");
     static MXUserRecLock *storage[40];
     EXPECT_DEATH(

@@ -4,8 +4,8 @@
 
 Usage: seam_check.py NM ARCHIVE HEADER...
 
-Every function that one of the contract headers declares must be defined by the archive, in a member that defines
-nothing but functions of that same header: only then can a program bring its own set and take the rest.
+The archive must define every function that a contract header declares, in a member that defines only functions of
+that header. Only then can a program define its own set and take the rest from the archive.
 """
 
 import re

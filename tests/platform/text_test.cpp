@@ -21,7 +21,7 @@ namespace {
 
 using Text = std::unique_ptr<char, decltype(&std::free)>;
 
-TEST(SafeAsprintf, FormatsIntoABlockOfItsOwn) {
+TEST(SafeAsprintf, FormatsIntoANewBlock) {
     size_t length = 0;
     const Text text(Str_SafeAsprintf(&length, "%s.%s", "/x/state", "tmp"), &std::free);
     ASSERT_TRUE(text);
@@ -34,7 +34,7 @@ TEST(SafeAsprintf, LengthIsOptional) {
     EXPECT_STREQ(text.get(), "7");
 }
 
-TEST(SafeAsprintf, TakesLongTexts) {
+TEST(SafeAsprintf, AcceptsLongTexts) {
     const std::string part(100000, 'p');
     size_t length = 0;
     const Text text(Str_SafeAsprintf(&length, "<%s>", part.c_str()), &std::free);
@@ -48,14 +48,14 @@ TEST(Strcpy, CopiesWhatFitsExactly) {
     EXPECT_STREQ(dst, "abc");
 }
 
-TEST(StrcpyDeath, StopsTheProgramWhenTheTextDoesNotFit) {
+TEST(StrcpyDeath, AbortsWhenTheTextDoesNotFit) {
     char dst[4];
     EXPECT_DEATH(Str_Strcpy(dst, "abcd", sizeof dst),
                  "text of 4 characters does not fit into 4 bytes: \"abcd\"");
     EXPECT_DEATH(Str_Strcpy(dst, "", 0), "does not fit into 0 bytes");
 }
 
-TEST(Errno2String, GivesTheSystemsText) {
+TEST(Errno2String, ReturnsTheSystemsText) {
     EXPECT_STREQ(Err_Errno2String(EACCES), std::strerror(EACCES));
     EXPECT_STREQ(Err_Errno2String(ENOSPC), std::strerror(ENOSPC));
     EXPECT_STREQ(Err_Errno2String(99999), "Unknown error 99999");

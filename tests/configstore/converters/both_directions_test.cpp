@@ -413,7 +413,7 @@ TEST_F(BothDirections, OfEveryKeyOnEveryClass) {
     }
 }
 
-TEST_F(BothDirections, HaveARowForEveryKeyAndConverter) {
+TEST_F(BothDirections, HasARowForEveryKeyAndConverter) {
     std::set<std::string> keys;
     std::set<uint32_t> types = {22, 30,
                                 33}; // unmapped_test.cpp covers the "DEFAULT" rows; 30 is unassigned

@@ -52,7 +52,7 @@ TEST_F(Filters, LargestSlotIsMinusOneAsIdAndUnsignedAsText) {
     EXPECT_EQ(Bytes().U32(1).Add(Filter(4294967295u, "agent", 0, {})), LoadOne(kPort, kKey));
 }
 
-TEST_F(Filters, OneFilterComesBackWithParametersNumberedFromZero) {
+TEST_F(Filters, OneFilterLoadsWithParametersNumberedFromZero) {
     ASSERT_EQ(0, Save(kPort, kKey, Bytes().U32(1).Add(Filter(3, "agent", 1, {"a", "b"}, 5))));
     EXPECT_EQ(Bytes().U32(1).Add(Filter(3, "agent", 1, {"a", "b"}, 0)), LoadOne(kPort, kKey));
 }
@@ -83,7 +83,7 @@ TEST_F(Filters, NoFiltersAreAnEmptyListAndACountOfZero) {
     EXPECT_EQ(Bytes().U32(0), LoadOne(kPort, kKey));
 }
 
-TEST_F(Filters, AListingThatFailsIsACountOfZero) {
+TEST_F(Filters, FailedListingIsACountOfZero) {
     ASSERT_EQ(0, Save(kPort, kKey, Bytes().U32(1).Add(Filter(3, "agent", 1, {"a"}))));
     const int before = fake_store::Calls();
     ASSERT_TRUE(LoadOne(kPort, kKey));
@@ -106,14 +106,14 @@ TEST_F(Filters, SlotTextsAreReadAsUnsignedDecimal) {
     }
 }
 
-TEST_F(Filters, UnreadableFieldsAreZeroAndOnlyFailOpenIsOpen) {
+TEST_F(Filters, UnreadableFieldsAreZero) {
     configstore::Object *filter = Sub("settings/filter_policy/network_filters[x]");
     ASSERT_EQ(0, configstore::SetValueInt(filter, "slot_number", 4));
     ASSERT_EQ(0, configstore::SetValueStr(filter, "on_failure", "fail_open"));
     EXPECT_EQ(Bytes().U32(1).Add(Filter(0, "", 0, {})), LoadOne(kPort, kKey));
 }
 
-TEST_F(Filters, RefusesCountsBeyondTheValue) {
+TEST_F(Filters, RejectsCountsBeyondTheValue) {
     Bytes whole = Bytes().U32(2).Add(Filter(1, "a", 1, {"x"})).Add(Filter(2, "b", 1, {"y"}));
     for (std::size_t length = 0; length < whole.size(); ++length) {
         EXPECT_EQ(-1, Save(kPort, kKey, {whole.begin(), whole.begin() + static_cast<std::ptrdiff_t>(length)}))
@@ -129,7 +129,7 @@ TEST_F(Filters, RefusesCountsBeyondTheValue) {
     }
 }
 
-TEST_F(Filters, TextsWithoutNulEndWithTheValue) {
+TEST_F(Filters, UnterminatedTextsEndWithTheValue) {
     Bytes value = Bytes().U32(1).Add(Filter(1, std::string(40, 'a'), 0x01010101, {std::string(256, 'p')}));
     // The agent's name continues into the count (1, 0, 0, 0) and ends there.
     ASSERT_EQ(0, Save(kPort, kKey, value));
@@ -137,7 +137,7 @@ TEST_F(Filters, TextsWithoutNulEndWithTheValue) {
     EXPECT_NE(std::string::npos, Dump().find("parameters[] = \"" + std::string(256, 'p') + "\"\n"));
 }
 
-TEST_F(Filters, ListsThatBecomeReadableLateFindNoRoom) {
+TEST_F(Filters, ListsThatBecomeReadableLateHaveNoRoom) {
     Stored("1", "1", {"a", "b"});
     const auto whole = LoadOne(kPort, kKey);
     // The first read of the parameters allocates their room.

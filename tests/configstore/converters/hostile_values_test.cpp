@@ -70,7 +70,7 @@ struct Hostile : ConverterTest {
     value_generator::Generator generator{7041776};
 };
 
-TEST_F(Hostile, AnyLengthOfAnyBytesIsRefusedOrBounded) {
+TEST_F(Hostile, ValuesOfAnyLengthAndBytesStayInBounds) {
     for (const Row &row : Rows()) {
         const auto *record = dvs::layout::FindType(dvs::ConverterTypeOf(*row.entry))->record;
         std::vector<std::size_t> sizes;
@@ -90,7 +90,7 @@ TEST_F(Hostile, AnyLengthOfAnyBytesIsRefusedOrBounded) {
     }
 }
 
-TEST_F(Hostile, LyingValuesAreRefusedOrBounded) {
+TEST_F(Hostile, ValuesWithWrongCountsStayInBounds) {
     const auto rows = Rows();
     for (long i = Count(6000); i > 0; --i) {
         const Row &row = rows[generator.Below(rows.size())];
@@ -159,7 +159,7 @@ struct HostileDocument : Hostile {
     }
 };
 
-TEST_F(HostileDocument, LoadersStayInsideTheirValues) {
+TEST_F(HostileDocument, LoadersStayInBounds) {
     const auto rows = Rows();
     long loaded = 0;
     for (long i = Count(6000); i > 0; --i) {

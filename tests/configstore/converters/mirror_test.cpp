@@ -90,7 +90,7 @@ TEST_F(Mirror, SavesEveryFieldOfASession) {
               Dump());
 }
 
-TEST_F(Mirror, NoSessionsSaveNothingAtAll) {
+TEST_F(Mirror, NoSessionsSaveNothing) {
     ASSERT_EQ(0, Save(kPort, kEtherswitchPort, Table({})));
     EXPECT_EQ("", Dump());
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Table({})));
@@ -98,7 +98,7 @@ TEST_F(Mirror, NoSessionsSaveNothingAtAll) {
     EXPECT_FALSE(LoadOne(kGlobal, kEtherswitch));
 }
 
-TEST_F(Mirror, OnlyAPacketLengthThatIsNotSetIsSaved) {
+TEST_F(Mirror, PacketLengthIsSavedOnlyIfNotSet) {
     for (const uint32_t length : {0u, 60u, 1500u}) {
         (void)configstore::DeleteSubObject(object, "settings", "");
         Session session;
@@ -140,7 +140,7 @@ TEST_F(Mirror, SourcesOfARemoteDestinationAreVlans) {
     EXPECT_TRUE(Has("/settings/vspans[s1]/source_transmit_port/vlans[] = 65534"));
 }
 
-TEST_F(Mirror, OfThreeAddressesTheThirdIsSaved) {
+TEST_F(Mirror, SavesTheThirdOfThreeAddresses) {
     Session session;
     session.type = 4;
     session.destinations = 3;
@@ -158,7 +158,7 @@ TEST_F(Mirror, OfThreeAddressesTheThirdIsSaved) {
         "/settings/vspans[s1]/destination_port/addresses[] = \"fe80:0000:0000:0000:0000:0000:0000:0001\""));
 }
 
-TEST_F(Mirror, MixedDestinationsGoByTheirKind) {
+TEST_F(Mirror, MixedDestinationsAreSavedByKind) {
     Session session;
     session.type = 0;
     session.destinations = 3;
@@ -169,7 +169,7 @@ TEST_F(Mirror, MixedDestinationsGoByTheirKind) {
     EXPECT_TRUE(Lacks("\"?\""));
 }
 
-TEST_F(Mirror, PortKeysAreAppendedToWhatIsThere) {
+TEST_F(Mirror, PortKeysAreAppendedToExistingOnes) {
     Session session;
     session.destinations = 1;
     const Bytes value = Table({session}).Add(Port(0, "d"));
@@ -179,11 +179,11 @@ TEST_F(Mirror, PortKeysAreAppendedToWhatIsThere) {
     EXPECT_NE(std::string::npos, Dump().find(line + line));
 }
 
-TEST_F(Mirror, LegacyModeNamesThePromiscuousSessionAndComesBackInverted) {
+TEST_F(Mirror, LegacyModeNamesThePromiscuousSessionAndLoadsInverted) {
     Session session;
     session.flags = 0x10;
     ASSERT_EQ(0, Save(kPort, kEtherswitchPort, Table({session})));
-    EXPECT_TRUE(Has("/settings/promiscuous_mode_vspan_session = \"s1\"")) << "in the object that was given";
+    EXPECT_TRUE(Has("/settings/promiscuous_mode_vspan_session = \"s1\"")) << "in the given object";
     EXPECT_TRUE(Has("/vspans[s1]/legacy_mode = true"));
     session.flags = 0;
     EXPECT_EQ(Table({session}), LoadOne(kPort, kEtherswitchPort));
@@ -192,7 +192,7 @@ TEST_F(Mirror, LegacyModeNamesThePromiscuousSessionAndComesBackInverted) {
     EXPECT_EQ(Table({session}), LoadOne(kPort, kEtherswitchPort));
 }
 
-TEST_F(Mirror, FlagsAndNumbersComeBackAsStated) {
+TEST_F(Mirror, FlagsAndNumbersLoadAsDocumented) {
     Session session;
     session.key = "k";
     session.type = 3;
@@ -213,7 +213,7 @@ TEST_F(Mirror, FlagsAndNumbersComeBackAsStated) {
     EXPECT_EQ(Table({session}), LoadOne(kGlobal, kEtherswitch));
 }
 
-TEST_F(Mirror, LoadedGroupsCountAsDestinationsAndTransmitSourcesReplaceReceiveSources) {
+TEST_F(Mirror, TransmitSourcesReplaceReceiveSourcesOnLoad) {
     Session session;
     session.type = 1;
     session.destinations = 2;
@@ -231,7 +231,7 @@ TEST_F(Mirror, LoadedGroupsCountAsDestinationsAndTransmitSourcesReplaceReceiveSo
     EXPECT_EQ(expected, LoadOne(kGlobal, kEtherswitch));
 }
 
-TEST_F(Mirror, UplinksFollowThePortKeysOfDestinations) {
+TEST_F(Mirror, UplinksFollowTheDestinationsPortKeys) {
     Session session;
     session.type = 0;
     session.destinations = 2;
@@ -242,7 +242,7 @@ TEST_F(Mirror, UplinksFollowThePortKeysOfDestinations) {
               LoadOne(kGlobal, kEtherswitch));
 }
 
-TEST_F(Mirror, TheNextSessionStartsBehindTheDestinations) {
+TEST_F(Mirror, NextSessionStartsAfterTheDestinations) {
     Session one, two;
     two.key = "s2";
     one.destinations = one.receive = two.destinations = 1;
@@ -319,7 +319,7 @@ TEST_F(Mirror, APortAsksTheSwitchBeingLoadedElseTheFlag) {
     configstore::DestroyObject(other);
 }
 
-TEST_F(Mirror, EachClassLoadsItsFamilysKeys) {
+TEST_F(Mirror, EachClassLoadsTheKeysOfItsFamily) {
     Session session;
     for (const char *className : {"etherswitch", "vswitch", "cswitch"}) {
         BecomeSwitch(className);
@@ -335,7 +335,7 @@ TEST_F(Mirror, EachClassLoadsItsFamilysKeys) {
     }
 }
 
-TEST_F(Mirror, UnknownTextsStoreAllOnesAndGoOn) {
+TEST_F(Mirror, UnknownTextsLoadAsAllOnes) {
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Table({Session()})));
     configstore::Object *vspan = Sub("settings/vspans[s1]");
     ASSERT_EQ(0, configstore::SetValueStr(vspan, "session_type", "dvport_mirror"));
@@ -348,7 +348,7 @@ TEST_F(Mirror, UnknownTextsStoreAllOnesAndGoOn) {
     EXPECT_NE(std::string::npos, messages.find("Unknown vspan encap type in schema: \n"));
 }
 
-TEST_F(Mirror, AnAbsentFlagTakesTheOneReadBefore) {
+TEST_F(Mirror, AbsentFlagTakesThePreviousOne) {
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Table({Session()})));
     configstore::Object *vspan = Sub("settings/vspans[s1]");
     const auto flags = [&] { return LoadOne(kGlobal, kEtherswitch).value_or(Bytes().Zeros(252))[20 + 124]; };
@@ -357,13 +357,13 @@ TEST_F(Mirror, AnAbsentFlagTakesTheOneReadBefore) {
     ASSERT_EQ(0, configstore::SetValueBool(vspan, "enabled", false));
     EXPECT_EQ(0x10 | 0x20 | 0x04, flags());
     ASSERT_EQ(0, configstore::RemoveValue(vspan, "enabled"));
-    EXPECT_EQ(0x10 | 0x20 | 0x04, flags()) << "nothing read before counts as false";
+    EXPECT_EQ(0x10 | 0x20 | 0x04, flags()) << "without a previous flag the value is false";
     ASSERT_EQ(0, configstore::SetValueStr(vspan, "legacy_mode", "no"));
     EXPECT_FALSE(LoadOne(kGlobal, kEtherswitch));
     EXPECT_EQ(configstore::SCHEMA_VIOLATION, loadStatus);
 }
 
-TEST_F(Mirror, LongKeysAndNamesAreCut) {
+TEST_F(Mirror, TruncatesLongKeysAndNames) {
     configstore::Object *vspan = Sub("settings/vspans[s1]");
     ASSERT_EQ(0, configstore::SetValueStr(vspan, "key", std::string(50, 'k').c_str()));
     ASSERT_EQ(0, configstore::SetValueStr(vspan, "name", std::string(90, 'n').c_str()));
@@ -375,7 +375,7 @@ TEST_F(Mirror, LongKeysAndNamesAreCut) {
     EXPECT_EQ(Table({expected}), LoadOne(kGlobal, kEtherswitch));
 }
 
-TEST_F(Mirror, ThePortAreaHoldsWhatIsWrittenWhateverTheSizePassCounts) {
+TEST_F(Mirror, PortAreaIsLargeEnoughForAnyCountOfTheSizePass) {
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Table({Session()})));
     for (const char *ports : {"destination_port", "source_recv_port", "source_transmit_port"}) {
         configstore::Object *sub = Sub(std::string("settings/vspans[s1]/") + ports);
@@ -400,7 +400,7 @@ TEST_F(Mirror, LongPortKeysStopAtTheEndOfTheValue) {
     EXPECT_EQ('x', (*loaded)[loaded->size() - 2]);
 }
 
-TEST_F(Mirror, RefusesCountsBeyondTheValue) {
+TEST_F(Mirror, RejectsCountsBeyondTheValue) {
     Session session;
     session.destinations = session.receive = session.transmit = 1;
     const Bytes whole = Table({session}).Add(Port(0, "d")).Add(Port(0, "r")).Add(Port(0, "t"));
@@ -420,7 +420,7 @@ TEST_F(Mirror, RefusesCountsBeyondTheValue) {
     EXPECT_EQ(-1, Save(kGlobal, kEtherswitch, whole)) << "too short for wide records";
 }
 
-TEST_F(Mirror, TypesWithoutTextAreTheStoresToRefuse) {
+TEST_F(Mirror, StoreRejectsTypesWithoutText) {
     Session session;
     for (const uint32_t type : {5u, 6u, kNotSet}) {
         session.type = type;

@@ -26,7 +26,7 @@ namespace {
 
 struct SwitchAddress : ConverterTest {};
 
-TEST_F(SwitchAddress, ThatCannotBeFormattedIsMinusOneWithItsNumber) {
+TEST_F(SwitchAddress, ReturnsMinusOneWithItsNumberIfFormattingFails) {
     const Bytes value = Bytes().U8(10).U8(0).U8(0).U8(1);
     g_fails = true;
     EXPECT_EQ(-1, Save(kGlobal, "com.orbeno.etherswitch.ipv4addr", value));

@@ -47,7 +47,7 @@ TEST_F(PortPolicy, PrivateVlanLoadsBackWithFlagsTwo) {
     EXPECT_EQ(Bytes().U16(2).U16(5).U16(0).U16(0), LoadOne(kPort, kVlan[0]));
 }
 
-TEST_F(PortPolicy, VlanOfEachFamilyLoadsForItsSwitchesOnly) {
+TEST_F(PortPolicy, VlanOfEachFamilyLoadsOnItsSwitchesOnly) {
     const Bytes value = Bytes().U16(1).U16(0).U16(0).U16(1).U16(1).U16(4094);
     for (const char *className : kClasses) {
         (void)configstore::DeleteSubObject(object, "settings", "");
@@ -70,19 +70,19 @@ TEST_F(PortPolicy, EtherswitchSavesNoVswitchVlanButAVswitchSavesBoth) {
     EXPECT_EQ(value, LoadOne(kPort, kVlan[1]));
 }
 
-TEST_F(PortPolicy, AnEmptyTrunkWritesTheEmptyListOnly) {
+TEST_F(PortPolicy, EmptyTrunkWritesOnlyTheEmptyList) {
     ASSERT_EQ(0, Save(kPort, kVlan[0], Bytes().U16(1).U16(9).U16(0).U16(0)));
     EXPECT_EQ("/settings {}\n/settings/vlan {}\n/settings/vlan/trunk_vlan_ids = []\n", Dump());
     EXPECT_EQ(Bytes().Zeros(8), LoadOne(kPort, kVlan[0]));
 }
 
-TEST_F(PortPolicy, ASaveClearsAnEarlierTrunk) {
+TEST_F(PortPolicy, SaveClearsAnEarlierTrunk) {
     ASSERT_EQ(0, Save(kPort, kVlan[0], Bytes().U16(1).U16(0).U16(0).U16(1).U16(1).U16(10)));
     ASSERT_EQ(0, Save(kPort, kVlan[0], Bytes().U16(0).U16(3).U16(0).U16(0)));
     EXPECT_EQ(Bytes().U16(0).U16(3).U16(0).U16(0), LoadOne(kPort, kVlan[0]));
 }
 
-TEST_F(PortPolicy, OnlyTheEtherswitchVlanTellsThatTheIdWasNotWritten) {
+TEST_F(PortPolicy, OnlyTheEtherswitchVlanReportsAFailedWriteOfTheId) {
     const Bytes value = Bytes().U16(0).U16(7).U32(0);
     fake_store::FailFunction("SetValueUint16", configstore::IO_ERROR);
     EXPECT_EQ(configstore::IO_ERROR, Save(kPort, kVlan[0], value));
@@ -91,7 +91,7 @@ TEST_F(PortPolicy, OnlyTheEtherswitchVlanTellsThatTheIdWasNotWritten) {
     fake_store::FailFunction(nullptr);
 }
 
-TEST_F(PortPolicy, VlanRefusesWhatIsShorterThanWhatItReads) {
+TEST_F(PortPolicy, VlanRejectsValuesThatAreTooShort) {
     EXPECT_EQ(-1, Save(kPort, kVlan[0], Bytes().U16(0).U8(1)));
     EXPECT_EQ(0, Save(kPort, kVlan[0], Bytes().U16(0).U16(1)));
     EXPECT_EQ(-1, Save(kPort, kVlan[0], Bytes().U16(1).U16(1).U16(0).U8(0)));
@@ -99,7 +99,7 @@ TEST_F(PortPolicy, VlanRefusesWhatIsShorterThanWhatItReads) {
     EXPECT_EQ(-1, Save(kPort, kVlan[0], Bytes().U16(1).U16(1).U16(0).U16(0xffff).U32(0)));
 }
 
-TEST_F(PortPolicy, VlanFieldsThatCannotBeReadAreZero) {
+TEST_F(PortPolicy, UnreadableVlanFieldsAreZero) {
     configstore::Object *range = Sub("settings/vlan/trunk_vlan_ids[a]");
     ASSERT_EQ(0, configstore::SetValueUint16(range, "start", 5));
     EXPECT_EQ(Bytes().U16(1).U16(0).U16(0).U16(1).U16(5).U16(0), LoadOne(kPort, kVlan[0]));
@@ -117,14 +117,14 @@ TEST_F(PortPolicy, VlanFieldsThatCannotBeReadAreZero) {
     EXPECT_EQ(0, loadStatus);
 }
 
-TEST_F(PortPolicy, APriorityAloneLoadsVlanZeroToo) {
+TEST_F(PortPolicy, PriorityAloneLoadsVlanZeroToo) {
     ASSERT_EQ(0, Save(kPort, "com.orbeno.vswitch.port.priority", Bytes().U32(3)));
     const Properties loaded = Load(kPort);
     EXPECT_EQ(Bytes().U32(3), loaded.at("com.orbeno.vswitch.port.priority"));
-    EXPECT_EQ(Bytes().Zeros(8), loaded.at(kVlan[0])) << "the priority stands inside the VLAN policy";
+    EXPECT_EQ(Bytes().Zeros(8), loaded.at(kVlan[0])) << "the priority is stored inside the VLAN policy";
 }
 
-TEST_F(PortPolicy, TransmitUplinkLoadsForTheFamilysKey) {
+TEST_F(PortPolicy, TransmitUplinkLoadsUnderTheFamilysKey) {
     const struct {
         Bytes value;
         const char *text;
@@ -167,7 +167,7 @@ TEST_F(PortPolicy, ShapingIsBytesInTheRecordAndBitsInTheStore) {
     }
 }
 
-TEST_F(PortPolicy, ShapingDividesWithSignAndTakesUnreadableLimitsForZero) {
+TEST_F(PortPolicy, ShapingDividesSignedAndReadsBadLimitsAsZero) {
     configstore::Object *policy = Sub("settings/in_shaping_policy");
     ASSERT_EQ(0, configstore::SetValueLong(policy, "average_bandwidth", -15));
     ASSERT_EQ(0, configstore::SetValueStr(policy, "peak_bandwidth", "8"));
@@ -191,14 +191,14 @@ TEST_F(PortPolicy, ShapingLoadsADirectionFromItsOwnLeafOnly) {
                      {object, Sub("settings"), nullptr, "out_shaping_policy", "other", 16, kPort}));
 }
 
-TEST_F(PortPolicy, SecuritySavesWhatIsAllowed) {
+TEST_F(PortPolicy, SecuritySavesAllowedFlags) {
     constexpr const char *kNames[] = {"allow_promiscuous", "allow_mac_change", "allow_forged_transmit"};
     for (uint32_t reject = 0; reject < 8; ++reject) {
         for (const char *className : kClasses) {
             BecomeSwitch(className);
             const int family = FamilyOf(className);
             ASSERT_EQ(0, Save(kPort, kSecurity[1 - family], Bytes().U32(reject | 0xfffffff8)))
-                << "no gate on save";
+                << "a save does not check the class";
             for (uint32_t i = 0; i < 3; ++i) {
                 bool allowed = false;
                 ASSERT_EQ(
@@ -213,14 +213,14 @@ TEST_F(PortPolicy, SecuritySavesWhatIsAllowed) {
     EXPECT_EQ(-1, Save(kPort, kSecurity[0], Bytes().Zeros(3)));
 }
 
-TEST_F(PortPolicy, SecurityThatCannotBeReadIsAllowed) {
+TEST_F(PortPolicy, UnreadableSecurityFlagsAreAllowed) {
     configstore::Object *policy = Sub("settings/mac_management_policy");
     ASSERT_EQ(0, configstore::SetValueBool(policy, "allow_mac_change", false));
     ASSERT_EQ(0, configstore::SetValueInt(policy, "allow_promiscuous", 0));
     EXPECT_EQ(Bytes().U32(2), LoadOne(kPort, kSecurity[0]));
 }
 
-TEST_F(PortPolicy, AnEtherswitchLoadsNoVswitchRow) {
+TEST_F(PortPolicy, EtherswitchLoadsNoVswitchRow) {
     ASSERT_EQ(0, Save(kPort, kVlan[0], Bytes().U16(0).U16(1).U32(0)));
     ASSERT_EQ(0, Save(kPort, kSecurity[0], Bytes().U32(1)));
     ASSERT_EQ(0, Save(kPort, kTxUplink[0], Bytes().Text("always", 7)));
@@ -256,15 +256,15 @@ TEST_F(PortPolicy, LacpNeedsBothFieldsOnLoad) {
     EXPECT_EQ(configstore::NOT_FOUND, loadStatus);
 }
 
-TEST_F(PortPolicy, EveryPortCarriesTheSwitchsPools) {
+TEST_F(PortPolicy, EveryPortLoadsTheSwitchsPools) {
     const char *key = "com.orbeno.common.port.respools.cfg";
     const Bytes pools =
         Bytes().U32(1).Text("vm", 128).Zeros(1).U32(50).Zeros(67).U32(100).U32(0xffffffff).Zeros(4);
-    EXPECT_EQ(0, Save(kPort, key, pools)) << "written nowhere";
+    EXPECT_EQ(0, Save(kPort, key, pools)) << "a save writes nothing";
     EXPECT_EQ(0, Save(kPort, key, {}));
     EXPECT_EQ("/settings {}\n", Dump());
     ASSERT_EQ(0, Save(kGlobal, "com.orbeno.common.respools.cfg", pools));
-    EXPECT_FALSE(Load(kPort).contains(key)) << "not for a port without the switch's resources";
+    EXPECT_FALSE(Load(kPort).contains(key)) << "without the switch's resources, a port has no pools";
     const Properties loaded = Load(kPort, Sub("resource_management"));
     EXPECT_EQ(pools, loaded.at(key));
 }

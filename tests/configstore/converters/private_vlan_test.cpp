@@ -34,7 +34,7 @@ TEST_F(PrivateVlan, SavesAndLoadsEveryTypeUnderBothKeys) {
     }
 }
 
-TEST_F(PrivateVlan, ClassAndVersionChooseTheOneKey) {
+TEST_F(PrivateVlan, ClassAndVersionSelectTheKey) {
     const struct {
         const char *className, *version;
         bool overlay;
@@ -67,11 +67,11 @@ TEST_F(PrivateVlan, IncompleteEntriesAreIgnored) {
     EXPECT_EQ(Entry(1, 2, 3), LoadOne(kGlobal, kEtherswitch));
 }
 
-TEST_F(PrivateVlan, ATypeWithoutTextIsTheStoresToRefuse) {
+TEST_F(PrivateVlan, StoreRejectsATypeWithoutText) {
     for (const uint8_t type : std::initializer_list<uint8_t>{0, 4, 5, 255}) {
         EXPECT_EQ(configstore::BAD_PARAMETER,
                   Save(kGlobal, kEtherswitch, Bytes().Add(Entry(1, 2, 3)).Add(Entry(3, 4, type))));
-        EXPECT_NE(std::string::npos, Dump().find("/type = \"COMMUNITY\"\n")) << "what was written stays";
+        EXPECT_NE(std::string::npos, Dump().find("/type = \"COMMUNITY\"\n")) << "earlier entries stay";
     }
 }
 
@@ -99,7 +99,7 @@ TEST_F(PrivateVlan, MissingFieldsFailTheLoadWithTheirStatus) {
 }
 
 // Loads the row alone: in a load of all rows, the version's row fails first.
-TEST_F(PrivateVlan, ASwitchWithoutClassOrVersionDoesNotLoad) {
+TEST_F(PrivateVlan, SwitchWithoutClassOrVersionDoesNotLoad) {
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Entry(1, 2, 3)));
     const auto load = [&] {
         return dvs::convert::LoadPrivateVlans(
@@ -108,7 +108,7 @@ TEST_F(PrivateVlan, ASwitchWithoutClassOrVersionDoesNotLoad) {
     ASSERT_EQ(0, configstore::SetValueStr(Sub("product"), "version", "7.0.1"));
     EXPECT_EQ(-1, load());
     ASSERT_EQ(0, configstore::RemoveValue(Sub("product"), "version"));
-    EXPECT_EQ(-1, load()) << "whatever the version reader says";
+    EXPECT_EQ(-1, load()) << "regardless of the version reader's status";
     ASSERT_EQ(0, configstore::RemoveValue(Sub("product"), "forwarding_class"));
     EXPECT_EQ(configstore::NOT_FOUND, load());
     EXPECT_NE(std::string::npos, messages.find("Failed to get forwarding_class, rc: 6\n"));

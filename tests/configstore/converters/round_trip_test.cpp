@@ -69,7 +69,7 @@ struct RoundTrip : ConverterTest {
     }
 };
 
-TEST_F(RoundTrip, SoundValuesComeBackAsTheModelSays) {
+TEST_F(RoundTrip, ValidValuesMatchTheModel) {
     value_generator::Generator generator(20261121);
     const int count = Count("DVS_ROUND_TRIPS", 30);
     for (const KindOfSwitch &sw : kSwitches) {

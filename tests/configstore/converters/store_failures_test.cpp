@@ -158,7 +158,7 @@ struct StoreFailures : ConverterTest {
     }
 };
 
-TEST_F(StoreFailures, AreTheResultOrStatedNotToMatter) {
+TEST_F(StoreFailures, AreReturnedOrDocumentedAsIgnored) {
     value_generator::Generator generator(4);
     for (const uint32_t propClass : {kGlobal, kHost, kPort}) {
         for (const auto *row = GetConfigMap(static_cast<int>(propClass)); row->key; ++row) {
@@ -177,7 +177,7 @@ TEST_F(StoreFailures, AreTheResultOrStatedNotToMatter) {
     }
     for (const Exception &each : kExceptions) {
         EXPECT_TRUE(g_met.contains(&each))
-            << static_cast<uint32_t>(each.type) << " " << each.function << " is no exception any more";
+            << static_cast<uint32_t>(each.type) << " " << each.function << " is no longer an exception";
     }
 }
 

@@ -19,7 +19,7 @@ Bytes Group(const std::string &name, const std::string &key, uint32_t mode, uint
     return Bytes().Text(name, 65).Text(key, 16).U32(mode).U32(algorithm).U32(uplinks);
 }
 
-TEST_F(SwitchTable, LacpGroupsGoBothWays) {
+TEST_F(SwitchTable, LacpGroupsRoundTrip) {
     for (const char *className : {"etherswitch", "vswitch", "cswitch"}) {
         BecomeSwitch(className);
         (void)configstore::DeleteSubObject(object, "settings", "");
@@ -51,7 +51,7 @@ TEST_F(SwitchTable, EveryLacpAlgorithmHasItsText) {
     EXPECT_EQ(configstore::BAD_PARAMETER, Save(kGlobal, kLacp, Bytes().U32(1).Add(Group("g", "k", 3, 0, 1))));
 }
 
-TEST_F(SwitchTable, ALacpNameOfSeventyCharactersIsCutToFit) {
+TEST_F(SwitchTable, TruncatesALacpNameOfSeventyCharacters) {
     configstore::Object *group = Sub("settings/lacp_groups[k]");
     ASSERT_EQ(0, configstore::SetValueStr(group, "name", std::string(70, 'n').c_str()));
     ASSERT_EQ(0, configstore::SetValueStr(group, "key", std::string(20, 'k').c_str()));
@@ -60,7 +60,7 @@ TEST_F(SwitchTable, ALacpNameOfSeventyCharactersIsCutToFit) {
               LoadOne(kGlobal, kLacp));
 }
 
-TEST_F(SwitchTable, UnknownLacpTextsStoreAllOnes) {
+TEST_F(SwitchTable, UnknownLacpTextsLoadAsAllOnes) {
     ASSERT_EQ(0, Save(kGlobal, kLacp, Bytes().U32(1).Add(Group("g", "k", 1, 1, 1))));
     configstore::Object *group = Sub("settings/lacp_groups[k]");
     ASSERT_EQ(0, configstore::SetValueStr(group, "mode", "active"));
@@ -88,7 +88,7 @@ TEST_F(SwitchTable, NoLacpGroupsSaveNothing) {
 
 constexpr const char *kCdp = "com.orbeno.etherswitch.cdp";
 
-TEST_F(SwitchTable, LinkDiscoveryGoesBothWays) {
+TEST_F(SwitchTable, LinkDiscoveryRoundTrips) {
     for (uint8_t protocol = 0; protocol < 2; ++protocol) {
         for (uint8_t operation = 0; operation < 4; ++operation) {
             const Bytes value = Bytes().U8(protocol).U8(operation);
@@ -107,7 +107,7 @@ TEST_F(SwitchTable, LinkDiscoveryGoesBothWays) {
     EXPECT_EQ(-1, Save(kGlobal, kCdp, Bytes().U8(0)));
 }
 
-TEST_F(SwitchTable, UnknownLinkDiscoveryTextsLoadAsTheValueBehindTheLast) {
+TEST_F(SwitchTable, UnknownLinkDiscoveryTextsLoadAsTheValueAfterTheLast) {
     configstore::Object *cdp = Sub("settings/link_discovery_protocol");
     ASSERT_EQ(0, configstore::SetValueStr(cdp, "protocol", "cdp"));
     (void)Load(kGlobal);
@@ -119,7 +119,7 @@ TEST_F(SwitchTable, UnknownLinkDiscoveryTextsLoadAsTheValueBehindTheLast) {
     EXPECT_EQ(configstore::NOT_FOUND, loadStatus);
 }
 
-TEST_F(SwitchTable, LinkDiscoveryFailsWithMinusOneWhereItsObjectCannotBeHad) {
+TEST_F(SwitchTable, LinkDiscoveryReturnsMinusOneWithoutItsObject) {
     ASSERT_EQ(0, configstore::SetValueBool(Sub("settings"), "link_discovery_protocol", true));
     EXPECT_EQ(-1, Save(kGlobal, kCdp, Bytes().U8(0).U8(0)));
     (void)Load(kGlobal);
@@ -130,7 +130,7 @@ TEST_F(SwitchTable, LinkDiscoveryFailsWithMinusOneWhereItsObjectCannotBeHad) {
 
 constexpr const char *kIpfix = "com.orbeno.etherswitch.ipfix";
 
-TEST_F(SwitchTable, IpfixGoesBothWays) {
+TEST_F(SwitchTable, IpfixRoundTrips) {
     const Bytes ipv4 = Bytes().U8(192).U8(0).U8(2).U8(7).Zeros(12);
     const Bytes value = Bytes().U32(15).U32(60).Add(ipv4).U16(4739).U32(100).U8(1).U8(0).U32(0xfffffffe);
     ASSERT_EQ(36u, value.size());
@@ -145,7 +145,7 @@ TEST_F(SwitchTable, IpfixGoesBothWays) {
     EXPECT_EQ(-1, Save(kGlobal, kIpfix, Bytes().Zeros(35)));
 }
 
-TEST_F(SwitchTable, AShortIpv6CollectorSavesBackInFull) {
+TEST_F(SwitchTable, ShortIpv6CollectorIsSavedInFull) {
     configstore::Object *ipfix = Sub("settings/ipfix");
     ASSERT_EQ(0, configstore::SetValueStr(ipfix, "collector_address", "fe80::1"));
     const auto loaded = LoadOne(kGlobal, kIpfix);
@@ -156,7 +156,7 @@ TEST_F(SwitchTable, AShortIpv6CollectorSavesBackInFull) {
     EXPECT_EQ(loaded, LoadOne(kGlobal, kIpfix));
 }
 
-TEST_F(SwitchTable, ACollectorThatIsNoAddressIsNone) {
+TEST_F(SwitchTable, InvalidCollectorLoadsAsNone) {
     configstore::Object *ipfix = Sub("settings/ipfix");
     for (const char *text : {"10.0.0.300", "", "localhost", "fe80::1%eth0"}) {
         ASSERT_EQ(0, configstore::SetValueStr(ipfix, "collector_address", text));
@@ -179,21 +179,21 @@ TEST_F(SwitchTable, HealthChecksSaveEnableAndLoadEnabled) {
               "false\n/health_checks[TEAMING]/interval = 60\n",
               Dump());
     Properties loaded = Load(kGlobal);
-    EXPECT_EQ(Bytes().U8(0).U32(30), loaded.at(kVlanCheck)) << "what was saved as enable is not enabled";
+    EXPECT_EQ(Bytes().U8(0).U32(30), loaded.at(kVlanCheck)) << "the save writes enable, the load reads enabled";
     EXPECT_EQ(Bytes().U8(0).U32(60), loaded.at(kTeamCheck));
     ASSERT_EQ(0, configstore::SetValueBool(Sub("health_checks[TEAMING]"), "enabled", true));
     loaded = Load(kGlobal);
     EXPECT_EQ(Bytes().U8(1).U32(60), loaded.at(kTeamCheck));
 }
 
-TEST_F(SwitchTable, HealthCheckFieldsThatCannotBeReadAreZero) {
+TEST_F(SwitchTable, UnreadableHealthCheckFieldsAreZero) {
     Sub("health_checks[VLAN_MTU]");
     EXPECT_EQ(Bytes().Zeros(5), LoadOne(kGlobal, kVlanCheck));
     EXPECT_FALSE(Load(kGlobal).contains(kTeamCheck));
     EXPECT_EQ(-1, Save(kGlobal, kVlanCheck, Bytes().Zeros(4)));
 }
 
-TEST_F(SwitchTable, OtherKeysAreNoHealthChecks) {
+TEST_F(SwitchTable, OtherKeysAreNotHealthChecks) {
     const uint8_t value[5] = {};
     EXPECT_EQ(-1, dvs::convert::SaveHealthCheck(
                       {object, object, "health_checks", value, "com.orbeno.other", kGlobal, 16}));
@@ -216,7 +216,7 @@ Bytes PoolKey(const std::string &key) {
     return Bytes().Text(key, 200);
 }
 
-TEST_F(SwitchTable, PoolsGoBothWays) {
+TEST_F(SwitchTable, PoolsRoundTrip) {
     const Bytes value = Bytes().U32(2).Add(Pool("vm", 50, 100, 0xffffffff)).Add(Pool("nfs", 0, 0, 1000));
     ASSERT_EQ(0, Save(kGlobal, kPools, value));
     const std::string base = "/resource_management/traffic_resources";
@@ -237,10 +237,10 @@ TEST_F(SwitchTable, NoPoolsSaveNothing) {
     EXPECT_FALSE(LoadOne(kGlobal, kPools));
     ASSERT_EQ(0, Save(kGlobal, kPoolList, Bytes().U32(1).Add(PoolKey("a"))));
     ASSERT_EQ(0, Save(kGlobal, kPoolList, Bytes().U32(0)));
-    EXPECT_EQ(Bytes().U32(1).Add(PoolKey("a")), LoadOne(kGlobal, kPoolList)) << "an earlier list stays";
+    EXPECT_EQ(Bytes().U32(1).Add(PoolKey("a")), LoadOne(kGlobal, kPoolList)) << "the earlier list is kept";
 }
 
-TEST_F(SwitchTable, APoolWithoutSharesKeepsItsOtherFields) {
+TEST_F(SwitchTable, PoolWithoutSharesKeepsItsOtherFields) {
     ASSERT_EQ(0, Save(kGlobal, kPools, Bytes().U32(1).Add(Pool("vm", 50, 100, 7))));
     ASSERT_EQ(0, configstore::DeleteSubObject(Sub("resource_management/traffic_resources[vm]/allocation"),
                                               "shares", ""));
@@ -250,7 +250,7 @@ TEST_F(SwitchTable, APoolWithoutSharesKeepsItsOtherFields) {
     EXPECT_EQ(Bytes().U32(1).Add(Pool("vm", 0, 0, 0)), LoadOne(kGlobal, kPools));
 }
 
-TEST_F(SwitchTable, PoolKeysGoBothWaysAndLongOnesAreCut) {
+TEST_F(SwitchTable, PoolKeysRoundTripAndLongOnesAreTruncated) {
     const Bytes value = Bytes().U32(2).Add(PoolKey("vm")).Add(PoolKey("nfs"));
     ASSERT_EQ(0, Save(kGlobal, kPoolList, value));
     EXPECT_EQ("/resource_management {}\n/resource_management/network_resource_pool_keys[] = \"vm\"\n"
@@ -264,7 +264,7 @@ TEST_F(SwitchTable, PoolKeysGoBothWaysAndLongOnesAreCut) {
     EXPECT_EQ(cut, LoadOne(kGlobal, kPoolList));
 }
 
-TEST_F(SwitchTable, PoolCountsBeyondTheValueAreRefused) {
+TEST_F(SwitchTable, RejectsPoolCountsBeyondTheValue) {
     for (const uint32_t count : {2u, 0x7fffffffu, 0xffffffffu}) {
         EXPECT_EQ(-1, Save(kGlobal, kPools, Bytes().U32(count).Add(Pool("vm", 1, 1, 1))));
         EXPECT_EQ(-1, Save(kGlobal, kPoolList, Bytes().U32(count).Add(PoolKey("vm"))));

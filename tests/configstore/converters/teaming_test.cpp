@@ -84,7 +84,7 @@ TEST_F(Teaming, ThreeActiveAndTwoStandbyNamesFillTheFirstFiveSlots) {
     EXPECT_EQ(expected.Value(), LoadOne(kPort, kEtherswitchPort));
 }
 
-TEST_F(Teaming, ExplicitPoliciesComeBackSwapped) {
+TEST_F(Teaming, ExplicitPoliciesLoadSwapped) {
     const struct {
         uint32_t saved;
         const char *text;
@@ -156,7 +156,7 @@ TEST_F(Teaming, EtherswitchSavesNoVswitchPolicyAndLoadsThePortRowOnly) {
     EXPECT_EQ(0, Save(kGlobal, kVswitch, kFull.Value()));
     EXPECT_EQ(0, Save(kPort, kVswitchPort, kFull.Value()));
     EXPECT_EQ("/settings {}\n", Dump());
-    EXPECT_EQ(0, Save(kGlobal, kVswitch, {1, 2, 3})) << "not looked at, hence not refused";
+    EXPECT_EQ(0, Save(kGlobal, kVswitch, {1, 2, 3})) << "the value is ignored, so it is not rejected";
     ASSERT_EQ(0, Save(kPort, kEtherswitchPort, kFull.Value()));
     const Properties port = Load(kPort);
     EXPECT_TRUE(port.contains(kEtherswitchPort));
@@ -179,7 +179,7 @@ TEST_F(Teaming, VswitchAndCswitchLoadTheVswitchKeys) {
     }
 }
 
-TEST_F(Teaming, CountsBeyondTheValueAreRefused) {
+TEST_F(Teaming, RejectsCountsBeyondTheValue) {
     Bytes value = kFull.Value();
     for (const uint32_t active : {33u, 0x7fffffffu, 0xffffffffu}) {
         Bytes lying(value);
@@ -197,7 +197,7 @@ TEST_F(Teaming, CountsBeyondTheValueAreRefused) {
     EXPECT_EQ(-1, Save(kPort, kEtherswitchPort, value));
 }
 
-TEST_F(Teaming, NamesThatHaveNoSlotAreNotCounted) {
+TEST_F(Teaming, NamesWithoutASlotAreNotCounted) {
     configstore::Object *order = Sub("settings/uplink_teaming_policy/uplink_port_order");
     for (int i = 0; i < 30; ++i)
         ASSERT_EQ(0, configstore::AppendValueString(order, "active_uplink_ports", "a"));
@@ -209,7 +209,7 @@ TEST_F(Teaming, NamesThatHaveNoSlotAreNotCounted) {
     EXPECT_EQ(expected.Value(), LoadOne(kPort, kEtherswitchPort));
 }
 
-TEST_F(Teaming, LongNamesRunIntoTheNextSlotAndStopAtTheEnd) {
+TEST_F(Teaming, LongNamesOverflowIntoTheNextSlotButNotTheEnd) {
     configstore::Object *order = Sub("settings/uplink_teaming_policy/uplink_port_order");
     const std::string longName(100, 'x');
     ASSERT_EQ(0, configstore::AppendValueString(order, "active_uplink_ports", longName.c_str()));
@@ -237,7 +237,7 @@ TEST_F(Teaming, WrongTypesInTheStoreLeaveTheirFieldsZero) {
     EXPECT_EQ(Policy().Value(), LoadOne(kPort, kEtherswitchPort));
 }
 
-TEST_F(Teaming, EtherswitchDoesWithoutItsCriteriaAndVswitchFails) {
+TEST_F(Teaming, MissingCriteriaFailTheVswitchOnly) {
     for (const bool isVswitch : {false, true}) {
         BecomeSwitch(isVswitch ? "vswitch" : "etherswitch");
         (void)configstore::DeleteSubObject(object, "settings", "");
@@ -249,7 +249,7 @@ TEST_F(Teaming, EtherswitchDoesWithoutItsCriteriaAndVswitchFails) {
     }
 }
 
-TEST_F(Teaming, EtherswitchTakesAnAbsentObjectForNothingToDo) {
+TEST_F(Teaming, EtherswitchSkipsAnAbsentObject) {
     Sub("settings");
     fake_store::FailFunction("CreateSubObject", configstore::NOT_FOUND);
     EXPECT_EQ(0, Save(kPort, kEtherswitchPort, kFull.Value()));

@@ -22,7 +22,7 @@ using state_builder::U32;
 namespace {
 
 // The model has its own names for places in the store; keys must share a place exactly as in the tables.
-TEST(RoundTripKeys, AreThoseOfTheTablesInTheirOrder) {
+TEST(RoundTripKeys, MatchTheTablesInOrder) {
     for (const uint32_t propClass : {0u, 1u, 2u}) {
         std::vector<std::string> rows;
         std::map<std::string, std::set<std::string>> keysOfPath, keysOfPlace;
@@ -53,7 +53,7 @@ TEST(RoundTripKeys, AreThoseOfTheTablesInTheirOrder) {
 }
 
 // Every row of the table of changes names at least one rule; every rule has a row.
-TEST(RoundTripRules, AreThoseOfTheDocumentation) {
+TEST(RoundTripRules, MatchTheDocumentation) {
     std::ifstream file(DVS_SOURCE_DIR "/docs/config-store.md");
     std::string line;
     bool isInside = false;
@@ -78,7 +78,7 @@ TEST(RoundTripRules, AreThoseOfTheDocumentation) {
     EXPECT_EQ(documented, known);
 }
 
-TEST(RoundTripModel, OwnsUpToEveryChange) {
+TEST(RoundTripModel, NamesARuleForEveryChange) {
     const Props before = {{"a", U32(1)}, {"b", U32(2)}, {"c", U32(3)}};
     ListFate fate;
     fate.kept = {{before[0], {0}, {}}, {{"b", U32(9)}, {1}, {Rule::kTextEnds}}};
@@ -123,7 +123,7 @@ TEST(RoundTripModel, NamesEachDifference) {
     EXPECT_EQ(Differences({sw}, {}).size(), 1u);
 }
 
-TEST(RoundTripModel, RefusesWhatItDoesNotKnow) {
+TEST(RoundTripModel, RejectsCasesItDoesNotCover) {
     const ListContext etherswitch{{"etherswitch", 9, 9, false}, 2, {}, nullptr};
     const ListContext vswitch{{"vswitch", 9, 9, false}, 2, {}, nullptr};
     const Value vlan(8);
@@ -135,7 +135,7 @@ TEST(RoundTripModel, RefusesWhatItDoesNotKnow) {
                  std::logic_error);
 }
 
-TEST(RoundTripLedger, KnowsTheRulesThatNeverApplied) {
+TEST(RoundTripLedger, ListsTheRulesThatNeverApplied) {
     Ledger ledger;
     EXPECT_EQ(ledger.Idle().size(), static_cast<std::size_t>(Rule::kCount));
     ledger.Note(Rule::kIpfixOff);

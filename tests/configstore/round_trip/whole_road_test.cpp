@@ -128,12 +128,12 @@ TEST_P(WholeRoadOf, RandomStates) {
     }
 }
 
-TEST_F(WholeRoad, AStateThatWasSavedOverAnotherKeepsNothingOfIt) {
+TEST_F(WholeRoad, SaveOverAnotherStateKeepsNothingOfIt) {
     for (unsigned seed = 0; seed < 5 && !HasFailure(); ++seed)
         Travel(Random(seed, {kClasses[seed % 3], kClasses[(seed + 1) % 3]}));
 }
 
-TEST_F(WholeRoad, MeetsEveryRule) {
+TEST_F(WholeRoad, AppliesEveryRule) {
     Travel(Example("site.json"));
     Travel(Generated(1));
     for (unsigned seed = 0; seed < 30 && !HasFailure(); ++seed)

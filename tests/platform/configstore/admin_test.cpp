@@ -42,7 +42,7 @@ TEST_P(StoreAdmin, ListsBothLayersWithRevisionAndSize) {
     EXPECT_EQ(entries[1].address.layer, admin::Layer::Desired);
 }
 
-TEST_P(StoreAdmin, ExportGivesTheStoredDocument) {
+TEST_P(StoreAdmin, ExportReturnsTheStoredDocument) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"a"})");
     std::string json;
@@ -57,7 +57,7 @@ TEST_P(StoreAdmin, ImportStoresAGoodDocument) {
     EXPECT_EQ(Stored(store.get()), R"({"name":"a","product":{"version":"8.0.3"}})");
 }
 
-TEST_P(StoreAdmin, ImportRefusesWhatSetWouldKeepAndStoresNothing) {
+TEST_P(StoreAdmin, ImportRejectsWhatSetWouldKeepAndStoresNothing) {
     struct {
         const char *json;
         int32_t status;
@@ -90,7 +90,7 @@ TEST_P(StoreAdmin, ImportRefusesWhatSetWouldKeepAndStoresNothing) {
     EXPECT_TRUE(StoredIds(store.get()).empty());
 }
 
-TEST_P(StoreAdmin, ImportRefusesTooManyItems) {
+TEST_P(StoreAdmin, ImportRejectsTooManyItems) {
     std::string json =
         R"({"settings":{"uplink_teaming_policy":{"uplink_port_order":{"active_uplink_ports":[)";
     for (int i = 0; i < 33; i++)
@@ -117,7 +117,7 @@ TEST_P(StoreAdmin, HistoryListsTheLatestFirst) {
     EXPECT_FALSE(past[1].deleted);
 }
 
-TEST_P(StoreAdmin, EveryHistoricDocumentCanBeReadAndBroughtBack) {
+TEST_P(StoreAdmin, EveryHistoricDocumentCanBeReadAndRestored) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"1"})");
     Save(store.get(), R"({"name":"2"})");
@@ -136,7 +136,7 @@ TEST_P(StoreAdmin, EveryHistoricDocumentCanBeReadAndBroughtBack) {
     EXPECT_EQ(admin::RestoreObject(store.get(), At("sw1"), 3), NOT_FOUND);
 }
 
-TEST_P(StoreAdmin, WholeStoreComesBackAsOfARevision) {
+TEST_P(StoreAdmin, RestoresTheWholeStoreAsOfARevision) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"a1"})", "a");
     Save(store.get(), R"({"name":"b1"})", "b", "USER");
@@ -170,7 +170,7 @@ TEST_P(StoreAdmin, PlannedRestoreCanBeCancelled) {
     EXPECT_EQ(Stored(store.get()), R"({"name":"a2"})");
 }
 
-TEST_F(StoreAdminFile, BackupIsAStoreOfItsOwnForTheOwnerOnly) {
+TEST_F(StoreAdminFile, BackupIsASeparateStoreForTheOwnerOnly) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"kept"})");
     const std::string copy = directory_ + "/copy.db";
@@ -187,7 +187,7 @@ TEST_F(StoreAdminFile, BackupIsAStoreOfItsOwnForTheOwnerOnly) {
     EXPECT_EQ(admin::Backup(store.get(), directory_ + "/no/where.db"), IO_ERROR);
 }
 
-TEST_F(StoreAdminFile, ReadOnlyStoreRefusesChangesAndIsNotMade) {
+TEST_F(StoreAdminFile, ReadOnlyStoreRejectsChangesAndIsNotCreated) {
     Store *opened = nullptr;
     Failure failure;
     EXPECT_EQ(admin::Open(path_, true, &opened, &failure), IO_ERROR);
@@ -206,7 +206,7 @@ TEST_F(StoreAdminFile, ReadOnlyStoreRefusesChangesAndIsNotMade) {
     EXPECT_EQ(LastFailure(opened), "config store " + path_ + ": the file cannot be written to");
 }
 
-TEST_F(StoreAdminFile, CheckFindsDocumentsThatBreakTheSchema) {
+TEST_F(StoreAdminFile, CheckReportsDocumentsThatViolateTheSchema) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"old"})");
     Save(store.get(), R"({"name":"new"})");

@@ -140,7 +140,7 @@ TEST_F(StoreDurability, KilledAtEachSystemCallOfASave) {
     }
 }
 
-TEST_F(StoreDurability, FailingSystemCallsGiveAnErrorAndLeaveTheOldOrTheNewWhole) {
+TEST_F(StoreDurability, FailingSystemCallsLeaveTheOldOrTheNewWhole) {
     constexpr int kPorts = 300;
     const std::string old = Tagged(kPorts, "old");
     const std::string json = Tagged(kPorts, "new");
@@ -173,7 +173,7 @@ TEST_F(StoreDurability, FailingSystemCallsGiveAnErrorAndLeaveTheOldOrTheNewWhole
     }
 }
 
-TEST_F(StoreDurability, OutOfMemoryAtEachAllocationIsAStatusAndLeavesTheOldWhole) {
+TEST_F(StoreDurability, EachFailedAllocationReturnsAStatusAndKeepsTheOld) {
     constexpr int kPorts = 20;
     const std::string json = Tagged(kPorts, "new");
     ASSERT_EQ(SaveOnce(path_, Tagged(kPorts, "old")), OK);
@@ -232,7 +232,7 @@ TEST_F(StoreDurability, TwoWritersAndAReaderNeverSeeAMixture) {
 using StoreConcurrency = AnyStoreTest;
 RUN_OVER_EVERY_BACKEND(StoreConcurrency);
 
-TEST_P(StoreConcurrency, ContentionIsAnsweredByTheCallsAfterBegin) {
+TEST_P(StoreConcurrency, ContentionIsReportedByTheCallsAfterBegin) {
     const StorePtr first = Open();
     const StorePtr second = Open();
     admin::SetBusyTimeout(second.get(), 20);
@@ -272,7 +272,7 @@ TEST_P(StoreConcurrency, ReaderInsideAWritersTransactionSeesTheOldContent) {
     EXPECT_EQ(Stored(reader.get()), R"({"name":"new"})");
 }
 
-TEST_P(StoreConcurrency, WriterWaitsForTheOneBeforeAndReadersForNobody) {
+TEST_P(StoreConcurrency, WritersWaitForEachOtherAndReadersDoNotWait) {
     const StorePtr first = Open();
     const StorePtr second = Open();
     Save(first.get(), R"({"name":"start"})");

@@ -138,14 +138,14 @@ TEST_F(StoreHostileDatabase, DamagedDocumentIsCorruptAndNamed) {
         << LastFailure(store.get());
 }
 
-TEST_F(StoreHostileDatabase, NewerVersionIsRefusedUntouched) {
+TEST_F(StoreHostileDatabase, RejectsANewerVersionUnchanged) {
     GoodStore();
     Run("PRAGMA user_version=2");
     ExpectRefused(FAILED, "newer release");
     EXPECT_FALSE(std::filesystem::exists(path_ + "-wal"));
 }
 
-TEST_F(StoreHostileDatabase, NewerVersionWithAWriteAheadLogIsRefusedUntouched) {
+TEST_F(StoreHostileDatabase, RejectsANewerVersionWithAWriteAheadLogUnchanged) {
     GoodStore();
     sqlite3 *db = nullptr;
     ASSERT_EQ(sqlite3_open(path_.c_str(), &db), SQLITE_OK);
@@ -160,17 +160,17 @@ TEST_F(StoreHostileDatabase, NewerVersionWithAWriteAheadLogIsRefusedUntouched) {
     EXPECT_TRUE(ReadFile(path_ + "-wal") == log);
 }
 
-TEST_F(StoreHostileDatabase, ForeignDatabaseIsRefusedUntouched) {
+TEST_F(StoreHostileDatabase, RejectsAForeignDatabaseUnchanged) {
     Run("CREATE TABLE songs (title TEXT); INSERT INTO songs VALUES ('x')");
     ExpectRefused(CORRUPT, "not a config store");
 }
 
-TEST_F(StoreHostileDatabase, ForeignDatabaseWithAVersionIsRefusedUntouched) {
+TEST_F(StoreHostileDatabase, RejectsAForeignDatabaseWithAVersionUnchanged) {
     Run("PRAGMA user_version=1");
     ExpectRefused(CORRUPT, "not a config store");
 }
 
-TEST_F(StoreHostileDatabase, OtherTablesUnderOurMarkAreRefused) {
+TEST_F(StoreHostileDatabase, RejectsForeignTablesUnderOurApplicationId) {
     GoodStore();
     Run("CREATE TRIGGER t AFTER INSERT ON document BEGIN DELETE FROM object_row; END");
     ExpectRefused(CORRUPT, "tables");
@@ -178,19 +178,19 @@ TEST_F(StoreHostileDatabase, OtherTablesUnderOurMarkAreRefused) {
     ExpectRefused(CORRUPT, "tables");
 }
 
-TEST_F(StoreHostileDatabase, TextFileIsRefusedUntouched) {
+TEST_F(StoreHostileDatabase, RejectsATextFileUnchanged) {
     WriteFile(path_, std::string(5000, 'x'));
     ExpectRefused(CORRUPT, "not a database");
 }
 
-TEST_F(StoreHostileDatabase, SymbolicLinkIsRefusedAndNotFollowed) {
+TEST_F(StoreHostileDatabase, RejectsASymbolicLinkWithoutFollowingIt) {
     const std::string target = directory_ + "/target.db";
     ASSERT_EQ(symlink(target.c_str(), path_.c_str()), 0);
     ExpectRefused(IO_ERROR, "symbolic link");
     EXPECT_FALSE(std::filesystem::exists(target));
 }
 
-TEST_F(StoreHostileDatabase, DirectoryAndFifoAreRefused) {
+TEST_F(StoreHostileDatabase, RejectsADirectoryAndAFifo) {
     ASSERT_EQ(mkdir(path_.c_str(), 0700), 0);
     ExpectRefused(IO_ERROR, "a directory");
     std::filesystem::remove(path_);
@@ -198,7 +198,7 @@ TEST_F(StoreHostileDatabase, DirectoryAndFifoAreRefused) {
     ExpectRefused(IO_ERROR, "not a regular file");
 }
 
-TEST_F(StoreHostileDatabase, MissingDirectoryAboveIsRefused) {
+TEST_F(StoreHostileDatabase, RejectsAMissingParentDirectory) {
     path_ = directory_ + "/no/such/store.db";
     ExpectRefused(IO_ERROR, "directory");
 }
@@ -208,7 +208,7 @@ TEST_F(StoreHostileDatabase, EmptyFileBecomesAStore) {
     EXPECT_TRUE(StoredIds(Open().get()).empty());
 }
 
-TEST_F(StoreHostileDatabase, WideModesAreTakenBack) {
+TEST_F(StoreHostileDatabase, RestrictsModesThatAreTooWide) {
     GoodStore();
     ASSERT_EQ(chmod(path_.c_str(), 0666), 0);
     (void)Open();

@@ -89,14 +89,14 @@ TEST_F(StoreHostileDocument, EveryTruncationOfADocument) {
     EXPECT_EQ(Json(NewSwitch(whole).get()).substr(0, 9), R"({"name":")");
 }
 
-TEST_F(StoreHostileDocument, WhatIsNotAnObject) {
+TEST_F(StoreHostileDocument, ValuesOtherThanObjects) {
     for (const char *json :
          {"", " ", "null", "1", "\"x\"", "[]", "[{}]", "{} {}", "{}x", "nul", "{'a':1}", "{\"a\":01}",
           "{\"a\":NaN}", "{\"a\":1,}", "{\"a\" 1}", "/**/{}", "\xef\xbb\xbf{}"})
         ExpectRefused(json, "at byte ");
 }
 
-TEST_F(StoreHostileDocument, TextsWithNulBytesFromOutsideEndThere) {
+TEST_F(StoreHostileDocument, TextsEndAtTheFirstNulByte) {
     // A C string ends at its first NUL; the bytes after it are ignored.
     Object *object = nullptr;
     ASSERT_EQ(CreateObject(kKey, kGroup, kComponent, "sw1", "{}\0{{{{", &object), OK);

@@ -43,14 +43,14 @@ TEST(HugePages, SizesAreRoundedUpToWholePages) {
     }
 }
 
-TEST(HugePages, TooMuchIsRefused) {
+TEST(HugePages, RejectsOversizedRequests) {
     for (std::size_t size : {SIZE_MAX, SIZE_MAX / 2}) {
         const std::size_t wanted = size;
         EXPECT_EQ(MapHugePages(&size), nullptr) << wanted;
     }
 }
 
-TEST(HugePages, WhatIsGivenBackComesAgainAndIsNeverGivenTwice) {
+TEST(HugePages, FreedBlocksAreReusedAndNeverHandedOutTwice) {
     for (int round = 0; round < 3; round++) {
         std::vector<Block> blocks;
         std::set<const char *> distinct;
@@ -69,7 +69,7 @@ TEST(HugePages, WhatIsGivenBackComesAgainAndIsNeverGivenTwice) {
     UnmapHugePages(again.data, again.size);
 }
 
-TEST(HugePages, TextsOfAnySizeKeepWhatTheyHoldWhileTheyGrow) {
+TEST(HugePages, TextsKeepTheirContentsWhileGrowing) {
     const std::string large(kHugePage - 100, 'l');
     for (const std::size_t first : {std::size_t{1}, kHugePage / 2, kHugePage / 2 + 1, kHugePage - 100}) {
         const std::string expected = large.substr(0, first) + "small" + large;

@@ -17,7 +17,7 @@ TEST(StoreObjects, NullOrEmptyIdMeansASingleton) {
     EXPECT_EQ(made, found);
 }
 
-TEST(StoreObjects, AbsentSubObjectIsNotFoundAndLeavesTheOutput) {
+TEST(StoreObjects, AbsentSubObjectIsNotFoundAndKeepsTheOutput) {
     const ObjectPtr object = NewSwitch();
     Object *out = object.get();
     EXPECT_EQ(GetSubObject(object.get(), "settings", "", &out), NOT_FOUND);
@@ -27,7 +27,7 @@ TEST(StoreObjects, AbsentSubObjectIsNotFoundAndLeavesTheOutput) {
     EXPECT_EQ(out, object.get());
 }
 
-TEST(StoreObjects, PlainValueIsNoSubObject) {
+TEST(StoreObjects, PlainValueIsNotASubObject) {
     const ObjectPtr object = NewSwitch(R"({"name":"x"})");
     Object *out = nullptr;
     EXPECT_EQ(GetSubObject(object.get(), "name", "", &out), SCHEMA_VIOLATION);
@@ -68,7 +68,7 @@ TEST(StoreObjects, CreateOfAnExistingInstanceEmptiesIt) {
     EXPECT_EQ(Json(object.get()), R"({"ports":{"p1":{}}})");
 }
 
-TEST(StoreObjects, InstanceIdReadsBackAsKeyUnlessItHasItsOwn) {
+TEST(StoreObjects, InstanceIdReadsBackAsKeyUnlessItHasAKey) {
     const ObjectPtr object = NewSwitch();
     Object *const port = Sub(object.get(), "ports", "p1");
     EXPECT_EQ(Text(port, "key"), "p1");
@@ -78,7 +78,7 @@ TEST(StoreObjects, InstanceIdReadsBackAsKeyUnlessItHasItsOwn) {
     EXPECT_EQ(Text(Sub(object.get(), "settings"), "key"), "<6>");
 }
 
-TEST(StoreObjects, HandlesSurviveTheirSiblingsComingAndGoing) {
+TEST(StoreObjects, HandlesStayValidWhileSiblingsChange) {
     const ObjectPtr object = NewSwitch();
     Object *const kept = Sub(object.get(), "ports", "kept");
     for (int round = 0; round < 3; round++) {
@@ -93,7 +93,7 @@ TEST(StoreObjects, HandlesSurviveTheirSiblingsComingAndGoing) {
     EXPECT_EQ(Json(object.get()), R"({"ports":{"kept":{"name":"still"}}})");
 }
 
-TEST(StoreObjects, DeletedHandleIsRefused) {
+TEST(StoreObjects, RejectsADeletedHandle) {
     const ObjectPtr object = NewSwitch();
     Object *const settings = Sub(object.get(), "settings");
     Object *const beacon = Sub(settings, "ipfix");
@@ -102,14 +102,14 @@ TEST(StoreObjects, DeletedHandleIsRefused) {
     EXPECT_EQ(SetValueBool(beacon, "x", true), BAD_PARAMETER);
 }
 
-TEST(StoreObjects, HandlesBelowWhatIsDeletedAreRefused) {
+TEST(StoreObjects, RejectsHandlesBelowADeletedObject) {
     const ObjectPtr object = NewSwitch();
     Object *const vlan = Sub(Sub(Sub(object.get(), "ports", "1"), "settings"), "vlan");
     Object *const shares = Sub(Sub(Sub(object.get(), "settings"), "unheard_of"), "of");
     ASSERT_EQ(SetValueBool(shares, "flag", true), OK);
     ASSERT_EQ(DeleteSubObject(object.get(), "ports", "1"), OK);
     Object *out = nullptr;
-    ASSERT_EQ(CreateSubObject(object.get(), "settings", "", &out), OK) << "emptied";
+    ASSERT_EQ(CreateSubObject(object.get(), "settings", "", &out), OK) << "create empties the sub-object";
     bool flag = false;
     EXPECT_EQ(GetValueBool(shares, "flag", &flag), BAD_PARAMETER);
     uint32_t number = 0;
@@ -117,7 +117,7 @@ TEST(StoreObjects, HandlesBelowWhatIsDeletedAreRefused) {
     EXPECT_EQ(GetSubObject(vlan, "trunk_vlan_ids", "1", &out), BAD_PARAMETER);
 }
 
-TEST(StoreObjects, NamesAreToldApartByTheirTextsNotByWhereTheyStand) {
+TEST(StoreObjects, NamesCompareByTextNotByAddress) {
     const ObjectPtr object = NewSwitch(R"({"name":"n","uuid":"u","new":"w"})");
     char name[8] = "name";
     EXPECT_EQ(Text(object.get(), name), "n");
@@ -155,7 +155,7 @@ TEST(StoreFilter, SelectsOneInstanceByItsId) {
     EXPECT_EQ(status, NOT_FOUND);
 }
 
-TEST(StoreFilter, GivesOneHandlePerElementOfATextList) {
+TEST(StoreFilter, ReturnsOneHandlePerElementOfATextList) {
     const ObjectPtr object = NewSwitch(R"({"uplink_port_names":["a","b","c"]})");
     int32_t status = 0;
     EXPECT_EQ(Ids(object.get(), "uplink_port_names", &status).size(), 3U);
@@ -182,7 +182,7 @@ TEST(StoreFilter, DescendsIntoUnknownSingletonsOfADocumentToo) {
     int32_t status = 0;
     EXPECT_EQ(Ids(object.get(), "things", &status), (std::vector<std::string>{"a", "b", "c"}));
     EXPECT_EQ(Ids(object.get(), "b\"y\x01", &status), std::vector<std::string>{"e"});
-    EXPECT_EQ(Json(object.get()), document) << "looking changes nothing";
+    EXPECT_EQ(Json(object.get()), document) << "a search changes nothing";
 
     const ObjectPtr again = NewSwitch(document);
     const SpecPtr spec = NewSpec("things");
@@ -192,7 +192,7 @@ TEST(StoreFilter, DescendsIntoUnknownSingletonsOfADocumentToo) {
 }
 
 // A search caches which kinds of objects cannot lead to its key. An unknown singleton always can.
-TEST(StoreFilter, DescendsIntoUnknownSingletonsThatCameAfterASearch) {
+TEST(StoreFilter, DescendsIntoUnknownSingletonsAddedAfterASearch) {
     const ObjectPtr object = NewSwitch(R"({"ports":{"p":{"settings":{"blocked":true}}}})");
     Object *const port = Sub(object.get(), "ports", "p");
     Object *const settings = Sub(port, "settings");
@@ -208,7 +208,7 @@ TEST(StoreFilter, DescendsIntoUnknownSingletonsThatCameAfterASearch) {
 }
 
 // The switch's settings have sessions, a port's settings have none. One search may visit both.
-TEST(StoreFilter, RemembersWhatCannotLeadToItsKeyByKindOfObject) {
+TEST(StoreFilter, CachesDeadEndsByKindOfObject) {
     const ObjectPtr object = NewSwitch(R"({"settings":{"vspans":{"s":{}}},"ports":{"p":{"settings":{}}}})");
     Object *const port = Sub(object.get(), "ports", "p");
     const SpecPtr spec = NewSpec("vspans");
@@ -229,7 +229,7 @@ TEST(StoreFilter, CountsTheTextsOfAllSingletons) {
     EXPECT_EQ(Ids(Sub(Sub(object.get(), "settings"), "vspans", "s"), "port_keys", &status).size(), 3U);
 }
 
-TEST(StoreFilter, DoesNotDescendWhereTheMemberIsThereButEmpty) {
+TEST(StoreFilter, DoesNotDescendWhereTheMemberExistsButIsEmpty) {
     const ObjectPtr object = NewSwitch();
     Sub(Sub(object.get(), "settings"), "things", "hidden");
     ASSERT_EQ(SetValueEmptyList(object.get(), "things"), OK);
@@ -246,7 +246,7 @@ TEST(StoreFilter, DoesNotDescendIntoInstances) {
     EXPECT_EQ(status, NOT_FOUND);
 }
 
-TEST(StoreFilter, NoMatchAtAllIsNotFoundAndLeavesTheOutputs) {
+TEST(StoreFilter, NoMatchIsNotFoundAndKeepsTheOutputs) {
     const ObjectPtr object = NewSwitch();
     const SpecPtr spec = NewSpec("ports");
     Object *some = object.get();
@@ -268,7 +268,7 @@ TEST(StoreFilter, DeletesWhatItSelects) {
     EXPECT_EQ(Json(object.get()), R"({"name":"n"})");
 }
 
-TEST(StoreFilter, RefusesNulls) {
+TEST(StoreFilter, RejectsNulls) {
     FilterSpec *spec = nullptr;
     EXPECT_EQ(CreateFilterSpecObject(nullptr, "", "", "", &spec), BAD_PARAMETER);
     EXPECT_EQ(CreateFilterSpecObject("k", nullptr, "", "", &spec), BAD_PARAMETER);

@@ -99,7 +99,7 @@ TEST(PlainDocument, ReadsAsTheGeneralReaderDoes) {
         ExpectBothAgree(json);
 }
 
-TEST(PlainDocument, OutlineOfASoundDocumentLeavesItsLongestListText) {
+TEST(PlainDocument, OutlineOfAValidDocumentKeepsItsLongestListAsText) {
     const std::string json = kPorts;
     ASSERT_EQ(Read(json).status, OK);
     EXPECT_EQ(ReadOutlined(json), Read(json).document);
@@ -112,7 +112,7 @@ TEST(PlainDocument, OutlineOfASoundDocumentLeavesItsLongestListText) {
     EXPECT_EQ(FindMember(&tree.root, "health_checks")->kind, Kind::Later);
 }
 
-TEST(PlainDocument, OutlineIsNotForWhatHasToBeReported) {
+TEST(PlainDocument, OutlineRejectsDocumentsWithErrorsToReport) {
     const auto parameter = [](const std::string &text) {
         return R"({"1":{"settings":{"filter_policy":{"network_filters":{"0":{"parameters":[")" + text +
                R"("]}}}}}})";
@@ -130,7 +130,7 @@ TEST(PlainDocument, OutlineIsNotForWhatHasToBeReported) {
     EXPECT_EQ(ReadOutlined(R"({"max_ports":"many","ports":{"1":{}}})"), std::nullopt);
 }
 
-TEST(PlainDocument, OutlineOverlooksNothing) {
+TEST(PlainDocument, OutlineMissesNoError) {
     std::vector<std::string> documents(std::begin(kDocuments), std::end(kDocuments));
     documents.emplace_back(kPorts);
     for (const std::string &json : documents) {
@@ -148,7 +148,7 @@ TEST(PlainDocument, OutlineOverlooksNothing) {
     }
 }
 
-TEST(PlainDocument, CutAnywhereIsJudgedAlike) {
+TEST(PlainDocument, BothReadersAgreeOnEveryTruncation) {
     for (const std::string json : kDocuments) {
         for (std::size_t size = 0; size < json.size(); size++) {
             ExpectBothAgree(json.substr(0, size));
@@ -157,7 +157,7 @@ TEST(PlainDocument, CutAnywhereIsJudgedAlike) {
     }
 }
 
-TEST(PlainDocument, OneByteChangedIsJudgedAlike) {
+TEST(PlainDocument, BothReadersAgreeOnEachChangedByte) {
     for (const std::string json : kDocuments) {
         for (std::size_t at = 0; at < json.size(); at++) {
             for (const char byte : {'"', '\\', '{', '}', '[', ',', '0', 'n', ' ', '\x01', '\xe4'}) {

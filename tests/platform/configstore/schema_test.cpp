@@ -200,7 +200,7 @@ TEST(StoreSchemaText, EveryFieldHasADescription) {
     EXPECT_GT(fields, 120);
 }
 
-TEST_F(StoreSchema, WrongTypeAtEveryPathIsRefusedByItsPath) {
+TEST_F(StoreSchema, RejectsAWrongTypeAtEveryPathByItsPath) {
     const StorePtr store = Open();
     int refused = 0;
     ForEachField([&](const Field *field, const std::string &path, const auto &around) {
@@ -227,7 +227,7 @@ TEST_F(StoreSchema, WrongTypeAtEveryPathIsRefusedByItsPath) {
     EXPECT_TRUE(StoredIds(store.get()).empty());
 }
 
-TEST_F(StoreSchema, NumbersAreHeldToTheirRange) {
+TEST_F(StoreSchema, NumbersAreCheckedAgainstTheirRange) {
     const StorePtr store = Open();
     std::string why;
     ForEachField([&](const Field *field, const std::string &path, const auto &around) {
@@ -242,7 +242,7 @@ TEST_F(StoreSchema, NumbersAreHeldToTheirRange) {
     });
 }
 
-TEST_F(StoreSchema, TextsAreHeldToTheirBytes) {
+TEST_F(StoreSchema, TextLimitsCountBytes) {
     const StorePtr store = Open();
     std::string why;
     int limits = 0;
@@ -264,7 +264,7 @@ TEST_F(StoreSchema, TextsAreHeldToTheirBytes) {
     EXPECT_GE(limits, 6);
 }
 
-TEST_F(StoreSchema, LimitsOfUplinkNamesPortKeysAgentsAndParametersAreTheLoadersOnes) {
+TEST_F(StoreSchema, LimitsMatchTheLoadersLimits) {
     const auto limit = [](std::initializer_list<const char *> path) {
         const Shape *shape = FindSchema(kKey, kGroup);
         const Field *field = nullptr;
@@ -283,7 +283,7 @@ TEST_F(StoreSchema, LimitsOfUplinkNamesPortKeysAgentsAndParametersAreTheLoadersO
         80U);
 }
 
-TEST_F(StoreSchema, VerdictIsGivenAtSetAndMendedValuesPass) {
+TEST_F(StoreSchema, SetReportsViolationsAndAcceptsCorrectedValues) {
     const StorePtr store = Open();
     const ObjectPtr object = NewSwitch();
     EXPECT_EQ(SetValueUint32(object.get(), "name", 1), OK);
@@ -305,7 +305,7 @@ TEST_F(StoreSchema, SingletonAndListOfInstancesAreNotMixedUp) {
     EXPECT_EQ(Set(store.get(), other.get(), "EXTERNAL"), SCHEMA_VIOLATION);
 }
 
-TEST_F(StoreSchema, UnknownMembersAreKeptToTheByte) {
+TEST_F(StoreSchema, UnknownMembersAreKeptByteForByte) {
     const StorePtr store = Open();
     const std::string document =
         R"({"new":{"a":[1,-2,2.5,1e+300,18446744073709551615,"\u0001é",null,{"b":[]}],"c":{}},)"

@@ -32,7 +32,7 @@ RUN_OVER_EVERY_BACKEND(StoreRows);
 
 using StoreFile = StoreTest;
 
-TEST_P(StoreRows, EmptyStoreListsNothingWithSuccess) {
+TEST_P(StoreRows, EmptyStoreListsNothingAndSucceeds) {
     const StorePtr store = Open();
     EXPECT_TRUE(StoredIds(store.get()).empty());
     Object **objects = nullptr;
@@ -65,7 +65,7 @@ TEST_P(StoreRows, ListsInAscendingInstanceId) {
     EXPECT_EQ(StoredIds(store.get()), (std::vector<std::string>{"a", "b", "c"}));
 }
 
-TEST_P(StoreRows, DesiredLayerIsApartFromTheCurrentOne) {
+TEST_P(StoreRows, DesiredLayerIsSeparateFromTheCurrentOne) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"wanted"})", "sw1", "USER");
     EXPECT_EQ(Stored(store.get()), "");
@@ -141,7 +141,7 @@ TEST_P(StoreRows, DocumentReplacedWithinItsOwnTransactionLeavesNoHistory) {
     EXPECT_EQ(text, R"({"name":"before"})");
 }
 
-TEST_F(StoreFile, ViewsForPeopleHaveTheDocuments) {
+TEST_F(StoreFile, ReadableViewsShowTheDocuments) {
     const StorePtr store = Open();
     Save(store.get(), R"({"name":"1"})");
     Save(store.get(), R"({"name":"2"})");
@@ -202,7 +202,7 @@ TEST_F(StoreFile, PathIsReadWithEachStore) {
     EXPECT_EQ(admin::DefaultPath(), directory_ + "/other.db");
 }
 
-TEST_F(StoreFile, FailuresOfTheHostsStoreAreLoggedAndThoseOfToolsAreRecordsOnly) {
+TEST_F(StoreFile, FailuresAreLoggedForTheHostsStoreOnly) {
     const ObjectPtr bad = NewSwitch(R"({"name":7})");
     const StorePtr store = OpenHosts(path_);
     (void)TakeHostLog();

@@ -36,7 +36,7 @@ TEST(StoreValues, NumbersOfEveryWidthReadBackAtTheirLimits) {
     EXPECT_EQ(wide, INT64_MIN);
 }
 
-TEST(StoreValues, NumberThatDoesNotFitTheGetterIsRefusedAndLeavesTheOutput) {
+TEST(StoreValues, RejectsANumberOutOfTheGettersRangeAndKeepsTheOutput) {
     const ObjectPtr object = NewSwitch();
     Object *const o = object.get();
     ASSERT_EQ(SetValueLong(o, "n", -1), OK);
@@ -91,7 +91,7 @@ TEST(StoreValues, TextListKeepsItsOrder) {
     EXPECT_EQ(Texts(object.get(), "uplink_port_names"), (std::vector<std::string>{"b", "", "a", "b"}));
 }
 
-TEST(StoreValues, AppendMakesTheListThatIsNotThere) {
+TEST(StoreValues, AppendCreatesAMissingList) {
     const ObjectPtr object = NewSwitch();
     ASSERT_EQ(AppendValueString(object.get(), "names", "x"), OK);
     EXPECT_EQ(Texts(object.get(), "names"), std::vector<std::string>{"x"});
@@ -125,7 +125,7 @@ TEST(StoreValues, EmptyListReadsAsEitherKindWithoutElements) {
     FreeIntArray(numbers);
 }
 
-TEST(StoreValues, AppendOfTheOtherKindOrToAPlainValueIsRefused) {
+TEST(StoreValues, RejectsAppendOfTheOtherKindOrToAPlainValue) {
     const ObjectPtr object = NewSwitch();
     ASSERT_EQ(AppendValueString(object.get(), "list", "x"), OK);
     EXPECT_EQ(AppendValueInt(object.get(), "list", 1), SCHEMA_VIOLATION);
@@ -159,7 +159,7 @@ TEST(StoreValues, ValueOfAnotherTypeIsASchemaViolationForEveryGetter) {
     EXPECT_EQ(GetValueIntArray(o, "text", &numbers, &number), SCHEMA_VIOLATION);
 }
 
-TEST(StoreValues, ATextThatMightBeBase64IsNoBinaryValueWhereItWasSetAsAText) {
+TEST(StoreValues, TextThatLooksLikeBase64IsNotABinaryValue) {
     const ObjectPtr object = NewSwitch(R"({"read":"text"})");
     Object *const o = object.get();
     void *data = nullptr;
