@@ -1,5 +1,5 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The config store family's emitter: checks the family's debug level and hands on to dvsdata/log.h.
+// The config store family's emitter on top of dvsdata/log.h.
 
 #include "configstore/log.h"
 
@@ -13,30 +13,17 @@
 int32_t dvsconfigstore_debug = 10;
 
 namespace dvs::config {
-namespace {
 
-thread_local bool isReported = false;
-
-} // namespace
-
-AlreadyReported::AlreadyReported() {
-    isReported = true;
-}
-
-AlreadyReported::~AlreadyReported() {
-    isReported = false;
-}
-
-void LogError(const char *format, ...) {
-    if (dvsconfigstore_debug < 0 || isReported) return;
+void Messages::Error(const char *format, ...) const {
+    if (level_ < 0) return;
     va_list args;
     va_start(args, format);
     log::ToStream(stdout, 0, format, args);
     va_end(args);
 }
 
-void LogTrace(const char *format, ...) {
-    if (!Tracing()) return;
+void Messages::Trace(const char *format, ...) const {
+    if (!Traces()) return;
     va_list args;
     va_start(args, format);
     log::ToStream(stdout, 1, format, args);
@@ -49,7 +36,7 @@ void LogSystem(int priority, const char *format, ...) {
     va_list again;
     va_copy(again, args);
     vsyslog(priority, format, args);
-    (void)log::ToSink(log::kUnguarded, format, again); // no sink: syslog alone has it
+    (void)log::ToSink(log::kUnguarded, format, again); // without a sink syslog alone has it
     va_end(again);
     va_end(args);
 }

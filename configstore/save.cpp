@@ -5,8 +5,8 @@
 
 #include "configstore/save.h"
 
-#include <cstdlib>
 #include <memory>
+#include <new>
 
 #include <syslog.h>
 
@@ -24,26 +24,17 @@ namespace {
 
 using namespace dvs::config;
 
-// What the walk over the switches carries along. On the heap, and checked, because running out of memory here
-// has a message and a result of its own.
+// What the walk over the switches carries along. On the heap, because running out of memory here has a message
+// and a result of its own.
 struct SaveContext {
     int32_t status;
     configstore::Store *store;
+    Messages messages;
 };
-struct ContextDeleter {
-    void operator()(SaveContext *context) const { std::free(context); }
-};
-using ContextOwner = std::unique_ptr<SaveContext, ContextDeleter>;
 
-ContextOwner NewContext(configstore::Store *store) {
-    ContextOwner context(static_cast<SaveContext *>(std::calloc(1, sizeof(SaveContext))));
-    if (context) context->store = store;
-    return context;
-}
-
-// One list of properties of one class into one object. `trace` is null for none.
+// One list of properties of one class into one object.
 int32_t SaveList(PropSaver *saver, DVSData *list, configstore::Object *object, uint32_t propClass,
-                 const char *trace) {
+                 const auto &trace) {
     int32_t status = 0;
     saver->Begin(object, propClass);
     DVSDataEntry *entry = nullptr;
@@ -51,8 +42,8 @@ int32_t SaveList(PropSaver *saver, DVSData *list, configstore::Object *object, u
         void *value = nullptr;
         const uint32_t len = DVSData_Data(entry, &value);
         const char *key = DVSData_Name(entry);
-        if (trace && Tracing()) LogTrace("%s: %s\n", trace, key);
-        status = saver->Save(key, value, len, DVSData_PropType(entry));
+        trace(key);
+        status = saver->Save(key, {static_cast<const uint8_t *>(value), len}, DVSData_PropType(entry));
     }
     saver->End();
     return status;
@@ -69,7 +60,7 @@ bool SavePort(DVSPort *port, void *arg) {
     configstore::Object *object = nullptr;
     run->status = GetOrCreateSubObject(true, run->switchObject, "ports", DVS_PortId(port), &object);
     if (run->status == 0)
-        run->status = SaveList(run->saver, port->portData, object, DVS_PROP_CLASS_PORT, nullptr);
+        run->status = SaveList(run->saver, port->portData, object, DVS_PROP_CLASS_PORT, [](const char *) {});
     return run->status != 0;
 }
 
@@ -79,17 +70,23 @@ int32_t SaveForwardingClass(configstore::Object *object, DVSwitch *sw) {
     return configstore::SetValueStr(product, "forwarding_class", DVS_ClassName(sw));
 }
 
-int32_t FillObject(configstore::Object *object, DVSwitch *sw) {
+int32_t FillObject(configstore::Object *object, DVSwitch *sw, const dvs::convert::Context &context) {
+    const Messages &messages = context.messages;
     if (const int32_t status = SaveForwardingClass(object, sw)) return status;
     if (const int32_t status = SaveMaxPorts(object, sw)) return status;
-    LogTrace("SaveDVS: %s\n", DVS_SwitchName(sw));
+    messages.Trace("SaveDVS: %s\n", DVS_SwitchName(sw));
     if (const int32_t status = SaveIdentity(object, sw)) return status;
-    PropSaver saver;
+    PropSaver saver(context, PropSaver::For::kManyProperties);
+    const auto traceGlobal = [&](const char *key) {
+        if (messages.Traces()) messages.Trace("SaveGlobalProp: %s\n", key);
+    };
+    const auto traceHost = [&](const char *key) {
+        if (messages.Traces()) messages.Trace("SaveHostProp: %s\n", key);
+    };
     if (const int32_t status =
-            SaveList(&saver, sw->globalPropList, object, DVS_PROP_CLASS_GLOBAL, "SaveGlobalProp"))
+            SaveList(&saver, sw->globalPropList, object, DVS_PROP_CLASS_GLOBAL, traceGlobal))
         return status;
-    if (const int32_t status =
-            SaveList(&saver, sw->hostPropList, object, DVS_PROP_CLASS_HOST, "SaveHostProp"))
+    if (const int32_t status = SaveList(&saver, sw->hostPropList, object, DVS_PROP_CLASS_HOST, traceHost))
         return status;
     PortRun ports = {object, &saver, 0};
     DVSState_PortForEach(sw, SavePort, &ports);
@@ -111,9 +108,11 @@ bool SaveSwitch(DVSwitch *sw, void *arg) {
     RootObject object;
     context->status = FetchForRewrite(context->store, DVS_SwitchId(sw), &object);
     if (!object.get()) return true;
-    if (context->status == 0) context->status = FillObject(object.get(), sw);
+    const dvs::convert::Context conversion = {
+        .switchClass = dvsSwitchClass, .wideRecords = dvsWidePortRecords, .messages = context->messages};
+    if (context->status == 0) context->status = FillObject(object.get(), sw, conversion);
     if (context->status == 0) context->status = WriteObject(context->store, object.get());
-    if (context->status) LogError("Failed to save dvs: %s to configstore\n", DVS_SwitchId(sw));
+    if (context->status) context->messages.Error("Failed to save dvs: %s to configstore\n", DVS_SwitchId(sw));
     return context->status != 0;
 }
 
@@ -158,16 +157,17 @@ private:
 };
 
 int32_t SaveSwitches(configstore::Store *store, const char *switchId) {
-    const ContextOwner context = NewContext(store);
+    const Messages messages;
+    const std::unique_ptr<SaveContext> context(new (std::nothrow) SaveContext{0, store, messages});
     if (!context) {
-        LogError("Failed to alloc memory for DVSUplinkPorts\n");
+        messages.Error("Failed to alloc memory for DVSUplinkPorts\n");
         return kFailed;
     }
     if (!switchId)
         DVSState_SwitchForEach(SaveSwitch, context.get());
     else if (DVSwitch *sw = DVSState_SwitchFind(switchId))
         (void)SaveSwitch(sw, context.get());
-    if (context->status) LogError("Failed to save dvs to configstore\n");
+    if (context->status) messages.Error("Failed to save dvs to configstore\n");
     return context->status;
 }
 
@@ -178,7 +178,7 @@ void ReportTime(const char *format) {
 
 // Everything between a begun transaction and its end, which it brings about.
 int32_t RunTransaction(configstore::Store *store, const char *switchId, Existing *existing) {
-    LogTrace("Ready to save dvs list\n");
+    Messages().Trace("Ready to save dvs list\n");
     int32_t status = existing->Collect(store, switchId);
     if (status == 0) status = SaveSwitches(store, switchId);
     if (status == 0) status = existing->DeleteStale(store);

@@ -20,7 +20,7 @@ void Report(const dvs::state::StateFault &fault) {
     char where[kTextSize];
     (void)fault.Describe(what); // cut if it is longer
     (void)fault.path.Format(where);
-    dvs::config::LogError("State is not saved to configstore: %s, at byte %zu%s%s\n", what, fault.offset,
+    dvs::config::Messages().Error("State is not saved to configstore: %s, at byte %zu%s%s\n", what, fault.offset,
                           *where ? " in " : "", where);
 }
 

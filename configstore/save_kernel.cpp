@@ -13,7 +13,7 @@ int32_t DVSState_SaveToConfigStore_ByInstance(const char *switchId) {
     uint32_t len = 0;
     const HYP_ReturnStatus status = DVSHYP_PersistentStateGet(&buf, &len);
     if (status != HYP_OK) {
-        dvs::config::LogError(
+        dvs::config::Messages().Error(
             "Failed to save DVS config to configstore when get DVS buffrom hyp. Error: %s\n",
             HYP_ReturnStatusToString(status));
         return -1;

@@ -74,7 +74,7 @@ int32_t ClearObsolete(configstore::Object *object) {
 int32_t StoreHandle::Open() {
     const int32_t status = configstore::GetStore(&store_);
     if (status == 0 && store_) return 0;
-    LogError("Get store failed\n");
+    Messages().Error("Get store failed\n");
     return status ? status : kFailed;
 }
 
@@ -100,7 +100,7 @@ int32_t FetchForRewrite(configstore::Store *store, const char *switchId, RootObj
         created = configstore::CreateObject(kKey, kGroup, kComponent, switchId, "{}", object->out());
     dvsConfigStoreTimeMs += dvsConfigStoreNowMs() - start;
 
-    if (Failed(found) || created) LogError("Get/Create dvs_switch:%s failed\n", switchId);
+    if (Failed(found) || created) Messages().Error("Get/Create dvs_switch:%s failed\n", switchId);
     if (Failed(found)) return found; // an object that cannot be read must not be overwritten
     if (created) return kFailed;
     return found == 0 ? ClearObsolete(object->get()) : 0;

@@ -6,6 +6,7 @@
 
 #include <cstdlib>
 #include <memory>
+#include <new>
 
 #include <syslog.h>
 
@@ -22,7 +23,7 @@ using namespace dvs::config;
 
 constexpr const char *kStateFile = "/etc/orbeno/dvsdata.db";
 
-// A state file's contents. The block begins before them, where their alignment asks for it.
+// A state file's contents. The block can begin before them, for their alignment.
 class FileBuffer {
 public:
     FileBuffer() = default;
@@ -50,15 +51,11 @@ struct UpgradeContext {
     int32_t status;
     configstore::Store *store;
 };
-struct ContextDeleter {
-    void operator()(UpgradeContext *context) const { std::free(context); }
-};
-using ContextOwner = std::unique_ptr<UpgradeContext, ContextDeleter>;
 
 // Writes the object only where there is a port set's name to write.
 int32_t SaveBasics(configstore::Store *store, DVSwitch *sw, configstore::Object *object) {
     if (const int32_t status = SaveMaxPorts(object, sw)) return status;
-    LogError("SaveDVS: %s\n", DVS_SwitchName(sw)); // prints from level 0 on, unlike the save's
+    Messages().Error("SaveDVS: %s\n", DVS_SwitchName(sw)); // prints from level 0 on, unlike the save's
     if (const int32_t status = SaveIdentity(object, sw)) return status;
     void *value = nullptr;
     uint32_t len = 0;
@@ -76,20 +73,19 @@ bool SaveBasicSwitch(DVSwitch *sw, void *arg) {
     context->status = FetchForRewrite(context->store, DVS_SwitchId(sw), &object);
     if (!object.get()) return true;
     if (context->status == 0) context->status = SaveBasics(context->store, sw, object.get());
-    if (context->status) LogError("Failed to save dvs: %s to configstore\n", DVS_SwitchId(sw));
+    if (context->status) Messages().Error("Failed to save dvs: %s to configstore\n", DVS_SwitchId(sw));
     return context->status != 0;
 }
 
 int32_t RunTransaction(configstore::Store *store) {
-    const ContextOwner context(static_cast<UpgradeContext *>(std::calloc(1, sizeof(UpgradeContext))));
+    const std::unique_ptr<UpgradeContext> context(new (std::nothrow) UpgradeContext{0, store});
     int32_t status = kFailed;
     if (!context) {
-        LogError("Failed to alloc memory for DVS\n");
+        Messages().Error("Failed to alloc memory for DVS\n");
     } else {
-        context->store = store;
         DVSState_SwitchForEach(SaveBasicSwitch, context.get());
         status = context->status;
-        if (status) LogError("Failed to save dvs to configstore\n");
+        if (status) Messages().Error("Failed to save dvs to configstore\n");
     }
     if (status == 0) status = configstore::CommitTransaction(store);
     if (status)

@@ -2,14 +2,12 @@
 #ifndef DVSDATA_GROWING_IMAGE_H
 #define DVSDATA_GROWING_IMAGE_H
 
-// Nested buffers written front to back into a block that grows: for those who learn the entries one by one
-// and would otherwise build a list, serialize it, put the result into a list and serialize that. The bytes
-// are those of the lists' way. Leans on format.h; the config store's load stands on it.
+// Nested buffers, written front to back into one block that grows. The entries become known one by one; each
+// is written once, where a list would be built, serialized, put into another list and serialized with it.
 //
-// What this way cannot do, it does not report entry by entry: it gives up, takes everything that follows and
-// keeps nothing of it, and GaveUp() tells at the end that the lists' way has to be gone instead. That is so
-// without memory, for a result above kMaxSize, and when a buffer with updates gets many entries, among which
-// only a list's index finds a name fast.
+// The result, the statuses and the messages are those of such lists: a buffer that is begun prints what
+// DVSData_Alloc prints, an entry what DVSData_Append or DVSData_Update prints, and a buffer that ends what
+// DVSData_Serialize prints.
 
 #include <array>
 #include <cstddef>
@@ -17,6 +15,7 @@
 #include <string_view>
 
 #include "dvsdata/format.h"
+#include "dvsdata/image_index.h"
 #include "dvsdata/open_buffer.h"
 
 namespace dvs::data {
@@ -24,63 +23,94 @@ namespace dvs::data {
 class GrowingImage {
 public:
     static constexpr std::size_t kMaxDepth = 3;
-    static constexpr std::size_t kMaxSize = std::size_t{1} << 30;
-    static constexpr std::uint32_t kMaxUpdates = 64;
+    static constexpr std::size_t kMaxSize = UINT32_MAX;
+
+    /// How a nested buffer becomes an entry of the buffer around it.
+    enum class Adding : bool {
+        kAppend, // DVSData_Append: behind an entry of the same name, if there is one
+        kUpdate  // DVSData_Update: in its place
+    };
 
     GrowingImage() = default;
     ~GrowingImage();
     GrowingImage(const GrowingImage &) = delete;
     GrowingImage &operator=(const GrowingImage &) = delete;
 
-    /// A buffer: the outermost one, or the whole value of an entry just begun.
-    void BeginBuffer();
-    void EndBuffer();
-    void BeginEntry(std::string_view name, std::uint32_t propType);
-    void EndEntry();
-    /// DVSData_Append to the innermost buffer.
-    void Append(std::string_view name, Bytes value, std::uint32_t propType);
-    /// DVSData_Update of the innermost buffer, all of whose entries came by this.
-    void Update(std::string_view name, Bytes value, std::uint32_t propType);
+    // HYP_NO_MEMORY, also for an image of more than 4 GiB, leaves the image as it was before the call, and it can be used further. HYP_BAD_PARAM: a
+    // value whose entry would be larger than the format allows.
 
-    /// About so many bytes more will come.
+    /// The outermost buffer.
+    [[nodiscard]] HYP_ReturnStatus BeginBuffer();
+    [[nodiscard]] HYP_ReturnStatus EndBuffer(std::uint32_t version);
+    /// A buffer that is the value of an entry of the innermost one. `name` must outlive it.
+    [[nodiscard]] HYP_ReturnStatus BeginNested(std::string_view name, std::uint32_t propType);
+    /// On failure the buffer is dropped.
+    [[nodiscard]] HYP_ReturnStatus EndNested(std::uint32_t version, Adding adding);
+    /// Drops the innermost buffer and its entry.
+    void DropNested();
+
+    /// DVSData_Append and DVSData_Update of the innermost buffer.
+    [[nodiscard]] HYP_ReturnStatus Append(std::string_view name, Bytes value, std::uint32_t propType);
+    [[nodiscard]] HYP_ReturnStatus Update(std::string_view name, Bytes value, std::uint32_t propType);
+
+    /// Allocates for about `size` more bytes. Without effect when there is no memory.
     void Expect(std::size_t size);
 
-    void GiveUp() { gaveUp_ = true; }
-    [[nodiscard]] bool GaveUp() const { return gaveUp_; }
-    /// The finished image, to be released with free(); the image is of no use afterwards.
+    /// The finished buffer, lent.
+    [[nodiscard]] Bytes Finished() const { return {begin_, at_}; }
+    /// The finished buffer, to be released with free(). The image is empty afterwards.
     void HandOver(void **buf, std::uint32_t *len);
 
 private:
     struct Level {
         OpenBuffer buffer;
-        std::size_t entry;     // the last one
-        std::uint32_t entries; // by Update
-        std::uint64_t names;   // their marks (MarkOf)
+        std::size_t entry;     // start of the nested buffer's entry
+        std::string_view name; // its name, uncut
+        std::uint32_t propType;
+        std::uint32_t count;   // entries, removed ones included
+        std::uint32_t removed; // bytes of removed entries
+        std::uint64_t marks;   // of the names (MarkOf)
+        ImageIndex index;      // used for long buffers only
     };
 
     /// Room at the end; null when there is none.
     std::uint8_t *Claim(std::size_t size) {
-        if ((gaveUp_ || size > capacity_ - at_) && !MakeRoom(size)) return nullptr;
+        if (size > capacity_ - at_ && !Grow(size)) return nullptr;
         std::uint8_t *const at = begin_ + at_;
         at_ += size;
         return at;
     }
-    bool MakeRoom(std::size_t size) { return !gaveUp_ && Grow(size); }
-    /// One of 64: entries whose marks differ have different names, and most are told apart by that. The
-    /// factors are such that hardly any two known keys of a table fall together.
+    /// One bit of 64. Names with different marks differ; most names are told apart by that. The factors keep
+    /// nearly all known keys of a table apart.
     [[nodiscard]] static std::uint64_t MarkOf(std::string_view name) {
         constexpr std::size_t kLast = 34;
         constexpr std::size_t kThirdLast = 15;
+        if (name.size() > kMaxNameLen) [[unlikely]]
+            name = name.substr(0, kMaxNameLen); // as it is stored
         std::size_t mark = name.size();
         if (name.size() >= 3) [[likely]]
             mark += static_cast<std::uint8_t>(name.back()) * kLast +
                     static_cast<std::uint8_t>(name[name.size() - 3]) * kThirdLast;
         return std::uint64_t{1} << mark % 64;
     }
+    /// The size of the list that the level's entries up to `end` would be.
+    [[nodiscard]] static std::uint32_t SizeOf(const Level &level, std::size_t end) {
+        return static_cast<std::uint32_t>(end - level.buffer.start + kMarkerSize - level.removed);
+    }
+
     bool Grow(std::size_t size);
-    [[gnu::always_inline]] inline void Put(std::string_view name, Bytes value, std::uint32_t propType);
-    void UpdateInPlace(std::size_t entry, std::string_view name, Bytes value, std::uint32_t propType);
-    [[nodiscard]] std::size_t Find(std::string_view name) const;
+    bool Resize(std::size_t capacity);
+    [[nodiscard]] HYP_ReturnStatus Open();
+    [[nodiscard]] HYP_ReturnStatus Close(std::uint32_t version);
+    [[nodiscard]] HYP_ReturnStatus AddNested(Adding adding);
+    [[nodiscard]] HYP_ReturnStatus Put(std::string_view name, std::uint64_t mark, Bytes value,
+                                       std::uint32_t propType);
+    [[nodiscard]] HYP_ReturnStatus Replace(std::size_t entry, std::string_view name, Bytes value,
+                                           std::uint32_t propType);
+    [[nodiscard]] std::size_t Find(std::string_view name, std::size_t end);
+    void Remove(std::size_t entry, std::size_t end);
+    void Compact();
+    void EmitEntries(const Level &level) const;
 
     std::uint8_t *begin_ = nullptr;
     std::size_t at_ = 0;
@@ -88,7 +118,6 @@ private:
     std::array<Level, kMaxDepth> levels_{};
     std::size_t depth_ = 0;
     Level *level_ = nullptr; // the innermost
-    bool gaveUp_ = false;
 };
 
 } // namespace dvs::data

@@ -86,21 +86,23 @@ HYP_ReturnStatus Update(DVSData *list, std::string_view name, const void *data, 
 
 } // namespace
 
+HYP_ReturnStatus EntryTooLarge(std::string_view name, std::uint32_t dataLen, std::uint32_t serialSize) {
+    if (dataLen > serialSize)
+        Emit(kDetail, "Datalen %u, serial size %u for prop %.*s will cause unsigned operation warp\n",
+             dataLen, serialSize, PrintLen(name), name.data());
+    else
+        Emit(kDetail, "Serial size %u for prop %.*s will cause unsigned operation warp\n", serialSize,
+             PrintLen(name), name.data());
+    return HYP_BAD_PARAM;
+}
+
 /// Append(), as part of the exported function: the call costs as much as the checks.
 [[gnu::always_inline]] inline HYP_ReturnStatus AppendHere(DVSData *list, std::string_view name,
                                                           const void *data, std::uint32_t dataLen,
                                                           std::uint32_t propType) {
-    const std::uint32_t serialSize = EntrySize(dataLen);
-    if (dataLen > serialSize) [[unlikely]] {
-        Emit(kDetail, "Datalen %u, serial size %u for prop %.*s will cause unsigned operation warp\n",
-             dataLen, serialSize, PrintLen(name), name.data());
-        return HYP_BAD_PARAM;
-    }
-    if (serialSize > UINT32_MAX - kImageOffset) [[unlikely]] {
-        Emit(kDetail, "Serial size %u for prop %.*s will cause unsigned operation warp\n", serialSize,
-             PrintLen(name), name.data());
-        return HYP_BAD_PARAM;
-    }
+    std::uint32_t serialSize = 0;
+    if (const HYP_ReturnStatus status = CheckedEntrySize(name, dataLen, &serialSize); status != HYP_OK)
+        return status;
     if (Emits(kDetail)) [[unlikely]]
         EmitAdding(name, dataLen, list->serialSize);
 

@@ -46,6 +46,19 @@ void EmitOldVersion(std::uint32_t version);
 void EmitBufferSize(std::uint32_t bufSize);
 void EmitWriting(std::string_view name, std::uint32_t dataLen, std::uint32_t entrySize);
 
+/// HYP_BAD_PARAM after a message.
+[[nodiscard]] HYP_ReturnStatus EntryTooLarge(std::string_view name, std::uint32_t dataLen,
+                                             std::uint32_t serialSize);
+
+/// The size of the entry for a value of that length; HYP_BAD_PARAM for lengths at which 32-bit sizes wrap.
+[[nodiscard]] inline HYP_ReturnStatus CheckedEntrySize(std::string_view name, std::uint32_t dataLen,
+                                                       std::uint32_t *serialSize) {
+    *serialSize = EntrySize(dataLen);
+    if (dataLen <= *serialSize && *serialSize <= UINT32_MAX - kImageOffset) [[likely]]
+        return HYP_OK;
+    return EntryTooLarge(name, dataLen, *serialSize);
+}
+
 /// Name comparison of lookups: equal, or equal in the first 128 characters. `field` is any 128-byte name
 /// field.
 [[nodiscard]] inline bool NameMatches(const char *field, std::string_view name) {

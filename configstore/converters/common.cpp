@@ -53,12 +53,7 @@ void CopyBounded(std::span<uint8_t> slot, const char *text) {
 
 int32_t StoreAs(const LoadArgs &args, std::string_view key, std::span<const uint8_t> value,
                 uint32_t propType) {
-    if (args.image) {
-        args.image->Update(key, value, propType);
-        return 0;
-    }
-    return static_cast<int32_t>(
-        DVSData_Update(args.list, key.data(), value.data(), static_cast<uint32_t>(value.size()), propType));
+    return static_cast<int32_t>(args.list->Update(key, value, propType));
 }
 
 void LoadNumber(configstore::Object *object, const char *name, std::span<uint8_t> value,

@@ -3,7 +3,7 @@
 #define CONFIGSTORE_CONVERTERS_COMMON_H
 
 // What the converters share: bytes in and out of packed values, texts of fixed slots, enumeration tables, and
-// owners for everything the store hands out. No converter frees by hand or looks past the value it was given.
+// owners for everything the store hands out. No converter frees by hand or reads past the value it was given.
 //
 // Values are little-endian, as is every host this library runs on.
 
@@ -112,8 +112,7 @@ private:
     std::size_t size_ = 0;
 };
 
-/// DVSData_Update of the list under construction, whatever it is built as; the status is the converter's. A
-/// NUL follows the key.
+/// DVSData_Update of the list under construction; the status is the converter's.
 [[nodiscard]] int32_t StoreAs(const LoadArgs &args, std::string_view key, std::span<const uint8_t> value,
                               uint32_t propType);
 /// The same with the row's key and type.
@@ -282,7 +281,7 @@ public:
     /// The same with the filter specs of the load.
     [[nodiscard]] int32_t Read(const LoadArgs &args, configstore::Object *parent, const char *name) {
         const configstore::FilterSpec *spec = nullptr;
-        const int32_t status = args.filters->Get(name, &spec);
+        const int32_t status = args.context.filters->Get(name, &spec);
         return status ? status : Read(parent, spec);
     }
     [[nodiscard]] std::span<configstore::Object *const> items() const {

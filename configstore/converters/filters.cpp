@@ -141,7 +141,7 @@ int32_t LoadFilters(const LoadArgs &args) {
     if (size > std::numeric_limits<int32_t>::max()) return kFailed;
     Block block;
     if (!block.Allocate(size)) {
-        config::LogError("Failed to alloc memory for DVFilterConfig\n");
+        args.context.messages.Error("Failed to alloc memory for DVFilterConfig\n");
         return kFailed;
     }
     const auto value = block.bytes();

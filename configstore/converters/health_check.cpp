@@ -24,7 +24,7 @@ const char *HealthCheckInstance(const char *key) {
 int32_t SaveHealthCheck(const SaveArgs &args) {
     const char *id = HealthCheckInstance(args.key);
     if (!id) {
-        config::LogError("Unknown health check type %s\n", args.key);
+        args.context.messages.Error("Unknown health check type %s\n", args.key);
         return kFailed;
     }
     if (args.value.size() < layout::kHealthCheck.size) return kFailed;
@@ -44,7 +44,7 @@ int32_t LoadHealthCheck(const LoadArgs &args) {
     if (status) return status == configstore::NOT_FOUND ? 0 : status;
     Block block;
     if (!block.Allocate(layout::kHealthCheck.size)) {
-        config::LogError("Failed to alloc memory for DVSHealthchkDeploy\n");
+        args.context.messages.Error("Failed to alloc memory for DVSHealthchkDeploy\n");
         return kFailed;
     }
     bool enabled = false;

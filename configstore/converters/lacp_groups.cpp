@@ -71,18 +71,18 @@ int32_t SaveGroup(const SaveArgs &args, std::span<const uint8_t> bytes) {
     return configstore::SetValueUint32(group, "uplink_num", Get(bytes, kUplinkNum));
 }
 
-uint32_t AlgorithmOf(const char *text) {
+uint32_t AlgorithmOf(const Context &context, const char *text) {
     const auto index = EnumIndex(LACP_LB_POLICY_SCHEMA, text);
-    if (!index) config::LogError("Unknown lacp lb policy %s\n", text);
+    if (!index) context.messages.Error("Unknown lacp lb policy %s\n", text);
     return index.value_or(kUnknown);
 }
 
-int32_t LoadGroup(configstore::Object *group, std::span<uint8_t> entry) {
+int32_t LoadGroup(const Context &context, configstore::Object *group, std::span<uint8_t> entry) {
     StoreText text;
     if (text.Read(group, "name") == 0) CopyBounded(entry.subspan(kName.offset, kName.size), text.get());
     if (text.Read(group, "key") == 0) CopyBounded(entry.subspan(kKey.offset, kKey.size), text.get());
-    if (text.Read(group, "mode") == 0) Put(entry, kMode, LacpModeOf(text.get()));
-    if (text.Read(group, "load_balance_algorithm") == 0) Put(entry, kAlgorithm, AlgorithmOf(text.get()));
+    if (text.Read(group, "mode") == 0) Put(entry, kMode, LacpModeOf(context, text.get()));
+    if (text.Read(group, "load_balance_algorithm") == 0) Put(entry, kAlgorithm, AlgorithmOf(context, text.get()));
     uint32_t uplinks = 0;
     const int32_t status = configstore::GetValueUint32(group, "uplink_num", &uplinks);
     if (status == 0) Put(entry, kUplinkNum, uplinks);
@@ -91,9 +91,9 @@ int32_t LoadGroup(configstore::Object *group, std::span<uint8_t> entry) {
 
 } // namespace
 
-uint32_t LacpModeOf(const char *text) {
+uint32_t LacpModeOf(const Context &context, const char *text) {
     const auto index = EnumIndex(LACP_MODE_2_CAHRS, text);
-    if (!index) config::LogError("Unknown lacp mode %s\n", text);
+    if (!index) context.messages.Error("Unknown lacp mode %s\n", text);
     return index.value_or(kUnknown);
 }
 
@@ -114,13 +114,13 @@ int32_t LoadLacpGroups(const LoadArgs &args) {
     if (groups.items().empty()) return 0;
     Block block;
     if (!block.Allocate(kHeadSize + groups.items().size() * kGroup.size)) {
-        config::LogError("Failed to alloc memory for LACPTable\n");
+        args.context.messages.Error("Failed to alloc memory for LACPTable\n");
         return kFailed;
     }
     Put(block.bytes(), kCount, static_cast<uint32_t>(groups.items().size()));
     std::size_t at = kHeadSize;
     for (configstore::Object *group : groups.items()) {
-        status = LoadGroup(group, block.bytes().subspan(at, kGroup.size));
+        status = LoadGroup(args.context, group, block.bytes().subspan(at, kGroup.size));
         if (status) return status;
         at += kGroup.size;
     }

@@ -9,7 +9,7 @@
 namespace dvs::convert {
 
 /// The value of a mode's text; 0xFFFFFFFF, after a message, for a text that is none.
-uint32_t LacpModeOf(const char *text);
+uint32_t LacpModeOf(const Context &context, const char *text);
 
 /// Type 16: a table of groups <-> the instances of "lacp_groups", keyed by the group key.
 int32_t SaveLacpGroups(const SaveArgs &args);

@@ -49,11 +49,11 @@ int32_t SaveMacSecurity(const SaveArgs &args) {
 }
 
 int32_t LoadEtherswitchMacSecurity(const LoadArgs &args) {
-    return dvsSwitchClass == 0 ? LoadMacSecurity(args) : 0;
+    return args.context.switchClass == 0 ? LoadMacSecurity(args) : 0;
 }
 
 int32_t LoadVswitchMacSecurity(const LoadArgs &args) {
-    return dvsSwitchClass == 0 ? 0 : LoadMacSecurity(args);
+    return args.context.switchClass == 0 ? 0 : LoadMacSecurity(args);
 }
 
 } // namespace dvs::convert

@@ -204,16 +204,16 @@ uint16_t LoadConnecteeTypes(configstore::Object *ports) {
 }
 
 // A text that cannot be read leaves 0, one that the table lacks stores kNotSet after `message`.
-void LoadEnum(configstore::Object *vspan, const char *name, std::span<const char *const> table,
+void LoadEnum(const Context &context, configstore::Object *vspan, const char *name, std::span<const char *const> table,
               const char *message, std::span<uint8_t> session, Slot<uint32_t> slot) {
     StoreText text;
     if (text.Read(vspan, name)) return;
     const auto index = EnumIndex(table, text.get());
-    if (!index) config::LogError("%s: %s\n", message, text.get());
+    if (!index) context.messages.Error("%s: %s\n", message, text.get());
     Put(session, slot, index.value_or(kNotSet));
 }
 
-int32_t LoadSession(configstore::Object *vspan, std::span<uint8_t> session, bool *previous) {
+int32_t LoadSession(const Context &context, configstore::Object *vspan, std::span<uint8_t> session, bool *previous) {
     StoreText text;
     if (text.Read(vspan, "key") == 0) CopyBounded(session.subspan(kKey.offset, kKey.size), text.get());
     if (text.Read(vspan, "name") == 0) CopyBounded(session.subspan(kName.offset, kName.size), text.get());
@@ -228,9 +228,9 @@ int32_t LoadSession(configstore::Object *vspan, std::span<uint8_t> session, bool
     const SessionPorts ports = SessionPorts::Of(vspan);
     Put(session, kReceiveTypes, LoadConnecteeTypes(ports.receive));
     Put(session, kTransmitTypes, LoadConnecteeTypes(ports.transmit));
-    LoadEnum(vspan, "session_type", SESSION_TYPE_LOCAL_ENUM_2_SCHEMA, "Unknown vspan session type in schema",
+    LoadEnum(context, vspan, "session_type", SESSION_TYPE_LOCAL_ENUM_2_SCHEMA, "Unknown vspan session type in schema",
              session, kSessionType);
-    LoadEnum(vspan, "encap_type", ENCAP_TYPE_LOCAL_ENUM_2SCHEMA, "Unknown vspan encap type in schema",
+    LoadEnum(context, vspan, "encap_type", ENCAP_TYPE_LOCAL_ENUM_2SCHEMA, "Unknown vspan encap type in schema",
              session, kEncapType);
     LoadNumber(vspan, "sampling_rate", session, kSamplingRate);
     uint16_t small = 0;
@@ -243,14 +243,14 @@ int32_t LoadSession(configstore::Object *vspan, std::span<uint8_t> session, bool
     return 0;
 }
 
-int32_t LoadTable(std::span<configstore::Object *const> vspans, std::span<uint8_t> value,
+int32_t LoadTable(const Context &context, std::span<configstore::Object *const> vspans, std::span<uint8_t> value,
                   std::size_t recordSize) {
     PortArea area{value.subspan(kHeadSize + vspans.size() * kSession.size), recordSize};
     bool previous = false;
     std::size_t at = kHeadSize;
     for (configstore::Object *vspan : vspans) {
         const auto session = value.subspan(at, kSession.size);
-        const int32_t status = LoadSession(vspan, session, &previous);
+        const int32_t status = LoadSession(context, vspan, session, &previous);
         if (status) return status;
         LoadSessionPorts(SessionPorts::Of(vspan), session, &area);
         at += kSession.size;
@@ -258,22 +258,23 @@ int32_t LoadTable(std::span<configstore::Object *const> vspans, std::span<uint8_
     return 0;
 }
 
-// Whether this switch has wide port records. A port's own object knows nothing of the switch: the switch that
-// is being loaded does, and where none is, the flag that a whole save or load sets.
+// Whether this switch has wide port records. A port's own object does not tell the switch's version.
 int32_t HasWideRecords(const LoadArgs &args, bool *wide) {
-    configstore::Object *owner = args.propClass == DVS_PROP_CLASS_PORT ? dvsLoadedSwitch : args.root;
-    if (!owner) {
-        *wide = dvsWidePortRecords;
+    const Context &context = args.context;
+    if (args.propClass == DVS_PROP_CLASS_PORT) {
+        if (context.loaded && !context.loaded->hasOverlayFlag) TraceNoOverlayFlag(context.messages);
+        *wide = context.wideRecords;
         return 0;
     }
-    uint32_t version = 0;
-    const int32_t status = ReadSwitchVersion(owner, &version);
-    *wide = state::HasWidePortRecords(version);
+    SwitchVersion version = {};
+    const int32_t status = ReadSwitchVersion(context.messages, args.root, &version);
+    *wide = state::HasWidePortRecords(version.number);
     return status;
 }
 
-bool IsKeyOfThisClass(std::string_view key) {
-    return dvsSwitchClass
+bool IsKeyOfThisClass(const LoadArgs &args) {
+    const std::string_view key = args.key;
+    return args.context.switchClass
                ? key == "com.orbeno.vswitch.mirrorSessions" || key == "com.orbeno.vswitch.port.mirrorSessions"
                : key == "com.orbeno.etherswitch.mirrorSessions" ||
                      key == "com.orbeno.etherswitch.port.mirrorSessions";
@@ -285,7 +286,7 @@ int32_t SaveMirrorSessions(const SaveArgs &args) {
     if (args.value.size() < kSessionCount.End()) return kFailed;
     const uint32_t count = Get(args.value, kSessionCount);
     if (count == 0) return 0;
-    const std::size_t recordSize = PortRecordSize(dvsWidePortRecords);
+    const std::size_t recordSize = PortRecordSize(args.context.wideRecords);
     if (!IsWhole(args.value, count, recordSize)) return kFailed;
     PortRecords ports{args.value.subspan(kHeadSize + std::size_t{count} * kSession.size), recordSize};
     int32_t status = 0;
@@ -296,13 +297,9 @@ int32_t SaveMirrorSessions(const SaveArgs &args) {
 }
 
 int32_t LoadMirrorSessions(const LoadArgs &args) {
-    if (!IsKeyOfThisClass(args.key)) return 0;
+    if (!IsKeyOfThisClass(args)) return 0;
     Instances vspans;
     const int32_t found = vspans.Read(args, args.parent, args.leaf);
-    // A switch that is being loaded has had its version read before any of its ports: most have no sessions,
-    // and those need not ask again.
-    const bool known = args.propClass == DVS_PROP_CLASS_PORT && args.image;
-    if (known && found == configstore::NOT_FOUND) return 0;
     bool wide = false;
     int32_t status = HasWideRecords(args, &wide);
     if (status) return status;
@@ -319,7 +316,7 @@ int32_t LoadMirrorSessions(const LoadArgs &args) {
     Block block;
     if (!block.Allocate(kHeadSize + vspans.items().size() * kSession.size +
                         std::max(ports, records) * recordSize)) {
-        config::LogError("Failed to alloc memory for DVMirrorSessionTable\n");
+        args.context.messages.Error("Failed to alloc memory for DVMirrorSessionTable\n");
         return kFailed;
     }
     const auto value = block.bytes();
@@ -327,7 +324,7 @@ int32_t LoadMirrorSessions(const LoadArgs &args) {
     Put(value, kVersion, kFormatVersion);
     Put(value, kSessionCount, static_cast<uint32_t>(vspans.items().size()));
     Put(value, kPortCount, static_cast<uint32_t>(ports));
-    status = LoadTable(vspans.items(), value, recordSize);
+    status = LoadTable(args.context, vspans.items(), value, recordSize);
     return status ? status : Store(args, value);
 }
 

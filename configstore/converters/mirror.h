@@ -8,8 +8,8 @@
 
 namespace dvs::convert {
 
-/// Type 9: one table of sessions <-> the instances of "vspans". A save asks dvsWidePortRecords for the size
-/// of the port records; a load asks the version of the switch.
+/// Type 9: one table of sessions <-> the instances of "vspans". A load reads the switch's version for the
+/// size of the port records, except for ports; all others take it from the context.
 int32_t SaveMirrorSessions(const SaveArgs &args);
 int32_t LoadMirrorSessions(const LoadArgs &args);
 

@@ -78,7 +78,7 @@ int32_t LoadTrafficResources(const LoadArgs &args) {
     if (pools.items().empty()) return 0;
     Block block;
     if (!block.Allocate(kHeadSize + pools.items().size() * kPool.size)) {
-        config::LogError("Failed to alloc memory for DVSPropResPoolsCfg\n");
+        args.context.messages.Error("Failed to alloc memory for DVSPropResPoolsCfg\n");
         return kFailed;
     }
     Put(block.bytes(), kCount, static_cast<uint32_t>(pools.items().size()));
@@ -111,7 +111,7 @@ int32_t LoadPoolKeys(const LoadArgs &args) {
     if (keys.items().empty()) return 0;
     Block block;
     if (!block.Allocate(kHeadSize + keys.items().size() * kPoolKey.size)) {
-        config::LogError("Failed to alloc memory for DVSPropResPoolsList\n");
+        args.context.messages.Error("Failed to alloc memory for DVSPropResPoolsList\n");
         return 0; // the load goes on without the list
     }
     Put(block.bytes(), kCount, static_cast<uint32_t>(keys.items().size()));

@@ -38,7 +38,7 @@ int32_t LoadPortLacp(const LoadArgs &args) {
     uint8_t record[layout::kPortLacp.size] = {};
     const std::span<uint8_t> value(record);
     Put(value, kEnabled, enabled);
-    Put(value, kMode, LacpModeOf(mode.get()));
+    Put(value, kMode, LacpModeOf(args.context, mode.get()));
     return Store(args, value);
 }
 

@@ -92,7 +92,7 @@ int32_t LoadPortVlan(const LoadArgs &args, Family family) {
     configstore::Object *vlan = nullptr;
     if (configstore::GetSubObject(args.parent, args.leaf, nullptr, &vlan) || !vlan) return 0;
     const configstore::FilterSpec *spec = nullptr;
-    const int32_t status = args.filters->Get("trunk_vlan_ids", &spec);
+    const int32_t status = args.context.filters->Get("trunk_vlan_ids", &spec);
     if (status) return status;
     Instances ranges;
     (void)ranges.Read(vlan, spec); // a list that cannot be read is no list
@@ -101,10 +101,10 @@ int32_t LoadPortVlan(const LoadArgs &args, Family family) {
     if (!block.Allocate(kPortVlan.size + ranges.items().size() * kRangeSize)) {
         // The one skips the property, the other fails the load; both are relied on.
         if (family == Family::kEtherswitch) {
-            config::LogError("Failed to alloc memory for ESPortVlanPolicy\n");
+            args.context.messages.Error("Failed to alloc memory for ESPortVlanPolicy\n");
             return 0;
         }
-        config::LogError("Failed to alloc memory for VSPortVlanPolicy\n");
+        args.context.messages.Error("Failed to alloc memory for VSPortVlanPolicy\n");
         return kFailed;
     }
     if (ranges.items().empty()) {
@@ -122,15 +122,15 @@ int32_t SaveEtherswitchPortVlan(const SaveArgs &args) {
 }
 
 int32_t LoadEtherswitchPortVlan(const LoadArgs &args) {
-    return dvsSwitchClass == 0 ? LoadPortVlan(args, Family::kEtherswitch) : 0;
+    return args.context.switchClass == 0 ? LoadPortVlan(args, Family::kEtherswitch) : 0;
 }
 
 int32_t SaveVswitchPortVlan(const SaveArgs &args) {
-    return dvsSwitchClass == 0 ? 0 : SavePortVlan(args, Family::kVswitch);
+    return args.context.switchClass == 0 ? 0 : SavePortVlan(args, Family::kVswitch);
 }
 
 int32_t LoadVswitchPortVlan(const LoadArgs &args) {
-    return dvsSwitchClass == 0 ? 0 : LoadPortVlan(args, Family::kVswitch);
+    return args.context.switchClass == 0 ? 0 : LoadPortVlan(args, Family::kVswitch);
 }
 
 } // namespace dvs::convert

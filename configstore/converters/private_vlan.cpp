@@ -42,16 +42,16 @@ int32_t SaveEntry(const SaveArgs &args, std::span<const uint8_t> entry) {
 }
 
 // The type byte of a store text; nothing, after a message, for a text that is none.
-std::optional<uint8_t> ParseType(const char *text) {
+std::optional<uint8_t> ParseType(const Context &context, const char *text) {
     const auto index = EnumIndex(PVLAN_2_CHARS, text);
     if (!index) {
-        config::LogError("Unknown PvlanType %s\n", text);
+        context.messages.Error("Unknown PvlanType %s\n", text);
         return std::nullopt;
     }
     return static_cast<uint8_t>(CHARS_2_PVLAN[*index]);
 }
 
-int32_t LoadEntry(configstore::Object *instance, std::span<uint8_t> entry) {
+int32_t LoadEntry(const Context &context, configstore::Object *instance, std::span<uint8_t> entry) {
     uint16_t id = 0;
     int32_t status = configstore::GetValueUint16(instance, "primary_id", &id);
     if (status) return status;
@@ -62,30 +62,30 @@ int32_t LoadEntry(configstore::Object *instance, std::span<uint8_t> entry) {
     StoreText text;
     status = text.Read(instance, "type");
     if (status) return status;
-    const auto type = ParseType(text.get());
+    const auto type = ParseType(context, text.get());
     if (!type) return kFailed;
     Put(entry, kType, *type);
     return 0;
 }
 
 // The one key that this switch keeps its map under.
-int32_t ChooseKey(configstore::Object *switchObject, const char **key) {
+int32_t ChooseKey(const Context &context, configstore::Object *switchObject, const char **key) {
     configstore::Object *product = nullptr;
     int32_t status = configstore::GetSubObject(switchObject, "product", nullptr, &product);
     if (status) {
-        config::LogError("Failed to get product obj, rc: %d\n", status);
+        context.messages.Error("Failed to get product obj, rc: %d\n", status);
         return status;
     }
     StoreText forwardingClass;
     status = forwardingClass.Read(product, "forwarding_class");
     if (status) {
-        config::LogError("Failed to get forwarding_class, rc: %d\n", status);
+        context.messages.Error("Failed to get forwarding_class, rc: %d\n", status);
         return status;
     }
-    uint32_t version = 0;
-    if (ReadSwitchVersion(switchObject, &version)) return kFailed;
+    SwitchVersion version = {};
+    if (ReadSwitchVersion(context.messages, switchObject, &version)) return kFailed;
     const bool isVswitch =
-        std::strcmp(forwardingClass.get(), "cswitch") == 0 || state::IsOverlayVersion(version);
+        std::strcmp(forwardingClass.get(), "cswitch") == 0 || state::IsOverlayVersion(version.number);
     *key = isVswitch ? kVswitchKey : kEtherswitchKey;
     return 0;
 }
@@ -103,7 +103,7 @@ int32_t SavePrivateVlans(const SaveArgs &args) {
 
 int32_t LoadPrivateVlans(const LoadArgs &args) {
     const char *key = nullptr;
-    int32_t status = ChooseKey(args.root, &key);
+    int32_t status = ChooseKey(args.context, args.root, &key);
     if (status) return status;
     if (args.key != key) return 0;
 
@@ -113,13 +113,13 @@ int32_t LoadPrivateVlans(const LoadArgs &args) {
     if (entries.items().empty()) return 0;
     Block block;
     if (!block.Allocate(entries.items().size() * kEntry.size)) {
-        config::LogError(key == kVswitchKey ? "Failed to alloc memory for VSPvlanMapEntry\n"
+        args.context.messages.Error(key == kVswitchKey ? "Failed to alloc memory for VSPvlanMapEntry\n"
                                             : "Failed to alloc memory for ESPvlanMapEntry\n");
         return kFailed;
     }
     std::size_t at = 0;
     for (configstore::Object *instance : entries.items()) {
-        status = LoadEntry(instance, block.bytes().subspan(at, kEntry.size));
+        status = LoadEntry(args.context, instance, block.bytes().subspan(at, kEntry.size));
         if (status) return status;
         at += kEntry.size;
     }

@@ -43,8 +43,8 @@ int32_t LoadUint32(const LoadArgs &args) {
 
 int32_t LoadMtu(const LoadArgs &args) {
     const bool wanted = args.key == "com.orbeno.common.portset.mtu" ||
-                        (dvsSwitchClass == 1 && args.key == "com.orbeno.vswitch.mtu") ||
-                        (dvsSwitchClass == 0 && args.key == "com.orbeno.etherswitch.mtu");
+                        (args.context.switchClass == 1 && args.key == "com.orbeno.vswitch.mtu") ||
+                        (args.context.switchClass == 0 && args.key == "com.orbeno.etherswitch.mtu");
     return wanted ? LoadUint32(args) : 0;
 }
 
@@ -53,7 +53,7 @@ int32_t SaveText(const SaveArgs &args) {
 }
 
 int32_t LoadText(const LoadArgs &args) {
-    if (dvsSwitchClass == 0 ? args.key == "com.orbeno.vswitch.multicastFilter"
+    if (args.context.switchClass == 0 ? args.key == "com.orbeno.vswitch.multicastFilter"
                             : args.key == "com.orbeno.etherswitch.multicastFilter")
         return 0;
     StoreText text;

@@ -25,7 +25,7 @@ int32_t SaveSwitchAddress(const SaveArgs &args) {
     if (args.value.size() < sizeof(in_addr)) return kFailed;
     char text[INET_ADDRSTRLEN];
     if (!inet_ntop(AF_INET, args.value.data(), text, sizeof text)) {
-        config::LogError("Failed to parse integer to Ipv4Address: %u\n", GetU32(args.value, 0));
+        args.context.messages.Error("Failed to parse integer to Ipv4Address: %u\n", GetU32(args.value, 0));
         return kFailed;
     }
     return configstore::SetValueStr(args.parent, args.leaf, text);

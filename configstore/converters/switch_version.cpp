@@ -8,30 +8,33 @@
 
 namespace dvs::convert {
 
-int32_t ReadSwitchVersion(configstore::Object *switchObject, uint32_t *version) {
+void TraceNoOverlayFlag(const config::Messages &messages) {
+    messages.Trace("Unabled to get ovl_enabled\n");
+}
+
+int32_t ReadSwitchVersion(const config::Messages &messages, configstore::Object *switchObject,
+                          SwitchVersion *version) {
     configstore::Object *product = nullptr;
     int32_t status = configstore::GetSubObject(switchObject, "product", "", &product);
     if (status) {
-        config::LogError("Failed to get product obj, rc: %d\n", status);
+        messages.Error("Failed to get product obj, rc: %d\n", status);
         return status;
     }
     StoreText text;
     status = text.Read(product, "version");
     if (status) {
-        config::LogError("Failed to get version obj, rc: %d\n", status);
+        messages.Error("Failed to get version obj, rc: %d\n", status);
         return status;
     }
     bool overlay = false;
-    if (configstore::GetValueBool(switchObject, "ovl_enabled", &overlay)) {
-        config::LogTrace("Unabled to get ovl_enabled\n");
-        overlay = false;
-    }
-    const uint32_t number = layout::VersionNumber(text.get(), overlay);
+    const bool hasFlag = configstore::GetValueBool(switchObject, "ovl_enabled", &overlay) == 0;
+    if (!hasFlag) TraceNoOverlayFlag(messages);
+    const uint32_t number = layout::VersionNumber(text.get(), hasFlag && overlay);
     if (number == 0) {
-        config::LogError("Unknown vds version %s\n", text.get());
+        messages.Error("Unknown vds version %s\n", text.get());
         return kFailed;
     }
-    *version = number;
+    *version = {number, hasFlag};
     return 0;
 }
 
@@ -40,16 +43,16 @@ int32_t SaveSwitchVersion(const SaveArgs &args) {
     const char *text = layout::VersionText(GetU32(args.value, 0));
     if (!text) {
         // The message has a place for a text that cannot be there: the number has none.
-        config::LogError("Unknow version : %s\n", "(null)");
+        args.context.messages.Error("Unknow version : %s\n", "(null)");
         return kFailed;
     }
     return configstore::SetValueStr(args.parent, args.leaf, text);
 }
 
 int32_t LoadSwitchVersion(const LoadArgs &args) {
-    uint32_t version = 0;
-    if (const int32_t status = ReadSwitchVersion(args.root, &version)) return status;
-    return StoreNumber(args, version);
+    SwitchVersion version = {};
+    if (const int32_t status = ReadSwitchVersion(args.context.messages, args.root, &version)) return status;
+    return StoreNumber(args, version.number);
 }
 
 } // namespace dvs::convert

@@ -12,9 +12,13 @@
 namespace dvs::convert {
 
 /// Reads the version of the switch whose root object is `switchObject`. Returns 0 with *version set, the
-/// store's status for a missing "product" or "version", or -1 for a text that names no version; all three
+/// store's status for a missing "product" or "version", or -1 for a text that names no version; the last two
 /// after a message.
-[[nodiscard]] int32_t ReadSwitchVersion(configstore::Object *switchObject, uint32_t *version);
+[[nodiscard]] int32_t ReadSwitchVersion(const config::Messages &messages, configstore::Object *switchObject,
+                                        SwitchVersion *version);
+
+/// The trace that a reading without the overlay flag prints.
+void TraceNoOverlayFlag(const config::Messages &messages);
 
 /// Type 15: a version number <-> "version". Only the numbers that have a text can be saved.
 int32_t SaveSwitchVersion(const SaveArgs &args);

@@ -209,15 +209,15 @@ int32_t SaveEtherswitchTeaming(const SaveArgs &args) {
 }
 
 int32_t LoadEtherswitchTeaming(const LoadArgs &args) {
-    return dvsSwitchClass == 0 ? LoadTeaming(args) : 0;
+    return args.context.switchClass == 0 ? LoadTeaming(args) : 0;
 }
 
 int32_t SaveVswitchTeaming(const SaveArgs &args) {
-    return dvsSwitchClass == 0 ? 0 : SaveTeaming(args, Family::kVswitch);
+    return args.context.switchClass == 0 ? 0 : SaveTeaming(args, Family::kVswitch);
 }
 
 int32_t LoadVswitchTeaming(const LoadArgs &args) {
-    return dvsSwitchClass == 0 ? 0 : LoadTeaming(args);
+    return args.context.switchClass == 0 ? 0 : LoadTeaming(args);
 }
 
 } // namespace dvs::convert

@@ -14,7 +14,7 @@ int32_t SaveTxUplink(const SaveArgs &args) {
 }
 
 int32_t LoadTxUplink(const LoadArgs &args) {
-    const bool wanted = dvsSwitchClass == 0 ? args.key == "com.orbeno.etherswitch.port.txUplink"
+    const bool wanted = args.context.switchClass == 0 ? args.key == "com.orbeno.etherswitch.port.txUplink"
                                             : args.key == "com.orbeno.vswitch.port.txUplink";
     if (!wanted) return 0;
     bool always = false;

@@ -25,7 +25,7 @@ int32_t StoreSlots(const LoadArgs &args, std::span<char *const> texts, std::size
                    const char *noMemory) {
     Block value;
     if (!value.Allocate(texts.size() * slotSize + kCountSize)) {
-        config::LogError("%s\n", noMemory);
+        args.context.messages.Error("%s\n", noMemory);
         return kFailed;
     }
     PutU32(value.bytes(), 0, static_cast<uint32_t>(texts.size()));

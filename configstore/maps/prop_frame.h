@@ -8,7 +8,8 @@
 // converters use its two sub-object functions.
 //
 // Statuses are the store's (platform/configstore.h) or -1 for a failure of the library's own. Nothing here
-// locks: the process-wide values below are written without one, and callers run one save or load at a time.
+// locks. SaveProp and LoadProps read the process-wide values below at their entry; whole saves and loads set
+// the first two for each switch. Callers run one save or load at a time.
 
 #include <cstdint>
 #include <type_traits>
@@ -30,10 +31,6 @@ extern uint32_t dvsSwitchClass;
 /// Whether the switch at hand has a version above 99, hence the wide port records of mirror sessions. Set for
 /// saves and for loads.
 extern bool dvsWidePortRecords;
-
-/// The store object of the switch being loaded, which a port's converter reads where its own object lacks the
-/// switch's version or class; null outside a whole load.
-extern configstore::Object *dvsLoadedSwitch;
 
 /// Milliseconds spent in converter and store calls. SaveProp adds to it, the save resets and reports it.
 extern int64_t dvsConfigStoreTimeMs;

@@ -1,6 +1,6 @@
 /* SPDX-License-Identifier: Apache-2.0 */
-// The load side of the frame (prop_loader.h). Like the other side it knows rows, paths and types, and nothing
-// of what a value looks like.
+// The load side of the frame (prop_loader.h). It knows rows, paths and types; what a value looks like is the
+// converters' business.
 
 #include "configstore/maps/prop_loader.h"
 
@@ -22,8 +22,8 @@ constexpr const char *kTrafficResourcesLeaf = "traffic_resources";
 
 } // namespace
 
-PropLoader::PropLoader(uint32_t propClass)
-    : propClass_(propClass), rest_(GetConfigMap(static_cast<int>(KnownClass(propClass)))) {
+PropLoader::PropLoader(const convert::Context &context, uint32_t propClass)
+    : context_(context), propClass_(propClass), rest_(GetConfigMap(static_cast<int>(KnownClass(propClass)))) {
     for (; rest_->key && rowNum_ < kMaxRows; ++rest_)
         rows_[rowNum_++] = Prepared(*rest_);
 }
@@ -52,12 +52,12 @@ uint32_t PropLoader::ParentOf(const DVSProp2ConfigEntry &row, uint32_t depth) {
     return parentNum_++;
 }
 
-int32_t PropLoader::LoadRows(configstore::Object *object, DVSData *list, data::GrowingImage *image,
+int32_t PropLoader::LoadRows(data::GrowingImage *image, configstore::Object *object,
                              configstore::Object *trafficResources) {
     parents_[0] = {nullptr, object, 0, true};
     for (uint32_t i = 1; i < parentNum_; ++i)
         parents_[i].isReached = false;
-    convert::LoadArgs args = {object, object, list, nullptr, {}, 0, propClass_, &filters_, image};
+    convert::LoadArgs args = {context_, object, object, image, nullptr, {}, 0, propClass_};
     for (const Row &row : std::span(rows_.data(), rowNum_)) {
         if (const int32_t status = LoadRow(row, &args)) return status;
     }
@@ -85,8 +85,8 @@ inline int32_t PropLoader::LoadRow(const Row &row, convert::LoadArgs *args) {
     args->leaf = row.leaf;
     args->key = row.key;
     args->propType = row.propType;
-    status = row.load ? row.load(*args) : -1;
-    return status ? FailedToLoad(row, status) : 0;
+    status = row.load ? row.load(*args) : kFailed;
+    return status ? Failed(row, status) : 0;
 }
 
 void PropLoader::Reach(Parent *parent, configstore::Object *object) {
@@ -94,22 +94,46 @@ void PropLoader::Reach(Parent *parent, configstore::Object *object) {
     parent->isReached = true;
 }
 
-int32_t PropLoader::FailedToLoad(const Row &row, int32_t status) {
-    LogError("Faild to load prop: %s, key: %s, type:%d from configstore, rc: %d\n", row.row->key, row.leaf,
-             static_cast<int>(row.row->converterType), status);
+int32_t PropLoader::Failed(const Row &row, int32_t status) const {
+    context_.messages.Error("Faild to load prop: %s, key: %s, type:%d from configstore, rc: %d\n", row.row->key,
+                            row.leaf, static_cast<int>(row.row->converterType), status);
     return status;
 }
 
 int32_t PropLoader::LoadInto(data::GrowingImage *image, const char *propsName, configstore::Object *object,
                              uint32_t serializeFlags, configstore::Object *trafficResources) {
-    image->BeginEntry(propsName, kPropTypeState);
-    image->BeginBuffer();
-    const int32_t status = LoadRows(object, nullptr, image, trafficResources);
-    if (status == 0) data::EmitOldVersion(serializeFlags);
-    image->EndBuffer();
-    image->EndEntry();
-    if (status) LogError("Load dvs props from configstore failed, props type:%s\n", propsName);
+    context_.messages.Trace("LoadProps: %s\n", propsName);
+    int32_t status = image->BeginNested(propsName, kPropTypeState) == HYP_OK ? 0 : kFailed;
+    if (status == 0) {
+        status = LoadRows(image, object, trafficResources);
+        if (status == 0)
+            status = static_cast<int32_t>(
+                image->EndNested(serializeFlags, data::GrowingImage::Adding::kUpdate));
+        else
+            image->DropNested();
+    }
+    if (status) Failed(propsName);
     return status;
+}
+
+int32_t PropLoader::LoadAlone(data::GrowingImage *image, const char *propsName, configstore::Object *object,
+                              DVSData *outList, uint32_t serializeFlags,
+                              configstore::Object *trafficResources) {
+    context_.messages.Trace("LoadProps: %s\n", propsName);
+    int32_t status = image->BeginBuffer() == HYP_OK ? 0 : kFailed;
+    if (status == 0) status = LoadRows(image, object, trafficResources);
+    if (status == 0) status = static_cast<int32_t>(image->EndBuffer(serializeFlags));
+    if (status == 0) {
+        const data::Bytes props = image->Finished();
+        status = static_cast<int32_t>(DVSData_Update(
+            outList, propsName, props.data(), static_cast<uint32_t>(props.size()), kPropTypeState));
+    }
+    if (status) Failed(propsName);
+    return status;
+}
+
+void PropLoader::Failed(const char *propsName) const {
+    context_.messages.Error("Load dvs props from configstore failed, props type:%s\n", propsName);
 }
 
 } // namespace dvs::config

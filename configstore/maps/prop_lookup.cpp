@@ -26,29 +26,24 @@ const DVSProp2ConfigEntry *FindRow(const DVSProp2ConfigEntry *table, const char 
     return nullptr;
 }
 
-void RowIndex::Build(const DVSProp2ConfigEntry *table, ConverterType defaultType) {
-    table_ = table;
-    defaultType_ = defaultType;
-    rowNum_ = last_ = 0;
-    hasDefault_ = usable_ = false;
-    behind_ = {};
-    slots_ = {};
+RowIndex::RowIndex(const DVSProp2ConfigEntry *table, ConverterType defaultType)
+    : table_(table), defaultType_(defaultType) {
     for (const auto *row = table; row->key && !hasDefault_; ++row) {
         if (rowNum_ == kMaxRows) return;
         hasDefault_ = ConverterTypeOf(*row) == defaultType_;
-        ways_[rowNum_] = WayOf(rowNum_);
+        routes_[rowNum_] = RouteOf(rowNum_);
         if (!hasDefault_) Insert(rowNum_);
         ++rowNum_;
     }
     usable_ = true;
 }
 
-uint8_t RowIndex::WayOf(uint32_t row) const {
+uint8_t RowIndex::RouteOf(uint32_t row) const {
     constexpr uint32_t kDepth = 2;
-    if (table_[row].depth != kDepth) return kOtherWay;
+    if (table_[row].depth != kDepth) return kOtherRoute;
     for (uint32_t i = 0; i < row; ++i) {
         if (table_[i].depth == kDepth && std::strcmp(table_[i].path[0], table_[row].path[0]) == 0)
-            return ways_[i];
+            return routes_[i];
     }
     return static_cast<uint8_t>(row);
 }
@@ -75,19 +70,19 @@ uint32_t RowIndex::Search(const char *key) const {
 }
 
 RowIndex::Found RowIndex::Find(const char *key) {
-    if (!usable_) return {FindRow(table_, key, defaultType_), kOtherWay};
+    if (!usable_) return {FindRow(table_, key, defaultType_), kOtherRoute};
     uint8_t &guess = behind_[last_];
     // A key that only the DEFAULT row takes may be anything: that row is never guessed.
     if (guess == 0 || std::strcmp(table_[guess - 1U].key, key) != 0) {
         const uint32_t row = Search(key);
-        if (row == rowNum_) return {nullptr, kOtherWay};
+        if (row == rowNum_) return {nullptr, kOtherRoute};
         last_ = row;
-        if (hasDefault_ && row == rowNum_ - 1) return {&table_[row], ways_[row]};
+        if (hasDefault_ && row == rowNum_ - 1) return {&table_[row], routes_[row]};
         guess = static_cast<uint8_t>(row + 1);
-        return {&table_[row], ways_[row]};
+        return {&table_[row], routes_[row]};
     }
     last_ = guess - 1U;
-    return {&table_[last_], ways_[last_]};
+    return {&table_[last_], routes_[last_]};
 }
 
 } // namespace dvs::config

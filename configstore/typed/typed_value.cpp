@@ -15,11 +15,14 @@
 #include "configstore/layouts/walk.h"
 #include "configstore/typed/own_form.h"
 #include "configstore/typed/tree.h"
-#include "dvsstate/owned_list.h"
+#include "dvsdata/growing_image.h"
+#include "dvsdata/list_internal.h"
 #include "dvsstate/versions.h"
 
 namespace dvs::typed {
 namespace {
+
+constexpr uint32_t kAnyVersion = 9; // the format does not depend on it
 
 // The converters' process-wide values as the property's own key calls for, and silence. Restored at the end.
 class Surroundings {
@@ -27,13 +30,11 @@ public:
     Surroundings(std::string_view key, const Context &context) {
         dvsSwitchClass = key.find(".vswitch.") != std::string_view::npos ? 1 : 0;
         dvsWidePortRecords = state::HasWidePortRecords(context.version);
-        dvsLoadedSwitch = nullptr;
         dvsconfigstore_debug = -1;
     }
     ~Surroundings() {
         dvsSwitchClass = switchClass_;
         dvsWidePortRecords = wide_;
-        dvsLoadedSwitch = loaded_;
         dvsconfigstore_debug = debug_;
     }
     Surroundings(const Surroundings &) = delete;
@@ -42,7 +43,6 @@ public:
 private:
     uint32_t switchClass_ = dvsSwitchClass;
     bool wide_ = dvsWidePortRecords;
-    configstore::Object *loaded_ = dvsLoadedSwitch;
     int32_t debug_ = dvsconfigstore_debug;
 };
 
@@ -83,8 +83,9 @@ public:
     }
 
     int32_t Save(std::span<const uint8_t> value) {
+        const convert::Context conversion = {.switchClass = dvsSwitchClass, .wideRecords = dvsWidePortRecords};
         const int32_t status =
-            converter_->save({root_.get(), parent_, leaf_, value, row_->key, propClass_, row_->loadPropType});
+            converter_->save({conversion, root_.get(), parent_, leaf_, value, row_->key, propClass_, row_->loadPropType});
         if (status == 0) CorrectNames(value);
         return status;
     }
@@ -108,14 +109,18 @@ public:
 private:
     int32_t Load(std::vector<uint8_t> *bytes, bool *found) {
         if (const int32_t status = DescribeSwitch()) return status;
-        state::OwnedList list;
-        if (state::NewList(list) != HYP_OK) return convert::kFailed;
+        data::GrowingImage list;
+        if (list.BeginBuffer() != HYP_OK) return convert::kFailed;
         convert::KnownFilters filters;
-        const int32_t status = converter_->load(
-            {root_.get(), parent_, list.get(), leaf_, row_->key, row_->loadPropType, propClass_, &filters});
-        DVSDataEntry *entry = nullptr;
-        *found = status == 0 && DVSData_Lookup(list.get(), row_->key, &entry) == HYP_OK;
-        if (*found) bytes->assign(entry->data, entry->data + entry->dataLen);
+        const convert::Context conversion = {
+            .switchClass = dvsSwitchClass, .wideRecords = dvsWidePortRecords, .filters = &filters};
+        int32_t status = converter_->load({conversion, root_.get(), parent_, &list, leaf_, row_->key,
+                                           row_->loadPropType, propClass_});
+        if (status == 0) status = static_cast<int32_t>(list.EndBuffer(kAnyVersion));
+        data::InPlaceList entries;
+        data::EntryRef entry;
+        *found = status == 0 && entries.Open(list.Finished()) == HYP_OK && entries.Next(&entry);
+        if (*found) bytes->assign(entry.value.begin(), entry.value.end());
         return status;
     }
 

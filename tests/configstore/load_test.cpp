@@ -74,8 +74,7 @@ TEST_F(LoadTest, BringsBackWhatWasSaved) {
     EXPECT_TRUE(Said("Loading switch:a\n"));
 }
 
-// A load whose work nobody follows writes its buffer at once; one that is followed builds lists.
-TEST_F(LoadTest, GivesTheSameBytesWhetherOrNotItIsFollowed) {
+TEST_F(LoadTest, GivesTheSameBytesAtEveryDebugLevel) {
     const auto bytes = [](int level) {
         dvsconfigstore_debug = level;
         void *buf = nullptr;
@@ -105,7 +104,7 @@ TEST_F(LoadTest, GivesTheSameBytesWhetherOrNotItIsFollowed) {
     ASSERT_EQ(0, Save({other, sw}));
     EXPECT_EQ(bytes(1), bytes(-1)) << "two switches";
 
-    // What only lists can do: ports of one name, and of names that the switch has for entries of its own.
+    // Ports of one name, and of names that the switch has for entries of its own.
     for (const std::string &key :
          {std::string("p1"), std::string("className"), std::string("hostPropList"), std::string(200, 'x')}) {
         configstore::Object *object = New("c");
@@ -117,7 +116,7 @@ TEST_F(LoadTest, GivesTheSameBytesWhetherOrNotItIsFollowed) {
         EXPECT_EQ(bytes(1), bytes(-1)) << key;
     }
 
-    // Vendors' properties of one port: some that meet in one name, then more than the image takes.
+    // Vendors' properties of one port: some that meet in one name, alone and among many.
     for (const int others : {0, 100}) {
         configstore::Object *object = New("c");
         configstore::Object *data = Sub(Sub(object, "ports", "p"), "data");
@@ -136,12 +135,12 @@ TEST_F(LoadTest, GivesTheSameBytesWhetherOrNotItIsFollowed) {
     }
 }
 
-TEST_F(LoadTest, ReportsOnceWhicheverWayItGoes) {
+TEST_F(LoadTest, ReportsOnce) {
     configstore::Object *object = New("a");
     configstore::Object *group = Sub(Sub(object, "settings"), "lacp_groups", "g");
     ASSERT_EQ(0, configstore::SetValueStr(group, "mode", "odd"));
     ASSERT_EQ(0, configstore::SetValueUint32(group, "uplink_num", 1));
-    // Two ports of one name, which only lists can tell what to do with.
+    // Two ports of one name.
     Sub(object, "ports", "p1");
     ASSERT_EQ(0, configstore::SetValueStr(Sub(object, "ports", "p2"), "key", "p1"));
     Put(object);
@@ -215,7 +214,9 @@ TEST_F(LoadTest, SetsClassAndPortRecordWidthForTheConverters) {
     EXPECT_EQ(1u, Load().size());
     EXPECT_EQ(2u, dvsSwitchClass);
     EXPECT_TRUE(dvsWidePortRecords);
-    EXPECT_EQ(nullptr, dvsLoadedSwitch) << "only as long as the load lasts";
+    dvsWidePortRecords = false;
+    EXPECT_EQ(1u, Load().size());
+    EXPECT_TRUE(dvsWidePortRecords);
 }
 
 // --- Ports. ---
@@ -238,6 +239,30 @@ TEST_F(LoadTest, OnlyUplinkPortsGetTheResourceManagement) {
     ASSERT_EQ(2u, loaded[0].ports.size());
     EXPECT_FALSE(Has(loaded[0].ports[0].props, "com.orbeno.common.port.respools.cfg"));
     EXPECT_EQ(216u, Find(loaded[0].ports[1].props, "com.orbeno.common.port.respools.cfg").value.size());
+}
+
+// A port's own object does not tell the switch's version.
+TEST_F(LoadTest, MirrorSessionsOfPortsHaveTheWidthOfTheirSwitchesVersion) {
+    const std::pair<const char *, bool> switches[] = {{"a", false}, {"b", true}, {"c", false}};
+    for (const auto &[id, isOverlay] : switches) {
+        configstore::Object *object = New(id);
+        ASSERT_EQ(0, configstore::SetValueBool(object, "ovl_enabled", isOverlay));
+        configstore::Object *session = Sub(Sub(object, "ports", "p"), "vspans", "s");
+        configstore::Object *sources = Sub(session, "source_recv_port");
+        ASSERT_EQ(0, configstore::AppendValueString(sources, "port_keys", "q"));
+        Put(object);
+    }
+    for (const int level : {10, 0}) {
+        dvsconfigstore_debug = level;
+        const auto loaded = Load();
+        ASSERT_EQ(3u, loaded.size());
+        for (std::size_t i = 0; i < 3; ++i) {
+            const Props &props = loaded[i].ports.at(0).props;
+            const std::size_t record = switches[i].second ? 52 : 36;
+            EXPECT_EQ(20 + 232 + 3 * record,
+                      Find(props, "com.orbeno.etherswitch.port.mirrorSessions").value.size());
+        }
+    }
 }
 
 TEST_F(LoadTest, UplinkKeysOfAnotherTypeFailASwitchWithoutPortsOnly) {
@@ -267,7 +292,7 @@ TEST_F(LoadTest, APortThatFailsEndsTheLoad) {
     ExpectSuccessWithoutBuffer();
 }
 
-// In both ways of building the buffer: nothing of the port that ended the walk is in it.
+// Nothing of the port that ended the walk is in the buffer.
 TEST_F(LoadTest, APortThatLacksSomethingEndsTheWalkOverThePortsWithoutFailingTheSwitch) {
     configstore::Object *object = New("a");
     Sub(object, "ports", "first");

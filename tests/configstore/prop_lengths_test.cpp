@@ -41,7 +41,6 @@ struct PropLengths : FrameTest {
                     saved == configstore::SCHEMA_VIOLATION)
             << key << " " << saved;
         if (propClass != DVS_PROP_CLASS_PORT) MakeSwitch();
-        dvsLoadedSwitch = nullptr;
         (void)Load(propClass);
     }
 

@@ -16,11 +16,11 @@ namespace {
 struct PropSaverTest : FrameTest {
     int32_t SaveMany(const Props &props, uint32_t propClass = DVS_PROP_CLASS_GLOBAL) {
         int32_t result = 0;
-        dvs::config::PropSaver saver;
+        const dvs::convert::Context context = {.switchClass = dvsSwitchClass};
+        dvs::config::PropSaver saver(context, dvs::config::PropSaver::For::kManyProperties);
         saver.Begin(object, propClass);
         for (const auto &prop : props) {
-            result = saver.Save(prop.key.c_str(), prop.value.data(), static_cast<uint32_t>(prop.value.size()),
-                                prop.type);
+            result = saver.Save(prop.key.c_str(), prop.value, prop.type);
             if (result) break;
         }
         saver.End();
@@ -55,8 +55,7 @@ TEST_F(PropSaverTest, FindsTheSameRowsAsAWalk) {
         using enum dvs::ConverterType;
         const auto defaultType = kind == DVS_PROP_CLASS_PORT ? kPortDefault : kSwitchDefault;
         const auto *table = GetConfigMap(kind);
-        dvs::config::RowIndex index;
-        index.Build(table, defaultType);
+        dvs::config::RowIndex index(table, defaultType);
         for (int round = 0; round < 2; ++round) // the second by what came behind what in the first
             for (const auto *row = table; row->key; ++row)
                 EXPECT_EQ(dvs::config::FindRow(table, row->key, defaultType), index.Find(row->key).row)

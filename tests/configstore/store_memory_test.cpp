@@ -98,17 +98,11 @@ TEST_F(StoreMemory, FailingLoadReturnsNoBuffer) {
         std::free(buf);
         return status == 0 && !buf ? -1 : status;
     };
-    // The image, and what the load falls back on when it cannot have one; then lists from the start, which
-    // take a block for each entry.
-    const struct {
-        int debugLevel;
-        uint64_t blocks;
-    } ways[] = {{-1, 5}, {1, 20}};
-    for (const auto &way : ways) {
-        dvsconfigstore_debug = way.debugLevel;
+    for (const int level : {-1, 1}) {
+        dvsconfigstore_debug = level;
         const uint64_t rounds = fault::Sweep(
             "alloc:%", [&](fault::Child &child) { return OnStore(child, load); }, ExpectClean, options);
-        EXPECT_GT(rounds, way.blocks);
+        EXPECT_GE(rounds, 5u); // the image, two values, and its last block; then a load that succeeds
     }
 }
 

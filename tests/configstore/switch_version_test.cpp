@@ -11,6 +11,13 @@ namespace {
 
 constexpr const char *kVersion = "com.orbeno.common.version";
 
+int32_t ReadVersion(configstore::Object *object, uint32_t *number) {
+    dvs::convert::SwitchVersion version = {*number, false};
+    const int32_t status = dvs::convert::ReadSwitchVersion(dvs::config::Messages(), object, &version);
+    *number = version.number;
+    return status;
+}
+
 struct SwitchVersion : FrameTest {};
 
 struct VersionCase {
@@ -28,10 +35,10 @@ TEST_F(SwitchVersion, EveryTextHasANumberAndAnOverlayNumber) {
         MakeSwitch("etherswitch", row.text);
         uint32_t version = 0;
         ASSERT_EQ(0, configstore::SetValueBool(object, "ovl_enabled", false));
-        ASSERT_EQ(0, dvs::convert::ReadSwitchVersion(object, &version));
+        ASSERT_EQ(0, ReadVersion(object, &version));
         EXPECT_EQ(row.number, version);
         ASSERT_EQ(0, configstore::SetValueBool(object, "ovl_enabled", true));
-        ASSERT_EQ(0, dvs::convert::ReadSwitchVersion(object, &version));
+        ASSERT_EQ(0, ReadVersion(object, &version));
         EXPECT_EQ(row.overlayNumber, version);
         EXPECT_EQ(U32(row.overlayNumber), Find(Load(), kVersion).value);
     }
@@ -63,7 +70,7 @@ TEST_F(SwitchVersion, NumbersWithoutATextCannotBeSaved) {
 TEST_F(SwitchVersion, UnknownTextFailsTheRead) {
     MakeSwitch("etherswitch", "7.0.1");
     uint32_t version = 77;
-    EXPECT_EQ(-1, dvs::convert::ReadSwitchVersion(object, &version));
+    EXPECT_EQ(-1, ReadVersion(object, &version));
     EXPECT_EQ("Unknown vds version 7.0.1\n", errors);
     EXPECT_EQ(77u, version);
     (void)Load();
@@ -79,9 +86,9 @@ TEST_F(SwitchVersion, Version800WithoutOverlayFlagLoadsAs10) {
 
 TEST_F(SwitchVersion, ReportsAbsentFields) {
     uint32_t version = 0;
-    EXPECT_EQ(6, dvs::convert::ReadSwitchVersion(object, &version));
+    EXPECT_EQ(6, ReadVersion(object, &version));
     Sub(object, "product");
-    EXPECT_EQ(6, dvs::convert::ReadSwitchVersion(object, &version));
+    EXPECT_EQ(6, ReadVersion(object, &version));
     EXPECT_EQ("Failed to get product obj, rc: 6\nFailed to get version obj, rc: 6\n", errors);
 }
 

@@ -67,7 +67,6 @@ void ConverterTest::BecomeSwitch(const char *className, const char *version, boo
                      : std::strcmp(className, "cswitch") == 0 ? 2
                                                               : 0;
     dvsWidePortRecords = overlay || std::strcmp(version, "OVL 1.0") == 0;
-    dvsLoadedSwitch = nullptr;
     configstore::Object *product = Sub("product");
     EXPECT_EQ(0, configstore::SetValueStr(product, "forwarding_class", className));
     EXPECT_EQ(0, configstore::SetValueStr(product, "version", version));

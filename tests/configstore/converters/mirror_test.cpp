@@ -294,7 +294,7 @@ TEST_F(Mirror, OverlayVersionsHaveWidePortRecords) {
     }
 }
 
-TEST_F(Mirror, APortAsksTheSwitchBeingLoadedElseTheFlag) {
+TEST_F(Mirror, APortThatIsLoadedAloneTakesTheFlag) {
     Session session;
     session.destinations = 1;
     const auto loaded = [&] {
@@ -306,17 +306,6 @@ TEST_F(Mirror, APortAsksTheSwitchBeingLoadedElseTheFlag) {
     EXPECT_EQ(head + 3 * 36, loaded());
     dvsWidePortRecords = true;
     EXPECT_EQ(head + 3 * 52, loaded());
-    configstore::Object *other = nullptr;
-    ASSERT_EQ(0, configstore::CreateObject("switches", "network_vds", "qel", "other", "{}", &other));
-    dvsLoadedSwitch = other;
-    EXPECT_EQ(0u, loaded());
-    EXPECT_EQ(configstore::NOT_FOUND, loadStatus) << "a switch without a version";
-    configstore::Object *product = nullptr;
-    ASSERT_EQ(0, configstore::CreateSubObject(other, "product", "", &product));
-    ASSERT_EQ(0, configstore::SetValueStr(product, "version", "7.0.3"));
-    EXPECT_EQ(head + 3 * 36, loaded());
-    dvsLoadedSwitch = nullptr;
-    configstore::DestroyObject(other);
 }
 
 TEST_F(Mirror, EachClassLoadsTheKeysOfItsFamily) {

@@ -185,10 +185,10 @@ TEST_F(PortPolicy, ShapingDividesSignedAndReadsBadLimitsAsZero) {
 TEST_F(PortPolicy, ShapingLoadsADirectionFromItsOwnLeafOnly) {
     ASSERT_EQ(0, Save(kPort, "com.orbeno.common.port.shaper.output", Bytes().U64(1).U64(2).U64(3)));
     const char *input = "com.orbeno.common.port.shaper.input";
-    EXPECT_EQ(0, dvs::convert::LoadShaping(
-                     {object, Sub("settings"), nullptr, "out_shaping_policy", input, 16, kPort}));
-    EXPECT_EQ(0, dvs::convert::LoadShaping(
-                     {object, Sub("settings"), nullptr, "out_shaping_policy", "other", 16, kPort}));
+    const dvs::convert::Context context;
+    for (const char *key : {input, "other"})
+        EXPECT_EQ(0, dvs::convert::LoadShaping({context, object, Sub("settings"), nullptr,
+                                                "out_shaping_policy", key, 16, kPort}));
 }
 
 TEST_F(PortPolicy, SecuritySavesAllowedFlags) {

@@ -102,8 +102,9 @@ TEST_F(PrivateVlan, MissingFieldsFailTheLoadWithTheirStatus) {
 TEST_F(PrivateVlan, SwitchWithoutClassOrVersionDoesNotLoad) {
     ASSERT_EQ(0, Save(kGlobal, kEtherswitch, Entry(1, 2, 3)));
     const auto load = [&] {
+        const dvs::convert::Context context;
         return dvs::convert::LoadPrivateVlans(
-            {object, Sub("settings"), nullptr, "pvlans", kEtherswitch, 16, kGlobal});
+            {context, object, Sub("settings"), nullptr, "pvlans", kEtherswitch, 16, kGlobal});
     };
     ASSERT_EQ(0, configstore::SetValueStr(Sub("product"), "version", "7.0.1"));
     EXPECT_EQ(-1, load());

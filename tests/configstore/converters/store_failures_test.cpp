@@ -11,6 +11,7 @@
 #include "configstore/layouts/registry.h"
 #include "configstore/layouts/value_generator.h"
 #include "configstore/round_trip/values.h"
+#include "dvsdata/growing_image.h"
 
 using namespace converter_test;
 
@@ -128,15 +129,12 @@ struct StoreFailures : ConverterTest {
         configstore::Object *parent = nullptr;
         if (const int32_t status = GetSubObjectByPath(row.path, row.depth, object, &parent, false))
             return status;
-        DVSData *list = nullptr;
-        EXPECT_EQ(HYP_OK, DVSData_Alloc(
-                              &list, [](uint64_t size) { return std::malloc(size); }, std::free));
+        dvs::data::GrowingImage list;
+        EXPECT_EQ(HYP_OK, list.BeginBuffer());
         dvs::convert::KnownFilters filters;
-        const int32_t status =
-            dvs::convert::ConverterFor(ConverterTypeOf(row))
-                ->load({object, parent, list, row.path[row.depth - 1], row.key, 16, propClass, &filters});
-        DVSData_Free(list);
-        return status;
+        const dvs::convert::Context context = {.switchClass = dvsSwitchClass, .filters = &filters};
+        return dvs::convert::ConverterFor(ConverterTypeOf(row))
+            ->load({context, object, parent, &list, row.path[row.depth - 1], row.key, 16, propClass});
     }
 
     // Fails the first call, then the second and so on, until a run has no such call.

@@ -195,12 +195,13 @@ TEST_F(SwitchTable, UnreadableHealthCheckFieldsAreZero) {
 
 TEST_F(SwitchTable, OtherKeysAreNotHealthChecks) {
     const uint8_t value[5] = {};
+    const dvs::convert::Context context;
     EXPECT_EQ(-1, dvs::convert::SaveHealthCheck(
-                      {object, object, "health_checks", value, "com.orbeno.other", kGlobal, 16}));
+                      {context, object, object, "health_checks", value, "com.orbeno.other", kGlobal, 16}));
     EXPECT_EQ("Unknown health check type com.orbeno.other\n", messages);
     messages.clear();
     EXPECT_EQ(-1, dvs::convert::LoadHealthCheck(
-                      {object, object, nullptr, "health_checks", "com.orbeno.other", 16, kGlobal}));
+                      {context, object, object, nullptr, "health_checks", "com.orbeno.other", 16, kGlobal}));
     EXPECT_EQ("", messages);
 }
 

@@ -332,14 +332,11 @@ TEST_F(Typed, TellsWhatReadsBackOtherwise) {
 
 TEST_F(Typed, LeavesTheConvertersValuesAsTheyWere) {
     BecomeSwitch("cswitch", "OVL 1.0");
-    dvsLoadedSwitch = object;
     (void)Describe(kPort, kVlan, Bytes().U16(0).U16(100).U32(0));
     (void)Build(kPort, kVlan, Object({Number(100, "vlan_id")}));
     EXPECT_EQ(2u, dvsSwitchClass);
     EXPECT_TRUE(dvsWidePortRecords);
-    EXPECT_EQ(object, dvsLoadedSwitch);
     EXPECT_EQ(10, dvsconfigstore_debug);
-    dvsLoadedSwitch = nullptr;
 }
 
 TEST_F(Typed, TheOverlayFlagIsItselfWhateverTheVersion) {
