@@ -9,6 +9,7 @@
 #include <random>
 #include <sqlite3.h>
 #include <sys/stat.h>
+#include <unistd.h>
 
 using namespace configstore;
 using namespace store_test;
@@ -176,6 +177,45 @@ TEST_F(StoreHostileDatabase, RejectsForeignTablesUnderOurApplicationId) {
     ExpectRefused(CORRUPT, "tables");
     Run("DROP TRIGGER t; DROP VIEW history; CREATE VIEW history AS SELECT 1");
     ExpectRefused(CORRUPT, "tables");
+}
+
+TEST_F(StoreHostileDatabase, RejectsMoreTablesViewsOrIndexes) {
+    GoodStore();
+    for (const char *more : {"TABLE", "VIEW", "INDEX", "UNIQUE INDEX"}) {
+        const std::string what = more;
+        const std::string kind = what == "UNIQUE INDEX" ? "INDEX" : what;
+        Run("CREATE " + what + " another " +
+            (kind == "TABLE"  ? "(x)"
+             : kind == "VIEW" ? "AS SELECT 1"
+                              : "ON revision (saved_ms, revision)"));
+        ExpectRefused(CORRUPT, "tables");
+        Run("DROP " + kind + " another");
+    }
+    EXPECT_EQ(StoredIds(Open().get()).size(), 3U);
+    Run("ANALYZE"); // what an administrator may do
+    EXPECT_EQ(StoredIds(Open().get()).size(), 3U);
+}
+
+TEST_F(StoreHostileDatabase, RejectsAChangeAfterTheLastRevision) {
+    GoodStore();
+    Run("INSERT INTO revision VALUES (9223372036854775807, 0)");
+    const StorePtr store = Open();
+    EXPECT_EQ(Set(store.get(), NewSwitch().get(), "EXTERNAL"), CORRUPT);
+    EXPECT_NE(LastFailure(store.get()).find("no revision after 9223372036854775807"), std::string::npos)
+        << LastFailure(store.get());
+    EXPECT_EQ(Number("SELECT count(*) FROM revision"), 10);
+}
+
+TEST_F(StoreHostileDatabase, RejectsAHardLinkUnderEitherName) {
+    GoodStore();
+    const std::string other = directory_ + "/other.db";
+    ASSERT_EQ(link(path_.c_str(), other.c_str()), 0);
+    ExpectRefused(IO_ERROR, "hard links");
+    path_ = other;
+    ExpectRefused(IO_ERROR, "hard links");
+    ASSERT_EQ(unlink(path_.c_str()), 0);
+    path_ = directory_ + "/store.db";
+    EXPECT_EQ(StoredIds(Open().get()).size(), 3U);
 }
 
 TEST_F(StoreHostileDatabase, RejectsATextFileUnchanged) {

@@ -216,6 +216,12 @@ private:
     /// The transaction's revision, taken at its first change.
     int32_t TakeRevision() {
         if (revision_ != 0) return OK;
+        // Past the largest number, SQLite would pick any free one, and later would come before earlier.
+        int64_t latest = 0;
+        if (const int32_t read = LatestRevision(&latest); read != OK) return read;
+        if (latest < 0 || latest == INT64_MAX)
+            return connection_.failures->Fail(CORRUPT,
+                                              "there is no revision after " + std::to_string(latest));
         timespec now{};
         clock_gettime(CLOCK_REALTIME, &now);
         Statement statement(connection_, "INSERT INTO revision (saved_ms) VALUES (?)");

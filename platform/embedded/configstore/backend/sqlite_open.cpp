@@ -56,6 +56,10 @@ int32_t CheckFile(Access access, FailureKeeper *failures) {
                                                          : "not a regular file";
         return failures->Fail(IO_ERROR, std::string("this is ") + what + "; name the database file itself");
     }
+    // Each name would have a write-ahead log of its own.
+    if (info.st_nlink > 1)
+        return failures->Fail(IO_ERROR, "this file has " + std::to_string(info.st_nlink) +
+                                            " names (hard links); a store must have one");
     // Copies and restored backups often have wider modes. Another owner's file keeps its mode.
     if (access == Access::ReadWrite && (info.st_mode & kOthersBits) != 0 && info.st_uid == geteuid())
         (void)chmod(path.c_str(), info.st_mode & ~kOthersBits & 07777);

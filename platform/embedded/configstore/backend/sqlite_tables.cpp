@@ -4,6 +4,7 @@
 
 #include "platform/embedded/configstore/backend/sqlite_tables.h"
 
+#include <algorithm>
 #include <iterator>
 
 #include "platform/configstore.h"
@@ -43,6 +44,12 @@ constexpr Definition kDefinitions[] = {
                 "ended, deleted, "
                 "datetime(saved_ms / 1000, 'unixepoch') AS ended_at, d.text AS document FROM history_row h "
                 "JOIN document d ON d.id = h.document JOIN revision r ON r.revision = h.ended"},
+};
+
+// What ANALYZE adds.
+constexpr Definition kStatistics[] = {
+    {"sqlite_stat1", "CREATE TABLE sqlite_stat1(tbl,idx,stat)"},
+    {"sqlite_stat4", "CREATE TABLE sqlite_stat4(tbl,idx,neq,nlt,ndlt,sample)"},
 };
 
 int32_t ReadNumber(const Connection &connection, const char *sql, int64_t *value) {
@@ -88,20 +95,25 @@ int32_t MakeStore(const Connection &connection) {
     return status;
 }
 
-/// Whether the tables are the ones that this code made. Others could turn a plain statement into something
-/// else.
+/// Whether the database has exactly the tables, views and indexes that this code makes. Others could turn a plain
+/// statement into something else, or make every save fail. SQLite's own statistics are harmless.
 int32_t CheckDefinitions(const Connection &connection) {
     Statement statement(connection, "SELECT name, sql FROM sqlite_schema WHERE sql IS NOT NULL");
     std::size_t known = 0;
+    bool hasOthers = false;
     while (statement.Step()) {
         const std::string_view name = statement.Text(0);
         const std::string_view sql = statement.Text(1);
-        for (const Definition &definition : kDefinitions)
-            known += name == definition.name && sql == definition.sql;
-        if (sql.starts_with("CREATE TRIGGER")) known = SIZE_MAX / 2;
+        const auto is = [&](const Definition &definition) {
+            return name == definition.name && sql == definition.sql;
+        };
+        if (std::any_of(std::begin(kDefinitions), std::end(kDefinitions), is))
+            known++;
+        else
+            hasOthers |= std::none_of(std::begin(kStatistics), std::end(kStatistics), is);
     }
     if (statement.Status() != OK) return statement.Status();
-    if (known == std::size(kDefinitions)) return OK;
+    if (known == std::size(kDefinitions) && !hasOthers) return OK;
     return connection.failures->Fail(CORRUPT, "its tables are not those of a config store");
 }
 
