@@ -102,6 +102,8 @@ TEST_F(KernelSource, ModuleFaultsGiveClearErrors) {
     EXPECT_EQ(Kernel({"copy", At("start.db"), "kernel:"}).status, 1);
     Fault("command=3,nth=1,status=0x0bad0014");
     EXPECT_EQ(Kernel({"show", "kernel:"}).status, 1);
+    Fault("command=3,nth=1,errno=EBUSY"); // a fetch prints nothing about it
+    EXPECT_EQ(Kernel({"show", "kernel:"}).status, 8);
 }
 
 TEST_F(KernelSource, HangingModuleTimesOut) {

@@ -19,20 +19,16 @@
 #include <unistd.h>
 
 #include "dvs/hyp.h"
-#include "platform/runtime.h"
 #include "platform/status_text.h"
 
 namespace dvs::ctl {
 
 namespace {
 
-// What the library says, word for word, where its status alone would not tell.
-constexpr std::string_view kOpenFailed = "failed to open dvsdev device ";
-constexpr std::string_view kCallFailed = "ioctl failed: ";
-
 /// What the child sends before the messages (each with its NUL) and the reply, which ends with the pipe.
 struct Head {
     HYP_ReturnStatus status;
+    hyp::Failure failure;
     std::uint32_t numMessages;
     std::uint64_t messagesSize;
 };
@@ -55,7 +51,9 @@ void SendAll(int fd, const void *bytes, std::size_t size) {
     Head head{};
     try {
         (void)context.log.Take(); // the parent has these
+        const hyp::FailureObserver observer;
         head.status = call(reply);
+        head.failure = observer.Last();
         std::string messages;
         for (const std::string &message : context.log.Take()) {
             messages += message.substr(0, message.find('\0')) + '\0';
@@ -66,7 +64,7 @@ void SendAll(int fd, const void *bytes, std::size_t size) {
         SendAll(fd, messages.data(), messages.size());
         SendAll(fd, reply.data(), reply.size());
     } catch (const std::exception &) {
-        head = {HYP_NO_MEMORY, 0, 0};
+        head = {HYP_NO_MEMORY, {}, 0, 0};
         SendAll(fd, &head, sizeof head);
     }
     _exit(EXIT_SUCCESS);
@@ -153,11 +151,6 @@ private:
         .Try("what was asked for may have been carried out: look before repeating it");
 }
 
-bool Says(const Answer &answer, std::string_view text) {
-    return std::any_of(answer.messages.begin(), answer.messages.end(),
-                       [&](const std::string &message) { return message.find(text) != std::string::npos; });
-}
-
 Answer Unpack(Bytes bytes, int status) {
     Head head;
     if (bytes.size() < sizeof head || !WIFEXITED(status) || WEXITSTATUS(status) != EXIT_SUCCESS)
@@ -168,13 +161,13 @@ Answer Unpack(Bytes bytes, int status) {
     bytes = bytes.subspan(texts.size());
     Answer answer;
     answer.status = head.status;
+    answer.failure = head.failure;
     for (; head.numMessages > 0; --head.numMessages) {
         const std::size_t end = std::min(texts.find('\0'), texts.size());
         answer.messages.emplace_back(texts.substr(0, end));
         texts.remove_prefix(std::min(end + 1, texts.size()));
     }
     answer.bytes.assign(bytes.begin(), bytes.end());
-    answer.isAbsent = head.status != HYP_OK && Says(answer, kOpenFailed);
     return answer;
 }
 
@@ -242,12 +235,12 @@ Answer FetchFromDevice(Context &context, const FetchCall &call) {
 }
 
 Error DeviceError(const Answer &answer, std::string title) {
-    if (answer.isAbsent) return AbsentDeviceError(answer, std::move(title));
+    if (answer.IsDeviceAbsent()) return AbsentDeviceError(answer, std::move(title));
     Error error(ErrorKind::Failed, std::move(title));
     error.source = "kernel:";
     error.messages = answer.messages;
-    // The module's own errno explains more than the status does; EBUSY has an exit status of its own.
-    if (Says(answer, std::string(kCallFailed) + Err_Errno2String(EBUSY))) {
+    // The module's own errno explains more than the status does; EBUSY is a kind of its own.
+    if (answer.failure.step == hyp::Step::Send && answer.failure.error == EBUSY) {
         error.kind = ErrorKind::Busy;
         error.why = "the module is busy";
         error.next = "repeat later";

@@ -13,6 +13,7 @@
 
 #include "dvs/status.h"
 #include "form/text.h"
+#include "kernel/failure.h"
 #include "tools/dvsctl/cli/context.h"
 
 namespace dvs::ctl {
@@ -20,9 +21,12 @@ namespace dvs::ctl {
 /// What came of a call that came to its end.
 struct Answer {
     HYP_ReturnStatus status = HYP_OK;
-    bool isAbsent = false;             ///< the device is not there (the status is HYP_FAILURE then)
+    hyp::Failure failure;              ///< of a refusal: which step of the device call failed
     std::vector<std::uint8_t> bytes;   ///< what the call handed back
     std::vector<std::string> messages; ///< what the library said
+
+    /// True when the device could not be opened.
+    bool IsDeviceAbsent() const { return status != HYP_OK && failure.step == hyp::Step::Open; }
 };
 
 /// The buffer a library call hands out, released with it.

@@ -21,7 +21,7 @@ public:
         const bool persistent = context.options.persistent || isForKeeping_;
         const Answer answer =
             FetchFromDevice(context, persistent ? DVSHYP_PersistentStateGet : DVSHYP_StateGet);
-        if (answer.isAbsent && context.options.ifExists) return std::nullopt;
+        if (answer.IsDeviceAbsent() && context.options.ifExists) return std::nullopt;
         if (persistent && (answer.status == HYP_BAD_PARAM || answer.status == HYP_BAD_CHECKSUM))
             RefuseUnsound(context, answer);
         RequireOk(answer, "cannot read the switching module's state");
