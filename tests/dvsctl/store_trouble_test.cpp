@@ -10,8 +10,9 @@
 
 #include <unistd.h>
 
-#include "dvs/configstore.h"
+#include "configstore/save.h"
 #include "dvs/status.h"
+#include "platform/embedded/configstore/admin.h"
 #include "store_fixture.h"
 
 namespace {
@@ -32,6 +33,13 @@ protected:
     static void Sql(const Database &db, const char *sql) {
         EXPECT_EQ(sqlite3_exec(db.get(), sql, nullptr, nullptr, nullptr), SQLITE_OK)
             << sqlite3_errmsg(db.get());
+    }
+    template <typename SaveFn> int32_t SaveWith(SaveFn save, const void *state, uint32_t size) const {
+        configstore::Store *store = nullptr;
+        EXPECT_EQ(configstore::admin::Open(store_, false, &store), configstore::OK);
+        const int32_t status = save(store, state, size, nullptr);
+        configstore::DestroyStore(store);
+        return status;
     }
     void ExpectStoreError(const char *named) const {
         const std::vector<std::vector<std::string>> verbs = {{"show", "store:"},
@@ -161,18 +169,17 @@ const UnsoundRow kUnsound[] = {
 TEST_F(StoreTrouble, RestoreUndoesAPlainSaveOfAnInvalidBuffer) {
     Save();
     const std::string alpha = Document("alpha"), beta = Document("beta");
-    ASSERT_EQ(setenv("DVS_CONFIGSTORE", store_.c_str(), 1), 0);
     for (const UnsoundRow &row : kUnsound) {
         SCOPED_TRACE(row.what);
         const std::string buffer = row.make(Get("site.db"));
         const auto size = static_cast<uint32_t>(buffer.size());
         const std::string before = Get("store.db");
-        EXPECT_EQ(DVSState_SaveBufToConfigStoreChecked(buffer.data(), size, nullptr),
+        EXPECT_EQ(SaveWith(dvs::config::SaveStateChecked, buffer.data(), size),
                   static_cast<int32_t>(row.refusal));
         EXPECT_EQ(Get("store.db"), before);
 
         // The plain save treats a buffer that does not load as a state without switches.
-        ASSERT_EQ(DVSState_SaveBufToConfigStore(buffer.data(), size), 0);
+        ASSERT_EQ(SaveWith(dvs::config::SaveState, buffer.data(), size), 0);
         EXPECT_EQ(Json(Ctl({"store", "list", "--json"})).at("objects"), boost::json::array());
         const auto events = Json(Ctl({"store", "history", "--json"})).at("events").as_array();
         ASSERT_FALSE(events.empty());
